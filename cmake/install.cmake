@@ -1,0 +1,19 @@
+# The installed tree: library, public headers side by side as <tavosso/sso.h> and <tavosso/jwt.h>, a CMake package, a
+# pkg-config file.
+set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/tavosso)
+
+install(TARGETS tavosso EXPORT tavosso
+        LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}
+        FILE_SET headers DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/tavosso)
+if(TARGET tavoplatform)
+    install(TARGETS tavoplatform EXPORT tavosso LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} NAMELINK_SKIP)
+endif()
+
+install(EXPORT tavosso NAMESPACE tavosso:: DESTINATION ${package_dir})
+configure_package_config_file(cmake/tavossoConfig.cmake.in tavossoConfig.cmake INSTALL_DESTINATION ${package_dir})
+write_basic_package_version_file(tavossoConfigVersion.cmake COMPATIBILITY SameMajorVersion)
+install(FILES ${PROJECT_BINARY_DIR}/tavossoConfig.cmake ${PROJECT_BINARY_DIR}/tavossoConfigVersion.cmake
+        DESTINATION ${package_dir})
+
+configure_file(cmake/tavosso.pc.in tavosso.pc @ONLY)
+install(FILES ${PROJECT_BINARY_DIR}/tavosso.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)

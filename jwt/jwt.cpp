@@ -1,0 +1,318 @@
+#include "jwt/jwt.h"
+
+#include <openssl/bio.h>
+#include <openssl/bn.h>
+#include <openssl/err.h>
+#include <openssl/evp.h>
+#include <openssl/hmac.h>
+#include <openssl/rsa.h>
+#include <syslog.h>
+
+#include <algorithm>
+#include <boost/algorithm/string/classification.hpp>
+#include <boost/algorithm/string/split.hpp>
+#include <climits>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+#include <utility>
+#include <vector>
+
+#include "utils/cleanse.h"
+#include "utils/json.h"
+#include "utils/source_line.h"
+
+namespace TAVO::JWT {
+
+namespace {
+
+constexpr char kSourceName[] = "jwt";
+
+template <auto function>
+struct ReleaseWith {
+    template <typename T>
+    void operator()(T *object) const {
+        function(object);
+    }
+};
+
+using Bytes = std::unique_ptr<unsigned char, ReleaseWith<std::free>>;
+using BIOPointer = std::unique_ptr<BIO, ReleaseWith<BIO_free_all>>;
+using BigNumber = std::unique_ptr<BIGNUM, ReleaseWith<BN_free>>;
+using DigestContext = std::unique_ptr<EVP_MD_CTX, ReleaseWith<EVP_MD_CTX_free>>;
+using PublicKey = std::unique_ptr<EVP_PKEY, ReleaseWith<EVP_PKEY_free>>;
+
+/// The error queue of OpenSSL belongs to the program that loads this library: what our calls leave there goes again.
+struct KeepErrorQueue {
+    KeepErrorQueue() { ERR_set_mark(); }
+    ~KeepErrorQueue() { ERR_pop_to_mark(); }
+    KeepErrorQueue(const KeepErrorQueue &) = delete;
+    KeepErrorQueue &operator=(const KeepErrorQueue &) = delete;
+};
+
+/// Room for a text: on the stack while it is small, as tokens are, and elsewhere when a provider sends a large one.
+/// Cleansed on release, as the text may be a key.
+class ScratchText {
+  public:
+    explicit ScratchText(std::size_t size)
+        : large_(size > sizeof small_ ? std::make_unique<char[]>(size) : nullptr),
+          text_(large_ ? large_.get() : small_),
+          cleanse_(text_, size) {}
+    char *get() { return text_; }
+
+  private:
+    char small_[4096];
+    std::unique_ptr<char[]> large_;
+    char *text_;
+    Utils::CleanseOnExit cleanse_;
+};
+
+/// A base64 filter on top of a source or sink, which it takes over; null when either is missing.
+BIOPointer PushBase64Filter(BIOPointer filter, BIOPointer end) {
+    if (!filter || !end) {
+        return nullptr;
+    }
+    BIO_set_flags(filter.get(), BIO_FLAGS_BASE64_NO_NL);
+    BIO_push(filter.get(), end.release());
+    return filter;
+}
+
+/// Decodes one base64url part of a token (RFC 7515, section 2), or standard base64. Returns the bytes with a NUL behind
+/// them and writes their number, which is 0 or less where the text is not base64. Null, and no number, when the part is
+/// empty or memory runs out.
+Bytes Base64UrlDecode(const char *part, int *length) {
+    const KeepErrorQueue keepErrorQueue;
+    const std::size_t partLength = std::strlen(part);
+    const std::size_t padding = (4 - partLength % 4) % 4;
+    if (partLength + padding > INT_MAX) {
+        return nullptr;  // OpenSSL counts in int
+    }
+    ScratchText scratch(partLength + padding + 1);
+    char *end = scratch.get();
+    for (const char *c = part; *c != '\0'; ++c) {
+        *end++ = *c == '-' ? '+' : *c == '_' ? '/' : *c;
+    }
+    end = std::fill_n(end, padding, '=');
+    *end = '\0';
+
+    const int textLength = static_cast<int>(end - scratch.get());
+    BIOPointer filter(BIO_new(BIO_f_base64()));
+    BIOPointer source(BIO_new_mem_buf(scratch.get(), textLength));
+    const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(source));
+    if (!chain) {
+        return nullptr;
+    }
+    const long pending = BIO_pending(chain.get());
+    if (pending <= 0) {
+        return nullptr;
+    }
+    Bytes decoded(static_cast<unsigned char *>(std::malloc(static_cast<std::size_t>(pending) + 1)));
+    if (!decoded) {
+        return nullptr;
+    }
+    *length = BIO_read(chain.get(), decoded.get(), static_cast<int>(pending));
+    decoded.get()[*length > 0 ? *length : 0] = '\0';
+    return decoded;
+}
+
+/// A decoded part; empty when the part did not decode, which is also the case when it decodes to nothing: an empty key
+/// would let anyone sign.
+struct DecodedPart {
+    explicit DecodedPart(const std::string &part) : bytes(Base64UrlDecode(part.c_str(), &length)) {}
+    explicit operator bool() const { return bytes && length > 0; }
+
+    int length = 0;
+    Bytes bytes;
+};
+
+/// The JSON value that a part encodes. Throws std::invalid_argument with that message if it is not JSON.
+Json::Value ParsePart(const std::string &part, const char *notJson) {
+    int length = 0;
+    const Bytes decoded = Base64UrlDecode(part.c_str(), &length);
+    if (!decoded) {
+        throw std::logic_error("empty jwt part");
+    }
+    Json::Value value;
+    if (!Utils::ParseJson(reinterpret_cast<const char *>(decoded.get()), value)) {
+        throw std::invalid_argument(notJson);
+    }
+    return value;
+}
+
+// The low-level RSA calls are marked deprecated in OpenSSL 3; older generations have no others.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wdeprecated-declarations"
+
+struct ReleaseRSA {
+    void operator()(RSA *rsa) const { RSA_free(rsa); }
+};
+using RSAPointer = std::unique_ptr<RSA, ReleaseRSA>;
+
+BigNumber MakeBigNumber(const DecodedPart &part) {
+    return BigNumber(BN_bin2bn(part.bytes.get(), part.length, nullptr));
+}
+
+RSAPointer MakeRSA(const DecodedPart &n, const DecodedPart &e) {
+    BigNumber modulus = MakeBigNumber(n);
+    BigNumber exponent = MakeBigNumber(e);
+    if (!modulus || !exponent) {
+        return nullptr;
+    }
+    RSAPointer rsa(RSA_new());
+    if (!rsa || RSA_set0_key(rsa.get(), modulus.get(), exponent.get(), nullptr) != 1) {
+        return nullptr;
+    }
+    modulus.release();
+    exponent.release();
+    return rsa;
+}
+
+/// The public key of modulus and exponent; null when it cannot be made.
+PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
+    RSAPointer rsa = MakeRSA(n, e);
+    if (!rsa) {
+        return nullptr;
+    }
+    PublicKey key(EVP_PKEY_new());
+    if (!key) {
+        return nullptr;
+    }
+    if (EVP_PKEY_assign(key.get(), EVP_PKEY_RSA, rsa.get()) != 1) {
+        syslog(LOG_ERR, "%s:%d EVP_PKEY_assign_RSA failed", SOURCE_LINE);
+        return nullptr;
+    }
+    rsa.release();
+    if (EVP_PKEY_id(key.get()) != EVP_PKEY_RSA) {
+        syslog(LOG_ERR, "%s:%d check key type failed", SOURCE_LINE);
+        return nullptr;
+    }
+    return key;
+}
+
+#pragma GCC diagnostic pop
+
+bool VerifyRSA(const std::string &signingInput, const std::string &n, const std::string &e,
+               const std::string &signature, const EVP_MD *md) {
+    const KeepErrorQueue keepErrorQueue;
+    const DecodedPart modulus(n);
+    const DecodedPart exponent(e);
+    const DecodedPart signatureBytes(signature);
+    if (!modulus || !exponent || !signatureBytes) {
+        return false;
+    }
+    const PublicKey key = MakePublicKey(modulus, exponent);
+    if (!key) {
+        return false;
+    }
+    const DigestContext context(EVP_MD_CTX_new());
+    if (!context) {
+        return false;
+    }
+    if (EVP_DigestVerifyInit(context.get(), nullptr, md, nullptr, key.get()) != 1) {
+        syslog(LOG_ERR, "%s:%d EVP_DigestVerifyInit failed", SOURCE_LINE);
+        return false;
+    }
+    if (EVP_DigestUpdate(context.get(), signingInput.c_str(), std::strlen(signingInput.c_str())) != 1) {
+        syslog(LOG_ERR, "%s:%d EVP_DigestVerifyUpdate failed", SOURCE_LINE);
+        return false;
+    }
+    if (EVP_DigestVerifyFinal(context.get(), signatureBytes.bytes.get(),
+                              static_cast<std::size_t>(signatureBytes.length)) != 1) {
+        syslog(LOG_ERR, "%s:%d EVP_DigestVerifyFinal failed", SOURCE_LINE);
+        return false;
+    }
+    return true;
+}
+
+/// Turns standard base64 into base64url without padding.
+void MakeBase64Url(char *text) {
+    char *end = text;
+    for (const char *c = text; *c != '\0'; ++c) {
+        if (*c != '=') {
+            *end++ = *c == '/' ? '_' : *c == '+' ? '-' : *c;
+        }
+    }
+    *end = '\0';
+}
+
+bool VerifyHMAC(const std::string &signingInput, const std::string &key, const std::string &signature,
+                const EVP_MD *md) {
+    const KeepErrorQueue keepErrorQueue;
+    const DecodedPart keyBytes(key);
+    if (!keyBytes) {
+        return false;
+    }
+    const Utils::CleanseOnExit cleanse(keyBytes.bytes.get(), static_cast<std::size_t>(keyBytes.length));
+    BIOPointer filter(BIO_new(BIO_f_base64()));
+    BIOPointer sink(BIO_new(BIO_s_mem()));
+    BIO *encoded = sink.get();
+    const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(sink));
+    if (!chain) {
+        return false;
+    }
+
+    unsigned char mac[EVP_MAX_MD_SIZE] = {};
+    unsigned int macLength = 0;
+    if (HMAC(md, keyBytes.bytes.get(), keyBytes.length, reinterpret_cast<const unsigned char *>(signingInput.c_str()),
+             std::strlen(signingInput.c_str()), mac, &macLength) == nullptr) {
+        return false;
+    }
+    // A MAC of which nothing arrived would match an empty signature.
+    if (BIO_write(chain.get(), mac, static_cast<int>(macLength)) != static_cast<int>(macLength) ||
+        BIO_flush(chain.get()) != 1) {
+        return false;
+    }
+    char text[2 * EVP_MAX_MD_SIZE] = {};
+    const long pending = BIO_pending(encoded);
+    if (pending <= 0 || pending >= static_cast<long>(sizeof text) ||
+        BIO_read(encoded, text, static_cast<int>(pending)) != pending) {
+        return false;
+    }
+    MakeBase64Url(text);
+    return std::strcmp(text, signature.c_str()) == 0;
+}
+
+}  // namespace
+
+// The destructors stand here so that each class has its type information in this library, once: that is how a program
+// catches by type what was thrown in here.
+
+jwt_exception::jwt_exception(std::string message) : std::runtime_error(message) {}
+jwt_exception::~jwt_exception() = default;
+
+jwt_not_support::jwt_not_support(std::string message) : jwt_exception(std::move(message)) {}
+jwt_not_support::~jwt_not_support() = default;
+
+jwt_verify_failed::jwt_verify_failed(std::string message) : jwt_exception(std::move(message)) {}
+jwt_verify_failed::~jwt_verify_failed() = default;
+
+Jwt::Jwt(std::string token) {
+    std::vector<std::string> parts;
+    boost::split(parts, token, boost::is_any_of("."));
+    if (parts.size() != 3) {
+        throw std::invalid_argument("bad jwt format!");
+    }
+    header = std::move(parts[0]);
+    body = std::move(parts[1]);
+    signature = std::move(parts[2]);
+}
+
+Jwt::~Jwt() = default;
+
+Json::Value Jwt::GetHeader() { return ParsePart(header, "bad jwt header format!"); }
+Json::Value Jwt::GetBody() { return ParsePart(body, "bad jwt body format!"); }
+std::string Jwt::GetSignature() { return signature; }
+
+void Jwt::JwtRSAVerify(std::string &n, std::string &e, const EVP_MD *md) {
+    if (!VerifyRSA(header + "." + body, n, e, signature, md)) {
+        throw jwt_verify_failed("verify rsa signature failed");
+    }
+}
+
+void Jwt::JwtHMACVerify(std::string &key, const EVP_MD *md) {
+    if (!VerifyHMAC(header + "." + body, key, signature, md)) {
+        throw jwt_verify_failed("verify hmac signature failed");
+    }
+}
+
+}  // namespace TAVO::JWT

@@ -1,0 +1,42 @@
+#include "sso/authorization_request.h"
+
+#include <boost/uuid/random_generator.hpp>
+#include <boost/uuid/uuid_io.hpp>
+#include <iostream>
+
+#include "sso/base64.h"
+#include "sso/names.h"
+#include "sso/parameters.h"
+#include "sso/sso.h"
+#include "utils/json.h"
+
+namespace TAVO::SSO {
+
+namespace {
+
+std::string MakeNonce() { return to_string(boost::uuids::random_generator_mt19937()()); }
+
+/// The state carries the digest of the nonce and not the nonce: a front end can tie the ID token to its request by it,
+/// while the state alone does not give the nonce away.
+std::string MakeState(Json::Value stateInfo, const std::string &nonce) {
+    stateInfo[kNonce] = MD5Digest(nonce);
+    return EncodeBase64(Utils::WriteCompactJson(stateInfo));
+}
+
+}  // namespace
+
+std::string AuthorizationURI(const AuthorizationRequest &request, const Json::Value &stateInfo) {
+    const std::string nonce = MakeNonce();
+    return request.endpoint + WriteQuery({
+                                  {kClientID, request.clientID},
+                                  {kNonce, nonce},
+                                  {kRedirectURI, request.redirectURI},
+                                  {kResponseType, kCode},
+                                  {kScope, request.scope},
+                                  {kState, MakeState(stateInfo, nonce)},
+                              });
+}
+
+void WriteRedirect(const std::string &uri) { std::cout << "Location: " + uri + "\n\n"; }
+
+}  // namespace TAVO::SSO

@@ -1,0 +1,49 @@
+#include "sso/id_token.h"
+
+#include <cstdlib>
+#include <ctime>
+#include <stdexcept>
+
+#include "utils/json.h"
+
+namespace TAVO::SSO {
+
+JWT::Jwt SplitIDToken(const std::string &token) {
+    if (token.empty()) {
+        throw std::invalid_argument("token cannot be empty");
+    }
+    return JWT::Jwt(token);
+}
+
+void CheckExpiry(const Json::Value &claims) {
+    // Reads as far as there are digits: no number at all is 0, long past.
+    const long expiry = std::strtol(Utils::MemberText(claims, "exp").value_or("").c_str(), nullptr, 10);
+    if (std::time(nullptr) > expiry) {
+        throw std::invalid_argument("id_token expired.");
+    }
+}
+
+void CheckAudience(const Json::Value &claims, const std::string &clientID) {
+    if (!Utils::MemberTextIs(claims, "aud", clientID)) {
+        throw std::invalid_argument("client ID invalid");
+    }
+}
+
+const EVP_MD *ChooseDigest(const Json::Value &header, const Algorithm (&supported)[3]) {
+    const std::string name = Utils::MemberText(header, "alg").value_or("");
+    for (const Algorithm &algorithm : supported) {
+        if (name == algorithm.name) {
+            return algorithm.digest();
+        }
+    }
+    throw JWT::jwt_not_support(name + " algorithm is not supported");
+}
+
+Json::Value ReadClaims(const std::string &token) {
+    if (token.empty()) {
+        throw std::invalid_argument("please request a id_token first.");
+    }
+    return JWT::Jwt(token).GetBody();
+}
+
+}  // namespace TAVO::SSO

@@ -1,0 +1,149 @@
+#include "sso/sso.h"
+
+#include <syslog.h>
+
+#include <algorithm>
+#include <iterator>
+#include <new>
+#include <utility>
+
+#include "sso/base64.h"
+#include "sso/names.h"
+#include "sso/token_exchange.h"
+#include "utils/json.h"
+#include "utils/source_line.h"
+
+namespace TAVO::SSO {
+
+namespace {
+
+constexpr char kSourceName[] = "sso";
+
+bool IsSupported(const std::string &profile) {
+    return std::find(std::begin(kSupportedProfiles), std::end(kSupportedProfiles), profile) !=
+           std::end(kSupportedProfiles);
+}
+
+}  // namespace
+
+// The destructors stand here so that each class has its type information in this library, once: that is how a program
+// catches by type what was thrown in here.
+
+sso_exception::sso_exception(std::string message) : std::runtime_error(message) {}
+sso_exception::~sso_exception() = default;
+
+sso_err_resp::sso_err_resp(std::string message) : sso_exception(std::move(message)) {}
+sso_err_resp::~sso_err_resp() = default;
+
+sso_not_implemented::sso_not_implemented(std::string message) : sso_exception(std::move(message)) {}
+sso_not_implemented::~sso_not_implemented() = default;
+
+sso_op_failed::sso_op_failed(std::string message) : sso_exception(std::move(message)) {}
+sso_op_failed::~sso_op_failed() = default;
+
+bool SSOClient::isEnable() { return enable; }
+std::string SSOClient::GetClientID() { return clientID; }
+std::string SSOClient::GetClientSecret() { return clientSecret; }
+std::string SSOClient::GetRedirectURI() { return redirectURI; }
+std::string SSOClient::GetToken() { return token; }
+std::string SSOClient::GetAuthEndpoint() { return authEndpoint; }
+std::string SSOClient::GetTokenEndpoint() { return tokenEndpoint; }
+std::string SSOClient::GetWellknownEndpoint() { return wellknownEndpoint; }
+std::string SSOClient::GetLogoutEndpoint() { return logoutEndpoint; }
+
+void SSOClient::SetRedirectURI(std::string uri) { redirectURI = std::move(uri); }
+void SSOClient::SetCode(std::string authorizationCode) { code = std::move(authorizationCode); }
+
+void SSOClient::RequestWellknownInfo(Json::Value &out) {
+    std::string response;
+    try {
+        httpGet(wellknownEndpoint, response, true, AppendChunk);
+        if (!Utils::ParseJson(response, out)) {
+            throw sso_err_resp("bad wellknown json format.");
+        }
+    } catch (const std::bad_alloc &) {
+        syslog(LOG_ERR, "%s:%d bad_alloc. %m", SOURCE_LINE);
+    } catch (const std::invalid_argument &error) {
+        syslog(LOG_ERR, "%s:%d %s", SOURCE_LINE, error.what());
+    } catch (const sso_err_resp &error) {
+        syslog(LOG_ERR, "%s:%d %s", SOURCE_LINE, error.what());
+    }
+}
+
+void SSOClient::RequestTokenEndpoint(std::string &response, const std::string &body) {
+    try {
+        httpPost(tokenEndpoint, body, response, true, AppendChunk);
+    } catch (const std::bad_alloc &) {
+        syslog(LOG_ERR, "%s:%d bad_alloc. %m", SOURCE_LINE);
+    } catch (const std::invalid_argument &error) {
+        syslog(LOG_ERR, "%s:%d %s", SOURCE_LINE, error.what());
+    } catch (const sso_err_resp &error) {
+        syslog(LOG_ERR, "%s:%d request token uri %s.", SOURCE_LINE, error.what());
+    }
+}
+
+void SSOClient::VerifyIDToken() { throw sso_not_implemented("VerifyIDToken not implemented"); }
+
+std::string SSOClient::GetIDTokenReqParams() { throw sso_not_implemented("GetIDTokenReqParams not implemented"); }
+
+void SSOClient::GetUserName(std::string & /*userName*/) { throw sso_not_implemented("GetUserName not implemented"); }
+
+void SSOClient::ProcessTokenResponse(std::string /*response*/) {
+    throw sso_not_implemented("ProcessTokenResponse not implemented");
+}
+
+void SSOClient::OpenIDConnectLogin(std::string authorizationCode, std::string &userName) {
+    SetCode(std::move(authorizationCode));
+    const std::string body = GetIDTokenReqParams();
+    std::string response;
+    RequestTokenEndpoint(response, body);
+    ProcessTokenResponse(response);
+    VerifyIDToken();
+    GetUserName(userName);
+}
+
+void OIDCLogin(const std::string &code, std::string &userName) {
+    // Read with the ids that the process has: a program that may not see the profile may not log anyone in.
+    Json::Value file;
+    if (!Utils::LoadJsonFile(kProfileFile, file)) {
+        throw sso_op_failed("read profile file failed.");
+    }
+    bool enable = false;
+    if (!Utils::ReadMember(file, kProfileEnable, enable) || !enable) {
+        throw sso_op_failed("sso does not enable.");
+    }
+    std::string profile;
+    if (!Utils::ReadMember(file, kProfileName, profile)) {
+        throw sso_op_failed("not specify sso profile");
+    }
+    if (!IsSupported(profile)) {
+        throw sso_exception("profile not support.");
+    }
+    if (profile == kAzureProfile) {
+        AzureSSOClient().OpenIDConnectLogin(code, userName);
+    } else {
+        WebSphereSSOClient().OpenIDConnectLogin(code, userName);
+    }
+}
+
+std::string GetSSORelayURL(bool success, const std::string &state, const std::string &reason) {
+    std::string query;
+    if (success) {
+        std::string text;
+        Json::Value stateInfo;
+        std::string origin;
+        if (DecodeBase64(state, text) && Utils::ParseJson(text, stateInfo) &&
+            Utils::ReadMember(stateInfo, kOrigin, origin)) {
+            query += "origin=" + URLEncode(origin) + "&";
+        }
+        query += "success=true";
+    } else {
+        if (!reason.empty()) {
+            query += "reason=" + reason + "&";
+        }
+        query += "success=false";
+    }
+    return "ssoclient/relay.html#" + query;
+}
+
+}  // namespace TAVO::SSO

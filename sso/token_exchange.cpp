@@ -1,0 +1,50 @@
+#include "sso/token_exchange.h"
+
+#include <cstring>
+#include <stdexcept>
+
+#include "sso/names.h"
+#include "sso/parameters.h"
+#include "sso/sso.h"
+#include "utils/json.h"
+
+namespace TAVO::SSO {
+
+std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept {
+    const std::size_t length = size * count;
+    try {
+        static_cast<std::string *>(response)->append(data, strnlen(data, length));
+    } catch (...) {
+        return 0;  // an exception through libcurl's frames would leak its connection and ruin the handle
+    }
+    return length;
+}
+
+std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
+                             const std::string &redirectURI) {
+    return WriteForm({
+        {kClientID, clientID},
+        {kClientSecret, clientSecret},
+        {kCode, code},
+        {kGrantType, kAuthorizationCode},
+        {kRedirectURI, redirectURI},
+    });
+}
+
+Json::Value ParseTokenResponse(const std::string &response) {
+    Json::Value tokenResponse;
+    if (!Utils::ParseJson(response, tokenResponse)) {
+        throw std::invalid_argument("parse json falied");
+    }
+    return tokenResponse;
+}
+
+std::string FindIDToken(const Json::Value &tokenResponse) {
+    std::string token;
+    if (!Utils::ReadMember(tokenResponse, kIDToken, token)) {
+        throw sso_err_resp("we cannot find key 'id_token' in response!");
+    }
+    return token;
+}
+
+}  // namespace TAVO::SSO

@@ -1,0 +1,26 @@
+#ifndef TAVOSSO_SSO_TOKEN_EXCHANGE_H
+#define TAVOSSO_SSO_TOKEN_EXCHANGE_H
+
+#include <json/json.h>
+
+#include <string>
+
+namespace TAVO::SSO {
+
+/// The libcurl write callback of every exchange with a provider: appends the chunk, up to its first NUL, to the
+/// std::string that `response` points to. A chunk that memory does not suffice for is refused, and the transfer fails.
+std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept;
+
+/// The form body that exchanges a code for a token (RFC 6749, sections 2.3.1 and 4.1.3).
+std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
+                             const std::string &redirectURI);
+
+/// Throws std::invalid_argument "parse json falied" for an answer that is not JSON.
+Json::Value ParseTokenResponse(const std::string &response);
+
+/// Throws sso_err_resp "we cannot find key 'id_token' in response!" where there is none, or it is not a string.
+std::string FindIDToken(const Json::Value &tokenResponse);
+
+}  // namespace TAVO::SSO
+
+#endif
