@@ -1,0 +1,24 @@
+#ifndef TAVOSSO_TESTS_SUPPORT_SYSTEM_LOG_H
+#define TAVOSSO_TESTS_SUPPORT_SYSTEM_LOG_H
+
+#include <iosfwd>
+#include <string>
+#include <vector>
+
+// The program that links this defines `syslog` itself, and so sees what the library under test writes.
+namespace Test {
+
+struct LogLine {
+    int priority;
+    std::string text;  // with the source's line number written as N: "utils:N calloc failed. ..."
+};
+
+bool operator==(const LogLine &a, const LogLine &b);
+std::ostream &operator<<(std::ostream &stream, const LogLine &line);
+
+/// Every line so far, and no more of them.
+std::vector<LogLine> TakeSystemLog();
+
+}  // namespace Test
+
+#endif
