@@ -1,0 +1,65 @@
+#include "frontend/answer.h"
+
+#include <iostream>
+#include <stdexcept>
+
+#include "frontend/text.h"
+
+namespace Frontend {
+
+namespace {
+
+// Nothing here is for a cache, for a frame, or for another site to learn where the user came from.
+constexpr char kEveryAnswer[] =
+    "Cache-Control: no-store\n"
+    "Referrer-Policy: no-referrer\n"
+    "X-Content-Type-Options: nosniff\n"
+    "Content-Security-Policy: default-src 'none'; style-src 'self'; base-uri 'none'; form-action 'self'; "
+    "frame-ancestors 'none'\n";
+
+}  // namespace
+
+void Answer::SetCookie(const std::string &name, const std::string &value, const std::string &attributes) {
+    // Lax, not Strict: the browser comes back from the provider's site, and brings the cookie only then.
+    AddHeader("Set-Cookie", name + "=" + value + "; Path=/; Secure; HttpOnly; SameSite=Lax" + attributes);
+}
+
+void Answer::ExpireCookie(const std::string &name) {
+    SetCookie(name, "", "; Max-Age=0");
+}
+
+void Answer::AddHeader(const std::string &name, const std::string &value) {
+    if (HasControlCharacter(value)) {
+        throw std::invalid_argument("A header would not stay on one line.");
+    }
+    head += name + ": " + value + "\n";
+}
+
+void Answer::BeginRedirect() {
+    std::cout << "Status: 302 Found\n" << kEveryAnswer << head;
+    redirectIsOpen = true;
+}
+
+void Answer::Redirect(const std::string &address) {
+    if (HasControlCharacter(address)) {
+        throw std::invalid_argument("A header would not stay on one line.");
+    }
+    if (!redirectIsOpen) {
+        BeginRedirect();
+    }
+    std::cout << "Location: " << address << "\n\n";
+}
+
+void Answer::Page(const std::string &status, const std::string &title, const std::string &content) {
+    std::cout << "Status: " << status << "\n"
+              << kEveryAnswer << head
+              << "Content-Type: text/html; charset=utf-8\n\n"
+                 "<!DOCTYPE html>\n<html lang=\"en\">\n<head>\n<meta charset=\"utf-8\">\n"
+                 "<meta name=\"viewport\" content=\"width=device-width, initial-scale=1\">\n<title>"
+              << EscapeHtml(title)
+              << "</title>\n<link rel=\"stylesheet\" href=\"/webman/ssoclient/style.css\">\n</head>\n"
+                 "<body>\n<main>\n"
+              << content << "</main>\n</body>\n</html>\n";
+}
+
+}  // namespace Frontend

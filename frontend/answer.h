@@ -1,0 +1,29 @@
+#ifndef TAVOSSO_FRONTEND_ANSWER_H
+#define TAVOSSO_FRONTEND_ANSWER_H
+
+#include <string>
+
+namespace Frontend {
+
+/// What a CGI program answers, written to standard output. One line of head at a time, then the one thing that ends it.
+class Answer {
+  public:
+    /// A cookie for this host alone, over TLS alone, out of reach of scripts; without an age it ends with the browser.
+    void SetCookie(const std::string &name, const std::string &value, const std::string &attributes = "");
+    void ExpireCookie(const std::string &name);
+    void AddHeader(const std::string &name, const std::string &value);
+
+    /// Writes the head of a redirect and leaves it open, for the library to add where it goes to.
+    void BeginRedirect();
+    void Redirect(const std::string &address);
+    /// `content` is HTML; `title` is not.
+    void Page(const std::string &status, const std::string &title, const std::string &content);
+
+  private:
+    std::string head;
+    bool redirectIsOpen = false;
+};
+
+}  // namespace Frontend
+
+#endif

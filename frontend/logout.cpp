@@ -1,0 +1,61 @@
+// Ends the session, here and, where the provider has a page for it, there.
+#include <sso/sso.h>
+
+#include "frontend/cgi.h"
+#include "frontend/failure.h"
+#include "frontend/session.h"
+#include "frontend/text.h"
+
+namespace {
+
+// The address of the start page as the provider knows this site; the request's own Host header is anyone's to choose.
+std::string StartPageAddress(const std::string &redirectURI) {
+    const std::size_t authority = redirectURI.find("://");
+    if (authority == std::string::npos) {
+        return "";
+    }
+    return redirectURI.substr(0, redirectURI.find('/', authority + 3)) + "/index.cgi";
+}
+
+std::string ProviderLogout(const Frontend::Session &session) {
+    TAVO::SSO::AzureSSOClient client;
+    if (session.profile != "azure" || client.GetLogoutEndpoint().empty()) {
+        return "";
+    }
+    return TAVO::SSO::GetAzureSSOLogoutURL(StartPageAddress(client.GetRedirectURI()));
+}
+
+void LeaveForProvider(Frontend::Answer &answer, const std::string &address) {
+    // A page and no redirect: browsers hold the redirects that follow a form against "form-action 'self'".
+    answer.AddHeader("Refresh", "0; url=" + address);
+    answer.Page("200 OK", "Signing out",
+                "<h1>Signing out</h1>\n<p>You are signed out of this device. <a href=\"" +
+                    Frontend::EscapeHtml(address) + "\">Sign out of your organisation too</a></p>\n");
+}
+
+void RefuseMethod(Frontend::Answer &answer) {
+    answer.AddHeader("Allow", "POST");
+    answer.Page("405 Method Not Allowed", "Sign out",
+                "<h1>Sign out</h1>\n<p>Please use the button on the <a href=\"/index.cgi\">start page</a>.</p>\n");
+}
+
+// No other site can end a session: the cookie is SameSite, and a foreign form is sent without it.
+void SignOut(Frontend::Answer &answer) {
+    if (Frontend::Variable("REQUEST_METHOD") != "POST") {
+        RefuseMethod(answer);
+        return;
+    }
+    const auto session = Frontend::EndSession(answer, Frontend::Variable("HTTP_COOKIE"));
+    const std::string address = session ? ProviderLogout(*session) : "";
+    if (address.empty()) {
+        answer.Redirect("/index.cgi");
+    } else {
+        LeaveForProvider(answer, address);
+    }
+}
+
+}  // namespace
+
+int main() {
+    return Frontend::Serve(SignOut);
+}

@@ -1,0 +1,55 @@
+// The redirect URI: the browser is back from the provider, with a code or with an error.
+#include <sso/sso.h>
+#include <syslog.h>
+
+#include "frontend/cgi.h"
+#include "frontend/failure.h"
+#include "frontend/pending_login.h"
+#include "frontend/session.h"
+#include "frontend/text.h"
+
+namespace {
+
+std::string RequireOnly(const Frontend::Parameters &parameters, const char *name) {
+    const std::optional<std::string> value = Frontend::OnlyValue(parameters, name);
+    if (!value || value->empty()) {
+        throw Frontend::Refusal(std::string("The provider's answer has no single ") + name + ".");
+    }
+    return *value;
+}
+
+void RefuseProviderError(const Frontend::Parameters &parameters) {
+    if (parameters.count("error") != 0) {
+        throw Frontend::Refusal(
+            Frontend::ProviderError(Frontend::OnlyValue(parameters, "error").value_or(""),
+                                    Frontend::OnlyValue(parameters, "error_description").value_or("")));
+    }
+}
+
+std::string SignIn(const std::string &code) {
+    std::string user;
+    TAVO::SSO::OIDCLogin(code, user);
+    if (user.empty() || Frontend::HasControlCharacter(user)) {
+        throw Frontend::Refusal("The provider's name for this user cannot be used.");
+    }
+    return user;
+}
+
+void CompleteLogin(Frontend::Answer &answer) {
+    const std::string cookies = Frontend::Variable("HTTP_COOKIE");
+    const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
+    const std::string state = RequireOnly(parameters, "state");
+    // Before anything of the answer is believed, and above all before the code is used.
+    Frontend::ConcludeLogin(answer, cookies, state);
+    RefuseProviderError(parameters);
+    const std::string user = SignIn(RequireOnly(parameters, "code"));
+    Frontend::StartSession(answer, cookies, {user, TAVO::SSO::SSOProfile().GetSSOProfile()});
+    syslog(LOG_AUTH | LOG_INFO, "frontend: signed in: %s", Frontend::OneLine(user).c_str());
+    answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, state, ""));
+}
+
+}  // namespace
+
+int main() {
+    return Frontend::Serve(CompleteLogin);
+}

@@ -1,0 +1,34 @@
+#ifndef TAVOSSO_FRONTEND_TEXT_H
+#define TAVOSSO_FRONTEND_TEXT_H
+
+#include <json/json.h>
+
+#include <cstddef>
+#include <string>
+
+// Texts that come from elsewhere, made fit to be shown, logged or followed.
+namespace Frontend {
+
+/// For element content and quoted attribute values.
+std::string EscapeHtml(const std::string &text);
+
+bool HasControlCharacter(const std::string &text);
+
+/// On one line and of a sane length.
+std::string OneLine(std::string text);
+
+/// The page to come back to after a login: `origin` where that is a path on this very site, else the start page.
+std::string SafeOrigin(const std::string &origin);
+
+/// The JSON object that a text holds, null where it holds none.
+Json::Value ParseObject(const std::string &text);
+
+/// An object's member, empty unless it is a string.
+std::string StringMember(const Json::Value &object, const char *name);
+
+/// On one line.
+std::string WriteCompact(const Json::Value &value);
+
+}  // namespace Frontend
+
+#endif
