@@ -1,0 +1,85 @@
+// The appliance: its configuration files and a web server with the front end.
+import {spawn} from 'node:child_process';
+import {once} from 'node:events';
+import {mkdirSync, readFileSync, writeFileSync} from 'node:fs';
+import net from 'node:net';
+import path from 'node:path';
+
+const SETTINGS = '/usr/tavo/etc/ssoclient';
+const FRONT_END_SETTINGS = new URL('../../frontend/lighttpd.conf', import.meta.url).pathname;
+
+function writePrivately(file, settings) {
+    writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode: 0o600});
+}
+
+/** The folders and files that an installed appliance has. */
+export function configure({provider, clients, domains}) {
+    const [azure, websphere] = clients;
+    mkdirSync(SETTINGS, {recursive: true, mode: 0o755});
+    mkdirSync('/usr/tavo/var');
+    writeFileSync('/usr/tavo/etc/domains.conf', JSON.stringify(domains));
+    writePrivately(`${SETTINGS}/azure.conf`, {
+        azure_sso_enable: true,
+        azure_wellknown: provider.endpoints.discovery,
+        azure_client_id: azure.id,
+        azure_client_secret: azure.secret,
+        azure_tenant_id: azure.tenant,
+        azure_authorization_endpoint: provider.endpoints.authorization,
+        azure_token_endpoint: provider.endpoints.token,
+        azure_redirect_uri: azure.redirectURI,
+        azure_logout_endpoint: provider.endpoints.logout,
+    });
+    writePrivately(`${SETTINGS}/websphere.conf`, {
+        websphere_wellknown: provider.endpoints.discovery,
+        websphere_client_id: websphere.id,
+        websphere_client_secret: websphere.secret,
+        websphere_authorization_endpoint: provider.endpoints.authorization,
+        websphere_token_endpoint: provider.endpoints.token,
+        websphere_redirect_uri: websphere.redirectURI,
+        websphere_logout_endpoint: provider.endpoints.logout,
+    });
+}
+
+export function useProfile(name) {
+    writePrivately(`${SETTINGS}/profile.conf`, {sso_enable: true, sso_profile: name});
+}
+
+/** A listening socket on a port of the kernel's choice, for `startWebServer`: its port is known before the server. */
+export async function listen() {
+    const socket = net.createServer();
+    socket.listen(0, '127.0.0.1');
+    await once(socket, 'listening');
+    return socket;
+}
+
+export function startWebServer({socket, webroot, certificate, folder}) {
+    const settings = path.join(folder, 'lighttpd.conf');
+    const log = path.join(folder, 'lighttpd.log');
+    writeFileSync(settings, `
+server.document-root = "${webroot}"
+server.systemd-socket-activation = "enable"
+server.bind = "127.0.0.1"
+server.port = ${socket.address().port}
+server.errorlog = "${log}"
+server.breakagelog = "${log}"
+server.modules = ( "mod_openssl" )
+ssl.engine = "enable"
+ssl.pemfile = "${certificate.certFile}"
+ssl.privkey = "${certificate.keyFile}"
+include "${FRONT_END_SETTINGS}"
+`);
+    // The server takes the socket over when it is told its own process id, which the shell knows before it becomes it.
+    // Node has no other name for a listening socket's descriptor.
+    const server = spawn('sh', ['-c', 'LISTEN_FDS=1 LISTEN_PID=$$ exec /usr/sbin/lighttpd -D -f "$0"', settings], {
+        stdio: ['ignore', 'inherit', 'inherit', socket._handle.fd],
+    });
+    socket.close();
+    return {
+        log: () => readFileSync(log, 'utf8'),
+        async stop() {
+            if (server.exitCode === null && server.kill()) {
+                await once(server, 'exit');
+            }
+        },
+    };
+}

@@ -1,0 +1,33 @@
+// A certificate authority for one run.
+import {execFileSync} from 'node:child_process';
+import {readFileSync, writeFileSync} from 'node:fs';
+import path from 'node:path';
+
+const EXTENSIONS = {
+    authority: 'basicConstraints = critical, CA:TRUE\nkeyUsage = critical, keyCertSign',
+    server: 'basicConstraints = critical, CA:FALSE\nextendedKeyUsage = serverAuth',
+};
+
+/** Makes the authority in `folder`; gives its file and what issues a server's certificate for "DNS:..." or "IP:...". */
+export function makeAuthority(folder) {
+    const make = (name, extensions, ...options) => {
+        const file = (suffix) => path.join(folder, name + suffix);
+        const settings = `[req]\ndistinguished_name = dn\nprompt = no\nx509_extensions = extensions
+[dn]\nCN = tavosso ${name}\n[extensions]\n${extensions}\n`;
+        writeFileSync(file('.cnf'), settings);
+        execFileSync('openssl', [
+            'req', '-x509', '-config', file('.cnf'), '-newkey', 'ec', '-pkeyopt', 'ec_paramgen_curve:P-256', '-nodes',
+            '-days', '2', '-keyout', file('.key'), '-out', file('.pem'), ...options,
+        ], {stdio: ['ignore', 'ignore', 'pipe']});
+        return {keyFile: file('.key'), certFile: file('.pem')};
+    };
+    const authority = make('authority', EXTENSIONS.authority);
+    return {
+        file: authority.certFile,
+        issue(name, subject) {
+            const issuer = ['-CA', authority.certFile, '-CAkey', authority.keyFile];
+            const files = make(name, `${EXTENSIONS.server}\nsubjectAltName = ${subject}`, ...issuer);
+            return {...files, key: readFileSync(files.keyFile), cert: readFileSync(files.certFile)};
+        },
+    };
+}

@@ -1,0 +1,149 @@
+// As much of a browser as a login needs: cookies, redirects, forms, TLS under the authority given.
+import https from 'node:https';
+
+const PATIENCE = 30_000;
+const MOST_REDIRECTS = 10;
+
+function unescapeHtml(text) {
+    const characters = {amp: '&', lt: '<', gt: '>', quot: '"', '#39': "'"};
+    return text.replace(/&(amp|lt|gt|quot|#39);/g, (whole, name) => characters[name]);
+}
+
+function attributes(tag) {
+    const pairs = [...tag.matchAll(/([\w-]+)="([^"]*)"/g)].map(([, name, value]) => [name, unescapeHtml(value)]);
+    return Object.fromEntries(pairs);
+}
+
+function parseCookie(header) {
+    const [pair, ...rest] = header.split(/; */);
+    const [name, ...value] = pair.split('=');
+    const told = Object.fromEntries(rest.map((item) => item.split('=')).map(([key, text]) => [key.toLowerCase(), text]));
+    return {name, value: value.join('='), path: told.path ?? '/', told};
+}
+
+function hasEnded({told}) {
+    return told['max-age'] ? Number(told['max-age']) <= 0 : Date.parse(told.expires) <= Date.now();
+}
+
+class CookieJar {
+    #cookies = [];
+
+    store(url, header) {
+        const cookie = {host: url.hostname, ...parseCookie(header)};
+        const {name, path, told} = cookie;
+        if (name.startsWith('__Host-') && !('secure' in told && path === '/' && !('domain' in told))) {
+            throw new Error(`a browser refuses the cookie ${name}`);
+        }
+        this.#cookies = this.#cookies.filter(
+            (other) => other.host !== cookie.host || other.name !== name || other.path !== path);
+        if (!hasEnded(cookie)) {
+            this.#cookies.push(cookie);
+        }
+    }
+
+    for(url) {
+        const covers = (path) => url.pathname === path || url.pathname.startsWith(path.replace(/\/?$/, '/'));
+        return this.#cookies.filter((cookie) => cookie.host === url.hostname && covers(cookie.path));
+    }
+}
+
+/** An answer: `heading` is that of its page, `next` where it sends the browser, if anywhere. */
+class Answer {
+    constructor(url, response, text) {
+        this.url = url;
+        this.status = response.statusCode;
+        this.headers = response.headers;
+        this.text = text;
+        this.heading = unescapeHtml(/<h1[^>]*>(.*?)<\/h1>/s.exec(text)?.[1] ?? '');
+        const next = response.headers.location ?? /^0; url=(.*)/.exec(response.headers.refresh ?? '')?.[1];
+        this.next = next && new URL(next, url);
+    }
+
+    get hasForm() {
+        return /<form\b/.test(this.text);
+    }
+
+    get form() {
+        const [whole, tag] = /(<form\b[^>]*>).*<\/form>/s.exec(this.text);
+        const inputs = [...whole.matchAll(/<input\b[^>]*>/g)].map(([input]) => attributes(input));
+        const filled = inputs.filter(({name, value}) => name && value !== undefined);
+        return {
+            action: new URL(attributes(tag).action, this.url),
+            values: Object.fromEntries(filled.map(({name, value}) => [name, value])),
+        };
+    }
+
+    link(text) {
+        const found = [...this.text.matchAll(/(<a\b[^>]*>)(.*?)<\/a>/gs)].find(([, , content]) => content === text);
+        return found && new URL(attributes(found[1]).href, this.url);
+    }
+}
+
+export class Browser {
+    #authority;
+    #report;
+    cookies = new CookieJar();
+    history = [];
+
+    /** `report` gets each exchange: method, address, the form's names, the answer. */
+    constructor(authority, report) {
+        this.#authority = authority;
+        this.#report = report;
+    }
+
+    /** One request and its answer; no redirect is followed. */
+    async request(method, url, form) {
+        const body = form && new URLSearchParams(form).toString();
+        const headers = {Cookie: this.cookies.for(url).map(({name, value}) => `${name}=${value}`).join('; ')};
+        if (body) {
+            Object.assign(headers, {'Content-Type': 'application/x-www-form-urlencoded', Origin: url.origin});
+        }
+        const answer = await this.#exchange(method, url, headers, body);
+        for (const cookie of answer.headers['set-cookie'] ?? []) {
+            this.cookies.store(url, cookie);
+        }
+        this.history.push(answer);
+        this.#report({method, url, fields: Object.keys(form ?? {}), answer});
+        return answer;
+    }
+
+    /** Opens an address and goes where the answers send it, up to a page or to an address that `stop` accepts. */
+    async open(url, stop = () => false) {
+        return this.#follow(await this.request('GET', new URL(url)), stop);
+    }
+
+    async submit(page, values, stop = () => false) {
+        const {action, values: filled} = page.form;
+        return this.#follow(await this.request('POST', action, {...filled, ...values}), stop);
+    }
+
+    async #follow(answer, stop) {
+        for (let count = 0; answer.next && !stop(answer.next); ++count) {
+            if (count === MOST_REDIRECTS) {
+                throw new Error('too many redirects');
+            }
+            answer = await this.request('GET', answer.next);
+        }
+        return answer;
+    }
+
+    #exchange(method, url, headers, body) {
+        return new Promise((resolve, reject) => {
+            const options = {method, headers, ca: this.#authority, family: 4, agent: false, timeout: PATIENCE};
+            const request = https.request(url, options, async (response) => {
+                try {
+                    let text = '';
+                    for await (const chunk of response.setEncoding('utf8')) {
+                        text += chunk;
+                    }
+                    resolve(new Answer(url, response, text));
+                } catch (failure) {
+                    reject(failure);
+                }
+            });
+            request.on('timeout', () => request.destroy(new Error(`no answer from ${url.origin}`)));
+            request.on('error', reject);
+            request.end(body);
+        });
+    }
+}

@@ -1,0 +1,52 @@
+// The system's log: programs write to /dev/log, and each line is handed on as it arrives.
+import {once} from 'node:events';
+import net from 'node:net';
+
+const PATIENCE = 20_000;
+
+/** Collects the log; `report` gets each line, without priority and date. */
+export async function collectSystemLog(report) {
+    let unread = [];
+    let lookForAwaited = () => {};
+    const add = (record) => {
+        const line = record.toString().replace(/^<\d+>\w+ +\d+ [\d:]+ /, '').trimEnd();
+        report(line);
+        unread.push(line);
+        lookForAwaited();
+    };
+    // A stream, on which the C library ends each record with a NUL; Node has no datagrams between processes.
+    const server = net.createServer((connection) => {
+        let rest = Buffer.alloc(0);
+        connection.on('data', (chunk) => {
+            rest = Buffer.concat([rest, chunk]);
+            for (let end; (end = rest.indexOf(0)) >= 0; rest = rest.subarray(end + 1)) {
+                add(rest.subarray(0, end));
+            }
+        });
+        connection.on('error', () => {});
+    });
+    server.listen('/dev/log');
+    await once(server, 'listening');
+    return {
+        /** Waits for a line and forgets it and all before it. */
+        until(pattern) {
+            return new Promise((resolve, reject) => {
+                const patience = setTimeout(() => reject(new Error(`no log line ${pattern}`)), PATIENCE);
+                lookForAwaited = () => {
+                    const found = unread.findIndex((line) => pattern.test(line));
+                    if (found >= 0) {
+                        clearTimeout(patience);
+                        lookForAwaited = () => {};
+                        const line = unread[found];
+                        unread = unread.slice(found + 1);
+                        resolve(line);
+                    }
+                };
+                lookForAwaited();
+            });
+        },
+        stop() {
+            server.close();
+        },
+    };
+}

@@ -1,0 +1,149 @@
+// The walk: what a user and a browser do at the appliance and at the provider, each step checked.
+import assert from 'node:assert/strict';
+
+import {Browser} from './browser.mjs';
+
+const START_PAGE = '/index.cgi';
+const RELAY_PAGE = '/webman/ssoclient/relay.html';
+const RETURN_PAGE = '/webman/sso/return.cgi';
+const AUTHORIZATION_PARAMETERS = ['client_id', 'nonce', 'redirect_uri', 'response_type', 'scope', 'state'];
+const COOKIE = /^__Host-[\w-]+=[0-9a-f]*; Path=\/; Secure; HttpOnly; SameSite=Lax(; Max-Age=\d+)?$/;
+
+export class Walk {
+    /**
+     * `origin` is the appliance's address, `provider` the provider's, `passwords` those of the users, `authority` the
+     * certificate to trust, `asked` the list that the appliance's requests to the provider are added to.
+     */
+    constructor({origin, provider, passwords, authority, asked, log, report}) {
+        Object.assign(this, {origin, provider, passwords, authority, asked, log, report});
+    }
+
+    newBrowser() {
+        return new Browser(this.authority, (exchange) => {
+            this.report.browserAsked(exchange);
+            if (exchange.url.origin === this.origin) {
+                this.#checkApplianceAnswer(exchange.answer);
+            }
+        });
+    }
+
+    /** Signs a user in and gives the name under which the appliance knows them. */
+    async signIn(browser, login) {
+        const relay = await this.#goToRelayPage(browser, login);
+        const view = await this.#runRelayScript(browser, relay);
+        assert.equal(view.headline, 'You are signed in');
+        assert.equal(view.onward, START_PAGE);
+        await this.log.until(/^return\.cgi: frontend: signed in: /);
+        assert.equal(this.#tokenRequests(), 1);
+        return this.userOf(browser);
+    }
+
+    /** The user whom the start page names. */
+    async userOf(browser) {
+        const start = await browser.open(this.origin + START_PAGE);
+        return /<strong>(.*)<\/strong>/.exec(start.text)?.[1];
+    }
+
+    /** A sign-in that fails after the provider's page; gives the reason that the user reads. */
+    async failToSignIn(browser, login) {
+        const relay = await this.#goToRelayPage(browser, login);
+        return this.#readReason(browser, relay);
+    }
+
+    /** The user changes their mind at the provider. */
+    async cancel(browser) {
+        const form = await this.#openSignInForm(browser);
+        return this.#readReason(browser, await browser.submit(form, {action: 'cancel'}));
+    }
+
+    /** Goes to an address that the provider sent some browser to before. */
+    async goAgain(browser, address) {
+        return this.#readReason(browser, await browser.open(address));
+    }
+
+    /** The return address of the browser's last login, as its history holds it. */
+    lastReturnAddress(browser) {
+        return browser.history.findLast(({url}) => url.pathname === RETURN_PAGE).url;
+    }
+
+    /** A login in progress, up to the return address, which is not followed. */
+    async startSignIn(browser, login) {
+        const form = await this.#openSignInForm(browser);
+        const isReturn = (url) => url.pathname === RETURN_PAGE;
+        const last = await browser.submit(form, {login, password: this.passwords.get(login)}, isReturn);
+        return last.next;
+    }
+
+    async signOut(browser) {
+        const start = await browser.open(this.origin + START_PAGE);
+        let page = await browser.submit(start, {});
+        if (page.url.origin === this.provider) {
+            page = await browser.submit(page, {logout: 'yes'});
+        }
+        if (page.url.pathname === RELAY_PAGE) {
+            const view = await this.#runRelayScript(browser, page);
+            assert.equal(view.headline, 'You are signed out');
+        }
+        assert.equal(await this.userOf(browser), undefined);
+        return page.url.pathname;
+    }
+
+    /** Since the last time that it was asked. */
+    #tokenRequests() {
+        return this.asked.splice(0).filter(({path}) => path === '/token').length;
+    }
+
+    async #openSignInForm(browser) {
+        const start = await browser.open(this.origin + START_PAGE);
+        const link = start.link('Sign in with single sign-on');
+        assert.ok(link, 'the start page has no link to sign in');
+        const form = await browser.open(link);
+        const request = browser.history.findLast(({url}) => url.origin === this.provider && url.pathname === '/auth');
+        assert.deepEqual([...request.url.searchParams.keys()], AUTHORIZATION_PARAMETERS);
+        assert.ok(form.hasForm, 'the provider shows no form to sign in');
+        return form;
+    }
+
+    async #goToRelayPage(browser, login) {
+        const form = await this.#openSignInForm(browser);
+        return browser.submit(form, {login, password: this.passwords.get(login)});
+    }
+
+    async #readReason(browser, relay) {
+        const view = await this.#runRelayScript(browser, relay);
+        assert.equal(view.headline, 'You could not be signed in');
+        const line = await this.log.until(/^return\.cgi: frontend: sign-in failed: /);
+        assert.ok(line.endsWith(`: ${view.reason}`), 'the log and the page tell different reasons');
+        return view.reason;
+    }
+
+    async refusedBeforeTheTokenRequest(refusal) {
+        this.#tokenRequests();
+        const reason = await refusal;
+        assert.equal(this.#tokenRequests(), 0, 'a token request was made');
+        return reason;
+    }
+
+    // Runs the script that was served, as the page would.
+    async #runRelayScript(browser, page) {
+        assert.equal(page.url.origin + page.url.pathname, this.origin + RELAY_PAGE);
+        const source = /<script type="module" src="([^"]+)"><\/script>/.exec(page.text)[1];
+        const script = await browser.open(new URL(source, page.url));
+        assert.match(script.headers['content-type'], /^text\/javascript/);
+        const {describe} = await import(`data:text/javascript,${encodeURIComponent(script.text)}`);
+        const view = describe(page.url.hash);
+        this.report.fact(`the relay page says: ${[view.headline, view.reason].filter(Boolean).join(': ')}`);
+        return view;
+    }
+
+    #checkApplianceAnswer({status, headers}) {
+        assert.ok(status === 200 || status === 302, `the appliance answers ${status}`);
+        assert.equal(headers['cache-control'], 'no-store');
+        assert.equal(headers['referrer-policy'], 'no-referrer');
+        assert.equal(headers['x-content-type-options'], 'nosniff');
+        assert.match(headers['content-security-policy'], /^default-src 'none';.* frame-ancestors 'none'$/);
+        for (const cookie of headers['set-cookie'] ?? []) {
+            assert.match(cookie, COOKIE, 'a cookie without its protection');
+        }
+    }
+}
