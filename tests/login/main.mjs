@@ -97,6 +97,12 @@ async function walkAzure(walk, report) {
         await walk.refusedBeforeTheTokenRequest(walk.goAgain(victim, foreign)),
         'This sign-in was not started in this browser.');
     assert.equal(await walk.userOf(victim), undefined);
+
+    report.title('Forged relay addresses: the page stays on its own site');
+    for (const origin of ['//evil.example', '/\\evil.example', 'https://evil.example/', 'javascript:alert(1)', '/\t/evil']) {
+        const fragment = new URLSearchParams({origin, success: 'true'}).toString();
+        assert.equal(await walk.followForgedFragment(victim, fragment), '/index.cgi');
+    }
     return user;
 }
 

@@ -124,6 +124,12 @@ export class Walk {
         return reason;
     }
 
+    /** What the relay page makes of a fragment that the appliance did not write. */
+    async followForgedFragment(browser, fragment) {
+        const page = await browser.open(`${this.origin}${RELAY_PAGE}#${fragment}`);
+        return (await this.#runRelayScript(browser, page)).onward;
+    }
+
     // Runs the script that was served, as the page would.
     async #runRelayScript(browser, page) {
         assert.equal(page.url.origin + page.url.pathname, this.origin + RELAY_PAGE);
