@@ -100,6 +100,7 @@ async function walkAzure(walk, report) {
 
     report.title('Forged relay addresses: the page stays on its own site');
     for (const origin of ['//evil.example', '/\\evil.example', 'https://evil.example/', 'javascript:alert(1)', '/\t/evil']) {
+        report.fact(`origin ${JSON.stringify(origin)}:`);
         const fragment = new URLSearchParams({origin, success: 'true'}).toString();
         assert.equal(await walk.followForgedFragment(victim, fragment), '/index.cgi');
     }

@@ -1,6 +1,7 @@
 // What happens, one readable line each. Names of parameters only: values may be secrets, codes and tokens.
 
-const names = (list) => (list.length > 0 ? ` (${[...new Set(list)].join(', ')})` : '');
+const names = (list) => (list.length > 0 ? `(${[...new Set(list)].join(', ')})` : '');
+const withNames = (text, list) => [text, names(list)].filter(Boolean).join(' ');
 const column = (text, width) => text.padEnd(width);
 
 export class Report {
@@ -20,11 +21,11 @@ export class Report {
     }
 
     browserAsked({method, url, fields, answer}) {
-        this.#line('browser', this.#site(url), `${method} ${this.#place(url)}${names(fields)}`, this.#outcome(answer));
+        this.#line('browser', this.#site(url), withNames(`${method} ${this.#place(url)}`, fields), this.#outcome(answer));
     }
 
     applianceAsked({method, path, parameters, status}) {
-        this.#line('appliance', 'provider', `${method} ${path}${names(parameters)}`, String(status));
+        this.#line('appliance', 'provider', withNames(`${method} ${path}`, parameters), String(status));
     }
 
     logged(line) {
@@ -42,8 +43,9 @@ export class Report {
     // The provider's paths name the one login that they belong to: that name is nobody's business.
     #place(url) {
         const path = url.pathname.replace(/^(\/(?:auth|sign-in))\/.*/, '$1/...');
+        const place = withNames(path, [...url.searchParams.keys()]);
         const fragment = new URLSearchParams(url.hash.slice(1));
-        return path + names([...url.searchParams.keys()]) + (url.hash && ` #${names([...fragment.keys()])}`);
+        return url.hash ? `${place} #${names([...fragment.keys()])}` : place;
     }
 
     #outcome({status, heading, headers, next}) {

@@ -138,7 +138,8 @@ export class Walk {
         assert.match(script.headers['content-type'], /^text\/javascript/);
         const {describe} = await import(`data:text/javascript,${encodeURIComponent(script.text)}`);
         const view = describe(page.url.hash);
-        this.report.fact(`the relay page says: ${[view.headline, view.reason].filter(Boolean).join(': ')}`);
+        const told = [view.headline, view.reason].filter(Boolean).join(': ');
+        this.report.fact(`the relay page says "${told}" and leads to ${view.onward}`);
         return view;
     }
 
