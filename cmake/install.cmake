@@ -4,7 +4,8 @@ set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/tavosso)
 
 install(TARGETS tavosso EXPORT tavosso
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}
-        FILE_SET headers DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/tavosso)
+        INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+install(FILES jwt/jwt.h sso/sso.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/tavosso)
 if(TARGET tavoplatform)
     install(TARGETS tavoplatform EXPORT tavosso LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} NAMELINK_SKIP)
 endif()

@@ -15,7 +15,8 @@
 
 namespace TAVO::JWT {
 
-/** Root of the token failures; never thrown by itself. Malformed tokens are `std::invalid_argument`, not of this kind. */
+/** Root of the token failures; never thrown by itself. Malformed tokens are `std::invalid_argument`, not of this kind.
+ */
 class jwt_exception : public std::runtime_error {
   public:
     /** @param message  the text that `what()` gives */

@@ -208,8 +208,8 @@ class AzureSSOClient : public SSOClient {
      * set, afresh, and checks the RSA signature (RFC 7515, section 5.2; RFC 7518, section 3.3). No leeway for clocks;
      * issuer, not-before, issued-at and nonce are not looked at.
      *
-     * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt body
-     *         format!"; "id_token expired." ("exp" lies before now, or is missing); "tenant ID invalid"; "client ID
+     * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
+     * body format!"; "id_token expired." ("exp" lies before now, or is missing); "tenant ID invalid"; "client ID
      *         invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be fetched); "RSA
      *         public 'n' cannot be found!", "RSA public 'e' cannot be found!"
      * @throws std::logic_error  when the header or the body of the token is empty
@@ -322,8 +322,8 @@ class WebSphereSSOClient : public SSOClient {
      * section 5.2; RFC 7518, section 3.2). No leeway for clocks; issuer, not-before, issued-at and nonce are not looked
      * at.
      *
-     * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt body
-     *         format!"; "id_token expired." ("exp" lies before now, or is missing); "client ID invalid"
+     * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
+     * body format!"; "id_token expired." ("exp" lies before now, or is missing); "client ID invalid"
      * @throws std::logic_error  when the header or the body of the token is empty
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
      * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes

@@ -33,9 +33,7 @@ class RootPrivilege {
   private:
     // The group goes first in both directions: a process whose effective uid is not 0 may not change its group, so
     // leaving returns to uid 0 before it restores the group.
-    bool Enter() {
-        return (savedGID_ == 0 || SetEffectiveGID(0)) && (savedUID_ == 0 || SetEffectiveUID(0));
-    }
+    bool Enter() { return (savedGID_ == 0 || SetEffectiveGID(0)) && (savedUID_ == 0 || SetEffectiveUID(0)); }
 
     bool Leave() {
         const bool changeUID = geteuid() != savedUID_;

@@ -50,9 +50,7 @@ void Transfer(const std::string &url, const std::string *form, std::string &resp
 }
 
 /// Zeroed memory from calloc, released on every way out; null when there is none.
-std::shared_ptr<char> AllocateText(std::size_t size) {
-    return {static_cast<char *>(std::calloc(size, 1)), std::free};
-}
+std::shared_ptr<char> AllocateText(std::size_t size) { return {static_cast<char *>(std::calloc(size, 1)), std::free}; }
 
 }  // namespace
 

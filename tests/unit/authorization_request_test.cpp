@@ -1,0 +1,210 @@
+// The authorization request, which both clients make alike but for the scope.
+#include <iostream>
+#include <regex>
+#include <sstream>
+
+#include "tests/support/token.h"
+#include "tests/unit/clients.h"
+#include "tests/unit/fixture.h"
+#include "tests/unit/platform_calls.h"
+
+namespace Test {
+
+namespace {
+
+using namespace TAVO::SSO;
+
+std::string FromBase64(const std::string &text) {
+    std::string bytes(3 * text.size() / 4, '\0');
+    EVP_DecodeBlock(reinterpret_cast<unsigned char *>(bytes.data()),
+                    reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size()));
+    for (auto end = text.rbegin(); end != text.rend() && *end == '='; ++end) {
+        bytes.pop_back();
+    }
+    return bytes;
+}
+
+std::string PercentDecode(const std::string &text) {
+    std::string decoded;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        if (text[i] == '%') {
+            decoded += static_cast<char>(std::stoi(text.substr(i + 1, 2), nullptr, 16));
+            i += 2;
+        } else {
+            decoded += text[i];
+        }
+    }
+    return decoded;
+}
+
+/// The value of a query's parameter, as a provider would read it.
+std::string Parameter(const std::string &uri, const std::string &name) {
+    std::smatch match;
+    EXPECT_TRUE(std::regex_search(uri, match, std::regex("[?&]" + name + "=([^&]*)"))) << name;
+    return PercentDecode(match[1]);
+}
+
+std::string StateText(const std::string &uri) { return FromBase64(Parameter(uri, "state")); }
+
+template <typename Client>
+class AuthorizationRequest : public Library {
+  protected:
+    void SetUp() override {
+        Library::SetUp();
+        client.authEndpoint = "https://provider.example/authorize";
+        client.clientID = "the id";
+        client.redirectURI = "https://nas.example/return.cgi";
+    }
+
+    std::string URI(const std::string &state = R"({"origin": "/"})") {
+        return client.GetAccessTokenReqURI(Parse(state));
+    }
+
+    Client client;
+};
+
+using Clients = testing::Types<AzureClient, WebSphereClient>;
+TYPED_TEST_SUITE(AuthorizationRequest, Clients);
+
+TYPED_TEST(AuthorizationRequest, HasTheSixParametersInTheOrderOfTheirNames) {
+    EXPECT_THAT(this->URI(), testing::MatchesRegex("https://provider\\.example/authorize"
+                                                   "\\?client_id=the%20id"
+                                                   "&nonce=[0-9a-f-]+"
+                                                   "&redirect_uri=https%3A%2F%2Fnas\\.example%2Freturn\\.cgi"
+                                                   "&response_type=code"
+                                                   "&scope=" +
+                                                   std::string(TypeParam::kScope) + "&state=[A-Za-z0-9%]+"));
+}
+
+TYPED_TEST(AuthorizationRequest, TwoOfTheSameStateDifferInNonceAndState) {
+    const std::string first = this->URI();
+    const std::string second = this->URI();
+    EXPECT_NE(Parameter(first, "nonce"), Parameter(second, "nonce"));
+    EXPECT_NE(Parameter(first, "state"), Parameter(second, "state"));
+}
+
+TYPED_TEST(AuthorizationRequest, TheNonceIsAVersion4UUIDOf36Characters) {
+    EXPECT_TRUE(std::regex_match(Parameter(this->URI(), "nonce"),
+                                 std::regex("[0-9a-f]{8}-[0-9a-f]{4}-4[0-9a-f]{3}-[89ab][0-9a-f]{3}-[0-9a-f]{12}")));
+}
+
+TYPED_TEST(AuthorizationRequest, TheStateCarriesTheDigestOfTheNonceAndNotTheNonce) {
+    const std::string uri = this->URI();
+    const std::string nonce = Parameter(uri, "nonce");
+    EXPECT_EQ(Parse(StateText(uri))["nonce"].asString(), MD5Digest(nonce));
+    EXPECT_THAT(StateText(uri), testing::Not(testing::HasSubstr(nonce)));
+}
+
+TYPED_TEST(AuthorizationRequest, ANullStateBecomesTheObjectWithTheDigestAndALineFeed) {
+    const std::string uri = this->URI("null");
+    EXPECT_EQ(StateText(uri), R"({"nonce":")" + MD5Digest(Parameter(uri, "nonce")) + "\"}\n");
+}
+
+TYPED_TEST(AuthorizationRequest, ANonceOfTheCallerIsReplaced) {
+    const std::string uri = this->URI(R"({"nonce": "mine"})");
+    EXPECT_EQ(Parse(StateText(uri))["nonce"].asString(), MD5Digest(Parameter(uri, "nonce")));
+}
+
+TYPED_TEST(AuthorizationRequest, EveryOtherMemberOfTheStateComesBackUnchanged) {
+    const char state[] =
+        R"({"origin": "/a?b=c&d", "csrf": "x+/=", "list": [1, null, {"a": 1.5}], "text": "\u00e4\"\\"})";
+    Json::Value returned = Parse(StateText(this->URI(state)));
+    returned.removeMember("nonce");
+    EXPECT_EQ(returned, Parse(state));
+}
+
+TYPED_TEST(AuthorizationRequest, TheCallersStateIsNotChanged) {
+    const Json::Value state = Parse(R"({"origin": "/"})");
+    const Json::Value before = state;
+    this->client.GetAccessTokenReqURI(state);
+    EXPECT_EQ(state, before);
+}
+
+TYPED_TEST(AuthorizationRequest, TheRelayURLReadsTheOriginBackOutOfTheState) {
+    EXPECT_EQ(GetSSORelayURL(true, Parameter(this->URI(R"({"origin": "/a b"})"), "state"), ""),
+              "ssoclient/relay.html#origin=%2Fa%20b&success=true");
+}
+
+/// A state whose compact JSON has this length.
+std::string StateOfLength(std::size_t length) { return R"({"origin":")" + std::string(length - 13, 'x') + "\"}"; }
+
+TYPED_TEST(AuthorizationRequest, AStateOf721BytesFitsAndOneMoreFails) {
+    EXPECT_EQ(Parameter(this->URI(StateOfLength(721)), "state").size(), 1020u);
+    EXPECT_EQ(FailureOf([&] { this->URI(StateOfLength(722)); }), Fails<sso_op_failed>("encode base64 failed."));
+}
+
+TYPED_TEST(AuthorizationRequest, TheEncoderIsGivenAZeroedBufferOf1024BytesAndItsFlags) {
+    Platform platform;
+    platform.encode = [](const std::string &src, char *dst, int flag1, std::size_t size, int flag2, int flag3) {
+        EXPECT_EQ(src.back(), '\n');
+        EXPECT_EQ(flag1, 1);
+        EXPECT_EQ(size, 1024u);
+        EXPECT_EQ(flag2, 0);
+        EXPECT_EQ(flag3, 1);
+        EXPECT_EQ(std::string(dst, size), std::string(1024, '\0'));
+        std::fill_n(dst, size, 'x');  // to the last byte, without a NUL
+        return 1;
+    };
+    ReplacePlatform(platform);
+    EXPECT_EQ(Parameter(this->URI(), "state"), std::string(1024, 'x'));
+}
+
+TYPED_TEST(AuthorizationRequest, AnEmptyConfigurationIsNotDetected) {
+    this->client.authEndpoint = "";
+    this->client.clientID = "";
+    this->client.redirectURI = "";
+    EXPECT_THAT(this->URI(), testing::StartsWith("?client_id=&nonce="));
+    EXPECT_EQ(Parameter(this->URI(), "redirect_uri"), "");
+}
+
+TYPED_TEST(AuthorizationRequest, AnEndpointWithAQueryGetsASecondQuestionMark) {
+    this->client.authEndpoint = "https://provider.example/?tenant=1";
+    EXPECT_THAT(this->URI(), testing::StartsWith("https://provider.example/?tenant=1?client_id="));
+}
+
+TYPED_TEST(AuthorizationRequest, AStateThatIsNeitherObjectNorNullIsTheCallersError) {
+    EXPECT_THROW(this->URI("[]"), Json::LogicError);
+}
+
+/// Stands behind std::cout and counts what is done to it.
+class Output : public std::stringbuf {
+  public:
+    Output() : former_(std::cout.rdbuf(this)) {}
+    ~Output() override { std::cout.rdbuf(former_); }
+
+    int insertions = 0;
+    int flushes = 0;
+
+  protected:
+    std::streamsize xsputn(const char *text, std::streamsize length) override {
+        ++insertions;
+        return std::stringbuf::xsputn(text, length);
+    }
+    int sync() override {
+        ++flushes;
+        return 0;
+    }
+
+  private:
+    std::streambuf *former_;
+};
+
+TYPED_TEST(AuthorizationRequest, TheRedirectIsOneInsertionOnStandardOutputUnflushed) {
+    Output output;
+    this->client.RedirectAuthEndpoint(Parse(R"({"origin": "/"})"));
+    EXPECT_THAT(output.str(),
+                testing::MatchesRegex("Location: https://provider\\.example/authorize\\?client_id=[^ \n]*\n\n"));
+    EXPECT_EQ(output.insertions, 1);
+    EXPECT_EQ(output.flushes, 0);
+}
+
+TYPED_TEST(AuthorizationRequest, AFailedRedirectWritesNothing) {
+    Output output;
+    EXPECT_EQ(FailureOf([&] { this->client.RedirectAuthEndpoint(Parse(StateOfLength(722))); }),
+              Fails<sso_op_failed>("encode base64 failed."));
+    EXPECT_EQ(output.insertions, 0);
+}
+
+}  // namespace
+
+}  // namespace Test

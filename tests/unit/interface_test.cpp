@@ -1,0 +1,177 @@
+// The binary interface of the built library: layout, slots, and the type information that exceptions are caught by.
+#include <dlfcn.h>
+#include <link.h>
+
+#include <type_traits>
+
+#include "jwt/jwt.h"
+#include "tests/unit/clients.h"
+#include "tests/unit/fixture.h"
+
+namespace Test {
+
+namespace {
+
+using namespace TAVO;
+
+static_assert(!std::has_virtual_destructor_v<SSO::SSOClient>);
+static_assert(std::has_virtual_destructor_v<SSO::AzureSSOClient>);
+static_assert(std::has_virtual_destructor_v<SSO::WebSphereSSOClient>);
+static_assert(std::has_virtual_destructor_v<SSO::SSOProfile>);
+static_assert(!std::is_polymorphic_v<JWT::Jwt>);
+static_assert(std::is_same_v<decltype(&SSO::httpGet), void (*)(const std::string &, std::string &, bool,
+                                                               size_t (*)(char *, size_t, size_t, void *))>);
+static_assert(std::is_same_v<decltype(&SSO::httpPost), void (*)(const std::string &, const std::string &, std::string &,
+                                                                bool, size_t (*)(char *, size_t, size_t, void *))>);
+
+using Slots = std::vector<std::string>;
+
+/// The slots of a class's virtual table in the built library, by the names of the functions in them.
+Slots SlotsOf(const std::string &mangledClass) {
+    Slots slots;
+    void *table = dlsym(RTLD_DEFAULT, ("_ZTV" + mangledClass).c_str());
+    Dl_info info;
+    const ElfW(Sym) *symbol = nullptr;
+    if (table == nullptr ||
+        dladdr1(table, &info, reinterpret_cast<void **>(const_cast<ElfW(Sym) **>(&symbol)), RTLD_DL_SYMENT) == 0 ||
+        symbol == nullptr) {
+        ADD_FAILURE() << "no virtual table of " << mangledClass;
+        return slots;
+    }
+    void **entries = static_cast<void **>(table);
+    for (std::size_t i = 2; i < symbol->st_size / sizeof(void *); ++i) {  // behind the offset and the type information
+        if (dladdr(entries[i], &info) == 0 || info.dli_saddr != entries[i]) {
+            slots.emplace_back("not an exported function");
+        } else {
+            slots.emplace_back(info.dli_sname);
+        }
+    }
+    return slots;
+}
+
+constexpr char kString[] = "NSt7__cxx1112basic_stringIcSt11char_traitsIcESaIcEEE";
+
+std::string Function(const std::string &mangledClass, const std::string &nameAndArguments) {
+    return "_Z" + mangledClass.substr(0, mangledClass.size() - 1) + nameAndArguments;
+}
+
+const std::string kBase = "N4TAVO3SSO9SSOClientE";
+
+/// The eighteen slots, of which a client's class defines four.
+Slots Eighteen(const std::string &hooks) {
+    const std::string string = kString;
+    return {
+        Function(kBase, "8isEnableEv"),
+        Function(kBase, "11GetClientIDB5cxx11Ev"),
+        Function(kBase, "15GetClientSecretB5cxx11Ev"),
+        Function(kBase, "14GetRedirectURIB5cxx11Ev"),
+        Function(kBase, "8GetTokenB5cxx11Ev"),
+        Function(kBase, "15GetAuthEndpointB5cxx11Ev"),
+        Function(kBase, "16GetTokenEndpointB5cxx11Ev"),
+        Function(kBase, "20GetWellknownEndpointB5cxx11Ev"),
+        Function(kBase, "17GetLogoutEndpointB5cxx11Ev"),
+        Function(kBase, "14SetRedirectURIE" + string),
+        Function(kBase, "7SetCodeE" + string),
+        Function(kBase, "20RequestWellknownInfoERN4Json5ValueE"),
+        Function(kBase, "20RequestTokenEndpointER" + string + "RKS7_"),
+        Function(hooks, "13VerifyIDTokenEv"),
+        Function(hooks, "19GetIDTokenReqParamsB5cxx11Ev"),
+        Function(hooks, "11GetUserNameER" + string),
+        Function(hooks, "20ProcessTokenResponseE" + string),
+        Function(kBase, "18OpenIDConnectLoginE" + string + "RS7_"),
+    };
+}
+
+class Interface : public Library {};
+
+TEST_F(Interface, TheBaseHasItsEighteenSlotsAndNoDestructorBehindThem) { EXPECT_EQ(SlotsOf(kBase), Eighteen(kBase)); }
+
+TEST_F(Interface, EachClientOverridesFourAndHasItsDestructorBehindTheEighteenth) {
+    for (const std::string client : {"N4TAVO3SSO14AzureSSOClientE", "N4TAVO3SSO18WebSphereSSOClientE"}) {
+        Slots expected = Eighteen(client);
+        expected.push_back(Function(client, "D1Ev"));
+        expected.push_back(Function(client, "D0Ev"));
+        Slots found = SlotsOf(client);
+        if (found.size() > 18 && found[18] == Function(client, "D2Ev")) {
+            found[18] = Function(client, "D1Ev");  // the base-object destructor, at the same address
+        }
+        EXPECT_EQ(found, expected) << client;
+    }
+}
+
+TEST_F(Interface, TheProfileHasItsDestructorAlone) {
+    Slots found = SlotsOf("N4TAVO3SSO10SSOProfileE");
+    ASSERT_EQ(found.size(), 2u);
+    EXPECT_EQ(found[1], "_ZN4TAVO3SSO10SSOProfileD0Ev");
+}
+
+/// Where a field lies in its object.
+template <typename Object, typename Field>
+std::ptrdiff_t Offset(Object &object, Field &field) {
+    return reinterpret_cast<char *>(&field) - reinterpret_cast<char *>(&object);
+}
+
+struct BaseFields : SSO::SSOClient {
+    std::vector<std::ptrdiff_t> Offsets() {
+        return {Offset(*this, enable),         Offset(*this, clientID),          Offset(*this, clientSecret),
+                Offset(*this, redirectURI),    Offset(*this, authEndpoint),      Offset(*this, tokenEndpoint),
+                Offset(*this, logoutEndpoint), Offset(*this, wellknownEndpoint), Offset(*this, code),
+                Offset(*this, token)};
+    }
+};
+
+TEST_F(Interface, TheFieldsOfTheBaseLieInTheirOrder) {
+    constexpr std::ptrdiff_t string = sizeof(std::string);
+    BaseFields fields;
+    EXPECT_THAT(fields.Offsets(),
+                testing::ElementsAre(8, 16, 16 + string, 16 + 2 * string, 16 + 3 * string, 16 + 4 * string,
+                                     16 + 5 * string, 16 + 6 * string, 16 + 7 * string, 16 + 8 * string));
+    EXPECT_EQ(sizeof(SSO::SSOClient), 16 + 9 * sizeof(std::string));
+}
+
+TEST_F(Interface, AzureAddsTheTenantAndWebSphereNothing) {
+    AzureClient client;
+    EXPECT_EQ(Offset(client, client.tenantID), static_cast<std::ptrdiff_t>(sizeof(SSO::SSOClient)));
+    EXPECT_EQ(sizeof(SSO::AzureSSOClient), sizeof(SSO::SSOClient) + sizeof(std::string));
+    EXPECT_EQ(sizeof(SSO::WebSphereSSOClient), sizeof(SSO::SSOClient));
+}
+
+TEST_F(Interface, TheProfileHoldsFlagNameAndClientInThisOrder) {
+    WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure"})");
+    SSO::SSOProfile profile;
+    char *start = reinterpret_cast<char *>(&profile);
+    EXPECT_EQ(*reinterpret_cast<bool *>(start + 8), true);
+    EXPECT_EQ(*reinterpret_cast<std::string *>(start + 16), "azure");
+    EXPECT_EQ(Offset(profile, *profile.GetSSOClient()), static_cast<std::ptrdiff_t>(16 + sizeof(std::string)));
+    EXPECT_EQ(sizeof(SSO::SSOProfile), 16 + sizeof(std::string) + sizeof(SSO::SSOClient));
+}
+
+TEST_F(Interface, ATokenHoldsHeaderBodyAndSignatureInThisOrder) {
+    JWT::Jwt jwt("header.body.signature");
+    const auto *parts = reinterpret_cast<std::string *>(&jwt);
+    EXPECT_EQ(parts[0], "header");
+    EXPECT_EQ(parts[1], "body");
+    EXPECT_EQ(parts[2], "signature");
+    EXPECT_EQ(sizeof(JWT::Jwt), 3 * sizeof(std::string));
+}
+
+TEST_F(Interface, EachExceptionsTypeInformationIsTheLibrarys) {
+    for (const std::type_info *type :
+         {&typeid(SSO::sso_exception), &typeid(SSO::sso_err_resp), &typeid(SSO::sso_not_implemented),
+          &typeid(SSO::sso_op_failed), &typeid(JWT::jwt_exception), &typeid(JWT::jwt_not_support),
+          &typeid(JWT::jwt_verify_failed)}) {
+        EXPECT_EQ(dlsym(RTLD_DEFAULT, ("_ZTI" + std::string(type->name())).c_str()), type) << type->name();
+    }
+}
+
+TEST_F(Interface, ACallBetweenExportedFunctionsGoesThroughTheSymbolTable) {
+    // This program's own isEnable stands in front of nothing; but an exported function that another one calls must be
+    // found by its name, as a program that puts its own in front relies on it.
+    Dl_info info;
+    ASSERT_NE(dladdr(reinterpret_cast<void *>(&SSO::MD5Digest), &info), 0);
+    EXPECT_THAT(info.dli_fname, testing::HasSubstr("libtavosso.so"));
+}
+
+}  // namespace
+
+}  // namespace Test

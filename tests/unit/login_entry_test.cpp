@@ -1,0 +1,184 @@
+// OIDCLogin up to the client's own steps, and GetSSORelayURL.
+#include <openssl/evp.h>
+
+#include "sso/sso.h"
+#include "tests/support/token.h"
+#include "tests/unit/fixture.h"
+#include "tests/unit/platform_calls.h"
+#include "tests/unit/process.h"
+#include "tests/unit/transport.h"
+
+namespace Test {
+
+namespace {
+
+using namespace TAVO::SSO;
+
+class LoginEntry : public Library {
+  protected:
+    Failure LoginWith(const std::string &profile) {
+        WriteFile(kProfileFile, profile);
+        return Login();
+    }
+
+    Failure Login() {
+        return FailureOf([this] { OIDCLogin("abc", userName); });
+    }
+
+    std::string userName = "before";
+};
+
+TEST_F(LoginEntry, WithoutAProfileFileItCannotBeRead) {
+    EXPECT_EQ(Login(), Fails<sso_op_failed>("read profile file failed."));
+    EXPECT_EQ(userName, "before");
+}
+
+TEST_F(LoginEntry, AProfileFileThatIsNotJSONCannotBeRead) {
+    EXPECT_EQ(LoginWith("sso_enable=yes"), Fails<sso_op_failed>("read profile file failed."));
+    EXPECT_EQ(LoginWith(""), Fails<sso_op_failed>("read profile file failed."));
+}
+
+TEST_F(LoginEntry, WithoutABooleanTrueSSOIsNotEnabled) {
+    const auto notEnabled = Fails<sso_op_failed>("sso does not enable.");
+    EXPECT_EQ(LoginWith(R"({"sso_profile": "azure"})"), notEnabled);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": false, "sso_profile": "azure"})"), notEnabled);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": "true", "sso_profile": "azure"})"), notEnabled);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": 1, "sso_profile": "azure"})"), notEnabled);
+    EXPECT_EQ(LoginWith(R"([true])"), notEnabled) << "a document that is no object has no members";
+}
+
+TEST_F(LoginEntry, WithoutAStringAsProfileNoneIsSpecified) {
+    const auto notSpecified = Fails<sso_op_failed>("not specify sso profile");
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true})"), notSpecified);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": 5})"), notSpecified);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": null})"), notSpecified);
+}
+
+TEST_F(LoginEntry, AnUnknownProfileIsThePlainSSOException) {
+    const auto notSupported = Fails<sso_exception>("profile not support.");
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "Azure"})"), notSupported);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": ""})"), notSupported);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "azure "})"), notSupported);
+}
+
+TEST_F(LoginEntry, TheProfileIsReadWithTheIdsThatTheProcessHas) {
+    SetEffectiveIDs(1024, 100);
+    EXPECT_EQ(Login(), Fails<sso_op_failed>("read profile file failed."));
+    EXPECT_THAT(TakeSetIDCalls(), testing::IsEmpty());
+}
+
+TEST_F(LoginEntry, TheProfileChoosesTheClientThatLogsIn) {
+    WriteFile(kAzureFile, R"({"azure_token_endpoint": "https://azure.example/token"})");
+    WriteFile(kWebSphereFile, R"({"websphere_token_endpoint": "https://websphere.example/token"})");
+    const auto noAnswer = Fails<std::invalid_argument>("parse json falied");
+
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "azure"})"), noAnswer);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "websphere"})"), noAnswer);
+
+    EXPECT_THAT(CurrentTransport().urls,
+                testing::ElementsAre("https://azure.example/token", "https://websphere.example/token"));
+    const auto unreachable = Error("sso:N request token uri Couldn't connect to server.");
+    EXPECT_THAT(TakeSystemLog(), testing::ElementsAre(unreachable, unreachable));
+    EXPECT_EQ(userName, "before");
+}
+
+TEST_F(LoginEntry, TheCodeIsSentToTheTokenEndpoint) {
+    LoginWith(R"({"sso_enable": true, "sso_profile": "azure"})");
+    EXPECT_EQ(CurrentTransport().form,
+              "client_id=&client_secret=&code=abc&grant_type=authorization_code&redirect_uri=");
+    TakeSystemLog();
+}
+
+std::string Base64(const std::string &text) {
+    std::string encoded(4 * ((text.size() + 2) / 3), '\0');
+    EVP_EncodeBlock(reinterpret_cast<unsigned char *>(encoded.data()),
+                    reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size()));
+    return encoded;
+}
+
+class RelayURL : public Library {};
+
+constexpr char kPlainSuccess[] = "ssoclient/relay.html#success=true";
+
+TEST_F(RelayURL, SuccessWithoutStateAndReason) { EXPECT_EQ(GetSSORelayURL(true, "", ""), kPlainSuccess); }
+
+TEST_F(RelayURL, SuccessDoesNotShowAReason) { EXPECT_EQ(GetSSORelayURL(true, "", "reason"), kPlainSuccess); }
+
+TEST_F(RelayURL, SuccessCarriesTheEncodedOrigin) {
+    EXPECT_EQ(GetSSORelayURL(true, Base64(R"({"origin": "/a page?b=c&d"})"), ""),
+              "ssoclient/relay.html#origin=%2Fa%20page%3Fb%3Dc%26d&success=true");
+}
+
+TEST_F(RelayURL, AnEmptyOriginIsCarried) {
+    EXPECT_EQ(GetSSORelayURL(true, Base64(R"({"origin": ""})"), ""), "ssoclient/relay.html#origin=&success=true");
+}
+
+TEST_F(RelayURL, AnOriginThatIsNoStringIsLeftOut) {
+    for (const char *state : {R"({"origin": null})", R"({"origin": 5})", R"({"origin": ["/"]})", R"({})"}) {
+        EXPECT_EQ(GetSSORelayURL(true, Base64(state), ""), kPlainSuccess) << state;
+    }
+}
+
+TEST_F(RelayURL, AStateThatIsNoJSONObjectIsLeftOut) {
+    for (const char *state : {"not JSON", "[]", "5", "\"text\"", R"({"origin": "/", )", "[[[[["}) {
+        EXPECT_EQ(GetSSORelayURL(true, Base64(state), ""), kPlainSuccess) << state;
+    }
+}
+
+TEST_F(RelayURL, AStateThatIsNotBase64IsLeftOut) {
+    EXPECT_EQ(GetSSORelayURL(true, "{\"origin\": \"/\"}", ""), kPlainSuccess);
+    EXPECT_EQ(GetSSORelayURL(true, "!!!!", ""), kPlainSuccess);
+}
+
+TEST_F(RelayURL, AStateThatDecodesToMoreThanTheBufferHoldsIsLeftOut) {
+    EXPECT_EQ(GetSSORelayURL(true, Base64(R"({"origin": "/"})" + std::string(1010, ' ')), ""), kPlainSuccess);
+}
+
+TEST_F(RelayURL, AStateThatFillsTheBufferToItsLastByteIsReadNoFurther) {
+    const std::string state = R"({"origin": "/"})";
+    EXPECT_EQ(GetSSORelayURL(true, Base64(state + std::string(1024 - state.size(), ' ')), ""),
+              "ssoclient/relay.html#origin=%2F&success=true");
+}
+
+TEST_F(RelayURL, TheStateIsReadUpToItsFirstNUL) {
+    EXPECT_EQ(GetSSORelayURL(true, Base64(std::string("{\"origin\": \"/\"}\0no JSON", 23)), ""),
+              "ssoclient/relay.html#origin=%2F&success=true");
+}
+
+TEST_F(RelayURL, TheDecoderIsGivenAZeroedBufferOf1024Bytes) {
+    Platform platform;
+    platform.decode = [](const std::string &src, char *dst, std::size_t *length) {
+        EXPECT_EQ(src, "the state");
+        EXPECT_EQ(*length, 1024u);
+        EXPECT_EQ(std::string(dst, *length), std::string(1024, '\0'));
+        const std::string text = R"({"origin": "/here"})";
+        text.copy(dst, text.size());
+        *length = 0;  // which is not looked at
+        return 1;
+    };
+    ReplacePlatform(platform);
+    EXPECT_EQ(GetSSORelayURL(true, "the state", ""), "ssoclient/relay.html#origin=%2Fhere&success=true");
+}
+
+TEST_F(RelayURL, FailureWithoutReasonIsTheSameWhateverTheState) {
+    EXPECT_EQ(GetSSORelayURL(false, "", ""), "ssoclient/relay.html#success=false");
+    EXPECT_EQ(GetSSORelayURL(false, Base64(R"({"origin": "/"})"), ""), "ssoclient/relay.html#success=false");
+}
+
+TEST_F(RelayURL, AfterAFailureTheStateIsNotDecoded) {
+    Platform platform;
+    platform.decode = [](const std::string &, char *, std::size_t *) {
+        ADD_FAILURE() << "decoded";
+        return 0;
+    };
+    ReplacePlatform(platform);
+    GetSSORelayURL(false, "c3RhdGU=", "reason");
+}
+
+TEST_F(RelayURL, AReasonIsCopiedAsItStands) {
+    EXPECT_EQ(GetSSORelayURL(false, "", "a & b # c%20d"), "ssoclient/relay.html#reason=a & b # c%20d&success=false");
+}
+
+}  // namespace
+
+}  // namespace Test

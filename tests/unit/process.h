@@ -1,0 +1,38 @@
+#ifndef TAVOSSO_TESTS_UNIT_PROCESS_H
+#define TAVOSSO_TESTS_UNIT_PROCESS_H
+
+#include <sys/types.h>
+
+#include <ctime>
+#include <string>
+#include <vector>
+
+// The process that the library under test sees: its effective ids, its clock, its memory.
+namespace Test {
+
+/// From now on the process has these effective ids, and may change them, until RestoreProcess.
+void SetEffectiveIDs(uid_t uid, gid_t gid);
+uid_t EffectiveUID();
+gid_t EffectiveGID();
+
+/// The n-th setresuid or setresgid from now on fails with EPERM.
+void FailSetID(int n);
+
+/// Every setresuid and setresgid since the last call: "setresgid(-1, 0, -1)".
+std::vector<std::string> TakeSetIDCalls();
+
+/// From now on it is this second, until RestoreProcess.
+void SetClock(std::time_t now);
+
+/// The next calloc of this many bytes fails.
+void FailCalloc(std::size_t size);
+
+/// What errno was when a file was last opened.
+int ErrnoAtOpen();
+
+/// The ids, the clock and the memory are the real ones again.
+void RestoreProcess();
+
+}  // namespace Test
+
+#endif

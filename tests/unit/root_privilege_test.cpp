@@ -1,0 +1,132 @@
+// The root-privilege section, seen through a client's constructor, which reads its file in it.
+#include <cerrno>
+
+#include "sso/sso.h"
+#include "tests/unit/fixture.h"
+#include "tests/unit/process.h"
+
+namespace Test {
+
+namespace {
+
+using namespace TAVO::SSO;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+LogLine AuthError(const std::string &text) { return {LOG_AUTH | LOG_ERR, "azuresso:N ERROR: " + text}; }
+LogLine AuthWarning(const std::string &text) { return {LOG_AUTH | LOG_INFO, "azuresso:N WARNING: " + text}; }
+
+class RootPrivilege : public Library {
+  protected:
+    /// Constructs a client as a process with these ids, of which the n-th change fails; 0: none.
+    void ReadAs(uid_t uid, gid_t gid, int failing = 0) {
+        WriteFile(kAzureFile, R"({"azure_client_id": "read"})");
+        SetEffectiveIDs(uid, gid);
+        FailSetID(failing);
+        errno = EDOM;
+        AzureSSOClient client;
+        errno_ = errno;
+        EXPECT_EQ(client.GetClientID(), "read") << "a failed change must not stop the read";
+    }
+
+    int errno_ = 0;
+};
+
+TEST_F(RootPrivilege, ARootProcessMakesNoCallAndWritesNoLine) {
+    ReadAs(0, 0);
+    EXPECT_THAT(TakeSetIDCalls(), IsEmpty());
+    EXPECT_THAT(TakeSystemLog(), IsEmpty());
+    EXPECT_EQ(errno_, 0);
+}
+
+TEST_F(RootPrivilege, Group100OfUserRootIsRaisedWithOneWarningAndRestoredWithNone) {
+    ReadAs(0, 100);
+    EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresgid(-1, 100, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)")));
+    EXPECT_EQ(EffectiveGID(), 100u);
+    EXPECT_EQ(errno_, 0);
+}
+
+TEST_F(RootPrivilege, User1024Group100IsRaisedGroupFirstAndRestoredByWayOfUser0) {
+    ReadAs(1024, 100);
+    EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)",
+                                              "setresgid(-1, 100, -1)", "setresuid(-1, 1024, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)"),
+                                             AuthWarning("setresuid(-1, 0, -1)")));
+    EXPECT_EQ(EffectiveUID(), 1024u);
+    EXPECT_EQ(EffectiveGID(), 100u);
+    EXPECT_EQ(ErrnoAtOpen(), 0);
+    EXPECT_EQ(errno_, 0);
+}
+
+TEST_F(RootPrivilege, User1024OfGroup0IsRaisedAndRestoredWithoutTouchingTheGroup) {
+    ReadAs(1024, 0);
+    EXPECT_THAT(TakeSetIDCalls(),
+                ElementsAre("setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 1024, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresuid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)")));
+}
+
+TEST_F(RootPrivilege, WhenTheGroupCannotBeRaisedTheUserIsNotTriedAndErrnoIs1) {
+    ReadAs(1024, 100, 1);
+    EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthError("setresgid(-1, 0, -1) [Operation not permitted]"),
+                                             AuthError("ENTERCriticalSection")));
+    EXPECT_EQ(ErrnoAtOpen(), 1);
+    EXPECT_EQ(errno_, 0) << "nothing had changed, so there was nothing to restore";
+}
+
+TEST_F(RootPrivilege, WhenTheUserCannotBeRaisedTheGroupIsRestored) {
+    ReadAs(1024, 100, 2);
+    EXPECT_THAT(TakeSetIDCalls(),
+                ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresgid(-1, 100, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"),
+                                             AuthError("setresuid(-1, 0, -1) [Operation not permitted]"),
+                                             AuthError("ENTERCriticalSection")));
+    EXPECT_EQ(ErrnoAtOpen(), 1);
+    EXPECT_EQ(EffectiveGID(), 100u);
+}
+
+TEST_F(RootPrivilege, WhenTheReturnToUser0FailsNothingIsRestored) {
+    ReadAs(1024, 100, 3);
+    EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)"),
+                                             AuthError("setresuid(-1, 0, -1) [Operation not permitted]"),
+                                             AuthError("LEAVECriticalSection")));
+    EXPECT_EQ(errno_, 1);
+}
+
+TEST_F(RootPrivilege, WhenTheGroupCannotBeRestoredTheUserIsNotTried) {
+    ReadAs(1024, 100, 4);
+    EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)",
+                                              "setresgid(-1, 100, -1)"));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)"),
+                                             AuthWarning("setresuid(-1, 0, -1)"),
+                                             AuthError("setresgid(-1, 100, -1) [Operation not permitted]"),
+                                             AuthError("LEAVECriticalSection")));
+    EXPECT_EQ(errno_, 1);
+}
+
+TEST_F(RootPrivilege, WhenTheUserCannotBeRestoredTheLineTellsItsId) {
+    ReadAs(1024, 100, 5);
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)"),
+                                             AuthWarning("setresuid(-1, 0, -1)"),
+                                             AuthError("setresuid(-1, 1024, -1) [Operation not permitted]"),
+                                             AuthError("LEAVECriticalSection")));
+    EXPECT_EQ(errno_, 1);
+}
+
+TEST_F(RootPrivilege, TheLinesCarryTheNameOfTheSourceThatReads) {
+    const auto sourceOf = [](auto construct) {
+        SetEffectiveIDs(0, 100);
+        construct();
+        const std::vector<LogLine> lines = TakeSystemLog();
+        return lines.size() == 1 ? lines.front().text : "not one line";
+    };
+    EXPECT_EQ(sourceOf([] { AzureSSOClient(); }), "azuresso:N WARNING: setresgid(-1, 0, -1)");
+    EXPECT_EQ(sourceOf([] { WebSphereSSOClient(); }), "webspheresso:N WARNING: setresgid(-1, 0, -1)");
+    EXPECT_EQ(sourceOf([] { SSOProfile(); }), "profile:N WARNING: setresgid(-1, 0, -1)");
+}
+
+}  // namespace
+
+}  // namespace Test

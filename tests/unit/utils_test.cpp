@@ -1,0 +1,170 @@
+#include <cerrno>
+#include <new>
+
+#include "sso/sso.h"
+#include "tests/unit/calls.h"
+#include "tests/unit/fixture.h"
+#include "tests/unit/platform_calls.h"
+#include "tests/unit/process.h"
+#include "tests/unit/transport.h"
+
+namespace Test {
+
+namespace {
+
+using namespace TAVO::SSO;
+using testing::ElementsAre;
+
+constexpr char kURL[] = "https://provider.example/";
+
+std::size_t Append(char *data, std::size_t size, std::size_t count, void *response) {
+    static_cast<std::string *>(response)->append(data, size * count);
+    return size * count;
+}
+
+class Transfer : public Library {};
+
+TEST_F(Transfer, AGetSetsURLFunctionAndDataInThisOrderAndNothingElse) {
+    CurrentTransport().answers[kURL] = Whole("answer");
+    std::string response;
+    httpGet(kURL, response, true, Append);
+    EXPECT_EQ(response, "answer");
+    EXPECT_THAT(
+        CurrentTransport().calls,
+        ElementsAre("curl_global_init 3", "curl_easy_init", "curl_easy_setopt CURLOPT_URL https://provider.example/",
+                    "curl_easy_setopt CURLOPT_WRITEFUNCTION", "curl_easy_setopt CURLOPT_WRITEDATA", "curl_easy_perform",
+                    "curl_easy_cleanup", "curl_global_cleanup"));
+}
+
+TEST_F(Transfer, APostSetsURLFieldsFunctionAndDataInThisOrderAndNothingElse) {
+    CurrentTransport().answers[kURL] = Whole("answer");
+    std::string response;
+    httpPost(kURL, "a=b&c=%20", response, true, Append);
+    EXPECT_EQ(response, "answer");
+    EXPECT_THAT(
+        CurrentTransport().calls,
+        ElementsAre("curl_global_init 3", "curl_easy_init", "curl_easy_setopt CURLOPT_URL https://provider.example/",
+                    "curl_easy_setopt CURLOPT_POSTFIELDS a=b&c=%20", "curl_easy_setopt CURLOPT_WRITEFUNCTION",
+                    "curl_easy_setopt CURLOPT_WRITEDATA", "curl_easy_perform", "curl_easy_cleanup",
+                    "curl_global_cleanup"));
+}
+
+TEST_F(Transfer, AnEmptyBodyIsStillAPost) {
+    CurrentTransport().answers[kURL] = Whole("");
+    std::string response;
+    httpPost(kURL, "", response, true, Append);
+    EXPECT_THAT(CurrentTransport().calls, testing::Contains("curl_easy_setopt CURLOPT_POSTFIELDS "));
+}
+
+TEST_F(Transfer, WithoutVerificationTheHostCheckGoesBeforeThePeerCheckAndBehindTheRest) {
+    CurrentTransport().answers[kURL] = Whole("");
+    std::string response;
+    httpGet(kURL, response, false, Append);
+    EXPECT_THAT(
+        CurrentTransport().calls,
+        ElementsAre("curl_global_init 3", "curl_easy_init", "curl_easy_setopt CURLOPT_URL https://provider.example/",
+                    "curl_easy_setopt CURLOPT_WRITEFUNCTION", "curl_easy_setopt CURLOPT_WRITEDATA",
+                    "curl_easy_setopt CURLOPT_SSL_VERIFYHOST 0", "curl_easy_setopt CURLOPT_SSL_VERIFYPEER 0",
+                    "curl_easy_perform", "curl_easy_cleanup", "curl_global_cleanup"));
+    ResetTransport();
+    CurrentTransport().answers[kURL] = Whole("");
+    httpPost(kURL, "a=b", response, false, Append);
+    EXPECT_THAT(CurrentTransport().calls, testing::IsSupersetOf({"curl_easy_setopt CURLOPT_SSL_VERIFYHOST 0",
+                                                                 "curl_easy_setopt CURLOPT_SSL_VERIFYPEER 0"}));
+}
+
+TEST_F(Transfer, AFailedTransferThrowsLibcurlsTextAfterCleaningUp) {
+    CurrentTransport().answers[kURL] = {CURLE_PEER_FAILED_VERIFICATION, {}};
+    std::string response;
+    EXPECT_EQ(FailureOf([&] { httpGet(kURL, response, true, Append); }),
+              Fails<sso_err_resp>(curl_easy_strerror(CURLE_PEER_FAILED_VERIFICATION)));
+    EXPECT_EQ(FailureOf([&] { httpPost("http://nobody.example/", "", response, true, Append); }),
+              Fails<sso_err_resp>(curl_easy_strerror(CURLE_COULDNT_CONNECT)));
+    const auto &calls = CurrentTransport().calls;
+    EXPECT_EQ(std::vector<std::string>(calls.end() - 3, calls.end()),
+              (std::vector<std::string>{"curl_easy_perform", "curl_easy_cleanup", "curl_global_cleanup"}));
+}
+
+TEST_F(Transfer, WithoutAHandleBadAllocIsThrownAndLibcurlCleanedUp) {
+    CurrentTransport().noHandle = true;
+    std::string response;
+    EXPECT_THROW(httpGet(kURL, response, true, Append), std::bad_alloc);
+    EXPECT_THROW(httpPost(kURL, "", response, true, Append), std::bad_alloc);
+    EXPECT_EQ(CurrentTransport().calls.front(), "curl_global_init 3");
+    EXPECT_EQ(CurrentTransport().calls.back(), "curl_global_cleanup");
+    EXPECT_THAT(CurrentTransport().calls, testing::Not(testing::Contains("curl_easy_perform")));
+}
+
+TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
+    CurrentTransport().answers[kURL] = Whole("answer");
+    std::string response = "earlier ";
+    httpGet(kURL, response, true, Append);
+    EXPECT_EQ(response, "earlier answer");
+}
+
+class Encoding : public Library {};
+
+TEST_F(Encoding, URLEncodePercentEncodesWhatIsNotUnreserved) {
+    EXPECT_EQ(URLEncode("https://a.example/b?c=d e&f"), "https%3A%2F%2Fa.example%2Fb%3Fc%3Dd%20e%26f");
+    EXPECT_EQ(URLEncode("A-z_0.9~"), "A-z_0.9~");
+    EXPECT_EQ(URLEncode(""), "");
+}
+
+TEST_F(Encoding, AValueOfWhichEveryByteIsEscapedFits) { EXPECT_EQ(URLEncode("&=\xc3\xa4"), "%26%3D%C3%A4"); }
+
+TEST_F(Encoding, TheEncoderIsGivenThreeTimesTheLengthAsUsableSize) {
+    Platform platform;
+    platform.urlEncode = [](const char *src, char *dst, std::size_t size) {
+        EXPECT_STREQ(src, "four");
+        EXPECT_EQ(size, 12u);
+        EXPECT_EQ(std::string(dst, size + 1), std::string(size + 1, '\0'));
+        std::fill_n(dst, size, 'x');
+        return 0;
+    };
+    ReplacePlatform(platform);
+    EXPECT_EQ(URLEncode("four"), "xxxxxxxxxxxx");
+}
+
+TEST_F(Encoding, AValueThatTheEncoderRefusesStaysAsItIs) {
+    Platform platform;
+    platform.urlEncode = [](const char *, char *dst, std::size_t) {
+        *dst = 'x';
+        return 1;
+    };
+    ReplacePlatform(platform);
+    EXPECT_EQ(URLEncode("a b"), "a b");
+}
+
+TEST_F(Encoding, WithoutMemoryTheValueStaysAsItIs) {
+    FailCalloc(3 * 3 + 1);
+    EXPECT_EQ(URLEncode("a b"), "a b");
+}
+
+TEST_F(Encoding, URLEncodeSeesTheTextUpToItsNUL) { EXPECT_EQ(URLEncode(std::string("a b\0c d", 7)), "a%20b"); }
+
+TEST_F(Encoding, TheMD5DigestOfTheEmptyStringIsTheStandardOne) {
+    EXPECT_EQ(MD5Digest(""), "d41d8cd98f00b204e9800998ecf8427e");
+    EXPECT_EQ(MD5Digest("message digest"), "f96b697d7cb7938d525a2f31aaf161d0");
+}
+
+TEST_F(Encoding, TheMD5DigestIsOverTheBytesBehindANULToo) {
+    EXPECT_EQ(MD5Digest(std::string("\0", 1)), "93b885adfe0da089cdf634904fd59f71");
+    EXPECT_NE(MD5Digest(std::string("a\0b", 3)), MD5Digest("a"));
+}
+
+TEST_F(Encoding, AFailedMD5GivesTheEmptyStringAndOneLine) {
+    FailCall("MD5");
+    errno = EPERM;
+    EXPECT_EQ(MD5Digest("text"), "");
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("utils:N MD5 digest failed Operation not permitted")));
+}
+
+TEST_F(Encoding, WithoutMemoryMD5DigestGivesTheEmptyStringAndOneLine) {
+    FailCalloc(33);
+    EXPECT_EQ(MD5Digest("text"), "");
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("utils:N calloc failed. Cannot allocate memory")));
+}
+
+}  // namespace
+
+}  // namespace Test

@@ -1,0 +1,316 @@
+#include "jwt/jwt.h"
+#include "tests/support/token.h"
+#include "tests/unit/clients.h"
+#include "tests/unit/fixture.h"
+#include "tests/unit/platform_calls.h"
+#include "tests/unit/process.h"
+#include "tests/unit/transport.h"
+
+namespace Test {
+
+namespace {
+
+using namespace TAVO::SSO;
+using TAVO::JWT::jwt_not_support;
+using TAVO::JWT::jwt_verify_failed;
+
+class WebSphereConfiguration : public Library {
+  protected:
+    static WebSphereClient ReadFrom(const std::string &file) {
+        WriteFile(kWebSphereFile, file);
+        return {};
+    }
+
+    static std::string AllFieldsOf(WebSphereClient client) {
+        return client.GetWellknownEndpoint() + client.GetClientID() + client.GetClientSecret() +
+               client.GetAuthEndpoint() + client.GetTokenEndpoint() + client.GetRedirectURI() +
+               client.GetLogoutEndpoint() + client.code + client.GetToken();
+    }
+};
+
+TEST_F(WebSphereConfiguration, EachKeyFillsItsFieldAndNoneSwitchesItOn) {
+    WebSphereClient client = ReadFrom(R"({
+        "websphere_wellknown": "the wellknown",
+        "websphere_client_id": "the id",
+        "websphere_client_secret": "made-up",
+        "websphere_authorization_endpoint": "the authorization",
+        "websphere_token_endpoint": "the token endpoint",
+        "websphere_redirect_uri": "the redirect",
+        "websphere_logout_endpoint": "the logout",
+        "websphere_sso_enable": true, "enable": true, "code": "no code", "token": "no token"})");
+    EXPECT_FALSE(client.isEnable());
+    EXPECT_EQ(client.GetWellknownEndpoint(), "the wellknown");
+    EXPECT_EQ(client.GetClientID(), "the id");
+    EXPECT_EQ(client.GetClientSecret(), "made-up");
+    EXPECT_EQ(client.GetAuthEndpoint(), "the authorization");
+    EXPECT_EQ(client.GetTokenEndpoint(), "the token endpoint");
+    EXPECT_EQ(client.GetRedirectURI(), "the redirect");
+    EXPECT_EQ(client.GetLogoutEndpoint(), "the logout");
+    EXPECT_EQ(client.code, "");
+    EXPECT_EQ(client.GetToken(), "");
+}
+
+TEST_F(WebSphereConfiguration, AClientIDThatIsANumberStaysEmptyWhileTheRestIsRead) {
+    WebSphereClient client = ReadFrom(R"({"websphere_client_id": 5, "websphere_redirect_uri": "the redirect"})");
+    EXPECT_EQ(client.GetClientID(), "");
+    EXPECT_EQ(client.GetRedirectURI(), "the redirect");
+}
+
+TEST_F(WebSphereConfiguration, AMissingOrMalformedFileLeavesAllEmptyAndNoLine) {
+    EXPECT_EQ(AllFieldsOf({}), "");
+    for (const char *file : {"", "{", "[]", "5", R"({"websphere_client_id": "the id")"}) {
+        EXPECT_EQ(AllFieldsOf(ReadFrom(file)), "") << file;
+    }
+}
+
+TEST_F(WebSphereConfiguration, ARootProcessChangesNoIds) {
+    SetEffectiveIDs(0, 0);
+    ReadFrom("{}");
+    EXPECT_THAT(TakeSetIDCalls(), testing::IsEmpty());
+}
+
+TEST_F(WebSphereConfiguration, TheFileIsReadOnceAtConstruction) {
+    WebSphereClient client = ReadFrom(R"({"websphere_client_id": "first"})");
+    WriteFile(kWebSphereFile, R"({"websphere_client_id": "second"})");
+    EXPECT_EQ(client.GetClientID(), "first");
+}
+
+class WebSphereTokenResponse : public Library {};
+
+TEST_F(WebSphereTokenResponse, AnErrorAnswerIsReportedByTheMissingTokenAlone) {
+    WebSphereClient client;
+    client.token = "earlier";
+    EXPECT_EQ(FailureOf([&] { client.ProcessTokenResponse(R"({"error": "invalid_grant"})"); }),
+              Fails<sso_err_resp>("we cannot find key 'id_token' in response!"));
+    EXPECT_EQ(client.GetToken(), "");
+}
+
+TEST_F(WebSphereTokenResponse, AnErrorBesideATokenIsIgnored) {
+    WebSphereClient client;
+    client.ProcessTokenResponse(R"({"error": "invalid_grant", "id_token": "h.b.s"})");
+    EXPECT_EQ(client.GetToken(), "h.b.s");
+}
+
+constexpr std::time_t kNow = 1700000000;
+const Failure kVerified{"nothing thrown", ""};
+const auto kExpired = Fails<std::invalid_argument>("id_token expired.");
+const auto kWrongAudience = Fails<std::invalid_argument>("client ID invalid");
+const auto kNotEncoded = Fails<sso_op_failed>("encode base64 failed.");
+const auto kBadSignature = Fails<jwt_verify_failed>("verify hmac signature failed");
+
+class WebSphereVerification : public Library {
+  protected:
+    void SetUp() override {
+        Library::SetUp();
+        SetClock(kNow);
+        client.clientID = "the id";
+        client.clientSecret = "made-up";
+        header = Parse(R"({"alg": "HS256"})");
+        claims = Parse(R"({"aud": "the id"})");
+        claims["exp"] = static_cast<Json::Int64>(kNow);
+    }
+
+    void TearDown() override {
+        EXPECT_THAT(CurrentTransport().calls, testing::IsEmpty()) << "this provider's tokens need no request";
+        Library::TearDown();
+    }
+
+    /// Verifies a token of `header` and `claims`, signed under the secret.
+    Failure Verify(const EVP_MD *digest = EVP_sha256(), const std::string &secret = "made-up") {
+        const std::string signingInput = SigningInput(header, claims);
+        return VerifyToken(signingInput + "." + SignHMAC(signingInput, secret, digest));
+    }
+
+    Failure VerifyToken(const std::string &token) {
+        client.token = token;
+        return FailureOf([this] { client.VerifyIDToken(); });
+    }
+
+    WebSphereClient client;
+    Json::Value header;
+    Json::Value claims;
+};
+
+TEST_F(WebSphereVerification, ATokenUnderTheSecretVerifiesAgainAndAgain) {
+    EXPECT_EQ(Verify(), kVerified);
+    EXPECT_EQ(FailureOf([this] { client.VerifyIDToken(); }), kVerified);
+}
+
+TEST_F(WebSphereVerification, HS384AndHS512VerifyWithTheirDigests) {
+    header["alg"] = "HS384";
+    EXPECT_EQ(Verify(EVP_sha384()), kVerified);
+    header["alg"] = "HS512";
+    EXPECT_EQ(Verify(EVP_sha512()), kVerified);
+    EXPECT_EQ(Verify(EVP_sha256()), kBadSignature);
+}
+
+TEST_F(WebSphereVerification, WithoutATokenThereIsNothingToVerify) {
+    EXPECT_EQ(VerifyToken(""), Fails<std::invalid_argument>("token cannot be empty"));
+}
+
+TEST_F(WebSphereVerification, AMalformedTokenIsRefusedAsMalformed) {
+    EXPECT_EQ(VerifyToken("a.b.c.d"), Fails<std::invalid_argument>("bad jwt format!"));
+    EXPECT_EQ(VerifyToken("bm8.e30.c2ln"), Fails<std::invalid_argument>("bad jwt header format!"));
+    EXPECT_EQ(VerifyToken("e30.bm8.c2ln"), Fails<std::invalid_argument>("bad jwt body format!"));
+    EXPECT_EQ(VerifyToken("e30..c2ln").type, typeid(std::logic_error).name());
+}
+
+TEST_F(WebSphereVerification, ATokenThatExpiresThisSecondPassesAndOneSecondEarlierFails) {
+    EXPECT_EQ(Verify(), kVerified);
+    claims["exp"] = static_cast<Json::Int64>(kNow - 1);
+    EXPECT_EQ(Verify(), kExpired);
+}
+
+TEST_F(WebSphereVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
+    for (const char *exp : {"null", "\"\"", "\"soon\"", "[1700000000]", "{}", "-1"}) {
+        claims["exp"] = Parse(std::string("[") + exp + "]")[0];
+        EXPECT_EQ(Verify(), kExpired) << exp;
+    }
+    claims.removeMember("exp");
+    EXPECT_EQ(Verify(), kExpired);
+}
+
+TEST_F(WebSphereVerification, ExpiryComesBeforeAudienceAndAudienceBeforeAlgorithm) {
+    claims["aud"] = "another";
+    header["alg"] = "none";
+    EXPECT_EQ(Verify(), kWrongAudience);
+    claims["exp"] = 1;
+    EXPECT_EQ(Verify(), kExpired);
+}
+
+TEST_F(WebSphereVerification, TheAudienceIsComparedExactlyAndAListIsRefused) {
+    for (const char *audience : {"\"The id\"", "\"the id \"", "null", "[\"the id\"]", "{\"the id\": 1}"}) {
+        claims["aud"] = Parse(std::string("[") + audience + "]")[0];
+        EXPECT_EQ(Verify(), kWrongAudience) << audience;
+    }
+    client.clientID = "";
+    claims["aud"] = Json::arrayValue;
+    EXPECT_EQ(Verify(), kWrongAudience) << "a list is no empty text";
+}
+
+TEST_F(WebSphereVerification, AnotherAlgorithmIsNotSupported) {
+    for (const char *algorithm : {"RS256", "none", "hs256", "HS256 ", "HS1", ""}) {
+        header["alg"] = algorithm;
+        EXPECT_EQ(Verify(), Fails<jwt_not_support>(std::string(algorithm) + " algorithm is not supported"));
+    }
+}
+
+TEST_F(WebSphereVerification, AMissingAlgorithmIsNamedByABlank) {
+    header.removeMember("alg");
+    EXPECT_EQ(Verify(), Fails<jwt_not_support>(" algorithm is not supported"));
+}
+
+TEST_F(WebSphereVerification, TheAlgorithmIsLookedAtBeforeTheSecret) {
+    client.clientSecret = std::string(766, 'x');
+    header["alg"] = "none";
+    EXPECT_EQ(Verify(), Fails<jwt_not_support>("none algorithm is not supported"));
+}
+
+TEST_F(WebSphereVerification, AnotherSecretIsABadSignature) {
+    client.clientSecret = "another";
+    EXPECT_EQ(Verify(), kBadSignature);
+}
+
+TEST_F(WebSphereVerification, AnEmptySecretIsABadSignatureEvenForATokenSignedUnderIt) {
+    client.clientSecret = "";
+    EXPECT_EQ(Verify(EVP_sha256(), ""), kBadSignature);
+}
+
+TEST_F(WebSphereVerification, ASecretOf765BytesFitsAndOneMoreFails) {
+    client.clientSecret = std::string(765, '\xff');
+    EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kVerified);
+    client.clientSecret += '\xff';
+    EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kNotEncoded);
+}
+
+TEST_F(WebSphereVerification, TheSecretsBytesAreTheKeyNULIncluded) {
+    client.clientSecret = std::string("a\0b", 3);
+    EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kVerified);
+    EXPECT_EQ(Verify(EVP_sha256(), "a"), kBadSignature);
+}
+
+TEST_F(WebSphereVerification, TheEncoderIsGivenAZeroedBufferOf1024BytesAndItsFlags) {
+    Platform platform;
+    platform.encode = [](const std::string &src, char *dst, int flag1, std::size_t size, int flag2, int flag3) {
+        EXPECT_EQ(src.size(), 7u);
+        EXPECT_EQ(flag1, 1);
+        EXPECT_EQ(size, 1024u);
+        EXPECT_EQ(flag2, 0);
+        EXPECT_EQ(flag3, 1);
+        EXPECT_EQ(std::string(dst, size), std::string(1024, '\0'));
+        std::fill_n(dst, size, 'A');  // to the last byte, without a NUL
+        return 1;
+    };
+    ReplacePlatform(platform);
+    EXPECT_EQ(Verify(EVP_sha256(), std::string(768, '\0')), kVerified);
+}
+
+TEST_F(WebSphereVerification, ATokenWithAKidNeedsNoKeySet) {
+    header["kid"] = "key 1";
+    EXPECT_EQ(Verify(), kVerified);
+}
+
+class WebSphereIdentity : public Library {
+  protected:
+    Failure NameOf(const std::string &claims) {
+        client.token = "e30." + Base64Url(claims) + ".";
+        return FailureOf([this] { client.GetUserName(userName); });
+    }
+
+    WebSphereClient client;
+    std::string userName = "before";
+};
+
+const Failure kNamed{"nothing thrown", ""};
+
+TEST_F(WebSphereIdentity, TheNameIsTheSubjectUnchangedAndEmailIsNotConsulted) {
+    EXPECT_EQ(NameOf(R"({"sub": " Alice@Corp ", "email": "bob@corp.example.net"})"), kNamed);
+    EXPECT_EQ(userName, " Alice@Corp ");
+}
+
+TEST_F(WebSphereIdentity, AnEmptySubjectIsAccepted) {
+    EXPECT_EQ(NameOf(R"({"sub": ""})"), kNamed);
+    EXPECT_EQ(userName, "");
+}
+
+TEST_F(WebSphereIdentity, WithoutAStringSubjectTheNameCannotBeFoundAndIsUnchanged) {
+    const auto notFound = Fails<std::invalid_argument>("cannot find the user name!");
+    for (const char *claims : {R"({"sub": 5})", R"({"sub": null})", R"({"email": "bob@corp"})", "[\"sub\"]", "5"}) {
+        EXPECT_EQ(NameOf(claims), notFound) << claims;
+        EXPECT_EQ(userName, "before") << claims;
+    }
+}
+
+TEST_F(WebSphereIdentity, WithoutATokenThereIsNoName) {
+    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }),
+              Fails<std::invalid_argument>("please request a id_token first."));
+    EXPECT_EQ(userName, "before");
+}
+
+TEST_F(WebSphereIdentity, AMalformedTokenIsRefusedAsMalformed) {
+    client.token = "a.b";
+    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }), Fails<std::invalid_argument>("bad jwt format!"));
+    EXPECT_EQ(NameOf("no JSON"), Fails<std::invalid_argument>("bad jwt body format!"));
+    EXPECT_EQ(userName, "before");
+}
+
+TEST_F(WebSphereIdentity, UserInfoIsAllClaims) {
+    client.token = "e30." + Base64Url(R"({"sub": "1", "list": [1]})") + ".";
+    Json::Value claims;
+    client.GetUserInfo(claims);
+    EXPECT_EQ(claims, Parse(R"({"sub": "1", "list": [1]})"));
+}
+
+TEST_F(WebSphereIdentity, WithoutATokenUserInfoIsUnchanged) {
+    Json::Value claims = "before";
+    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(claims); }),
+              Fails<std::invalid_argument>("please request a id_token first."));
+    EXPECT_EQ(claims, "before");
+    client.token = "a.b";
+    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(claims); }), Fails<std::invalid_argument>("bad jwt format!"));
+    EXPECT_EQ(claims, "before");
+}
+
+}  // namespace
+
+}  // namespace Test
