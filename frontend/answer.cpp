@@ -24,9 +24,7 @@ void Answer::SetCookie(const std::string &name, const std::string &value, const 
     AddHeader("Set-Cookie", name + "=" + value + "; Path=/; Secure; HttpOnly; SameSite=Lax" + attributes);
 }
 
-void Answer::ExpireCookie(const std::string &name) {
-    SetCookie(name, "", "; Max-Age=0");
-}
+void Answer::ExpireCookie(const std::string &name) { SetCookie(name, "", "; Max-Age=0"); }
 
 void Answer::AddHeader(const std::string &name, const std::string &value) {
     if (HasControlCharacter(value)) {

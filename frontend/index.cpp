@@ -44,6 +44,4 @@ void ShowStartPage(Frontend::Answer &answer) {
 
 }  // namespace
 
-int main() {
-    return Frontend::Serve(ShowStartPage);
-}
+int main() { return Frontend::Serve(ShowStartPage); }

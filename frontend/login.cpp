@@ -34,6 +34,4 @@ void StartLogin(Frontend::Answer &answer) {
 
 }  // namespace
 
-int main() {
-    return Frontend::Serve(StartLogin);
-}
+int main() { return Frontend::Serve(StartLogin); }

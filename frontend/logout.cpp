@@ -56,6 +56,4 @@ void SignOut(Frontend::Answer &answer) {
 
 }  // namespace
 
-int main() {
-    return Frontend::Serve(SignOut);
-}
+int main() { return Frontend::Serve(SignOut); }

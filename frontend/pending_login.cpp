@@ -16,9 +16,7 @@ constexpr char kFolder[] = "logins";
 constexpr int kSeconds = 600;
 constexpr std::size_t kDecodedState = 1024;
 
-std::string CookieName(const std::string &login) {
-    return "__Host-login-" + login.substr(0, 8);
-}
+std::string CookieName(const std::string &login) { return "__Host-login-" + login.substr(0, 8); }
 
 }  // namespace
 

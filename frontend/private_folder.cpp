@@ -20,9 +20,7 @@ constexpr char kFrontEndFolder[] = "/usr/tavo/var/frontend";
 constexpr std::size_t kRandomBytes = 16;
 constexpr char kHexDigits[] = "0123456789abcdef";
 
-[[noreturn]] void ThrowSystemError(const char *what) {
-    throw std::system_error(errno, std::generic_category(), what);
-}
+[[noreturn]] void ThrowSystemError(const char *what) { throw std::system_error(errno, std::generic_category(), what); }
 
 std::string RandomName() {
     unsigned char bytes[kRandomBytes];
@@ -113,9 +111,7 @@ Descriptor::Descriptor(int opened, const char *what) : number(opened) {
     }
 }
 
-Descriptor::~Descriptor() {
-    close(number);
-}
+Descriptor::~Descriptor() { close(number); }
 
 PrivateFolder::PrivateFolder(const char *name, std::time_t seconds)
     : folder(OpenFolder(std::string(kFrontEndFolder) + "/" + name), "The front end's folder cannot be opened"),

@@ -50,6 +50,4 @@ void CompleteLogin(Frontend::Answer &answer) {
 
 }  // namespace
 
-int main() {
-    return Frontend::Serve(CompleteLogin);
-}
+int main() { return Frontend::Serve(CompleteLogin); }

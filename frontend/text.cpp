@@ -12,14 +12,10 @@ constexpr std::size_t kLongestLine = 200;
 // With the random value beside it, the longest origin must fit into the state: 721 bytes of compact JSON.
 constexpr std::size_t kLongestOrigin = 512;
 
-bool IsControl(char c) {
-    return static_cast<unsigned char>(c) < 0x20 || c == 0x7f;
-}
+bool IsControl(char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7f; }
 
 // What a browser leaves as it is in a path and its query, and JSON in a string. A backslash would be a slash to it.
-bool IsPathCharacter(char c) {
-    return c > 0x20 && c < 0x7f && c != '\\' && c != '"';
-}
+bool IsPathCharacter(char c) { return c > 0x20 && c < 0x7f && c != '\\' && c != '"'; }
 
 }  // namespace
 
@@ -49,9 +45,7 @@ std::string EscapeHtml(const std::string &text) {
     return escaped;
 }
 
-bool HasControlCharacter(const std::string &text) {
-    return std::any_of(text.begin(), text.end(), IsControl);
-}
+bool HasControlCharacter(const std::string &text) { return std::any_of(text.begin(), text.end(), IsControl); }
 
 std::string OneLine(std::string text) {
     text.resize(std::min(text.size(), kLongestLine));

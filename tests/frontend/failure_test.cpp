@@ -6,13 +6,9 @@ using namespace Frontend;
 
 namespace {
 
-std::string Reason(const std::string &text) {
-    return ReasonOf(std::runtime_error(text));
-}
+std::string Reason(const std::string &text) { return ReasonOf(std::runtime_error(text)); }
 
-TEST(Reason, IsTheFixedTextOfTheLibrary) {
-    EXPECT_EQ(Reason("id_token expired."), "id_token expired.");
-}
+TEST(Reason, IsTheFixedTextOfTheLibrary) { EXPECT_EQ(Reason("id_token expired."), "id_token expired."); }
 
 TEST(Reason, IsOfAProvidersWholeAnswerOnlyTheErrorThatItNames) {
     EXPECT_EQ(Reason("{\"access_token\":\"SECRET\",\"error\":\"invalid_grant\",\"error_description\":\"used\"}\n"),

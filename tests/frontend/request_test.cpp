@@ -50,8 +50,6 @@ TEST(Origin, FitsIntoTheStateHoweverLongItIs) {
     EXPECT_NO_THROW(TAVO::SSO::AzureSSOClient().GetAccessTokenReqURI(state));
 }
 
-TEST(Html, ShowsEveryCharacterAsText) {
-    EXPECT_EQ(EscapeHtml("<a b='\"&\">"), "&lt;a b=&#39;&quot;&amp;&quot;&gt;");
-}
+TEST(Html, ShowsEveryCharacterAsText) { EXPECT_EQ(EscapeHtml("<a b='\"&\">"), "&lt;a b=&#39;&quot;&amp;&quot;&gt;"); }
 
 }  // namespace
