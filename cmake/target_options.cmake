@@ -15,7 +15,8 @@ function(tavosso_options target)
         # Not _FORTIFY_SOURCE: it renames the calls that the library makes, and belongs to the packager's flags.
         target_compile_options(${target} PRIVATE -fstack-protector-strong -fstack-clash-protection
             $<$<BOOL:${TAVOSSO_HAS_CF_PROTECTION}>:-fcf-protection=full>)
-        target_link_options(${target} PRIVATE LINKER:-z,relro LINKER:-z,now LINKER:-z,noexecstack)
+        target_link_options(${target} PRIVATE LINKER:-z,relro LINKER:-z,now LINKER:-z,noexecstack
+            $<$<BOOL:${TAVOSSO_HAS_CF_PROTECTION}>:LINKER:-z,shstk>)
     endif()
     if(TAVOSSO_SANITIZE)
         target_compile_options(${target} PRIVATE -fsanitize=address,undefined -fno-sanitize-recover=all
