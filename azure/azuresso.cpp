@@ -174,9 +174,9 @@ void AzureSSOClient::GetUserName(std::string &userName) {
 
 std::string GetAzureSSOLogoutURL(const std::string &base) {
     AzureSSOClient client;
-    const std::string logoutEndpoint = client.GetLogoutEndpoint();
+    std::string url = client.GetLogoutEndpoint();
     if (base.empty()) {
-        return logoutEndpoint;
+        return url;
     }
     std::string relayPage = base;
     for (const char *suffix : kStrippedSuffixes) {
@@ -191,7 +191,7 @@ std::string GetAzureSSOLogoutURL(const std::string &base) {
         relayPage.pop_back();
     }
     relayPage += kRelayPage;
-    return logoutEndpoint + "?" + kPostLogoutRedirectURI + "=" + URLEncode(relayPage);
+    return url + "?" + kPostLogoutRedirectURI + "=" + URLEncode(relayPage);
 }
 
 }  // namespace TAVO::SSO

@@ -53,7 +53,7 @@ std::string DecodePercent(const std::string &text) {
 
 std::string Variable(const char *name) {
     const char *value = std::getenv(name);
-    return value ? value : "";
+    return value != nullptr ? value : "";
 }
 
 Parameters ParseQuery(const std::string &query) {

@@ -48,8 +48,8 @@ void ConcludeLogin(Answer &answer, const std::string &cookies, const std::string
 Json::Value DecodeState(const std::string &state) {
     char buffer[kDecodedState];
     std::size_t length = sizeof buffer;
-    if (!TLIBCBase64Decode(state.data(), state.size(), buffer, &length)) {
-        return Json::Value();
+    if (TLIBCBase64Decode(state.data(), state.size(), buffer, &length) == 0) {
+        return {};
     }
     return ParseObject(std::string(buffer, length));
 }

@@ -121,7 +121,7 @@ PrivateFolder::PrivateFolder(const char *name, std::time_t seconds)
 
 std::string PrivateFolder::Keep(const std::string &text) {
     Sweep();
-    const std::string name = RandomName();
+    std::string name = RandomName();
     const Descriptor file(
         openat(folder.Number(), name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600),
         "The front end's file cannot be made");

@@ -29,8 +29,8 @@ class Descriptor {
  */
 class PrivateFolder {
   public:
-    /// `folder` in the front end's own, made when missing; texts are forgotten `lifetime` seconds after they were kept.
-    PrivateFolder(const char *folder, std::time_t lifetime);
+    /// The folder `name` in the front end's own, made when missing; texts are forgotten `seconds` after they were kept.
+    PrivateFolder(const char *name, std::time_t seconds);
 
     /// Keeps a text and gives its name.
     std::string Keep(const std::string &text);

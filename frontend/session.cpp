@@ -10,7 +10,7 @@ namespace {
 
 constexpr char kCookie[] = "__Host-session";
 constexpr char kFolder[] = "sessions";
-constexpr std::time_t kSeconds = 8 * 60 * 60;
+constexpr std::time_t kSeconds = std::time_t{8} * 60 * 60;
 
 std::optional<Session> ParseSession(const std::optional<std::string> &text) {
     if (!text) {

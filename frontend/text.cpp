@@ -74,7 +74,7 @@ Json::Value ParseObject(const std::string &text) {
     } catch (const Json::Exception &) {
         // Too deeply nested: no object that anyone here has written.
     }
-    return Json::Value();
+    return {};
 }
 
 std::string StringMember(const Json::Value &object, const char *name) {

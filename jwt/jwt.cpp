@@ -162,8 +162,8 @@ RSAPointer MakeRSA(const DecodedPart &n, const DecodedPart &e) {
     if (!rsa || RSA_set0_key(rsa.get(), modulus.get(), exponent.get(), nullptr) != 1) {
         return nullptr;
     }
-    modulus.release();
-    exponent.release();
+    static_cast<void>(modulus.release());
+    static_cast<void>(exponent.release());
     return rsa;
 }
 
@@ -181,7 +181,7 @@ PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
         syslog(LOG_ERR, "%s:%d EVP_PKEY_assign_RSA failed", SOURCE_LINE);
         return nullptr;
     }
-    rsa.release();
+    static_cast<void>(rsa.release());
     if (EVP_PKEY_id(key.get()) != EVP_PKEY_RSA) {
         syslog(LOG_ERR, "%s:%d check key type failed", SOURCE_LINE);
         return nullptr;

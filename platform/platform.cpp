@@ -4,8 +4,8 @@
 #include <json/json.h>
 #include <openssl/evp.h>
 
+#include <algorithm>
 #include <boost/algorithm/string/predicate.hpp>
-#include <cstring>
 #include <fstream>
 #include <limits>
 #include <locale>
@@ -90,7 +90,7 @@ bool CopyText(const std::string &text, char *dst, std::size_t usableSize) {
     if (text.size() > usableSize) {
         return false;
     }
-    std::memcpy(dst, text.c_str(), text.size() + 1);
+    std::copy_n(text.c_str(), text.size() + 1, dst);
     return true;
 }
 
@@ -107,8 +107,8 @@ int TavoCgiURLEncode(const char *src, char *dst, size_t size) try {
     return -1;
 }
 
-int TLIBCBase64SzEncodeFull(const char *src, size_t len, char *dst, int /*flag*/, size_t size, int /*flag*/,
-                            int /*flag*/) try {
+int TLIBCBase64SzEncodeFull(const char *src, size_t len, char *dst, int /*flag1*/, size_t size, int /*flag2*/,
+                            int /*flag3*/) try {
     if ((src == nullptr && len != 0) || dst == nullptr || size == 0 || len > kLongestInput) {
         return 0;
     }
@@ -123,7 +123,7 @@ int TLIBCBase64Decode(const char *src, size_t len, char *dst, size_t *len_inout)
         !DecodeBase64(std::string(src, len), bytes) || bytes.size() > *len_inout) {
         return 0;
     }
-    std::memcpy(dst, bytes.data(), bytes.size());
+    std::copy(bytes.begin(), bytes.end(), dst);
     *len_inout = bytes.size();
     return 1;
 } catch (const std::exception &) {

@@ -8,7 +8,7 @@
 #ifndef TAVOSSO_PLATFORM_PLATFORM_H
 #define TAVOSSO_PLATFORM_PLATFORM_H
 
-#include <stddef.h>
+#include <stddef.h>  // NOLINT(modernize-deprecated-headers): a header for C as well
 
 #pragma GCC visibility push(default)
 
@@ -34,9 +34,9 @@ int TavoCgiURLEncode(const char *src, char *dst, size_t size);
  * @param size  size of `dst`, the NUL included
  * @return non-zero on success, 0 when the text does not fit or an argument is null
  *
- * The three unnamed flags are the appliance's; its callers pass 1, 0 and 1.
+ * The three flags are the appliance's; its callers pass 1, 0 and 1.
  */
-int TLIBCBase64SzEncodeFull(const char *src, size_t len, char *dst, int, size_t size, int, int);
+int TLIBCBase64SzEncodeFull(const char *src, size_t len, char *dst, int flag1, size_t size, int flag2, int flag3);
 
 /**
  * Decodes standard base64 (RFC 4648, section 4): one line, canonical, padded.
