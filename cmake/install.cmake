@@ -16,5 +16,7 @@ write_basic_package_version_file(tavossoConfigVersion.cmake COMPATIBILITY SameMa
 install(FILES ${PROJECT_BINARY_DIR}/tavossoConfig.cmake ${PROJECT_BINARY_DIR}/tavossoConfigVersion.cmake
         DESTINATION ${package_dir})
 
+# Found from where the file itself lies, so that the tree may be installed under any prefix, or moved.
+file(RELATIVE_PATH prefix_from_pkgconfig /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
 configure_file(cmake/tavosso.pc.in tavosso.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/tavosso.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
