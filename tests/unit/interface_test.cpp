@@ -164,14 +164,6 @@ TEST_F(Interface, EachExceptionsTypeInformationIsTheLibrarys) {
     }
 }
 
-TEST_F(Interface, ACallBetweenExportedFunctionsGoesThroughTheSymbolTable) {
-    // This program's own isEnable stands in front of nothing; but an exported function that another one calls must be
-    // found by its name, as a program that puts its own in front relies on it.
-    Dl_info info;
-    ASSERT_NE(dladdr(reinterpret_cast<void *>(&SSO::MD5Digest), &info), 0);
-    EXPECT_THAT(info.dli_fname, testing::HasSubstr("libtavosso.so"));
-}
-
 }  // namespace
 
 }  // namespace Test
