@@ -86,7 +86,7 @@ INSTANTIATE_TEST_SUITE_P(
     Of, TokenOfSize,
     Combine(Values(Profile::kAzure, Profile::kWebSphere),
             Values(Size{"Below1KB", 0, 1024}, Size{"Above1KB", 1025, 2048}, Size{"Above3KB", 3073, 4096},
-                   Size{"Above4KB", 4097, 5120}, Size{"100KB", 100 * 1024, 101 * 1024})),
+                   Size{"Above4KB", 4608, 5120}, Size{"100KB", 100 * 1024, 101 * 1024})),
     [](const auto &row) { return ::testing::PrintToString(std::get<0>(row.param)) + std::get<1>(row.param).name; });
 
 class HugeAnswer : public ::testing::TestWithParam<Profile> {

@@ -82,16 +82,10 @@ void TrustAuthority() {
     WriteFile(kTrustedAuthorities, std::string(bytes, static_cast<std::size_t>(length)));
 }
 
-Credentials CertificateFor(const std::string &name) {
-    return Issue(Server(name, kFarAhead), &Authority());
-}
+Credentials CertificateFor(const std::string &name) { return Issue(Server(name, kFarAhead), &Authority()); }
 
-Credentials ExpiredCertificateFor(const std::string &name) {
-    return Issue(Server(name, kSoonAfter), &Authority());
-}
+Credentials ExpiredCertificateFor(const std::string &name) { return Issue(Server(name, kSoonAfter), &Authority()); }
 
-Credentials SelfSignedCertificateFor(const std::string &name) {
-    return Issue(Server(name, kFarAhead), nullptr);
-}
+Credentials SelfSignedCertificateFor(const std::string &name) { return Issue(Server(name, kFarAhead), nullptr); }
 
 }  // namespace Test

@@ -14,12 +14,8 @@ std::atomic<std::size_t> limit{kNoLimit};
 
 }  // namespace
 
-MemoryLimit::MemoryLimit(std::size_t largest) {
-    limit = largest;
-}
-MemoryLimit::~MemoryLimit() {
-    limit = kNoLimit;
-}
+MemoryLimit::MemoryLimit(std::size_t largest) { limit = largest; }
+MemoryLimit::~MemoryLimit() { limit = kNoLimit; }
 
 }  // namespace Test
 
@@ -30,9 +26,5 @@ void *operator new(std::size_t size) {
     }
     return memory;
 }
-void operator delete(void *memory) noexcept {
-    std::free(memory);
-}
-void operator delete(void *memory, std::size_t /*size*/) noexcept {
-    std::free(memory);
-}
+void operator delete(void *memory) noexcept { std::free(memory); }
+void operator delete(void *memory, std::size_t /*size*/) noexcept { std::free(memory); }

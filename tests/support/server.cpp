@@ -108,9 +108,7 @@ Port::Port() : socket_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
     setenv("no_proxy", "*", 1);
 }
 
-Port::~Port() {
-    close(socket_);
-}
+Port::~Port() { close(socket_); }
 
 std::uint16_t Port::number() const {
     sockaddr_in address{};
