@@ -14,8 +14,19 @@ constexpr char kEveryAnswer[] =
     "Cache-Control: no-store\n"
     "Referrer-Policy: no-referrer\n"
     "X-Content-Type-Options: nosniff\n"
-    "Content-Security-Policy: default-src 'none'; style-src 'self'; base-uri 'none'; form-action 'self'; "
-    "frame-ancestors 'none'\n";
+    "Content-Security-Policy: default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; "
+    "base-uri 'none'; form-action 'self'; frame-ancestors 'none'\n";
+
+constexpr char kBeforeTitle[] =
+    "Content-Type: text/html; charset=utf-8\n\n"
+    "<!DOCTYPE html>\n<html lang=\"en\">\n<head>\n<meta charset=\"utf-8\">\n"
+    "<meta name=\"viewport\" content=\"width=device-width, initial-scale=1\">\n<title>";
+
+constexpr char kBeforeContent[] =
+    "</title>\n<link rel=\"icon\" href=\"/webman/ssoclient/mark.svg\" type=\"image/svg+xml\">\n"
+    "<link rel=\"stylesheet\" href=\"/webman/ssoclient/style.css\">\n</head>\n<body>\n"
+    "<header><img src=\"/webman/ssoclient/mark.svg\" alt=\"\" width=\"32\" height=\"32\"> Network storage</header>\n"
+    "<main>\n";
 
 }  // namespace
 
@@ -33,31 +44,15 @@ void Answer::AddHeader(const std::string &name, const std::string &value) {
     head += name + ": " + value + "\n";
 }
 
-void Answer::BeginRedirect() {
-    std::cout << "Status: 302 Found\n" << kEveryAnswer << head;
-    redirectIsOpen = true;
-}
-
 void Answer::Redirect(const std::string &address) {
-    if (HasControlCharacter(address)) {
-        throw std::invalid_argument("A header would not stay on one line.");
-    }
-    if (!redirectIsOpen) {
-        BeginRedirect();
-    }
-    std::cout << "Location: " << address << "\n\n";
+    AddHeader("Location", address);
+    std::cout << "Status: 302 Found\n" << kEveryAnswer << head << "\n";
 }
 
 void Answer::Page(const std::string &status, const std::string &title, const std::string &content) {
     std::cout << "Status: " << status << "\n"
-              << kEveryAnswer << head
-              << "Content-Type: text/html; charset=utf-8\n\n"
-                 "<!DOCTYPE html>\n<html lang=\"en\">\n<head>\n<meta charset=\"utf-8\">\n"
-                 "<meta name=\"viewport\" content=\"width=device-width, initial-scale=1\">\n<title>"
-              << EscapeHtml(title)
-              << "</title>\n<link rel=\"stylesheet\" href=\"/webman/ssoclient/style.css\">\n</head>\n"
-                 "<body>\n<main>\n"
-              << content << "</main>\n</body>\n</html>\n";
+              << kEveryAnswer << head << kBeforeTitle << EscapeHtml(title) << kBeforeContent << content
+              << "</main>\n</body>\n</html>\n";
 }
 
 }  // namespace Frontend

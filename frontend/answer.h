@@ -5,7 +5,7 @@
 
 namespace Frontend {
 
-/// What a CGI program answers, written to standard output. One line of head at a time, then the one thing that ends it.
+/// What a CGI program answers, written to standard output: headers one at a time, then the one thing that ends it.
 class Answer {
   public:
     /// A cookie for this host alone, over TLS alone, out of reach of scripts; without an age it ends with the browser.
@@ -13,15 +13,12 @@ class Answer {
     void ExpireCookie(const std::string &name);
     void AddHeader(const std::string &name, const std::string &value);
 
-    /// Writes the head of a redirect and leaves it open, for the library to add where it goes to.
-    void BeginRedirect();
     void Redirect(const std::string &address);
     /// `content` is HTML; `title` is not.
     void Page(const std::string &status, const std::string &title, const std::string &content);
 
   private:
     std::string head;
-    bool redirectIsOpen = false;
 };
 
 }  // namespace Frontend

@@ -3,42 +3,52 @@
 
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
+#include "frontend/profile.h"
 #include "frontend/session.h"
 #include "frontend/text.h"
 
 namespace {
 
-bool SignInIsPossible() {
-    TAVO::SSO::SSOProfile profile;
-    const std::string name = profile.GetSSOProfile();
-    return profile.SSOIsEnable() && (name == "azure" || name == "websphere") &&
-           !profile.GetSSOClient()->GetAuthEndpoint().empty();
-}
-
 void ShowUser(Frontend::Answer &answer, const std::string &user) {
     answer.Page("200 OK", "Signed in",
-                "<h1>Signed in</h1>\n<p>You are signed in as <strong>" + Frontend::EscapeHtml(user) +
-                    "</strong>.</p>\n<form method=\"post\" action=\"/webman/sso/logout.cgi\">\n"
+                "<h1>Welcome</h1>\n<p>You are signed in as <strong>" + Frontend::EscapeHtml(user) +
+                    "</strong>.</p>\n<p><a href=\"/account.cgi\">Your account</a></p>\n"
+                    "<form method=\"post\" action=\"/webman/sso/logout.cgi\">\n"
                     "<button type=\"submit\">Sign out</button>\n</form>\n");
 }
 
-void ShowSignIn(Frontend::Answer &answer) {
+void ShowSignIn(Frontend::Answer &answer, const std::string &origin) {
     answer.Page("200 OK", "Sign in",
-                "<h1>Sign in</h1>\n<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=%2Findex.cgi\">"
-                "Sign in with single sign-on</a></p>\n");
+                "<h1>Sign in</h1>\n<p>Your organisation knows you already: sign in there, with the name and password "
+                "that you use every day.</p>\n<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=" +
+                    Frontend::EscapeHtml(TAVO::SSO::URLEncode(origin)) + "\">Sign in with single sign-on</a></p>\n");
 }
 
-void ShowThatSignInIsOff(Frontend::Answer &answer) {
-    answer.Page("200 OK", "Sign in", "<h1>Sign in</h1>\n<p>Single sign-on is not set up on this device.</p>\n");
+void ShowThatNobodyCanSignIn(Frontend::Answer &answer, const std::string &why) {
+    answer.Page("200 OK", "Sign in",
+                "<h1>Sign in</h1>\n<p>" + why + "</p>\n<p>Please ask your administrator for help.</p>\n");
+}
+
+void ShowWayToSignIn(Frontend::Answer &answer) {
+    const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
+    switch (Frontend::HowFarSetUp()) {
+        case Frontend::SetUp::kComplete:
+            ShowSignIn(answer, Frontend::SafeOrigin(Frontend::OnlyValue(parameters, "origin").value_or("")));
+            break;
+        case Frontend::SetUp::kIncomplete:
+            ShowThatNobodyCanSignIn(answer, "Single sign-on is not completely set up on this device.");
+            break;
+        case Frontend::SetUp::kOff:
+            ShowThatNobodyCanSignIn(answer, "Single sign-on is switched off on this device.");
+            break;
+    }
 }
 
 void ShowStartPage(Frontend::Answer &answer) {
     if (const auto session = Frontend::FindSession(Frontend::Variable("HTTP_COOKIE"))) {
         ShowUser(answer, session->user);
-    } else if (SignInIsPossible()) {
-        ShowSignIn(answer);
     } else {
-        ShowThatSignInIsOff(answer);
+        ShowWayToSignIn(answer);
     }
 }
 

@@ -3,6 +3,7 @@
 
 #include <json/json.h>
 
+#include <functional>
 #include <string>
 
 #include "frontend/answer.h"
@@ -16,12 +17,14 @@
  */
 namespace Frontend {
 
-/// Gives the state object for the client's `RedirectAuthEndpoint`.
-Json::Value StartLogin(Answer &answer, const std::string &origin);
+/// Starts a login. `makeAddress` makes the provider's address from the state's object, as `GetAccessTokenReqURI` of the
+/// clients does; gives that address. The state in it is remembered as it stands.
+std::string StartLogin(Answer &answer, const std::string &origin,
+                       const std::function<std::string(const Json::Value &)> &makeAddress);
 
-/// Throws `Refusal` unless this browser started the login that `state` (as it came back) belongs to, not long ago, and
-/// has not come back from it before.
-void ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state);
+/// Throws `Refusal` unless this browser started the login that `state` (as it came back) belongs to, not long ago, has
+/// not come back from it before, and brings the state unchanged. Gives the state's object.
+Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state);
 
 /// The JSON object that the state holds, null where it holds none.
 Json::Value DecodeState(const std::string &state);

@@ -22,20 +22,7 @@ constexpr char kHexDigits[] = "0123456789abcdef";
 
 [[noreturn]] void ThrowSystemError(const char *what) { throw std::system_error(errno, std::generic_category(), what); }
 
-std::string RandomName() {
-    unsigned char bytes[kRandomBytes];
-    if (getrandom(bytes, sizeof bytes, 0) != static_cast<ssize_t>(sizeof bytes)) {
-        ThrowSystemError("No random name can be made");
-    }
-    std::string name;
-    for (const unsigned char byte : bytes) {
-        name += kHexDigits[byte >> 4];
-        name += kHexDigits[byte & 15];
-    }
-    return name;
-}
-
-bool IsRandomName(const std::string &name) {
+bool IsName(const std::string &name) {
     return name.size() == 2 * kRandomBytes && name.find_first_not_of(kHexDigits) == std::string::npos;
 }
 
@@ -96,7 +83,7 @@ std::vector<std::string> NamesIn(const Descriptor &folder) {
     }
     std::vector<std::string> names;
     while (const dirent *entry = readdir(directory.get())) {
-        if (IsRandomName(entry->d_name)) {
+        if (IsName(entry->d_name)) {
             names.emplace_back(entry->d_name);
         }
     }
@@ -119,18 +106,29 @@ PrivateFolder::PrivateFolder(const char *name, std::time_t seconds)
     RefuseUnlessPrivate(folder);
 }
 
-std::string PrivateFolder::Keep(const std::string &text) {
+std::string PrivateFolder::NewName() {
+    unsigned char bytes[kRandomBytes];
+    if (getrandom(bytes, sizeof bytes, 0) != static_cast<ssize_t>(sizeof bytes)) {
+        ThrowSystemError("No random name can be made");
+    }
+    std::string name;
+    for (const unsigned char byte : bytes) {
+        name += kHexDigits[byte >> 4];
+        name += kHexDigits[byte & 15];
+    }
+    return name;
+}
+
+void PrivateFolder::Keep(const std::string &name, const std::string &text) {
     Sweep();
-    std::string name = RandomName();
     const Descriptor file(
         openat(folder.Number(), name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600),
         "The front end's file cannot be made");
     WriteAll(file, text);
-    return name;
 }
 
 std::optional<std::string> PrivateFolder::Read(const std::string &name) {
-    if (!IsRandomName(name) || !IsAlive(name)) {
+    if (!IsName(name) || !IsAlive(name)) {
         return std::nullopt;
     }
     const int opened = openat(folder.Number(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC);

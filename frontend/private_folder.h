@@ -32,8 +32,10 @@ class PrivateFolder {
     /// The folder `name` in the front end's own, made when missing; texts are forgotten `seconds` after they were kept.
     PrivateFolder(const char *name, std::time_t seconds);
 
-    /// Keeps a text and gives its name.
-    std::string Keep(const std::string &text);
+    /// A name that nobody can guess.
+    static std::string NewName();
+    /// Keeps a text under a new name.
+    void Keep(const std::string &name, const std::string &text);
     std::optional<std::string> Read(const std::string &name);
     /// Reads a text and removes it. Of two that take the same, one gets it.
     std::optional<std::string> Take(const std::string &name);

@@ -4,7 +4,9 @@
 
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
+#include "frontend/id_token.h"
 #include "frontend/pending_login.h"
+#include "frontend/profile.h"
 #include "frontend/session.h"
 #include "frontend/text.h"
 
@@ -26,9 +28,11 @@ void RefuseProviderError(const Frontend::Parameters &parameters) {
     }
 }
 
-std::string SignIn(const std::string &code) {
+// `OIDCLogin`, with a look at the token before the user is believed.
+std::string SignIn(TAVO::SSO::SSOClient &client, const std::string &code, const Json::Value &state) {
     std::string user;
-    TAVO::SSO::OIDCLogin(code, user);
+    client.OpenIDConnectLogin(code, user);
+    Frontend::RequireNonce(client.GetToken(), state);
     if (user.empty() || Frontend::HasControlCharacter(user)) {
         throw Frontend::Refusal("The provider's name for this user cannot be used.");
     }
@@ -38,14 +42,17 @@ std::string SignIn(const std::string &code) {
 void CompleteLogin(Frontend::Answer &answer) {
     const std::string cookies = Frontend::Variable("HTTP_COOKIE");
     const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
-    const std::string state = RequireOnly(parameters, "state");
+    const std::string stateText = RequireOnly(parameters, "state");
     // Before anything of the answer is believed, and above all before the code is used.
-    Frontend::ConcludeLogin(answer, cookies, state);
+    const Json::Value state = Frontend::ConcludeLogin(answer, cookies, stateText);
     RefuseProviderError(parameters);
-    const std::string user = SignIn(RequireOnly(parameters, "code"));
-    Frontend::StartSession(answer, cookies, {user, TAVO::SSO::SSOProfile().GetSSOProfile()});
+    const std::string code = RequireOnly(parameters, "code");
+    const std::string profile = Frontend::ProfileInForce();
+    const std::string user =
+        Frontend::WithClient(profile, [&](TAVO::SSO::SSOClient &client) { return SignIn(client, code, state); });
+    Frontend::StartSession(answer, cookies, {user, profile});
     syslog(LOG_AUTH | LOG_INFO, "frontend: signed in: %s", Frontend::OneLine(user).c_str());
-    answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, state, ""));
+    answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, stateText, ""));
 }
 
 }  // namespace

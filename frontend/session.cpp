@@ -44,7 +44,9 @@ void StartSession(Answer &answer, const std::string &cookies, const Session &ses
     Json::Value text;
     text["user"] = session.user;
     text["profile"] = session.profile;
-    answer.SetCookie(kCookie, sessions.Keep(WriteCompact(text)));
+    const std::string name = PrivateFolder::NewName();
+    sessions.Keep(name, WriteCompact(text));
+    answer.SetCookie(kCookie, name);
 }
 
 }  // namespace Frontend

@@ -1,10 +1,12 @@
 #include "frontend/pending_login.h"
 
 #include <gmock/gmock.h>
+#include <sso/sso.h>
 #include <utime.h>
 
 #include <filesystem>
 
+#include "frontend/cgi.h"
 #include "frontend/failure.h"
 #include "frontend/text.h"
 #include "platform/platform.h"
@@ -19,17 +21,23 @@ std::string Encode(const std::string &text) {
     return buffer;
 }
 
+// As the clients do, with a nonce of its own.
+std::string MakeAddress(Json::Value state) {
+    state["nonce"] = "digest";
+    return "https://provider.example/auth?scope=openid&state=" + TAVO::SSO::URLEncode(Encode(WriteCompact(state)));
+}
+
 class PendingLogin : public testing::Test {
   protected:
     PendingLogin() {
         std::filesystem::create_directory("/usr/tavo/var");
-        state = StartLogin(answer, "/files");
+        const std::string address = StartLogin(answer, "/files", MakeAddress);
+        state = OnlyValue(ParseQuery(address.substr(address.find('?') + 1)), "state").value();
     }
     ~PendingLogin() override { std::filesystem::remove_all("/usr/tavo/var"); }
 
-    std::string Name() { return state["csrf"].asString(); }
+    std::string Name() { return DecodeState(state)["csrf"].asString(); }
     std::string Cookie() { return "__Host-login-" + Name().substr(0, 8) + "=" + Name(); }
-    std::string State() { return Encode(WriteCompact(state)); }
 
     std::string Refusal(const std::string &cookies, const std::string &returned) {
         try {
@@ -41,31 +49,44 @@ class PendingLogin : public testing::Test {
     }
 
     Answer answer;
-    Json::Value state;
+    std::string state;
 };
 
 TEST_F(PendingLogin, IsConcludedOnceByTheBrowserThatStartedIt) {
-    EXPECT_EQ(Refusal(Cookie(), State()), "");
-    EXPECT_EQ(Refusal(Cookie(), State()), "This sign-in took too long, or was already completed.");
+    EXPECT_EQ(Refusal(Cookie(), state), "");
+    EXPECT_EQ(Refusal(Cookie(), state), "This sign-in took too long, or was already completed.");
+}
+
+TEST_F(PendingLogin, GivesWhatTheStateHolds) {
+    const Json::Value object = ConcludeLogin(answer, Cookie(), state);
+    EXPECT_EQ(object["origin"].asString(), "/files");
+    EXPECT_EQ(object["nonce"].asString(), "digest");
 }
 
 TEST_F(PendingLogin, IsRefusedToAnotherBrowserAndStaysPending) {
     const std::string reason = "This sign-in was not started in this browser.";
-    EXPECT_EQ(Refusal("", State()), reason);
-    EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 8) + "=" + std::string(32, '0'), State()), reason);
-    EXPECT_EQ(Refusal(Cookie() + "; " + Cookie(), State()), reason);
-    EXPECT_EQ(Refusal(Cookie(), State()), "");
+    EXPECT_EQ(Refusal("", state), reason);
+    EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 8) + "=" + std::string(32, '0'), state), reason);
+    EXPECT_EQ(Refusal(Cookie() + "; " + Cookie(), state), reason);
+    EXPECT_EQ(Refusal(Cookie(), state), "");
 }
 
 TEST_F(PendingLogin, IsRefusedWhenItTookTooLong) {
     const utimbuf past{std::time(nullptr) - 601, std::time(nullptr) - 601};
     ASSERT_EQ(utime(("/usr/tavo/var/frontend/logins/" + Name()).c_str(), &past), 0);
-    EXPECT_EQ(Refusal(Cookie(), State()), "This sign-in took too long, or was already completed.");
+    EXPECT_EQ(Refusal(Cookie(), state), "This sign-in took too long, or was already completed.");
 }
 
 TEST_F(PendingLogin, IsRefusedWithAnotherOriginThanItWasStartedWith) {
-    state["origin"] = "/elsewhere";
-    EXPECT_EQ(Refusal(Cookie(), State()), "This sign-in was changed on its way.");
+    Json::Value changed = DecodeState(state);
+    changed["origin"] = "/elsewhere";
+    EXPECT_EQ(Refusal(Cookie(), Encode(WriteCompact(changed))), "This sign-in was changed on its way.");
+}
+
+TEST_F(PendingLogin, IsRefusedWithTheNonceOfAnotherLogin) {
+    Json::Value changed = DecodeState(state);
+    changed["nonce"] = "another digest";
+    EXPECT_EQ(Refusal(Cookie(), Encode(WriteCompact(changed))), "This sign-in was changed on its way.");
 }
 
 TEST_F(PendingLogin, IsRefusedWithoutAStateThatCanBeRead) {

@@ -19,6 +19,12 @@ class PrivateFolderTest : public testing::Test {
     PrivateFolderTest() { std::filesystem::create_directory("/usr/tavo/var"); }
     ~PrivateFolderTest() override { std::filesystem::remove_all("/usr/tavo/var"); }
 
+    static std::string Keep(PrivateFolder &folder, const std::string &text) {
+        std::string name = PrivateFolder::NewName();
+        folder.Keep(name, text);
+        return name;
+    }
+
     static void MakeOld(const std::string &name) {
         const utimbuf past{std::time(nullptr) - kLifetime - 1, std::time(nullptr) - kLifetime - 1};
         ASSERT_EQ(utime((kFolder + name).c_str(), &past), 0);
@@ -33,27 +39,28 @@ class PrivateFolderTest : public testing::Test {
 
 TEST_F(PrivateFolderTest, KeepsATextUnderARandomNameForThisUserAlone) {
     PrivateFolder things("things", kLifetime);
-    const std::string name = things.Keep("text");
+    const std::string name = Keep(things, "text");
     EXPECT_THAT(name, testing::MatchesRegex("[0-9a-f]{32}"));
-    EXPECT_NE(things.Keep("text"), name);
+    EXPECT_NE(Keep(things, "text"), name);
     EXPECT_EQ(things.Read(name), "text");
+    EXPECT_THROW(things.Keep(name, "another text"), std::system_error);
     EXPECT_EQ(Mode(kFolder + name), 0600U);
     EXPECT_EQ(Mode(kFolder), 0700U);
 }
 
 TEST_F(PrivateFolderTest, GivesATextToOneTakerOnly) {
     PrivateFolder things("things", kLifetime);
-    const std::string name = things.Keep("text");
+    const std::string name = Keep(things, "text");
     EXPECT_EQ(things.Take(name), "text");
     EXPECT_EQ(things.Take(name), std::nullopt);
 }
 
 TEST_F(PrivateFolderTest, ForgetsATextThatIsTooOld) {
     PrivateFolder things("things", kLifetime);
-    const std::string name = things.Keep("text");
+    const std::string name = Keep(things, "text");
     MakeOld(name);
     EXPECT_EQ(things.Read(name), std::nullopt);
-    things.Keep("another");
+    Keep(things, "another");
     EXPECT_FALSE(std::filesystem::exists(kFolder + name));
 }
 

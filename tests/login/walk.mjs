@@ -134,13 +134,22 @@ export class Walk {
     async #runRelayScript(browser, page) {
         assert.equal(page.url.origin + page.url.pathname, this.origin + RELAY_PAGE);
         const source = /<script type="module" src="([^"]+)"><\/script>/.exec(page.text)[1];
-        const script = await browser.open(new URL(source, page.url));
-        assert.match(script.headers['content-type'], /^text\/javascript/);
-        const {describe} = await import(`data:text/javascript,${encodeURIComponent(script.text)}`);
+        const {describe} = await import(await this.#fetchModule(browser, new URL(source, page.url)));
         const view = describe(page.url.hash);
         const told = [view.headline, view.reason].filter(Boolean).join(': ');
         this.report.fact(`the relay page says "${told}" and leads to ${view.onward}`);
         return view;
+    }
+
+    // As an address that holds it, with what it imports.
+    async #fetchModule(browser, url) {
+        const script = await browser.open(url);
+        assert.match(script.headers['content-type'], /^text\/javascript/);
+        let {text} = script;
+        for (const [whole, specifier] of script.text.matchAll(/(?<=^import .* from ')([^']+)(?=';$)/gm)) {
+            text = text.replace(whole, await this.#fetchModule(browser, new URL(specifier, url)));
+        }
+        return `data:text/javascript;base64,${Buffer.from(text).toString('base64')}`;
     }
 
     #checkApplianceAnswer({status, headers}) {

@@ -1,0 +1,31 @@
+// A page for users who are signed in, and an example of one: whoever is not signs in first and comes back to it.
+#include <sso/sso.h>
+
+#include "frontend/cgi.h"
+#include "frontend/failure.h"
+#include "frontend/session.h"
+#include "frontend/text.h"
+
+namespace {
+
+void GoAndSignIn(Frontend::Answer &answer) {
+    const std::string origin = Frontend::SafeOrigin(Frontend::Variable("REQUEST_URI"));
+    answer.Redirect("/index.cgi?origin=" + TAVO::SSO::URLEncode(origin));
+}
+
+void ShowAccount(Frontend::Answer &answer) {
+    const auto session = Frontend::FindSession(Frontend::Variable("HTTP_COOKIE"));
+    if (!session) {
+        GoAndSignIn(answer);
+        return;
+    }
+    answer.Page("200 OK", "Your account",
+                "<h1>Your account</h1>\n<dl>\n<dt>Name on this device</dt>\n<dd>" +
+                    Frontend::EscapeHtml(session->user) + "</dd>\n<dt>Signed in through</dt>\n<dd>" +
+                    Frontend::EscapeHtml(session->profile) +
+                    "</dd>\n</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
+}
+
+}  // namespace
+
+int main() { return Frontend::Serve(ShowAccount); }

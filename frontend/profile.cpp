@@ -1,0 +1,40 @@
+#include "frontend/profile.h"
+
+namespace Frontend {
+
+namespace {
+
+bool IsSupported(const std::string &profile) { return profile == "azure" || profile == "websphere"; }
+
+// Without any of these a login is certain to fail, some only after the user has typed a password.
+bool HasAllSettings(const std::string &profile, TAVO::SSO::SSOClient &client) {
+    return !client.GetClientID().empty() && !client.GetClientSecret().empty() && !client.GetRedirectURI().empty() &&
+           !client.GetAuthEndpoint().empty() && !client.GetTokenEndpoint().empty() &&
+           (profile != "azure" || !client.GetWellknownEndpoint().empty());
+}
+
+}  // namespace
+
+SetUp HowFarSetUp() {
+    TAVO::SSO::SSOProfile profile;
+    if (!profile.SSOIsEnable()) {
+        return SetUp::kOff;
+    }
+    const std::string name = profile.GetSSOProfile();
+    const bool isComplete = IsSupported(name) && HasAllSettings(name, *profile.GetSSOClient());
+    return isComplete ? SetUp::kComplete : SetUp::kIncomplete;
+}
+
+std::string ProfileInForce() {
+    TAVO::SSO::SSOProfile profile;
+    if (!profile.SSOIsEnable()) {
+        throw TAVO::SSO::sso_op_failed("sso does not enable.");
+    }
+    std::string name = profile.GetSSOProfile();
+    if (!IsSupported(name)) {
+        throw TAVO::SSO::sso_exception("profile not support.");
+    }
+    return name;
+}
+
+}  // namespace Frontend

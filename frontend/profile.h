@@ -1,0 +1,32 @@
+#ifndef TAVOSSO_FRONTEND_PROFILE_H
+#define TAVOSSO_FRONTEND_PROFILE_H
+
+#include <sso/sso.h>
+
+#include <string>
+
+// The profile in force, as the library's own `OIDCLogin` chooses it, for logins that need the client itself.
+namespace Frontend {
+
+enum class SetUp { kOff, kIncomplete, kComplete };
+
+/// Whether users can sign in, for pages that offer it.
+SetUp HowFarSetUp();
+
+/// The profile's name. Refuses where `OIDCLogin` does, with the same exceptions: a profile that is off or unknown.
+std::string ProfileInForce();
+
+/// Runs `use` on a fresh client of the profile.
+template <typename Use>
+auto WithClient(const std::string &profile, Use use) {
+    if (profile == "azure") {
+        TAVO::SSO::AzureSSOClient client;
+        return use(client);
+    }
+    TAVO::SSO::WebSphereSSOClient client;
+    return use(client);
+}
+
+}  // namespace Frontend
+
+#endif

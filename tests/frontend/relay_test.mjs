@@ -1,0 +1,64 @@
+// What the relay page makes of its address.
+import assert from 'node:assert/strict';
+import {readFileSync} from 'node:fs';
+import {test} from 'node:test';
+
+import {describe} from '../../frontend/static/relay.js';
+
+const START_PAGE = '/index.cgi';
+const SITE = 'https://appliance.example';
+const {foreign, own} = JSON.parse(readFileSync(new URL('origins.json', import.meta.url)));
+
+const after = (values) => describe(`#${new URLSearchParams(values)}`);
+
+test('leads to the start page where a browser could leave this site', () => {
+    assert.ok(foreign.length >= 200);
+    for (const origin of foreign) {
+        assert.equal(after({origin, success: 'true'}).onward, START_PAGE, JSON.stringify(origin));
+    }
+});
+
+test('stays on this site with an origin that is written into the fragment as it stands', () => {
+    for (const origin of foreign) {
+        const {onward} = describe(`#origin=${origin}&success=true`);
+        assert.equal(new URL(onward, SITE).origin, SITE, JSON.stringify(origin));
+    }
+});
+
+test('leads back to a path on this site', () => {
+    assert.ok(own.length >= 10);
+    for (const origin of own) {
+        const {onward} = after({origin, success: 'true'});
+        assert.equal(onward, origin);
+        assert.equal(new URL(onward, SITE).origin, SITE);
+    }
+});
+
+test('never leads to an origin after a failure', () => {
+    for (const origin of [...foreign, ...own]) {
+        assert.match(after({origin, success: 'false'}).onward, /^\/webman\/sso\/login\.cgi\?origin=%2Findex\.cgi$/);
+    }
+});
+
+test('explains the reasons that it knows and cuts those that are too long', () => {
+    const {explanation, reason} = after({success: 'false', reason: 'TAVOWinsUserNameFqdn2Netbios failed.'});
+    assert.match(explanation, /^Your account's domain is not known to this device\./);
+    assert.equal(reason, 'TAVOWinsUserNameFqdn2Netbios failed.');
+    assert.match(after({success: 'false', reason: 'id_token expired.'}).explanation, /^Your sign-in took too long\./);
+    const unknown = after({success: 'false', reason: 'x'.repeat(100_000)});
+    assert.equal(unknown.reason.length, 200);
+    assert.match(unknown.explanation, /^Something went wrong/);
+    assert.equal(after({success: 'false'}).reason, '');
+});
+
+test('finds no explanation in what every object has', () => {
+    for (const reason of ['constructor', '__proto__', 'toString']) {
+        assert.match(after({success: 'false', reason}).explanation, /^Something went wrong/);
+    }
+});
+
+test('weighs less than 20 KB in all', () => {
+    const size = (file) => readFileSync(new URL(`../../frontend/static/${file}`, import.meta.url)).length;
+    const sizes = ['relay.html', 'relay.js', 'reasons.js', 'style.css', 'mark.svg'].map(size);
+    assert.ok(sizes.reduce((sum, each) => sum + each, 0) < 20_000);
+});
