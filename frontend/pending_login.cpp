@@ -38,7 +38,7 @@ std::string StartLogin(Answer &answer, const std::string &origin,
 }
 
 Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state) {
-    const Json::Value returned = DecodeState(state);
+    Json::Value returned = DecodeState(state);
     const std::string login = StringMember(returned, "csrf");
     if (login.empty() || FindCookie(cookies, CookieName(login)) != login) {
         throw Refusal("This sign-in was not started in this browser.");

@@ -1,70 +1,31 @@
 // Signs users in at a real OpenID provider through the front end, or serves both until it is ended. Runs as root of
 // private namespaces; see `run`.
 import assert from 'node:assert/strict';
-import {randomBytes, randomUUID} from 'node:crypto';
-import {copyFileSync, mkdtempSync, readFileSync, rmSync} from 'node:fs';
-import path from 'node:path';
+import {copyFileSync, readFileSync, rmSync} from 'node:fs';
 
-import {configure, listen, startWebServer, useProfile} from './appliance.mjs';
-import {makeAuthority} from './authority.mjs';
-import {startProvider} from './provider.mjs';
+import {useProfile} from '../site/appliance.mjs';
+import {makeUsers, startSite} from '../site/site.mjs';
 import {Report} from './report.mjs';
-import {collectSystemLog} from './system_log.mjs';
 import {Walk} from './walk.mjs';
 
-const SYSTEM_BUNDLE = '/etc/ssl/certs/ca-certificates.crt';
-const DOMAINS = {'corp.example.net': 'ACME'};
+const USERS = {alice: 'alice@corp.example.net', bob: 'bob@corp.example.net', carol: 'carol@elsewhere.example.org'};
 
-const randomSecret = () => randomBytes(24).toString('base64url');
-const randomPassword = () => randomBytes(9).toString('base64url');
-
-function makeUsers() {
-    const named = {alice: 'alice@corp.example.net', bob: 'bob@corp.example.net', carol: 'carol@elsewhere.example.org'};
-    const entries = Object.entries(named).map(([login, uniqueName]) => [login, {uniqueName, password: randomPassword()}]);
-    return new Map(entries);
-}
-
-function makeClients(origin, tenant) {
-    const common = {redirectURI: `${origin}/webman/sso/return.cgi`, logoutURI: `${origin}/webman/ssoclient/relay.html`};
-    return [
-        {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant, ...common},
-        {id: 'appliance-websphere', secret: randomSecret(), algorithm: 'HS256', ...common},
-    ];
-}
-
-async function startEverything({webroot, nodeModules, folder}) {
-    const running = {asked: [], users: makeUsers(), steps: []};
-    const authority = makeAuthority(folder);
-    running.authority = authority.file;
-    copyFileSync(authority.file, SYSTEM_BUNDLE);
-
-    const socket = await listen();
-    running.origin = `https://localhost:${socket.address().port}`;
-    const tenant = randomUUID();
-    const clients = makeClients(running.origin, tenant);
-    running.provider = await startProvider({
+async function startEverything(webroot, nodeModules) {
+    const asked = [];
+    const report = new Report();
+    const site = await startSite({
+        webroot,
         nodeModules,
-        tenant,
-        clients,
-        users: running.users,
-        certificate: authority.issue('provider', 'IP:127.0.0.1'),
-        report(request) {
-            running.asked.push(request);
-            running.report.applianceAsked(request);
+        users: makeUsers(USERS),
+        onRequest(request) {
+            asked.push(request);
+            report.applianceAsked(request);
         },
+        onLog: (line) => report.logged(line),
     });
-    running.report = new Report(new Map([[running.origin, 'appliance'], [running.provider.address, 'provider']]));
-    running.log = await collectSystemLog((line) => running.report.logged(line));
-    configure({provider: running.provider, clients, domains: DOMAINS});
-    const certificate = authority.issue('appliance', 'DNS:localhost');
-    running.webServer = startWebServer({socket, webroot, certificate, folder});
-    return running;
-}
-
-async function stopEverything({webServer, provider, log}) {
-    await webServer.stop();
-    provider.stop();
-    log.stop();
+    report.nameSite(site.origin, 'appliance');
+    report.nameSite(site.provider.address, 'provider');
+    return {...site, asked, report};
 }
 
 async function walkAzure(walk, report) {
@@ -154,8 +115,7 @@ async function serve(running, profile, authorityFile) {
 }
 
 const [webroot, nodeModules, profile, authorityFile] = process.argv.slice(2);
-const folder = mkdtempSync('/tmp/login-');
-const running = await startEverything({webroot, nodeModules, folder});
+const running = await startEverything(webroot, nodeModules);
 try {
     if (profile) {
         await serve(running, profile, authorityFile);
@@ -166,5 +126,5 @@ try {
     console.error(`\nFAILED: ${failure.message}\n\nThe web server's own log:\n${running.webServer.log()}`);
     process.exitCode = 1;
 } finally {
-    await stopEverything(running);
+    await running.stop();
 }

@@ -5,11 +5,10 @@ const withNames = (text, list) => [text, names(list)].filter(Boolean).join(' ');
 const column = (text, width) => text.padEnd(width);
 
 export class Report {
-    #sites;
+    #sites = new Map();
 
-    /** `sites` tells the names of origins. */
-    constructor(sites) {
-        this.#sites = sites;
+    nameSite(origin, name) {
+        this.#sites.set(origin, name);
     }
 
     title(text) {

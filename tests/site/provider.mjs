@@ -7,6 +7,7 @@ import {pathToFileURL} from 'node:url';
 
 const SIGN_IN = '/sign-in/';
 const SIGN_OUT = '/sign-out';
+const SCOPE = 'openid profile email';
 
 function signingKeys() {
     const {privateKey} = generateKeyPairSync('rsa', {modulusLength: 2048});
@@ -26,7 +27,7 @@ function registration({id, secret, algorithm, redirectURI, logoutURI}) {
     };
 }
 
-function configuration({MemoryAdapter, clients, users, tenant}) {
+function configuration({MemoryAdapter, clients, users, tenant, lifetimes}) {
     return {
         // Nothing outlives the run; under a name of our own the provider does not warn of that.
         adapter: class extends MemoryAdapter {},
@@ -41,25 +42,52 @@ function configuration({MemoryAdapter, clients, users, tenant}) {
         },
         interactions: {url: (context, interaction) => SIGN_IN + interaction.uid},
         jwks: signingKeys(),
-        ttl: {AccessToken: 600, Grant: 600, IdToken: 600, Interaction: 600, Session: 3600},
+        ttl: {
+            AccessToken: 600,
+            AuthorizationCode: () => lifetimes.code,
+            Grant: 600,
+            IdToken: () => lifetimes.idToken,
+            Interaction: 600,
+            Session: 3600,
+        },
         findAccount: (context, login) => ({
             accountId: login,
             claims: () => ({sub: login, tid: tenant, unique_name: users.get(login).uniqueName}),
         }),
-        loadExistingGrant: grantEverything,
+        loadExistingGrant: (context) => findGrant(context.oidc, users),
     };
 }
 
-// The appliance belongs to the organisation: its users are not asked whether they trust it.
-async function grantEverything({oidc}) {
-    const grant = new oidc.provider.Grant({accountId: oidc.session.accountId, clientId: oidc.client.clientId});
-    grant.addOIDCScope('openid profile email');
+// The appliance belongs to the organisation: its users are not asked whether they trust it, unless marked so.
+async function findGrant({provider, client, session, result}, users) {
+    if (users.get(session.accountId).decidesAlone) {
+        const agreed = result?.consent?.grantId ?? session.grantIdFor(client.clientId);
+        return agreed && provider.Grant.find(agreed);
+    }
+    return makeGrant(provider, session.accountId, client.clientId);
+}
+
+async function makeGrant(provider, accountId, clientId) {
+    const grant = new provider.Grant({accountId, clientId});
+    grant.addOIDCScope(SCOPE);
     await grant.save();
     return grant;
 }
 
-const page = (content) =>
-    `<!DOCTYPE html><html lang="en"><title>Example organisation</title><main>${content}</main></html>`;
+const STYLE = `
+:root { color-scheme: light dark; font: 1rem/1.6 system-ui, sans-serif; background: light-dark(#eef0f7, #14161f); }
+body { margin: 0 auto; max-width: 24rem; padding: clamp(1rem, 12vh, 7rem) 1rem 2rem; }
+main { background: light-dark(#fff, #1e2130); border-top: 4px solid #4f5bd5; padding: 1.5rem; }
+h1 { font-size: 1.4rem; line-height: 1.3; margin: 0 0 1rem; }
+label { display: block; font-weight: 600; }
+input { box-sizing: border-box; font: inherit; padding: 0.5rem; width: 100%; }
+button { background: #3d49c4; border: 0; color: #fff; cursor: pointer; font: inherit; padding: 0.5rem 1.25rem; }
+button[value=cancel] { background: none; color: light-dark(#3d49c4, #b6bdff); }
+`;
+
+const page = (content) => `<!DOCTYPE html><html lang="en"><head><meta charset="utf-8">
+<meta name="viewport" content="width=device-width, initial-scale=1"><title>Example organisation</title>
+<link rel="icon" href="data:,"><style>${STYLE}</style></head><body><main>${content}</main></body></html>`;
 
 function showSignOutForm(context, form) {
     context.body = page(`<h1>Sign out of Example organisation?</h1>${form}
@@ -71,12 +99,19 @@ function sendPage(response, status, content) {
     response.end(page(content));
 }
 
-function sendSignInForm(response, status, uid, hint) {
-    sendPage(response, status, `<h1>Sign in to Example organisation</h1><p>${hint}</p>
+function sendSignInForm(response, uid, hint) {
+    sendPage(response, 200, `<h1>Sign in to Example organisation</h1>${hint && `<p role="alert">${hint}</p>`}
 <form method="post" action="${SIGN_IN}${uid}">
 <p><label>Name <input name="login" autocomplete="username" autofocus></label></p>
 <p><label>Password <input name="password" type="password" autocomplete="current-password"></label></p>
 <p><button name="action" value="sign-in">Sign in</button> <button name="action" value="cancel">Cancel</button></p>
+</form>`);
+}
+
+function sendConsentForm(response, uid) {
+    sendPage(response, 200, `<h1>May the appliance know who you are?</h1>
+<form method="post" action="${SIGN_IN}${uid}">
+<p><button name="action" value="allow">Allow</button> <button name="action" value="cancel">Cancel</button></p>
 </form>`);
 }
 
@@ -88,21 +123,38 @@ async function readForm(request) {
     return new URLSearchParams(body);
 }
 
-async function signIn(provider, users, request, response) {
-    const {uid} = await provider.interactionDetails(request, response);
-    if (request.method !== 'POST') {
-        sendSignInForm(response, 200, uid, '');
+async function interact(provider, users, request, response) {
+    const {uid, prompt, params, session} = await provider.interactionDetails(request, response);
+    const finish = (result) =>
+        provider.interactionFinished(request, response, result, {mergeWithLastSubmission: !result.error});
+    const isAsked = request.method !== 'POST';
+    const form = isAsked ? new URLSearchParams() : await readForm(request);
+    if (form.get('action') === 'cancel') {
+        await finish({error: 'access_denied', error_description: 'The user cancelled.'});
+    } else if (prompt.name === 'consent') {
+        await askForConsent({provider, uid, params, session, isAsked, response, finish});
+    } else {
+        await askForPassword({users, uid, form, isAsked, response, finish});
+    }
+}
+
+async function askForConsent({provider, uid, params, session, isAsked, response, finish}) {
+    if (isAsked) {
+        sendConsentForm(response, uid);
         return;
     }
-    const form = await readForm(request);
-    const user = users.get(form.get('login'));
-    if (form.get('action') === 'cancel') {
-        const error = {error: 'access_denied', error_description: 'The user cancelled.'};
-        await provider.interactionFinished(request, response, error);
-    } else if (user?.password === form.get('password')) {
-        await provider.interactionFinished(request, response, {login: {accountId: form.get('login')}});
+    const grant = await makeGrant(provider, session.accountId, params.client_id);
+    await finish({consent: {grantId: grant.jti}});
+}
+
+async function askForPassword({users, uid, form, isAsked, response, finish}) {
+    const login = form.get('login');
+    if (isAsked) {
+        sendSignInForm(response, uid, '');
+    } else if (users.get(login)?.password === form.get('password')) {
+        await finish({login: {accountId: login}});
     } else {
-        sendSignInForm(response, 401, uid, 'Name and password do not match.');
+        sendSignInForm(response, uid, 'Name and password do not match.');
     }
 }
 
@@ -132,8 +184,9 @@ function reporting(report) {
 /**
  * Starts the provider on a port of the kernel's choice.
  *
- * `users` is a map from login to {password, uniqueName}; `describeClients` gets the provider's address and gives the
- * clients to register; `report` is called for each request of an appliance.
+ * `users` is a map from login to {password, uniqueName} and, for one who is asked for consent, `decidesAlone`; `report`
+ * is called for each request of an appliance. What it gives holds the lifetimes of codes and ID tokens in seconds, to be
+ * changed at will: with a negative one they have expired when they are issued.
  */
 export async function startProvider({nodeModules, certificate, users, tenant, clients, report}) {
     const load = (file) => import(pathToFileURL(path.join(nodeModules, 'oidc-provider/lib', file)));
@@ -144,12 +197,13 @@ export async function startProvider({nodeModules, certificate, users, tenant, cl
     await once(server, 'listening');
     const address = `https://127.0.0.1:${server.address().port}`;
 
-    const provider = new Provider(address, configuration({MemoryAdapter, clients, users, tenant}));
+    const lifetimes = {code: 60, idToken: 600};
+    const provider = new Provider(address, configuration({MemoryAdapter, clients, users, tenant, lifetimes}));
     provider.use(reporting(report));
     const answer = provider.callback();
     server.on('request', (request, response) => {
         if (request.url.startsWith(SIGN_IN)) {
-            signIn(provider, users, request, response).catch(() => {
+            interact(provider, users, request, response).catch(() => {
                 sendPage(response, 400, '<h1>This sign-in has ended</h1>');
             });
         } else if (request.url.startsWith(SIGN_OUT)) {
@@ -160,6 +214,7 @@ export async function startProvider({nodeModules, certificate, users, tenant, cl
     });
     return {
         address,
+        lifetimes,
         endpoints: {
             discovery: `${address}/.well-known/openid-configuration`,
             authorization: `${address}/auth`,

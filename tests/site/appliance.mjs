@@ -12,12 +12,16 @@ function writePrivately(file, settings) {
     writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode: 0o600});
 }
 
-/** The folders and files that an installed appliance has. */
-export function configure({provider, clients, domains}) {
-    const [azure, websphere] = clients;
+/** The platform's domains: DNS name to NetBIOS name. */
+export function writeDomains(domains) {
     mkdirSync(SETTINGS, {recursive: true, mode: 0o755});
     mkdirSync('/usr/tavo/var');
     writeFileSync('/usr/tavo/etc/domains.conf', JSON.stringify(domains));
+}
+
+/** The settings of both profiles' clients. */
+export function writeSettings({provider, clients}) {
+    const [azure, websphere] = clients;
     writePrivately(`${SETTINGS}/azure.conf`, {
         azure_sso_enable: true,
         azure_wellknown: provider.endpoints.discovery,
@@ -40,8 +44,8 @@ export function configure({provider, clients, domains}) {
     });
 }
 
-export function useProfile(name) {
-    writePrivately(`${SETTINGS}/profile.conf`, {sso_enable: true, sso_profile: name});
+export function useProfile(name, enable = true) {
+    writePrivately(`${SETTINGS}/profile.conf`, {sso_enable: enable, sso_profile: name});
 }
 
 /** A listening socket on a port of the kernel's choice, for `startWebServer`: its port is known before the server. */
