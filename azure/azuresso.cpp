@@ -2,6 +2,7 @@
 #include <openssl/evp.h>
 #include <syslog.h>
 
+#include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/classification.hpp>
 #include <boost/algorithm/string/split.hpp>
@@ -14,6 +15,7 @@
 #include "jwt/jwt.h"
 #include "platform/platform.h"
 #include "sso/authorization_request.h"
+#include "sso/fetch.h"
 #include "sso/id_token.h"
 #include "sso/names.h"
 #include "sso/sso.h"
@@ -132,12 +134,8 @@ void AzureSSOClient::VerifyIDToken() {
 }
 
 void AzureSSOClient::RequestKeysInfo(std::string uri, Json::Value &keys) {
-    std::string response;
     try {
-        httpGet(uri, response, true, AppendChunk);
-        if (!Utils::ParseJson(response, keys)) {
-            throw sso_err_resp("bad wellknown json format.");
-        }
+        FetchJson(uri, keys);
         if (Utils::FindMember(keys, "keys") == nullptr) {
             throw std::invalid_argument("no kyes information");
         }
@@ -148,7 +146,8 @@ void AzureSSOClient::RequestKeysInfo(std::string uri, Json::Value &keys) {
     } catch (const sso_err_resp &error) {
         syslog(LOG_ERR, "%s:%d request wellknown uri %s.", SOURCE_LINE, error.what());
     }
-    // Once more than httpGet initialised it: a host that counts on libcurl's global state knows this library for it.
+    // Once more than it was initialised, as the interface tells: a host that has initialised libcurl for itself must do
+    // so again, and those that exist do.
     curl_global_cleanup();
 }
 
@@ -156,12 +155,13 @@ void AzureSSOClient::GetUserInfo(Json::Value &info) { info = ReadClaims(token); 
 
 void AzureSSOClient::GetUserName(std::string &userName) {
     const std::string principalName = FindPrincipalName(ReadClaims(token));
-    std::vector<std::string> pieces;
-    boost::split(pieces, principalName, boost::is_any_of("@"));
-    userName = pieces.front();
-    if (pieces.size() != 2) {
+    userName = principalName.substr(0, principalName.find('@'));
+    // Counted before it is split: the pieces of a name of millions of at signs would take a gigabyte.
+    if (std::count(principalName.begin(), principalName.end(), '@') != 1) {
         throw std::invalid_argument("cannot get the user name!");
     }
+    std::vector<std::string> pieces;
+    boost::split(pieces, principalName, boost::is_any_of("@"));
     const std::string domain = boost::to_upper_copy(pieces.back());
     userName = domain + '\\' + userName;
 
@@ -169,7 +169,7 @@ void AzureSSOClient::GetUserName(std::string &userName) {
     if (TAVOWinsUserNameFqdn2Netbios(userName.c_str(), buffer, sizeof buffer - 1) < 0) {
         throw sso_op_failed("TAVOWinsUserNameFqdn2Netbios failed.");
     }
-    userName = buffer;
+    userName.assign(buffer, strnlen(buffer, sizeof buffer));
 }
 
 std::string GetAzureSSOLogoutURL(const std::string &base) {

@@ -2,7 +2,6 @@
 
 #include <openssl/bio.h>
 #include <openssl/bn.h>
-#include <openssl/err.h>
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
 #include <openssl/rsa.h>
@@ -19,6 +18,7 @@
 #include <vector>
 
 #include "utils/cleanse.h"
+#include "utils/error_queue.h"
 #include "utils/json.h"
 #include "utils/source_line.h"
 
@@ -42,14 +42,6 @@ using BigNumber = std::unique_ptr<BIGNUM, ReleaseWith<BN_free>>;
 using DigestContext = std::unique_ptr<EVP_MD_CTX, ReleaseWith<EVP_MD_CTX_free>>;
 using PublicKey = std::unique_ptr<EVP_PKEY, ReleaseWith<EVP_PKEY_free>>;
 
-/// The error queue of OpenSSL belongs to the program that loads this library: what our calls leave there goes again.
-struct KeepErrorQueue {
-    KeepErrorQueue() { ERR_set_mark(); }
-    ~KeepErrorQueue() { ERR_pop_to_mark(); }
-    KeepErrorQueue(const KeepErrorQueue &) = delete;
-    KeepErrorQueue &operator=(const KeepErrorQueue &) = delete;
-};
-
 /// Room for a text: on the stack while it is small, as tokens are, and elsewhere when a provider sends a large one.
 /// Cleansed on release, as the text may be a key.
 class ScratchText {
@@ -67,11 +59,8 @@ class ScratchText {
     Utils::CleanseOnExit cleanse_;
 };
 
-/// A base64 filter on top of a source or sink, which it takes over; null when either is missing.
+/// A base64 filter on top of a source or sink, which it takes over.
 BIOPointer PushBase64Filter(BIOPointer filter, BIOPointer end) {
-    if (!filter || !end) {
-        return nullptr;
-    }
     BIO_set_flags(filter.get(), BIO_FLAGS_BASE64_NO_NL);
     BIO_push(filter.get(), end.release());
     return filter;
@@ -81,7 +70,7 @@ BIOPointer PushBase64Filter(BIOPointer filter, BIOPointer end) {
 /// them and writes their number, which is 0 or less where the text is not base64. Null, and no number, when the part is
 /// empty or memory runs out.
 Bytes Base64UrlDecode(const char *part, int *length) {
-    const KeepErrorQueue keepErrorQueue;
+    const Utils::KeepErrorQueue keepErrorQueue;
     const std::size_t partLength = std::strlen(part);
     const std::size_t padding = (4 - partLength % 4) % 4;
     if (partLength + padding > INT_MAX) {
@@ -98,10 +87,10 @@ Bytes Base64UrlDecode(const char *part, int *length) {
     const int textLength = static_cast<int>(end - scratch.get());
     BIOPointer filter(BIO_new(BIO_f_base64()));
     BIOPointer source(BIO_new_mem_buf(scratch.get(), textLength));
-    const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(source));
-    if (!chain) {
+    if (!filter || !source) {
         return nullptr;
     }
+    const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(source));
     const long pending = BIO_pending(chain.get());
     if (pending <= 0) {
         return nullptr;
@@ -193,7 +182,7 @@ PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
 
 bool VerifyRSA(const std::string &signingInput, const std::string &n, const std::string &e,
                const std::string &signature, const EVP_MD *md) {
-    const KeepErrorQueue keepErrorQueue;
+    const Utils::KeepErrorQueue keepErrorQueue;
     const DecodedPart modulus(n);
     const DecodedPart exponent(e);
     const DecodedPart signatureBytes(signature);
@@ -237,19 +226,22 @@ void MakeBase64Url(char *text) {
 
 bool VerifyHMAC(const std::string &signingInput, const std::string &key, const std::string &signature,
                 const EVP_MD *md) {
-    const KeepErrorQueue keepErrorQueue;
+    const Utils::KeepErrorQueue keepErrorQueue;
     const DecodedPart keyBytes(key);
     if (!keyBytes) {
         return false;
     }
     const Utils::CleanseOnExit cleanse(keyBytes.bytes.get(), static_cast<std::size_t>(keyBytes.length));
     BIOPointer filter(BIO_new(BIO_f_base64()));
-    BIOPointer sink(BIO_new(BIO_s_mem()));
-    BIO *encoded = sink.get();
-    const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(sink));
-    if (!chain) {
+    if (!filter) {
         return false;
     }
+    BIOPointer sink(BIO_new(BIO_s_mem()));
+    if (!sink) {
+        return false;
+    }
+    BIO *encoded = sink.get();
+    const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(sink));
 
     unsigned char mac[EVP_MAX_MD_SIZE] = {};
     unsigned int macLength = 0;

@@ -8,8 +8,9 @@
 #include <utility>
 
 #include "sso/base64.h"
+#include "sso/fetch.h"
 #include "sso/names.h"
-#include "sso/token_exchange.h"
+#include "utils/cleanse.h"
 #include "utils/json.h"
 #include "utils/source_line.h"
 
@@ -55,12 +56,8 @@ void SSOClient::SetRedirectURI(std::string uri) { redirectURI = std::move(uri); 
 void SSOClient::SetCode(std::string authorizationCode) { code = std::move(authorizationCode); }
 
 void SSOClient::RequestWellknownInfo(Json::Value &out) {
-    std::string response;
     try {
-        httpGet(wellknownEndpoint, response, true, AppendChunk);
-        if (!Utils::ParseJson(response, out)) {
-            throw sso_err_resp("bad wellknown json format.");
-        }
+        FetchJson(wellknownEndpoint, out);
     } catch (const std::bad_alloc &) {
         syslog(LOG_ERR, "%s:%d bad_alloc. %m", SOURCE_LINE);
     } catch (const std::invalid_argument &error) {
@@ -94,7 +91,8 @@ void SSOClient::ProcessTokenResponse(std::string /*response*/) {
 
 void SSOClient::OpenIDConnectLogin(std::string authorizationCode, std::string &userName) {
     SetCode(std::move(authorizationCode));
-    const std::string body = GetIDTokenReqParams();
+    std::string body = GetIDTokenReqParams();
+    const Utils::CleanseOnExit cleanse(body.data(), body.size());  // it holds the client secret
     std::string response;
     RequestTokenEndpoint(response, body);
     ProcessTokenResponse(response);

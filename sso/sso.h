@@ -108,7 +108,7 @@ class SSOClient {
      *
      * Does not throw for a failed transfer or a malformed answer. Each is one line at `LOG_ERR`:
      *  - "sso:LINE TEXT", where TEXT is libcurl's text or "bad wellknown json format.";
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made.
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out.
      *
      * Initialises and cleans up libcurl globally.
      */
@@ -124,7 +124,7 @@ class SSOClient {
      *
      * Does not throw for a failed transfer; the next step reports it. It is one line at `LOG_ERR`:
      *  - "sso:LINE request token uri TEXT." with libcurl's text;
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made.
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out.
      *
      * Initialises and cleans up libcurl globally.
      */
@@ -212,11 +212,12 @@ class AzureSSOClient : public SSOClient {
      * body format!"; "id_token expired." ("exp" lies before now, or is missing); "tenant ID invalid"; "client ID
      *         invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be fetched); "RSA
      *         public 'n' cannot be found!", "RSA public 'e' cannot be found!"
-     * @throws std::logic_error  when the header or the body of the token is empty
+     * @throws std::logic_error  when the header or the body of the token is empty, or memory runs out in decoding it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not RS256, RS384 or RS512
      * @throws TAVO::JWT::jwt_verify_failed  "verify rsa signature failed"
      *
-     * Log lines: those of `RequestWellknownInfo`, `RequestKeysInfo` and `TAVO::JWT::Jwt::JwtRSAVerify`.
+     * Log lines and side effects: those of `RequestWellknownInfo`, `RequestKeysInfo` and
+     * `TAVO::JWT::Jwt::JwtRSAVerify`.
      */
     void VerifyIDToken() override;
 
@@ -237,7 +238,7 @@ class AzureSSOClient : public SSOClient {
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
      *         (`VerifyIDToken`); "cannot find the user name!" (neither claim is a string); "cannot get the user name!"
      *         (not exactly one at sign)
-     * @throws std::logic_error  when the body of the token is empty
+     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
      * @throws sso_op_failed  "TAVOWinsUserNameFqdn2Netbios failed.": the platform does not know the domain
      */
     void GetUserName(std::string &userName) override;
@@ -260,7 +261,7 @@ class AzureSSOClient : public SSOClient {
      * @param info  receives the decoded body; untouched on failure
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  when the body of the token is empty
+     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
      */
     void GetUserInfo(Json::Value &info);
 
@@ -273,7 +274,7 @@ class AzureSSOClient : public SSOClient {
      * Does not throw for those failures, nor for a document without "keys". Each is one line at `LOG_ERR`:
      *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text or "bad wellknown json format.";
      *  - "azuresso:LINE no kyes information";
-     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made.
+     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made, or memory runs out.
      *
      * Calls `curl_global_cleanup` once more than it initialises: a host that uses libcurl itself initialises it again.
      */
@@ -289,6 +290,8 @@ class AzureSSOClient : public SSOClient {
      *
      * @throws sso_op_failed  "encode base64 failed.": the state does not fit
      * @throws Json::LogicError  when `state` is neither an object nor null
+     *
+     * Log lines: those of `MD5Digest`, whose failure leaves the state with an empty "nonce".
      */
     std::string GetAccessTokenReqURI(const Json::Value &state);
 
@@ -324,7 +327,7 @@ class WebSphereSSOClient : public SSOClient {
      *
      * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
      * body format!"; "id_token expired." ("exp" lies before now, or is missing); "client ID invalid"
-     * @throws std::logic_error  when the header or the body of the token is empty
+     * @throws std::logic_error  when the header or the body of the token is empty, or memory runs out in decoding it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
      * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes
      * @throws TAVO::JWT::jwt_verify_failed  "verify hmac signature failed", also under an empty client secret
@@ -341,7 +344,7 @@ class WebSphereSSOClient : public SSOClient {
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
      *         (`VerifyIDToken`); "cannot find the user name!": "sub" is missing or not a string
-     * @throws std::logic_error  when the body of the token is empty
+     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
      */
     void GetUserName(std::string &userName) override;
 
@@ -362,7 +365,7 @@ class WebSphereSSOClient : public SSOClient {
      * @param claims  receives the decoded body; untouched on failure
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  when the body of the token is empty
+     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
      */
     void GetUserInfo(Json::Value &claims);
 
@@ -414,6 +417,9 @@ class SSOProfile {
  * @throws sso_op_failed  "read profile file failed."; "sso does not enable."; "not specify sso profile"
  * @throws sso_exception  (itself) "profile not support."
  * @throws whatever the client's construction and `OpenIDConnectLogin` throw
+ *
+ * Log lines and side effects: those of the client's construction, which raises the process's ids for a moment, and of
+ * its login.
  */
 void OIDCLogin(const std::string &code, std::string &userName);
 

@@ -1,6 +1,5 @@
 #include "sso/token_exchange.h"
 
-#include <cstring>
 #include <stdexcept>
 
 #include "sso/names.h"
@@ -9,16 +8,6 @@
 #include "utils/json.h"
 
 namespace TAVO::SSO {
-
-std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept {
-    const std::size_t length = size * count;
-    try {
-        static_cast<std::string *>(response)->append(data, strnlen(data, length));
-    } catch (...) {
-        return 0;  // an exception through libcurl's frames would leak its connection and ruin the handle
-    }
-    return length;
-}
 
 std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
                              const std::string &redirectURI) {

@@ -7,10 +7,6 @@
 
 namespace TAVO::SSO {
 
-/// The libcurl write callback of every exchange with a provider: appends the chunk, up to its first NUL, to the
-/// std::string that `response` points to. A chunk that memory does not suffice for is refused, and the transfer fails.
-std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept;
-
 /// The form body that exchanges a code for a token (RFC 6749, sections 2.3.1 and 4.1.3).
 std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
                              const std::string &redirectURI);

@@ -4,6 +4,8 @@
 #include <cstring>
 #include <memory>
 
+#include "utils/cleanse.h"
+
 // Json::Reader and Json::FastWriter are marked deprecated, but what they accept and how they write is what the
 // provider's documents, the configuration files and the relay page have always been read and written with.
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
@@ -22,6 +24,7 @@ bool ReadFile(const char *path, std::string &content) {
         return false;
     }
     char chunk[4096];
+    const CleanseOnExit cleanse(chunk, sizeof chunk);  // the client secret passes through
     while (const std::size_t length = std::fread(chunk, 1, sizeof chunk, file.get())) {
         content.append(chunk, length);
     }
@@ -31,9 +34,11 @@ bool ReadFile(const char *path, std::string &content) {
 }  // namespace
 
 bool ParseJson(const std::string &text, Json::Value &document) {
+    Json::Value parsed;  // of which nothing gets out unless all of it is there
     try {
         Json::Reader reader;
-        if (reader.parse(text, document, true)) {
+        if (reader.parse(text, parsed, true)) {
+            document.swap(parsed);
             return true;
         }
     } catch (const Json::Exception &) {
@@ -45,7 +50,11 @@ bool ParseJson(const std::string &text, Json::Value &document) {
 
 bool LoadJsonFile(const char *path, Json::Value &document) {
     std::string content;
-    return ReadFile(path, content) && ParseJson(content, document);
+    if (!ReadFile(path, content)) {
+        return false;
+    }
+    const CleanseOnExit cleanse(content.data(), content.size());
+    return ParseJson(content, document);
 }
 
 std::string WriteCompactJson(const Json::Value &document) { return Json::FastWriter().write(document); }

@@ -7,11 +7,12 @@
 #include <optional>
 #include <string>
 
-// Everything that the library asks of its JSON library. No exception of that library leaves these functions: a text
-// that it refuses has failed to parse, and a value that is not an object has no members.
+// How the library reads and writes JSON. No exception of the JSON library leaves these functions: a text that it
+// refuses has failed to parse, and a value that is not an object has no members.
 namespace TAVO::Utils {
 
-/// Parses a whole text. On failure the document is null, never the half that had been read.
+/// Parses a text. On failure the document is null, and when memory runs out it is as it was: never the half that had
+/// been read.
 bool ParseJson(const std::string &text, Json::Value &document);
 
 /// Reads and parses a whole file. On failure the document is null or as it was.

@@ -9,6 +9,8 @@
 
 #include "platform/platform.h"
 #include "sso/sso.h"
+#include "utils/cleanse.h"
+#include "utils/error_queue.h"
 #include "utils/source_line.h"
 
 namespace TAVO::SSO {
@@ -28,6 +30,7 @@ struct CurlGlobalState {
 /// One request with a fresh handle: a POST of the form if there is one, else a GET.
 void Transfer(const std::string &url, const std::string *form, std::string &response, bool verifySSL,
               curl_write_callback writeCallback) {
+    const Utils::SaveErrorQueue saveErrorQueue;
     const CurlGlobalState global;
     const std::shared_ptr<CURL> handle(curl_easy_init(), curl_easy_cleanup);
     if (!handle) {
@@ -67,13 +70,18 @@ void httpPost(const std::string &url, const std::string &body, std::string &resp
 std::string URLEncode(const std::string &value) {
     const std::size_t usableSize = 3 * value.size();  // every byte may become "%XX"
     const std::shared_ptr<char> encoded = AllocateText(usableSize + 1);
-    if (!encoded || TavoCgiURLEncode(value.c_str(), encoded.get(), usableSize) != 0) {
+    if (!encoded) {
+        return value;
+    }
+    const Utils::CleanseOnExit cleanse(encoded.get(), usableSize);  // the value may be the client secret
+    if (TavoCgiURLEncode(value.c_str(), encoded.get(), usableSize) != 0) {
         return value;
     }
     return encoded.get();
 }
 
 std::string MD5Digest(std::string data) {
+    const Utils::KeepErrorQueue keepErrorQueue;
     unsigned char digest[MD5_DIGEST_LENGTH];
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"

@@ -15,6 +15,18 @@ class MemoryLimit {
     MemoryLimit &operator=(const MemoryLimit &) = delete;
 };
 
+/// While it lives, the n-th request for memory (1: the next) fails, of whatever size.
+class FailingAllocation {
+  public:
+    explicit FailingAllocation(int n);
+    ~FailingAllocation();
+    FailingAllocation(const FailingAllocation &) = delete;
+    FailingAllocation &operator=(const FailingAllocation &) = delete;
+
+    /// Whether there were n requests.
+    bool Happened();
+};
+
 }  // namespace Test
 
 #endif

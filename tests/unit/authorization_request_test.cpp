@@ -4,9 +4,11 @@
 #include <sstream>
 
 #include "tests/support/token.h"
+#include "tests/unit/calls.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
 #include "tests/unit/platform_calls.h"
+#include "tests/unit/process.h"
 
 namespace Test {
 
@@ -83,6 +85,19 @@ TYPED_TEST(AuthorizationRequest, TwoOfTheSameStateDifferInNonceAndState) {
     EXPECT_NE(Parameter(first, "state"), Parameter(second, "state"));
 }
 
+TYPED_TEST(AuthorizationRequest, EachNonceComesFromAGeneratorOfItsOwnSeededByTheSystem) {
+    this->URI();
+    const int before = EntropyReads();
+    this->URI();
+    EXPECT_GT(EntropyReads(), before);
+}
+
+TYPED_TEST(AuthorizationRequest, WithoutADigestTheStateCarriesAnEmptyNonce) {
+    FailCall("MD5");
+    EXPECT_EQ(Parse(StateText(this->URI()))["nonce"], "");
+    EXPECT_EQ(TakeSystemLog().size(), 1u);
+}
+
 TYPED_TEST(AuthorizationRequest, TheNonceIsAVersion4UUIDOf36Characters) {
     EXPECT_TRUE(std::regex_match(Parameter(this->URI(), "nonce"),
                                  std::regex("[0-9a-f]{8}-[0-9a-f]{4}-4[0-9a-f]{3}-[89ab][0-9a-f]{3}-[0-9a-f]{12}")));
@@ -143,7 +158,7 @@ TYPED_TEST(AuthorizationRequest, TheEncoderIsGivenAZeroedBufferOf1024BytesAndIts
         EXPECT_EQ(flag3, 1);
         EXPECT_EQ(std::string(dst, size), std::string(1024, '\0'));
         std::fill_n(dst, size, 'x');  // to the last byte, without a NUL
-        return 1;
+        return -1;                    // anything but 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(Parameter(this->URI(), "state"), std::string(1024, 'x'));

@@ -1,4 +1,7 @@
+#include <locale>
+
 #include "jwt/jwt.h"
+#include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
@@ -193,7 +196,8 @@ TEST_F(AzureVerification, ATokenThatExpiresThisSecondPassesAndOneSecondEarlierFa
 }
 
 TEST_F(AzureVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
-    for (const char *exp : {"null", "\"\"", "\"soon\"", "[1700000000]", "{}", "true", "-1", "\"-1700000000\"", "0.5"}) {
+    for (const char *exp :
+         {"null", "\"\"", "\"soon\"", "[1700000000]", "{}", "true", "-1", "\"0x7fffffff\"", "\"-1700000000\"", "0.5"}) {
         claims["exp"] = Parse(std::string("[") + exp + "]")[0];
         EXPECT_EQ(Verify(), kExpired) << exp;
     }
@@ -203,8 +207,8 @@ TEST_F(AzureVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
 }
 
 TEST_F(AzureVerification, AnExpiryIsReadAsFarAsItsLeadingDigitsGo) {
-    for (const char *exp : {"1700000000", "\"1700000000\"", "\" 1700000000\"", "\"1700000000.9\"", "1700000000.5",
-                            "\"1700000000 seconds\"", "\"99999999999999999999\""}) {
+    for (const char *exp : {"1700000000", "\"01700000000\"", "\"1700000000\"", "\" 1700000000\"", "\"1700000000.9\"",
+                            "1700000000.5", "\"1700000000 seconds\"", "\"99999999999999999999\""}) {
         claims["exp"] = Parse(std::string("[") + exp + "]")[0];
         EXPECT_EQ(Verify(), kVerified) << exp;
     }
@@ -305,7 +309,9 @@ TEST_F(AzureVerification, AKeySetWithoutKeysIsOneLineAndAnUnknownKid) {
 
 TEST_F(AzureVerification, KeysThatAreNoListHoldNoKey) {
     const Json::Value key = keySet["keys"][0];
-    for (const Json::Value &keys : {Json::Value(), Json::Value(Json::arrayValue), key, Json::Value("key 1")}) {
+    Json::Value named;
+    named["a"] = key;
+    for (const Json::Value &keys : {Json::Value(), Json::Value(Json::arrayValue), key, named, Json::Value("key 1")}) {
         keySet["keys"] = keys;
         EXPECT_EQ(Verify(), kUnknownKid);
     }
@@ -333,6 +339,8 @@ TEST_F(AzureVerification, TheKidIsComparedExactlyAndOneWithoutTextIsNoKeys) {
 TEST_F(AzureVerification, ATokenWithoutKidMatchesAKeyWithTheEmptyKid) {
     header.removeMember("kid");
     EXPECT_EQ(Verify(), kUnknownKid);
+    keySet["keys"].append(Json::objectValue);
+    EXPECT_EQ(Verify(), kUnknownKid) << "a key without kid is skipped, not one with an empty kid";
     keySet["keys"][0]["kid"] = "";
     EXPECT_EQ(Verify(), kVerified);
 }
@@ -416,6 +424,21 @@ TEST_F(AzureVerification, OtherClaimsAreNotLookedAt) {
     claims["iat"] = static_cast<Json::Int64>(kNow + 1000);
     claims["nonce"] = "another";
     EXPECT_EQ(Verify(), kVerified);
+}
+
+/// A client whose discovery document comes from elsewhere.
+struct OwnDiscovery : AzureClient {
+    void RequestWellknownInfo(Json::Value &out) override { out["jwks_uri"] = "https://elsewhere.example/keys"; }
+};
+
+TEST_F(AzureVerification, ADerivedClassMayBringItsOwnDiscoveryDocument) {
+    OwnDiscovery derived;
+    derived.clientID = "the id";
+    derived.tenantID = "the tenant";
+    derived.token = ProviderKey().RS256Token(claims, "key 1");
+    EXPECT_EQ(FailureOf([&] { derived.VerifyIDToken(); }), kUnknownKid);
+    EXPECT_THAT(CurrentTransport().urls, ElementsAre("https://elsewhere.example/keys"));
+    TakeSystemLog();
 }
 
 TEST_F(AzureVerification, TheClientIsNotChanged) {
@@ -528,6 +551,14 @@ TEST_F(AzureIdentity, WithoutExactlyOneAtSignTheNameCannotBeGotAndTheUserPieceIs
     EXPECT_EQ(NameOf(R"({"unique_name": "alice@@corp.example.net"})"), notGot);
 }
 
+TEST_F(AzureIdentity, ANameOfAMillionAtSignsIsRefusedWithoutTakingItApart) {
+    client.token = "e30." + Base64Url(R"({"email": "alice)" + std::string(1000000, '@') + "\"}") + ".";
+    const MemoryLimit limit(4000000);
+    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }),
+              Fails<std::invalid_argument>("cannot get the user name!"));
+    EXPECT_EQ(userName, "alice");
+}
+
 TEST_F(AzureIdentity, AnUnknownDomainFailsAndTheBackslashFormIsWritten) {
     EXPECT_EQ(NameOf(R"({"unique_name": "Alice@elsewhere.example"})"),
               Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
@@ -550,6 +581,19 @@ TEST_F(AzureIdentity, TheUserKeepsItsCaseWhileTheDomainIsUpperCased) {
     EXPECT_EQ(userName, "x");
 }
 
+/// Upper case as in no language: the global locale's own.
+struct OwnCase : std::ctype<char> {
+    char do_toupper(char c) const override { return c == 'p' ? '#' : c; }
+};
+
+TEST_F(AzureIdentity, TheDomainIsUpperCasedByTheGlobalLocale) {
+    const std::locale before = std::locale::global(std::locale(std::locale::classic(), new OwnCase));
+    EXPECT_EQ(NameOf(R"({"unique_name": "pat@corp.example"})"),
+              Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
+    std::locale::global(before);
+    EXPECT_EQ(userName, "cor#.exam#le\\pat");
+}
+
 TEST_F(AzureIdentity, AnEmptyUserIsHandedOnAsALoneBackslash) {
     std::string asked;
     Platform platform;
@@ -566,12 +610,12 @@ TEST_F(AzureIdentity, AnEmptyUserIsHandedOnAsALoneBackslash) {
 TEST_F(AzureIdentity, ANameThatFillsTheBufferIsReadToItsEnd) {
     Platform platform;
     platform.fqdn2Netbios = [](const char *, char *dst, std::size_t size) {
-        std::fill_n(dst, size, 'x');
+        std::fill_n(dst, size + 1, 'x');  // no room was left for a NUL
         return 0;
     };
     ReplacePlatform(platform);
     EXPECT_EQ(NameOf(R"({"unique_name": "a@b"})"), kNamed);
-    EXPECT_EQ(userName, std::string(1023, 'x'));
+    EXPECT_EQ(userName, std::string(1024, 'x'));
 }
 
 TEST_F(AzureIdentity, UserInfoIsAllClaims) {
@@ -579,6 +623,13 @@ TEST_F(AzureIdentity, UserInfoIsAllClaims) {
     Json::Value info;
     client.GetUserInfo(info);
     EXPECT_EQ(info, Parse(R"({"sub": "1", "list": [1]})"));
+}
+
+TEST_F(AzureIdentity, OfAMalformedTokenUserInfoIsUnchanged) {
+    client.token = "a.b";
+    Json::Value info = "before";
+    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(info); }), Fails<std::invalid_argument>("bad jwt format!"));
+    EXPECT_EQ(info, "before");
 }
 
 TEST_F(AzureIdentity, WithoutATokenUserInfoIsUnchanged) {

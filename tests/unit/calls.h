@@ -4,6 +4,7 @@
 #include <dlfcn.h>
 
 #include <string>
+#include <vector>
 
 // This program defines functions of libc, libcrypto and the platform itself and so stands between them and the library
 // under test: each call is counted, passed on, or made to fail.
@@ -17,6 +18,10 @@ void FailNothing();
 
 /// Counts a call, and says whether it is the one to fail.
 bool ShouldFail(const std::string &function);
+
+/// Every text that OPENSSL_cleanse has overwritten since the last call.
+std::vector<std::string> TakeCleansed();
+void NoteCleansed(const void *memory, std::size_t size);
 
 /// The function that would have been called.
 template <typename Function>
@@ -38,11 +43,18 @@ class CallDepth {
     static inline int depth_ = 0;
 };
 
-/// Passes a call on, or fails it if that has been asked for.
+/// What libcrypto itself does when a call of it fails: leaves an entry in its error queue.
+void RaiseCryptoError();
+
+/// Passes a call into libcrypto on, or fails it if that has been asked for.
 template <typename Result, typename Function, typename... Arguments>
 Result PassOn(const char *name, Result failure, Function *own, Arguments... arguments) {
     const CallDepth depth;
-    return depth.Outermost() && ShouldFail(name) ? failure : Next(own, name)(arguments...);
+    if (depth.Outermost() && ShouldFail(name)) {
+        RaiseCryptoError();
+        return failure;
+    }
+    return Next(own, name)(arguments...);
 }
 
 }  // namespace Test

@@ -2,6 +2,7 @@
 #define OPENSSL_SUPPRESS_DEPRECATED
 #include <openssl/bio.h>
 #include <openssl/bn.h>
+#include <openssl/crypto.h>
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
 #include <openssl/md5.h>
@@ -9,6 +10,7 @@
 
 #include "tests/unit/calls.h"
 
+using Test::Next;
 using Test::PassOn;
 
 extern "C" {
@@ -70,6 +72,11 @@ unsigned char *HMAC(const EVP_MD *digest, const void *key, int keyLength, const 
 
 unsigned char *MD5(const unsigned char *data, size_t length, unsigned char *digest) {
     return PassOn<unsigned char *>("MD5", nullptr, MD5, data, length, digest);
+}
+
+void OPENSSL_cleanse(void *memory, size_t size) {
+    Test::NoteCleansed(memory, size);
+    Next(OPENSSL_cleanse, "OPENSSL_cleanse")(memory, size);
 }
 
 }  // extern "C"

@@ -2,8 +2,12 @@
 // find them, whatever compiler built it and however it optimised.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <syslog.h>
+
+#include <functional>
 
 #include "sso/sso.h"
+#include "tests/support/system_log.h"
 
 namespace TAVO::SSO {
 
@@ -11,14 +15,16 @@ std::string URLEncode(const std::string &value) { return "<" + value + ">"; }
 
 std::string MD5Digest(std::string /*data*/) { return "digest"; }
 
+std::function<void(std::string &response)> transfer;
+
 void httpGet(const std::string & /*url*/, std::string &response, bool /*verifySSL*/,
              std::size_t (* /*writeCallback*/)(char *, std::size_t, std::size_t, void *)) {
-    response = R"({"from": "httpGet"})";
+    transfer(response);
 }
 
 void httpPost(const std::string & /*url*/, const std::string & /*body*/, std::string &response, bool /*verifySSL*/,
               std::size_t (* /*writeCallback*/)(char *, std::size_t, std::size_t, void *)) {
-    response = R"({"id_token": "from httpPost"})";
+    transfer(response);
 }
 
 std::string SSOClient::GetLogoutEndpoint() { return "logout"; }
@@ -28,6 +34,8 @@ std::string SSOClient::GetLogoutEndpoint() { return "logout"; }
 namespace {
 
 using namespace TAVO::SSO;
+using ::Test::LogLine;
+using ::Test::TakeSystemLog;
 
 TEST(Interposition, URLEncodeIsFoundByTheFunctionsThatUseIt) {
     EXPECT_EQ(WebSphereSSOClient().GetIDTokenReqParams(),
@@ -41,19 +49,72 @@ TEST(Interposition, MD5DigestIsFoundByTheAuthorizationRequest) {
 }
 
 TEST(Interposition, HttpGetIsFoundByDiscoveryAndKeySet) {
+    transfer = [](std::string &response) { response = R"({"keys": "from httpGet"})"; };
     AzureSSOClient client;
     Json::Value wellknown;
     client.RequestWellknownInfo(wellknown);
-    EXPECT_EQ(wellknown["from"], "httpGet");
+    EXPECT_EQ(wellknown["keys"], "from httpGet");
+    Json::Value keys;
+    client.RequestKeysInfo("", keys);
+    EXPECT_EQ(keys["keys"], "from httpGet");
 }
 
 TEST(Interposition, HttpPostIsFoundByTheTokenRequest) {
+    transfer = [](std::string &response) { response = R"({"id_token": "from httpPost"})"; };
     AzureSSOClient client;
     std::string response;
     client.RequestTokenEndpoint(response, "");
     client.ProcessTokenResponse(response);
     EXPECT_EQ(client.GetToken(), "from httpPost");
 }
+
+/// The three exchanges with a provider, and the source that logs each.
+struct Exchange {
+    const char *name;
+    const char *source;
+    void (*run)(AzureSSOClient &client);
+};
+
+constexpr Exchange kExchanges[] = {
+    {"Discovery", "sso",
+     [](AzureSSOClient &client) {
+         Json::Value out;
+         client.RequestWellknownInfo(out);
+     }},
+    {"KeySet", "azuresso",
+     [](AzureSSOClient &client) {
+         Json::Value keys;
+         client.RequestKeysInfo("", keys);
+     }},
+    {"TokenRequest", "sso",
+     [](AzureSSOClient &client) {
+         std::string response;
+         client.RequestTokenEndpoint(response, "");
+     }},
+};
+
+class FailingExchange : public testing::TestWithParam<Exchange> {
+  protected:
+    AzureSSOClient client;
+};
+
+TEST_P(FailingExchange, AnInvalidArgumentIsOneLineAndGoesNoFurther) {
+    transfer = [](std::string &) { throw std::invalid_argument("the reason"); };
+    GetParam().run(client);
+    EXPECT_THAT(TakeSystemLog(),
+                testing::ElementsAre(LogLine{LOG_ERR, std::string(GetParam().source) + ":N the reason"}));
+}
+
+TEST_P(FailingExchange, AnyOtherExceptionGoesThroughUnlogged) {
+    transfer = [](std::string &) { throw std::domain_error("the reason"); };
+    EXPECT_THROW(GetParam().run(client), std::domain_error);
+    transfer = [](std::string &) { throw std::runtime_error("the reason"); };
+    EXPECT_THROW(GetParam().run(client), std::runtime_error);
+    EXPECT_THAT(TakeSystemLog(), testing::IsEmpty());
+}
+
+INSTANTIATE_TEST_SUITE_P(, FailingExchange, testing::ValuesIn(kExchanges),
+                         [](const auto &exchange) { return exchange.param.name; });
 
 TEST(Interposition, AGetterIsFoundByTheLogoutURL) { EXPECT_EQ(GetAzureSSOLogoutURL(""), "logout"); }
 

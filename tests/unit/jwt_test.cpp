@@ -7,6 +7,7 @@
 #include <fstream>
 #include <sstream>
 
+#include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
 #include "tests/unit/calls.h"
 #include "tests/unit/fixture.h"
@@ -26,6 +27,15 @@ const auto kRSAFailed = Fails<jwt_verify_failed>("verify rsa signature failed");
 const auto kHMACFailed = Fails<jwt_verify_failed>("verify hmac signature failed");
 const Failure kVerified{"nothing thrown", ""};
 
+/// The error queue of the host program.
+std::vector<unsigned long> ErrorQueue() {
+    std::vector<unsigned long> errors;
+    while (const unsigned long error = ERR_get_error()) {
+        errors.push_back(error);
+    }
+    return errors;
+}
+
 class Parts : public Library {
   protected:
     static Json::Value HeaderOf(const std::string &part) { return Jwt(part + ".e30.c2ln").GetHeader(); }
@@ -36,6 +46,12 @@ TEST_F(Parts, ATokenOfOtherThanThreePartsIsRefused) {
     for (const char *token : {"", "a", "a.b", "a.b.c.d", "...", "."}) {
         EXPECT_EQ(FailureOf([&] { Jwt jwt(token); }), kBadFormat) << token;
     }
+}
+
+TEST_F(Parts, ATokenOfAMillionPartsIsRefusedWithoutTakingItApart) {
+    const std::string token(1000000, '.');
+    const MemoryLimit limit(2000000);
+    EXPECT_EQ(FailureOf([&] { Jwt jwt(token); }), kBadFormat);
 }
 
 TEST_F(Parts, EmptyPartsAreAcceptedByTheConstructor) {
@@ -100,6 +116,7 @@ TEST_F(Parts, APartThatCannotBeDecodedForWantOfMemoryIsAStandardLogicError) {
         FailCall(call);
         EXPECT_EQ(FailureOf([] { HeaderOf("e30"); }).type, typeid(std::logic_error).name()) << call;
         FailNothing();
+        EXPECT_THAT(ErrorQueue(), IsEmpty()) << call;
     }
     FailCall("BIO_read");
     EXPECT_EQ(FailureOf([] { HeaderOf("e30"); }), kBadHeader);
@@ -118,6 +135,14 @@ TEST_F(Parts, ReadingTwiceGivesEqualValues) {
     Jwt jwt("eyJhIjoxfQ.eyJiIjoyfQ.c2ln");
     EXPECT_EQ(jwt.GetHeader(), jwt.GetHeader());
     EXPECT_EQ(jwt.GetBody(), jwt.GetBody());
+}
+
+TEST_F(Parts, CommentsAreCollected) { EXPECT_TRUE(HeaderOf(Base64Url("// why\n{}")).hasComment(Json::commentBefore)); }
+
+TEST_F(Parts, PartsOfEveryLengthAroundTheScratchSpaceAreReadWhole) {
+    for (std::size_t size = 3040; size < 3090; ++size) {
+        EXPECT_EQ(BodyOf(Base64Url("\"" + std::string(size, 'x') + "\"")), Json::Value(std::string(size, 'x')));
+    }
 }
 
 TEST_F(Parts, LargePartsAreReadWhole) {
@@ -198,6 +223,12 @@ TEST_F(RSASignature, FailsWithOneLineForKeysThatAreNoKeys) {
     }
 }
 
+TEST_F(RSASignature, EachPartIsReadUpToItsNUL) {
+    const std::size_t dot = token.rfind('.');
+    const std::string junk("\0junk", 5);
+    EXPECT_EQ(Verify(token.substr(0, dot) + junk + token.substr(dot) + junk), kVerified);
+}
+
 TEST_F(RSASignature, PaddingOfTheSignaturePartIsAccepted) { EXPECT_EQ(Verify(token + "=="), kVerified); }
 
 struct FailingCall {
@@ -221,6 +252,7 @@ TEST_P(FailingRSACall, FailsTheCheckAndLogsAsTold) {
         EXPECT_THAT(TakeSystemLog(), IsEmpty());
     }
     FailNothing();
+    EXPECT_THAT(ErrorQueue(), IsEmpty());
     EXPECT_EQ(Verify(token), kVerified);
 }
 
@@ -302,6 +334,13 @@ TEST_F(HMACSignature, FailsWithPaddingOrInStandardBase64) {
     }
 }
 
+TEST_F(HMACSignature, EachPartIsReadUpToItsNUL) {
+    const std::string token = Sign("key");
+    const std::size_t dot = token.rfind('.');
+    const std::string junk("\0junk", 5);
+    EXPECT_EQ(Verify(token.substr(0, dot) + junk + token.substr(dot) + junk, "a2V5"), kVerified);
+}
+
 TEST_F(HMACSignature, FailsWithAnEmptyOrCutSignature) {
     EXPECT_EQ(Verify(kSigningInput + ".", "a2V5"), kHMACFailed);
     const std::string token = Sign("key");
@@ -330,6 +369,7 @@ TEST_P(FailingHMACCall, FailsTheCheckSilently) {
     FailCall(GetParam().function, GetParam().call);
     EXPECT_EQ(Verify(kSigningInput + ".", "a2V5"), kHMACFailed) << "an empty signature must not match a missing MAC";
     FailNothing();
+    EXPECT_THAT(ErrorQueue(), IsEmpty());
     EXPECT_EQ(Verify(token, "a2V5"), kVerified);
 }
 
@@ -341,15 +381,6 @@ INSTANTIATE_TEST_SUITE_P(, FailingHMACCall,
                                          FailingCall{"BIO_ctrl", 2, nullptr}, FailingCall{"BIO_ctrl", 3, nullptr},
                                          FailingCall{"BIO_read", 2, nullptr}),
                          Named);
-
-/// The error queue of the host program.
-std::vector<unsigned long> ErrorQueue() {
-    std::vector<unsigned long> errors;
-    while (const unsigned long error = ERR_get_error()) {
-        errors.push_back(error);
-    }
-    return errors;
-}
 
 TEST_F(RSASignature, LeavesTheHostsErrorQueueAsItWas) {
     ErrorQueue();

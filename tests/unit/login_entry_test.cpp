@@ -59,6 +59,7 @@ TEST_F(LoginEntry, AnUnknownProfileIsThePlainSSOException) {
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "Azure"})"), notSupported);
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": ""})"), notSupported);
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "azure "})"), notSupported);
+    EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "azure\u0000"})"), notSupported);
 }
 
 TEST_F(LoginEntry, TheProfileIsReadWithTheIdsThatTheProcessHas) {
@@ -154,7 +155,7 @@ TEST_F(RelayURL, TheDecoderIsGivenAZeroedBufferOf1024Bytes) {
         const std::string text = R"({"origin": "/here"})";
         text.copy(dst, text.size());
         *length = 0;  // which is not looked at
-        return 1;
+        return -1;    // anything but 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(GetSSORelayURL(true, "the state", ""), "ssoclient/relay.html#origin=%2Fhere&success=true");

@@ -1,5 +1,6 @@
 #include "tests/unit/process.h"
 
+#include <sys/random.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -18,7 +19,10 @@ std::optional<gid_t> effectiveGID;
 std::optional<std::time_t> clockTime;
 std::size_t failingCalloc = 0;
 int setIDsUntilFailure = 0;
+int setIDError = 0;
 int errnoAtOpen = 0;
+const char *modeAtOpen = "";
+int entropyReads = 0;
 
 std::vector<std::string> &SetIDCalls() {
     static std::vector<std::string> calls;
@@ -30,7 +34,7 @@ int SetID(const char *name, unsigned int real, unsigned int effective, unsigned 
     const auto text = [](unsigned int value) { return std::to_string(static_cast<int>(value)); };
     SetIDCalls().push_back(std::string(name) + "(" + text(real) + ", " + text(effective) + ", " + text(saved) + ")");
     if (--setIDsUntilFailure == 0) {
-        errno = EPERM;
+        errno = setIDError;
         return -1;
     }
     id = effective;
@@ -47,7 +51,10 @@ void SetEffectiveIDs(uid_t uid, gid_t gid) {
 uid_t EffectiveUID() { return *effectiveUID; }
 gid_t EffectiveGID() { return *effectiveGID; }
 
-void FailSetID(int n) { setIDsUntilFailure = n; }
+void FailSetID(int n, int error) {
+    setIDsUntilFailure = n;
+    setIDError = error;
+}
 
 std::vector<std::string> TakeSetIDCalls() {
     std::vector<std::string> taken;
@@ -58,6 +65,9 @@ std::vector<std::string> TakeSetIDCalls() {
 void SetClock(std::time_t now) { clockTime = now; }
 
 int ErrnoAtOpen() { return errnoAtOpen; }
+std::string ModeAtOpen() { return modeAtOpen; }
+
+int EntropyReads() { return entropyReads; }
 
 void FailCalloc(std::size_t size) { failingCalloc = size; }
 
@@ -87,7 +97,13 @@ int setresgid(gid_t real, gid_t effective, gid_t saved) noexcept {
 
 FILE *fopen(const char *path, const char *mode) {
     Test::errnoAtOpen = errno;
+    Test::modeAtOpen = mode;
     return Test::Next(fopen, "fopen")(path, mode);
+}
+
+ssize_t getrandom(void *bytes, size_t length, unsigned int flags) {
+    ++Test::entropyReads;
+    return Test::Next(getrandom, "getrandom")(bytes, length, flags);
 }
 
 time_t time(time_t *result) noexcept {

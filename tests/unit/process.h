@@ -3,6 +3,7 @@
 
 #include <sys/types.h>
 
+#include <cerrno>
 #include <ctime>
 #include <string>
 #include <vector>
@@ -15,8 +16,8 @@ void SetEffectiveIDs(uid_t uid, gid_t gid);
 uid_t EffectiveUID();
 gid_t EffectiveGID();
 
-/// The n-th setresuid or setresgid from now on fails with EPERM.
-void FailSetID(int n);
+/// The n-th setresuid or setresgid from now on fails with this error.
+void FailSetID(int n, int error = EPERM);
 
 /// Every setresuid and setresgid since the last call: "setresgid(-1, 0, -1)".
 std::vector<std::string> TakeSetIDCalls();
@@ -27,8 +28,12 @@ void SetClock(std::time_t now);
 /// The next calloc of this many bytes fails.
 void FailCalloc(std::size_t size);
 
-/// What errno was when a file was last opened.
+/// What errno was when a file was last opened, and the mode it was opened with.
 int ErrnoAtOpen();
+std::string ModeAtOpen();
+
+/// How often the system's entropy source has been read.
+int EntropyReads();
 
 /// The ids, the clock and the memory are the real ones again.
 void RestoreProcess();

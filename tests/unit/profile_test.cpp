@@ -1,4 +1,7 @@
+#include <new>
+
 #include "sso/sso.h"
+#include "tests/support/memory_limit.h"
 #include "tests/unit/fixture.h"
 #include "tests/unit/process.h"
 
@@ -122,6 +125,13 @@ TEST_F(Profile, TheFileIsReadOnceAtConstruction) {
     WriteFile(kProfileFile, R"({"sso_enable": false})");
     EXPECT_TRUE(profile.SSOIsEnable());
     EXPECT_EQ(profile.GetSSOProfile(), "azure");
+}
+
+TEST_F(Profile, AnExceptionOfTheClientsConstructorPassesThrough) {
+    WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "websphere"})");
+    WriteFile(kWebSphereFile, R"({"websphere_client_id": ")" + std::string(100000, 'x') + "\"}");
+    const MemoryLimit limit(50000);
+    EXPECT_THROW(SSOProfile(), std::bad_alloc);
 }
 
 TEST_F(Profile, ItsClientIsAlwaysTheSameAndItsOwn) {

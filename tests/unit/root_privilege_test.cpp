@@ -1,7 +1,11 @@
 // The root-privilege section, seen through a client's constructor, which reads its file in it.
 #include <cerrno>
+#include <filesystem>
+#include <new>
 
 #include "sso/sso.h"
+#include "tests/support/memory_limit.h"
+#include "tests/unit/calls.h"
 #include "tests/unit/fixture.h"
 #include "tests/unit/process.h"
 
@@ -113,6 +117,49 @@ TEST_F(RootPrivilege, WhenTheUserCannotBeRestoredTheLineTellsItsId) {
                                              AuthError("setresuid(-1, 1024, -1) [Operation not permitted]"),
                                              AuthError("LEAVECriticalSection")));
     EXPECT_EQ(errno_, 1);
+}
+
+TEST_F(RootPrivilege, AnErrorOfWhichTheSystemHasNoTextIsToldByItsNumber) {
+    WriteFile(kAzureFile, "{}");
+    SetEffectiveIDs(0, 100);
+    FailSetID(1, 9999);
+    AzureSSOClient client;
+    EXPECT_THAT(TakeSystemLog(),
+                ElementsAre(AuthError("setresgid(-1, 0, -1) [Unknown error 9999]"), AuthError("ENTERCriticalSection")));
+}
+
+TEST_F(RootPrivilege, TheFileIsOpenedForThisProcessAloneAndClosed) {
+    const auto openFiles = [] {
+        const std::filesystem::directory_iterator files("/proc/self/fd");
+        return std::distance(begin(files), end(files));
+    };
+    const auto before = openFiles();
+    ReadAs(0, 0);
+    SSOProfile profile;
+    EXPECT_EQ(openFiles(), before);
+    EXPECT_EQ(ModeAtOpen(), "re") << "a program that the caller executes must not inherit the secrets";
+}
+
+TEST_F(RootPrivilege, WhatWasReadIsOverwritten) {
+    TakeCleansed();
+    ReadAs(0, 0);
+    const std::vector<std::string> cleansed = TakeCleansed();
+    const std::string content = R"({"azure_client_id": "read"})";
+    EXPECT_THAT(cleansed, testing::Contains(content)) << "the file's content";
+    EXPECT_THAT(cleansed, testing::Contains(testing::AllOf(testing::StartsWith(content), testing::SizeIs(4096))))
+        << "the buffer it was read by";
+}
+
+TEST_F(RootPrivilege, WantOfMemoryInTheReadPassesThroughAfterTheIdsAreRestored) {
+    WriteFile(kAzureFile, R"({"azure_client_id": ")" + std::string(100000, 'x') + "\"}");
+    SetEffectiveIDs(1024, 100);
+    {
+        const MemoryLimit limit(50000);
+        EXPECT_THROW(AzureSSOClient(), std::bad_alloc);
+    }
+    EXPECT_EQ(EffectiveUID(), 1024u);
+    EXPECT_EQ(EffectiveGID(), 100u);
+    EXPECT_EQ(TakeSystemLog().size(), 3u);
 }
 
 TEST_F(RootPrivilege, TheLinesCarryTheNameOfTheSourceThatReads) {

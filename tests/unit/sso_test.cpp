@@ -3,6 +3,9 @@
 
 #include <new>
 
+#include "tests/support/memory_limit.h"
+#include "tests/support/token.h"
+#include "tests/unit/calls.h"
 #include "tests/unit/fixture.h"
 #include "tests/unit/transport.h"
 
@@ -39,6 +42,35 @@ class ClientBase : public Library {
     Client client;
     Json::Value out;
     std::string response;
+};
+
+/// Writes down the steps, and fails at one.
+struct SteppingClient : SSOClient {
+    void SetCode(std::string authorizationCode) override { Step("SetCode " + authorizationCode); }
+    std::string GetIDTokenReqParams() override {
+        Step("GetIDTokenReqParams");
+        return "the body";
+    }
+    void RequestTokenEndpoint(std::string &answer, const std::string &body) override {
+        Step("RequestTokenEndpoint '" + answer + "' " + body);
+        answer = "the answer";
+    }
+    void ProcessTokenResponse(std::string answer) override { Step("ProcessTokenResponse " + answer); }
+    void VerifyIDToken() override { Step("VerifyIDToken"); }
+    void GetUserName(std::string &userName) override {
+        Step("GetUserName " + userName);
+        userName = "the user";
+    }
+
+    void Step(const std::string &step) {
+        steps.push_back(step);
+        if (steps.size() == failingStep) {
+            throw std::domain_error(step);
+        }
+    }
+
+    std::vector<std::string> steps;
+    std::size_t failingStep = 0;
 };
 
 TEST_F(ClientBase, StartsSwitchedOffAndEmpty) {
@@ -83,6 +115,7 @@ TEST_F(ClientBase, TheDiscoveryDocumentIsFetchedVerifiedAndParsed) {
     CurrentTransport().answers[kWellknown] = {CURLE_OK, {R"({"jwks_uri":)", R"( "keys" /* a comment */})"}};
     client.RequestWellknownInfo(out);
     EXPECT_EQ(out["jwks_uri"].asString(), "keys");
+    EXPECT_TRUE(out["jwks_uri"].hasComment(Json::commentAfterOnSameLine)) << "comments are collected";
     for (const std::string &call : CurrentTransport().calls) {
         EXPECT_THAT(call, testing::Not(testing::HasSubstr("VERIFY"))) << "libcurl's own checks must stay on";
     }
@@ -124,6 +157,33 @@ TEST_F(ClientBase, DiscoveryWithoutATransferHandleIsOneLine) {
     ASSERT_EQ(log.size(), 1u);
     EXPECT_EQ(log[0].priority, LOG_ERR);
     EXPECT_THAT(log[0].text, testing::StartsWith("sso:N bad_alloc. "));
+}
+
+TEST_F(ClientBase, WhereverMemoryRunsOutTheDiscoveryDocumentIsThereWholeOrNotAtAll) {
+    const std::string document = R"({"a": {"b": [1, 2]}, "jwks_uri": "https://provider.example/keys", "z": true})";
+    CurrentTransport().answers[kWellknown] = Whole(document);
+    const Json::Value whole = Parse(document);
+    int failed = 0;
+    for (bool happened = true; happened;) {
+        out = Json::Value();
+        FailingAllocation failing(failed + 1);
+        client.RequestWellknownInfo(out);
+        happened = failing.Happened();
+        failed += happened ? 1 : 0;
+        ASSERT_TRUE(out == whole || (happened && out.isNull())) << failed;
+    }
+    EXPECT_GT(failed, 5);
+    EXPECT_THAT(TakeSystemLog(), testing::Each(testing::Field(&LogLine::text, testing::StartsWith("sso:N "))));
+}
+
+TEST_F(ClientBase, TheRequestsBodyIsOverwrittenAfterALogin) {
+    struct SecretClient : SteppingClient {
+        std::string GetIDTokenReqParams() override { return "client_secret=a+secret+that+is+long+enough"; }
+    } stepping;
+    std::string userName;
+    TakeCleansed();
+    stepping.OpenIDConnectLogin("abc", userName);
+    EXPECT_THAT(TakeCleansed(), testing::Contains("client_secret=a+secret+that+is+long+enough"));
 }
 
 TEST_F(ClientBase, TheTokenRequestIsPostedAndItsAnswerAppended) {
@@ -183,35 +243,6 @@ TEST_F(ClientBase, ALoginOnThePlainBaseStoresTheCodeAndFailsAtTheRequest) {
     EXPECT_EQ(userName, "before");
     EXPECT_THAT(CurrentTransport().calls, testing::IsEmpty());
 }
-
-/// Writes down the steps, and fails at one.
-struct SteppingClient : SSOClient {
-    void SetCode(std::string authorizationCode) override { Step("SetCode " + authorizationCode); }
-    std::string GetIDTokenReqParams() override {
-        Step("GetIDTokenReqParams");
-        return "the body";
-    }
-    void RequestTokenEndpoint(std::string &answer, const std::string &body) override {
-        Step("RequestTokenEndpoint '" + answer + "' " + body);
-        answer = "the answer";
-    }
-    void ProcessTokenResponse(std::string answer) override { Step("ProcessTokenResponse " + answer); }
-    void VerifyIDToken() override { Step("VerifyIDToken"); }
-    void GetUserName(std::string &userName) override {
-        Step("GetUserName " + userName);
-        userName = "the user";
-    }
-
-    void Step(const std::string &step) {
-        steps.push_back(step);
-        if (steps.size() == failingStep) {
-            throw std::domain_error(step);
-        }
-    }
-
-    std::vector<std::string> steps;
-    std::size_t failingStep = 0;
-};
 
 TEST_F(ClientBase, ALoginRunsItsSixStepsInTheirOrder) {
     SteppingClient stepping;

@@ -3,6 +3,7 @@
 
 #include <curl/curl.h>
 
+#include <functional>
 #include <map>
 #include <string>
 #include <vector>
@@ -26,6 +27,9 @@ struct Transport {
     /// The URLs asked for, and the form of the last POST.
     std::vector<std::string> urls;
     std::string form;
+
+    /// What else happens in a transfer.
+    std::function<void()> duringPerform;
 
     /// Whether the next handle cannot be made.
     bool noHandle = false;

@@ -1,4 +1,7 @@
+#include <openssl/err.h>
+
 #include <cerrno>
+#include <cstring>
 #include <new>
 
 #include "sso/sso.h"
@@ -13,6 +16,7 @@ namespace Test {
 namespace {
 
 using namespace TAVO::SSO;
+using testing::Contains;
 using testing::ElementsAre;
 
 constexpr char kURL[] = "https://provider.example/";
@@ -90,9 +94,9 @@ TEST_F(Transfer, WithoutAHandleBadAllocIsThrownAndLibcurlCleanedUp) {
     std::string response;
     EXPECT_THROW(httpGet(kURL, response, true, Append), std::bad_alloc);
     EXPECT_THROW(httpPost(kURL, "", response, true, Append), std::bad_alloc);
-    EXPECT_EQ(CurrentTransport().calls.front(), "curl_global_init 3");
-    EXPECT_EQ(CurrentTransport().calls.back(), "curl_global_cleanup");
-    EXPECT_THAT(CurrentTransport().calls, testing::Not(testing::Contains("curl_easy_perform")));
+    EXPECT_THAT(CurrentTransport().calls,
+                ElementsAre("curl_global_init 3", "curl_easy_init", "curl_easy_cleanup", "curl_global_cleanup",
+                            "curl_global_init 3", "curl_easy_init", "curl_easy_cleanup", "curl_global_cleanup"));
 }
 
 TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
@@ -100,6 +104,44 @@ TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
     std::string response = "earlier ";
     httpGet(kURL, response, true, Append);
     EXPECT_EQ(response, "earlier answer");
+}
+
+/// What stands in the calling thread's error queue of OpenSSL, as texts.
+std::vector<std::string> ErrorQueue() {
+    std::vector<std::string> errors;
+    const char *file = nullptr;
+    const char *function = nullptr;
+    const char *data = nullptr;
+    int line = 0;
+    int flags = 0;
+    while (const unsigned long error = ERR_get_error_all(&file, &line, &function, &data, &flags)) {
+        errors.push_back(std::to_string(ERR_GET_REASON(error)) + " " + file + ":" + std::to_string(line) + " " +
+                         function + " " + data);
+    }
+    return errors;
+}
+
+TEST_F(Transfer, TheHostsErrorQueueSurvivesATransferThatClearsItAndLeavesItsOwn) {
+    CurrentTransport().answers[kURL] = Whole("answer");
+    CurrentTransport().duringPerform = [] {
+        ERR_clear_error();
+        ERR_raise(ERR_LIB_SSL, 17);
+    };
+    ERR_clear_error();
+    const auto hostFails = [] {
+        ERR_raise_data(ERR_LIB_USER, 1, "some %s", "data");
+        ERR_raise(ERR_LIB_USER, 2);
+    };
+    hostFails();
+    const std::vector<std::string> before = ErrorQueue();
+    ASSERT_EQ(before.size(), 2u);
+
+    hostFails();
+    std::string response;
+    httpGet(kURL, response, true, Append);
+    EXPECT_EQ(ErrorQueue(), before);
+    httpGet(kURL, response, true, Append);
+    EXPECT_EQ(ErrorQueue(), std::vector<std::string>());
 }
 
 class Encoding : public Library {};
@@ -115,21 +157,21 @@ TEST_F(Encoding, AValueOfWhichEveryByteIsEscapedFits) { EXPECT_EQ(URLEncode("&=\
 TEST_F(Encoding, TheEncoderIsGivenThreeTimesTheLengthAsUsableSize) {
     Platform platform;
     platform.urlEncode = [](const char *src, char *dst, std::size_t size) {
-        EXPECT_STREQ(src, "four");
-        EXPECT_EQ(size, 12u);
+        EXPECT_EQ(size, 3 * std::strlen(src));
         EXPECT_EQ(std::string(dst, size + 1), std::string(size + 1, '\0'));
         std::fill_n(dst, size, 'x');
         return 0;
     };
     ReplacePlatform(platform);
     EXPECT_EQ(URLEncode("four"), "xxxxxxxxxxxx");
+    EXPECT_EQ(URLEncode(std::string(1000, 'a')), std::string(3000, 'x'));
 }
 
 TEST_F(Encoding, AValueThatTheEncoderRefusesStaysAsItIs) {
     Platform platform;
     platform.urlEncode = [](const char *, char *dst, std::size_t) {
         *dst = 'x';
-        return 1;
+        return -1;
     };
     ReplacePlatform(platform);
     EXPECT_EQ(URLEncode("a b"), "a b");
@@ -142,6 +184,12 @@ TEST_F(Encoding, WithoutMemoryTheValueStaysAsItIs) {
 
 TEST_F(Encoding, URLEncodeSeesTheTextUpToItsNUL) { EXPECT_EQ(URLEncode(std::string("a b\0c d", 7)), "a%20b"); }
 
+TEST_F(Encoding, TheEncodedTextIsOverwrittenBeforeItsMemoryIsReleased) {
+    TakeCleansed();
+    URLEncode("a secret");
+    EXPECT_THAT(TakeCleansed(), Contains(testing::StartsWith("a%20secret")));
+}
+
 TEST_F(Encoding, TheMD5DigestOfTheEmptyStringIsTheStandardOne) {
     EXPECT_EQ(MD5Digest(""), "d41d8cd98f00b204e9800998ecf8427e");
     EXPECT_EQ(MD5Digest("message digest"), "f96b697d7cb7938d525a2f31aaf161d0");
@@ -153,10 +201,12 @@ TEST_F(Encoding, TheMD5DigestIsOverTheBytesBehindANULToo) {
 }
 
 TEST_F(Encoding, AFailedMD5GivesTheEmptyStringAndOneLine) {
+    ERR_clear_error();
     FailCall("MD5");
     errno = EPERM;
     EXPECT_EQ(MD5Digest("text"), "");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("utils:N MD5 digest failed Operation not permitted")));
+    EXPECT_EQ(ErrorQueue(), std::vector<std::string>());
 }
 
 TEST_F(Encoding, WithoutMemoryMD5DigestGivesTheEmptyStringAndOneLine) {

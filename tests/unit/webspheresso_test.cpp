@@ -1,5 +1,6 @@
 #include "jwt/jwt.h"
 #include "tests/support/token.h"
+#include "tests/unit/calls.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
 #include "tests/unit/platform_calls.h"
@@ -239,10 +240,23 @@ TEST_F(WebSphereVerification, TheEncoderIsGivenAZeroedBufferOf1024BytesAndItsFla
         EXPECT_EQ(flag3, 1);
         EXPECT_EQ(std::string(dst, size), std::string(1024, '\0'));
         std::fill_n(dst, size, 'A');  // to the last byte, without a NUL
-        return 1;
+        return -1;                    // anything but 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(Verify(EVP_sha256(), std::string(768, '\0')), kVerified);
+}
+
+TEST_F(WebSphereVerification, TheSecretsBase64FormAndTheKeyAreOverwritten) {
+    client.clientSecret = "a secret that is long enough";
+    TakeCleansed();
+    EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kVerified);
+    const std::vector<std::string> cleansed = TakeCleansed();
+    const std::string form = "YSBzZWNyZXQgdGhhdCBpcyBsb25nIGVub3VnaA==";
+    EXPECT_THAT(cleansed, testing::Contains(testing::AllOf(testing::StartsWith(form), testing::SizeIs(1024))))
+        << "the encoder's buffer";
+    EXPECT_THAT(cleansed, testing::Contains(form)) << "the key text";
+    EXPECT_THAT(cleansed, testing::Contains(form + std::string(1, '\0'))) << "the decoder's scratch space";
+    EXPECT_THAT(cleansed, testing::Contains(client.clientSecret)) << "the decoded key";
 }
 
 TEST_F(WebSphereVerification, ATokenWithAKidNeedsNoKeySet) {

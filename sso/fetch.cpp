@@ -1,0 +1,28 @@
+#include "sso/fetch.h"
+
+#include <cstring>
+
+#include "sso/sso.h"
+#include "utils/json.h"
+
+namespace TAVO::SSO {
+
+std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept {
+    const std::size_t length = size * count;
+    try {
+        static_cast<std::string *>(response)->append(data, strnlen(data, length));
+    } catch (...) {
+        return 0;  // an exception through libcurl's frames would leak its connection and ruin the handle
+    }
+    return length;
+}
+
+void FetchJson(const std::string &uri, Json::Value &document) {
+    std::string response;
+    httpGet(uri, response, true, AppendChunk);
+    if (!Utils::ParseJson(response, document)) {
+        throw sso_err_resp("bad wellknown json format.");
+    }
+}
+
+}  // namespace TAVO::SSO
