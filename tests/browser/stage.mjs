@@ -1,0 +1,111 @@
+// What every test plays on: the site, and one Chromium that trusts the site's certificates and no others.
+import assert from 'node:assert/strict';
+import {createHash, X509Certificate} from 'node:crypto';
+import {readFileSync} from 'node:fs';
+import path from 'node:path';
+import {pathToFileURL} from 'node:url';
+
+import {useProfile, writeSettings} from '../site/appliance.mjs';
+import {makeUsers, startSite} from '../site/site.mjs';
+import {Visitor} from './visitor.mjs';
+
+export const HTML_LOGIN = '<img src=x onerror=alert(1)>';
+
+const USERS = {
+    alice: 'alice@corp.example.net',
+    bob: 'bob@corp.example.net',
+    carol: 'carol@elsewhere.example.org',
+    dora: 'dora@corp.example.net',
+    [HTML_LOGIN]: `${HTML_LOGIN}@corp.example.net`,
+};
+
+const SWITCHES = [
+    '--disable-background-networking', '--disable-component-update', '--disable-gpu', '--disable-quic',
+    '--disable-sync', '--no-first-run',
+];
+
+function launch({chromium}, {providerCertificate, applianceCertificate, folder}) {
+    const fingerprints = [providerCertificate, applianceCertificate].map(({cert}) => {
+        const key = new X509Certificate(cert).publicKey.export({type: 'spki', format: 'der'});
+        return createHash('sha256').update(key).digest('base64');
+    });
+    return chromium.launch({
+        executablePath: '/usr/bin/chromium',
+        args: [...SWITCHES, `--ignore-certificate-errors-spki-list=${fingerprints}`],
+        chromiumSandbox: false,
+        env: {...process.env, HOME: folder, XDG_CONFIG_HOME: folder, XDG_CACHE_HOME: folder},
+    });
+}
+
+class Stage {
+    constructor(properties) {
+        Object.assign(this, properties);
+        this.origin = this.site.origin;
+    }
+
+    /** Everything as it should be, under the profile named. */
+    reset(profile = 'azure') {
+        useProfile(profile);
+        writeSettings(this.site);
+        Object.assign(this.site.provider.lifetimes, {code: 60, idToken: 600});
+        this.asked.splice(0);
+        this.logged.splice(0);
+    }
+
+    /** Leaves the appliance with other settings of the clients than the provider has, or with another provider. */
+    misconfigure({changes = {}, provider = this.site.provider}) {
+        writeSettings({provider, clients: this.site.clients.map((client) => ({...client, ...changes}))});
+    }
+
+    /** Whether an address is the appliance's or, all of them having one host, a provider's. */
+    isOfTheSite(address) {
+        const url = new URL(address);
+        return url.protocol === 'data:' || url.origin === this.origin || url.hostname === '127.0.0.1';
+    }
+
+    /** How often the appliance asked the provider for a token. */
+    tokenRequests() {
+        return this.asked.filter(({path: asked}) => asked === '/token').length;
+    }
+
+    /**
+     * Lets visitors with a browser context of their own act, then holds against each that the pages logged an error or
+     * asked another site for something. `options` are Playwright's, and `expects`, a pattern of errors that belong to
+     * the test.
+     */
+    async visit(act, options = {}) {
+        const visitors = [];
+        for (let i = 0; i < act.length; ++i) {
+            visitors.push(await Visitor.arrive(this, options));
+        }
+        try {
+            await act(...visitors);
+            visitors.forEach((visitor) => assert.deepEqual(visitor.complaints, []));
+        } finally {
+            await Promise.all(visitors.map((visitor) => visitor.leave()));
+        }
+    }
+
+    async stop() {
+        await this.browser.close();
+        await this.site.stop();
+    }
+}
+
+export async function startStage({webroot, siteModules, browserModules, pictures}) {
+    const load = (file) => import(pathToFileURL(path.join(browserModules, file)));
+    const asked = [];
+    const logged = [];
+    const users = makeUsers(USERS);
+    users.get('dora').decidesAlone = true;
+    const site = await startSite({
+        webroot,
+        nodeModules: siteModules,
+        users,
+        onRequest: (request) => asked.push(request),
+        onLog: (line) => logged.push(line),
+    });
+    const browser = await launch(await load('playwright-core/index.mjs'), site);
+    const axe = readFileSync(path.join(browserModules, 'axe-core/axe.min.js'), 'utf8');
+    return new Stage({site, browser, axe, asked, logged, pictures});
+}
