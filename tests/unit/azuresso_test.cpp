@@ -519,20 +519,6 @@ TEST_F(AzureIdentity, AnEmptyUniqueNameIsAStringAndTaken) {
               Fails<std::invalid_argument>("cannot get the user name!"));
 }
 
-TEST_F(AzureIdentity, WithoutATokenThereIsNoName) {
-    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }),
-              Fails<std::invalid_argument>("please request a id_token first."));
-    EXPECT_EQ(userName, "before");
-}
-
-TEST_F(AzureIdentity, AMalformedTokenIsRefusedAsMalformed) {
-    client.token = "a.b";
-    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }), Fails<std::invalid_argument>("bad jwt format!"));
-    EXPECT_EQ(NameOf("no JSON"), Fails<std::invalid_argument>("bad jwt body format!"));
-    EXPECT_EQ(NameOf("").type, Fails<std::logic_error>("").type);
-    EXPECT_EQ(userName, "before");
-}
-
 TEST_F(AzureIdentity, WithoutAStringUniqueNameOrEmailTheNameCannotBeFound) {
     const auto notFound = Fails<std::invalid_argument>("cannot find the user name!");
     for (const char *claims : {R"({"sub": "alice@corp.example.net"})", R"({"unique_name": null, "email": ["a@b"]})",
@@ -616,27 +602,6 @@ TEST_F(AzureIdentity, ANameThatFillsTheBufferIsReadToItsEnd) {
     ReplacePlatform(platform);
     EXPECT_EQ(NameOf(R"({"unique_name": "a@b"})"), kNamed);
     EXPECT_EQ(userName, std::string(1024, 'x'));
-}
-
-TEST_F(AzureIdentity, UserInfoIsAllClaims) {
-    client.token = "e30." + Base64Url(R"({"sub": "1", "list": [1]})") + ".";
-    Json::Value info;
-    client.GetUserInfo(info);
-    EXPECT_EQ(info, Parse(R"({"sub": "1", "list": [1]})"));
-}
-
-TEST_F(AzureIdentity, OfAMalformedTokenUserInfoIsUnchanged) {
-    client.token = "a.b";
-    Json::Value info = "before";
-    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(info); }), Fails<std::invalid_argument>("bad jwt format!"));
-    EXPECT_EQ(info, "before");
-}
-
-TEST_F(AzureIdentity, WithoutATokenUserInfoIsUnchanged) {
-    Json::Value info = "before";
-    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(info); }),
-              Fails<std::invalid_argument>("please request a id_token first."));
-    EXPECT_EQ(info, "before");
 }
 
 class AzureLogout : public Library {

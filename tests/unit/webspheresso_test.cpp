@@ -295,36 +295,6 @@ TEST_F(WebSphereIdentity, WithoutAStringSubjectTheNameCannotBeFoundAndIsUnchange
     }
 }
 
-TEST_F(WebSphereIdentity, WithoutATokenThereIsNoName) {
-    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }),
-              Fails<std::invalid_argument>("please request a id_token first."));
-    EXPECT_EQ(userName, "before");
-}
-
-TEST_F(WebSphereIdentity, AMalformedTokenIsRefusedAsMalformed) {
-    client.token = "a.b";
-    EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }), Fails<std::invalid_argument>("bad jwt format!"));
-    EXPECT_EQ(NameOf("no JSON"), Fails<std::invalid_argument>("bad jwt body format!"));
-    EXPECT_EQ(userName, "before");
-}
-
-TEST_F(WebSphereIdentity, UserInfoIsAllClaims) {
-    client.token = "e30." + Base64Url(R"({"sub": "1", "list": [1]})") + ".";
-    Json::Value claims;
-    client.GetUserInfo(claims);
-    EXPECT_EQ(claims, Parse(R"({"sub": "1", "list": [1]})"));
-}
-
-TEST_F(WebSphereIdentity, WithoutATokenUserInfoIsUnchanged) {
-    Json::Value claims = "before";
-    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(claims); }),
-              Fails<std::invalid_argument>("please request a id_token first."));
-    EXPECT_EQ(claims, "before");
-    client.token = "a.b";
-    EXPECT_EQ(FailureOf([&] { client.GetUserInfo(claims); }), Fails<std::invalid_argument>("bad jwt format!"));
-    EXPECT_EQ(claims, "before");
-}
-
 }  // namespace
 
 }  // namespace Test

@@ -1,0 +1,60 @@
+// What both clients say of the user, as far as they are alike.
+#include "tests/support/token.h"
+#include "tests/unit/clients.h"
+#include "tests/unit/fixture.h"
+
+namespace Test {
+
+namespace {
+
+template <typename Client>
+class UserIdentity : public Library {
+  protected:
+    /// What asking for the name and asking for all claims throw for this token.
+    std::vector<Failure> FailuresOf(const std::string &token) {
+        client.token = token;
+        return {FailureOf([this] { client.GetUserName(userName); }), FailureOf([this] { client.GetUserInfo(info); })};
+    }
+
+    void TearDown() override {
+        EXPECT_EQ(userName, "before");
+        EXPECT_EQ(info, "before");
+        Library::TearDown();
+    }
+
+    Client client;
+    std::string userName = "before";
+    Json::Value info = "before";
+};
+
+using Clients = testing::Types<AzureClient, WebSphereClient>;
+TYPED_TEST_SUITE(UserIdentity, Clients);
+
+TYPED_TEST(UserIdentity, WithoutATokenThereIsNone) {
+    EXPECT_THAT(this->FailuresOf(""), testing::Each(Fails<std::invalid_argument>("please request a id_token first.")));
+}
+
+TYPED_TEST(UserIdentity, ATokenOfOtherThanThreePartsIsRefused) {
+    EXPECT_THAT(this->FailuresOf("a.b"), testing::Each(Fails<std::invalid_argument>("bad jwt format!")));
+}
+
+TYPED_TEST(UserIdentity, ABodyThatIsNotJSONIsRefused) {
+    EXPECT_THAT(this->FailuresOf("e30." + Base64Url("no JSON") + ".c2ln"),
+                testing::Each(Fails<std::invalid_argument>("bad jwt body format!")));
+}
+
+TYPED_TEST(UserIdentity, AnEmptyBodyIsAStandardLogicError) {
+    EXPECT_THAT(this->FailuresOf("e30..c2ln"),
+                testing::Each(testing::Field(&Failure::type, typeid(std::logic_error).name())));
+}
+
+TYPED_TEST(UserIdentity, AllClaimsAreTheDecodedBodyUnverified) {
+    this->client.token = "no header." + Base64Url(R"({"sub": "1", "exp": 1, "list": [1]})") + ".no signature";
+    Json::Value claims;
+    this->client.GetUserInfo(claims);
+    EXPECT_EQ(claims, Parse(R"({"sub": "1", "exp": 1, "list": [1]})"));
+}
+
+}  // namespace
+
+}  // namespace Test
