@@ -101,9 +101,22 @@ function defineStolenTokens(stage) {
 }
 
 function defineOpenRedirects(stage) {
-    it('open redirects: the relay page, sent to each of the foreign origins', () => stage.visit(async (visitor) => {
-        assert.ok(foreign.length >= 200);
-        for (const origin of foreign) {
+    it('open redirects: what the relay page makes of the foreign origins, as the browser reads it', () =>
+        stage.visit(async (visitor) => {
+            assert.ok(foreign.length >= 200);
+            await visitor.open(RELAY_PAGE);
+            const onward = await visitor.page.evaluate(async ({script, fragments}) => {
+                const {describe} = await import(script);
+                return fragments.map((fragment) => new URL(describe(fragment).onward, location).href);
+            }, {
+                script: RELAY_PAGE.replace(/html$/, 'js'),
+                fragments: foreign.map((origin) => `#${new URLSearchParams({origin, success: 'true'})}`),
+            });
+            assert.deepEqual(onward, foreign.map(() => stage.origin + START_PAGE));
+        }));
+
+    it('open redirects: the relay page, sent to foreign origins of every kind', () => stage.visit(async (visitor) => {
+        for (const origin of foreign.filter((each, index) => index % 12 === 0)) {
             await visitor.open(relayWith({origin, success: 'true'}));
             await visitor.page.waitForURL((url) => url.pathname !== RELAY_PAGE);
             assert.equal(visitor.page.url(), stage.origin + START_PAGE, JSON.stringify(origin));
@@ -162,7 +175,8 @@ function defineInjections(stage) {
             assert.equal(response.status(), 400);
         }
         assert.deepEqual((await visitor.context.cookies()).filter(({name}) => name === 'injected'), []);
-    }, {expects: /status of 400/}));
+        // The web server's own page has no icon, and the browser looks for one.
+    }, {expects: /status of 40[04]/}));
 }
 
 function defineSessionAttacks(stage) {

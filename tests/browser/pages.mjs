@@ -5,8 +5,7 @@ import {it} from 'node:test';
 import {useProfile} from '../site/appliance.mjs';
 import {RELAY_PAGE} from './visitor.mjs';
 
-const SCREENS = [360, 1280].flatMap((width) =>
-    ['light', 'dark'].map((colorScheme) => ({viewport: {width, height: 800}, colorScheme})));
+const SCREENS = [360, 1280].flatMap((width) => ['light', 'dark'].map((colorScheme) => ({width, colorScheme})));
 const PICTURE = {viewport: {width: 720, height: 560}, colorScheme: 'light'};
 const DEEP_LINK = '/account.cgi?opened=after';
 const SUCCESS = `${RELAY_PAGE}#${new URLSearchParams({origin: DEEP_LINK, success: 'true'})}`;
@@ -75,26 +74,25 @@ function stayOn(visitor, elsewhere) {
     return visitor.page.route(elsewhere, (route) => route.fulfill({status: 204}));
 }
 
-async function findBarriers({page, stage}) {
-    await page.evaluate(stage.axe);
+async function findBarriers(page) {
     const {violations} = await page.evaluate(() => globalThis.axe.run());
     return violations.map(({id, nodes}) => `${id}: ${nodes.map(({html}) => html).join(' ')}`);
 }
 
 function defineAccessibility(stage) {
     for (const [name, open] of Object.entries(PAGES)) {
-        it(`has no barriers, on a phone and a desktop, in light and dark: ${name}`, async () => {
-            for (const screen of SCREENS) {
-                stage.reset();
-                await stage.visit(async (visitor) => {
-                    await open(visitor, stage);
-                    assert.deepEqual(await findBarriers(visitor), []);
-                    const {page} = visitor;
-                    const overhang = await page.evaluate(() => document.documentElement.scrollWidth - innerWidth);
-                    assert.ok(overhang <= 0, `${overhang} pixels beyond the right edge of ${screen.viewport.width}`);
-                }, screen);
+        it(`has no barriers, on a phone and a desktop, in light and dark: ${name}`, () => stage.visit(async (visitor) => {
+            const {page} = visitor;
+            await open(visitor, stage);
+            await page.evaluate(stage.axe);
+            for (const {width, colorScheme} of SCREENS) {
+                await page.setViewportSize({width, height: 800});
+                await page.emulateMedia({colorScheme});
+                assert.deepEqual(await findBarriers(page), [], `${width} pixels wide, ${colorScheme}`);
+                const overhang = await page.evaluate(() => document.documentElement.scrollWidth - innerWidth);
+                assert.ok(overhang <= 0, `${overhang} pixels beyond the right edge of ${width}`);
             }
-        });
+        }));
     }
 }
 
@@ -106,7 +104,7 @@ function defineHeaders(stage) {
     ];
     it('is protected by its headers', () => stage.visit(async (visitor) => {
         const seen = [];
-        visitor.page.on('response', async (response) => {
+        visitor.page.on('response', (response) => {
             if (response.url().startsWith(stage.origin)) {
                 seen.push(response);
             }

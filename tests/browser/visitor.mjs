@@ -1,7 +1,7 @@
 // A person with a browser: what they see, by the roles and names that a screen reader tells, and what they do.
 import assert from 'node:assert/strict';
 
-const PATIENCE = 8_000;
+const PATIENCE = 15_000;
 export const RETURN_PAGE = '/webman/sso/return.cgi';
 export const RELAY_PAGE = '/webman/ssoclient/relay.html';
 
