@@ -29,6 +29,7 @@ const EXPLANATIONS = new Map([
     ['verify hmac signature failed', NOT_VERIFIED],
     ['ALG algorithm is not supported', NOT_VERIFIED],
     ['bad jwt', NOT_VERIFIED],
+    ['token cannot be empty', NOT_VERIFIED],
     ['cannot find the user name!', NO_NAME],
     ['cannot get the user name!', NO_NAME],
     ["The provider's name for this user cannot be used.", NO_NAME],
@@ -42,7 +43,9 @@ const EXPLANATIONS = new Map([
     ['The provider refused: invalid_client', `Your organisation does not accept this device. ${ASK}`],
     ['The provider refused: unauthorized_client', `Your organisation does not accept this device. ${ASK}`],
     ['sso does not enable.', `Single sign-on is switched off on this device. ${ASK}`],
+    ['read profile file failed.', NOT_SET_UP],
     ['profile not support.', NOT_SET_UP],
+    ['not specify sso profile', NOT_SET_UP],
     ['Single sign-on is not completely set up', NOT_SET_UP],
     ['encode base64 failed.', NOT_SET_UP],
 ]);

@@ -51,6 +51,18 @@ test('explains the reasons that it knows and cuts those that are too long', () =
     assert.equal(after({success: 'false'}).reason, '');
 });
 
+test("explains every exception's text that the guide lists", () => {
+    const guide = readFileSync(new URL('../../docs/integration.md', import.meta.url), 'utf8');
+    const table = /\n## What an exception means\n(.*?)\n## /s.exec(guide)[1];
+    const texts = [...table.matchAll(/^\| (`.*?) \|/gm)].flatMap(([, cell]) => [...cell.matchAll(/`([^`]+)`/g)]);
+    const ofTheLibrary = texts.map(([, text]) => text).filter((text) => !text.startsWith('std::'));
+    assert.ok(ofTheLibrary.length >= 20);
+    for (const text of ofTheLibrary) {
+        const {explanation} = after({success: 'false', reason: text.replace(/\.\.\.$/, '')});
+        assert.doesNotMatch(explanation, /^Something went wrong/, text);
+    }
+});
+
 test('finds no explanation in what every object has', () => {
     for (const reason of ['constructor', '__proto__', 'toString']) {
         assert.match(after({success: 'false', reason}).explanation, /^Something went wrong/);
