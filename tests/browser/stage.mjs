@@ -1,6 +1,5 @@
 // What every test plays on: the site, and one Chromium that trusts the site's certificates and no others.
 import assert from 'node:assert/strict';
-import {createHash, X509Certificate} from 'node:crypto';
 import {readFileSync} from 'node:fs';
 import path from 'node:path';
 import {pathToFileURL} from 'node:url';
@@ -24,14 +23,10 @@ const SWITCHES = [
     '--disable-sync', '--no-first-run',
 ];
 
-function launch({chromium}, {providerCertificate, applianceCertificate, folder}) {
-    const fingerprints = [providerCertificate, applianceCertificate].map(({cert}) => {
-        const key = new X509Certificate(cert).publicKey.export({type: 'spki', format: 'der'});
-        return createHash('sha256').update(key).digest('base64');
-    });
+function launch({chromium}, {chromiumTrust, folder}) {
     return chromium.launch({
         executablePath: '/usr/bin/chromium',
-        args: [...SWITCHES, `--ignore-certificate-errors-spki-list=${fingerprints}`],
+        args: [...SWITCHES, chromiumTrust],
         chromiumSandbox: false,
         env: {...process.env, HOME: folder, XDG_CONFIG_HOME: folder, XDG_CACHE_HOME: folder},
     });

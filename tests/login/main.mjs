@@ -102,7 +102,9 @@ async function serve(running, profile, authorityFile) {
     useProfile(profile);
     copyFileSync(running.authority, authorityFile);
     console.log(`\nServing with profile ${profile}, until Ctrl-C:\n\n  ${running.origin}/\n`);
-    console.log(`The browser has to trust this authority, made for this run:\n\n  ${authorityFile}\n\nUsers:\n`);
+    console.log(`The browser has to trust this authority, made for this run:\n\n  ${authorityFile}\n`);
+    console.log(`or else, with Chromium or Chrome, in a profile of its own:\n`);
+    console.log(`  chromium --user-data-dir="$(mktemp -d)" ${running.chromiumTrust} ${running.origin}/\n\nUsers:\n`);
     for (const [login, {password, uniqueName}] of running.users) {
         console.log(`  ${login.padEnd(6)} password ${password}  (${uniqueName})`);
     }

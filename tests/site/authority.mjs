@@ -1,5 +1,6 @@
 // A certificate authority for one run.
 import {execFileSync} from 'node:child_process';
+import {createHash, X509Certificate} from 'node:crypto';
 import {readFileSync, writeFileSync} from 'node:fs';
 import path from 'node:path';
 
@@ -7,6 +8,12 @@ const EXTENSIONS = {
     authority: 'basicConstraints = critical, CA:TRUE\nkeyUsage = critical, keyCertSign',
     server: 'basicConstraints = critical, CA:FALSE\nextendedKeyUsage = serverAuth',
 };
+
+// Of its public key: Chromium trusts a server by it.
+function fingerprint(certificate) {
+    const key = new X509Certificate(certificate).publicKey.export({type: 'spki', format: 'der'});
+    return createHash('sha256').update(key).digest('base64');
+}
 
 /** Makes the authority in `folder`; gives its file and what issues a server's certificate for "DNS:..." or "IP:...". */
 export function makeAuthority(folder) {
@@ -27,7 +34,8 @@ export function makeAuthority(folder) {
         issue(name, subject) {
             const issuer = ['-CA', authority.certFile, '-CAkey', authority.keyFile];
             const files = make(name, `${EXTENSIONS.server}\nsubjectAltName = ${subject}`, ...issuer);
-            return {...files, key: readFileSync(files.keyFile), cert: readFileSync(files.certFile)};
+            const cert = readFileSync(files.certFile);
+            return {...files, key: readFileSync(files.keyFile), cert, fingerprint: fingerprint(cert)};
         },
     };
 }

@@ -27,7 +27,10 @@ function makeClients(origin, tenant) {
     ];
 }
 
-/** `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. */
+/**
+ * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it gives,
+ * `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
+ */
 export async function startSite({webroot, nodeModules, users, onRequest, onLog}) {
     const folder = mkdtempSync('/tmp/site-');
     const authority = makeAuthority(folder);
@@ -39,6 +42,7 @@ export async function startSite({webroot, nodeModules, users, onRequest, onLog})
     const clients = makeClients(origin, tenant);
     const providerCertificate = authority.issue('provider', 'IP:127.0.0.1');
     const applianceCertificate = authority.issue('appliance', 'DNS:localhost');
+    const fingerprints = [providerCertificate, applianceCertificate].map(({fingerprint}) => fingerprint);
     const startAnotherProvider = () =>
         startProvider({nodeModules, tenant, clients, users, certificate: providerCertificate, report: onRequest});
 
@@ -53,7 +57,7 @@ export async function startSite({webroot, nodeModules, users, onRequest, onLog})
         clients,
         provider,
         providerCertificate,
-        applianceCertificate,
+        chromiumTrust: `--ignore-certificate-errors-spki-list=${fingerprints}`,
         authority: authority.file,
         folder,
         log,
