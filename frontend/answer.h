@@ -13,6 +13,9 @@ class Answer {
     void ExpireCookie(const std::string &name);
     void AddHeader(const std::string &name, const std::string &value);
 
+    /// The page that the user is on the way to: after a failure they can try again from there.
+    std::string origin;
+
     void Redirect(const std::string &address);
     /// `content` is HTML; `title` is not.
     void Page(const std::string &status, const std::string &title, const std::string &content);

@@ -13,8 +13,11 @@ namespace {
 
 void Fail(Answer &answer, const std::string &reason) {
     syslog(LOG_AUTH | LOG_WARNING, "frontend: sign-in failed: %s", reason.c_str());
-    // The relay address takes the reason as it stands.
-    const std::string encoded = TAVO::SSO::URLEncode(reason);
+    // The relay address takes the reason as it stands, and so takes more than a reason.
+    std::string encoded = TAVO::SSO::URLEncode(reason);
+    if (!answer.origin.empty()) {
+        encoded += "&origin=" + TAVO::SSO::URLEncode(answer.origin);
+    }
     answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(false, "", encoded));
 }
 

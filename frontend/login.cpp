@@ -3,21 +3,22 @@
 #include "frontend/failure.h"
 #include "frontend/pending_login.h"
 #include "frontend/profile.h"
+#include "frontend/text.h"
 
 namespace {
 
 void GoToProvider(Frontend::Answer &answer) {
+    const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
+    answer.origin = Frontend::SafeOrigin(Frontend::OnlyValue(parameters, "origin").value_or(""));
     const std::string profile = Frontend::ProfileInForce();
     if (Frontend::HowFarSetUp() != Frontend::SetUp::kComplete) {
         throw Frontend::Refusal("Single sign-on is not completely set up on this device.");
     }
-    const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
-    const std::string origin = Frontend::OnlyValue(parameters, "origin").value_or("");
     // Not `RedirectAuthEndpoint`, which writes the address at once: the state in it is to be remembered.
     const auto makeAddress = [&](const Json::Value &state) {
         return Frontend::WithClient(profile, [&](auto &client) { return client.GetAccessTokenReqURI(state); });
     };
-    answer.Redirect(Frontend::StartLogin(answer, origin, makeAddress));
+    answer.Redirect(Frontend::StartLogin(answer, makeAddress));
 }
 
 }  // namespace

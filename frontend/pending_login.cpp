@@ -25,11 +25,10 @@ std::string StateIn(const std::string &address) {
 
 }  // namespace
 
-std::string StartLogin(Answer &answer, const std::string &origin,
-                       const std::function<std::string(const Json::Value &)> &makeAddress) {
+std::string StartLogin(Answer &answer, const std::function<std::string(const Json::Value &)> &makeAddress) {
     const std::string login = PrivateFolder::NewName();
     Json::Value state;
-    state["origin"] = SafeOrigin(origin);
+    state["origin"] = SafeOrigin(answer.origin);
     state["csrf"] = login;
     std::string address = makeAddress(state);
     PrivateFolder(kFolder, kSeconds).Keep(login, StateIn(address));
@@ -53,6 +52,7 @@ Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std:
     if (state != *started) {
         throw Refusal("This sign-in was changed on its way.");
     }
+    answer.origin = StringMember(returned, "origin");
     return returned;
 }
 

@@ -17,13 +17,14 @@
  */
 namespace Frontend {
 
-/// Starts a login. `makeAddress` makes the provider's address from the state's object, as `GetAccessTokenReqURI` of the
-/// clients does; gives that address. The state in it is remembered as it stands.
-std::string StartLogin(Answer &answer, const std::string &origin,
-                       const std::function<std::string(const Json::Value &)> &makeAddress);
+/// Starts a login, to come back to the answer's origin. `makeAddress` makes the provider's address from the state's
+/// object, as `GetAccessTokenReqURI` of the clients does; gives that address. The state in it is remembered as it
+/// stands.
+std::string StartLogin(Answer &answer, const std::function<std::string(const Json::Value &)> &makeAddress);
 
 /// Throws `Refusal` unless this browser started the login that `state` (as it came back) belongs to, not long ago, has
-/// not come back from it before, and brings the state unchanged. Gives the state's object.
+/// not come back from it before, and brings the state unchanged. Gives the state's object, and its origin to the
+/// answer.
 Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state);
 
 /// The JSON object that the state holds, null where it holds none.

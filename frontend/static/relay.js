@@ -3,7 +3,7 @@
 import {explain} from './reasons.js';
 
 const START_PAGE = '/index.cgi';
-const SIGN_IN = '/webman/sso/login.cgi?origin=%2Findex.cgi';
+const SIGN_IN = '/webman/sso/login.cgi?origin=';
 const LONGEST_REASON = 200;
 const LONGEST_ORIGIN = 512;
 // A path, not a host ("//") and nothing that a browser would turn into one (backslashes, control characters).
@@ -22,14 +22,14 @@ function describeSuccess(origin) {
     };
 }
 
-function describeFailure(reason) {
+function describeFailure(reason, origin) {
     const shown = reason.slice(0, LONGEST_REASON);
     return {
         headline: 'You could not be signed in',
         explanation: explain(shown),
         reason: shown,
         action: 'Try again',
-        onward: SIGN_IN,
+        onward: SIGN_IN + encodeURIComponent(ownPath(origin)),
         atOnce: false,
     };
 }
@@ -48,11 +48,12 @@ function describeLogout() {
 /** What to show for a fragment ("#..."), and where to go on to: at once where nothing has to be read. */
 export function describe(fragment) {
     const values = new URLSearchParams(fragment.replace(/^#/, ''));
+    const origin = values.get('origin') ?? '';
     switch (values.get('success')) {
         case 'true':
-            return describeSuccess(values.get('origin') ?? '');
+            return describeSuccess(origin);
         case 'false':
-            return describeFailure(values.get('reason') ?? '');
+            return describeFailure(values.get('reason') ?? '', origin);
         default:
             return describeLogout();
     }

@@ -16,7 +16,9 @@ export function defineFailures(stage) {
     }));
 
     it('is explained when the user does not consent, and can be tried again', () => stage.visit(async (visitor) => {
-        await visitor.tryToSignIn('dora');
+        await visitor.open('/account.cgi');
+        await visitor.followSignIn();
+        await visitor.giveNameAndPassword('dora');
         await visitor.seesHeading('May the appliance know who you are?');
         await visitor.press('Cancel');
         await visitor.seesFailure(/The sign-in was cancelled/);
@@ -24,7 +26,7 @@ export function defineFailures(stage) {
         await visitor.page.getByRole('link', {name: 'Try again', exact: true}).click();
         await visitor.seesHeading('May the appliance know who you are?');
         await visitor.press('Allow');
-        await visitor.seesHeading('Welcome');
+        await visitor.seesHeading('Your account');
     }));
 
     it("is explained when the user's domain is not known", () => stage.visit(async (visitor) => {

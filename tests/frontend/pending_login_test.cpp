@@ -31,7 +31,8 @@ class PendingLogin : public testing::Test {
   protected:
     PendingLogin() {
         std::filesystem::create_directory("/usr/tavo/var");
-        const std::string address = StartLogin(answer, "/files", MakeAddress);
+        answer.origin = "/files";
+        const std::string address = StartLogin(answer, MakeAddress);
         state = OnlyValue(ParseQuery(address.substr(address.find('?') + 1)), "state").value();
     }
     ~PendingLogin() override { std::filesystem::remove_all("/usr/tavo/var"); }

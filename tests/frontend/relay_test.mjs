@@ -34,9 +34,16 @@ test('leads back to a path on this site', () => {
     }
 });
 
-test('never leads to an origin after a failure', () => {
-    for (const origin of [...foreign, ...own]) {
-        assert.match(after({origin, success: 'false'}).onward, /^\/webman\/sso\/login\.cgi\?origin=%2Findex\.cgi$/);
+test('tries again, after a failure, with an origin on this site', () => {
+    const tryAgain = (origin) => new URL(after({origin, success: 'false'}).onward, SITE);
+    const signIn = `${SITE}/webman/sso/login.cgi`;
+    for (const origin of foreign) {
+        assert.equal(tryAgain(origin).href, `${signIn}?origin=%2Findex.cgi`);
+    }
+    for (const origin of own) {
+        const {href, searchParams} = tryAgain(origin);
+        assert.ok(href.startsWith(`${signIn}?`));
+        assert.deepEqual([...searchParams], [['origin', origin]]);
     }
 });
 
