@@ -53,8 +53,7 @@ class Stage {
     }
 
     /** Whether an address is the appliance's or, all of them having one host, a provider's. */
-    isOfTheSite(address) {
-        const url = new URL(address);
+    isOfTheSite(url) {
         return url.protocol === 'data:' || url.origin === this.origin || url.hostname === '127.0.0.1';
     }
 
@@ -65,7 +64,7 @@ class Stage {
 
     /**
      * Lets visitors with a browser context of their own act, then holds against each that the pages logged an error or
-     * asked another site for something. `options` are Playwright's, and `expects`, a pattern of errors that belong to
+     * asked another site for something, or that the appliance logged a code. `options` are Playwright's, and `expects`, a pattern of errors that belong to
      * the test.
      */
     async visit(act, options = {}) {
@@ -75,10 +74,16 @@ class Stage {
         }
         try {
             await act(...visitors);
-            visitors.forEach((visitor) => assert.deepEqual(visitor.complaints, []));
+            visitors.forEach((visitor) => this.#holdAgainst(visitor));
         } finally {
             await Promise.all(visitors.map((visitor) => visitor.leave()));
         }
+    }
+
+    #holdAgainst({complaints, codes}) {
+        assert.deepEqual(complaints, []);
+        const told = [...codes].filter((code) => this.logged.some((line) => line.includes(code)));
+        assert.equal(told.length, 0, 'a code was logged');
     }
 
     async stop() {

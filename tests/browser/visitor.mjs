@@ -7,6 +7,8 @@ export const RELAY_PAGE = '/webman/ssoclient/relay.html';
 
 export class Visitor {
     complaints = [];
+    /** The codes with which the browser came back. */
+    codes = new Set();
 
     static async arrive(stage, {expects, ...options}) {
         const context = await stage.browser.newContext({locale: 'en', ...options});
@@ -27,8 +29,15 @@ export class Visitor {
                 this.complaints.push(text);
             }
         };
-        const isKnown = (url) => this.stage.isOfTheSite(url);
-        this.context.on('request', (request) => isKnown(request.url()) || complain(`asked for ${request.url()}`));
+        this.context.on('request', (request) => {
+            const url = new URL(request.url());
+            if (!this.stage.isOfTheSite(url)) {
+                complain(`asked for ${url}`);
+            }
+            if (url.pathname === RETURN_PAGE && url.searchParams.get('code')) {
+                this.codes.add(url.searchParams.get('code'));
+            }
+        });
         this.context.on('console', (message) => message.type() === 'error' && complain(message.text()));
         this.context.on('weberror', (error) => complain(String(error.error())));
         this.context.on('dialog', (dialog) => {
