@@ -3,7 +3,7 @@
 import assert from 'node:assert/strict';
 import {copyFileSync, readFileSync, rmSync} from 'node:fs';
 
-import {useProfile} from '../site/appliance.mjs';
+import {useProfile, writeSettings} from '../site/appliance.mjs';
 import {makeUsers, startSite} from '../site/site.mjs';
 import {Report} from './report.mjs';
 import {Walk} from './walk.mjs';
@@ -80,6 +80,15 @@ async function walkWebsphere(walk, report) {
     return user;
 }
 
+async function walkReadmeProgram(walk, report, {provider, clients}) {
+    writeSettings({provider, clients: clients.map((client) => ({...client, redirectURI: client.otherRedirectURI}))});
+    for (const [profile, login, name] of [['azure', 'alice', 'ACME\\alice'], ['websphere', 'bob', 'bob']]) {
+        useProfile(profile);
+        report.title(`Profile ${profile}: ${login} signs in through the program of the README`);
+        assert.equal(await walk.signInThroughReadmeProgram(walk.newBrowser(), login), name);
+    }
+}
+
 async function walkEverything(running) {
     const {report} = running;
     const walk = new Walk({
@@ -93,6 +102,7 @@ async function walkEverything(running) {
     });
     const azureUser = await walkAzure(walk, report);
     const websphereUser = await walkWebsphere(walk, report);
+    await walkReadmeProgram(walk, report, running);
     report.title('Every step was as it should be. Signed in through a real OpenID provider:');
     report.fact(`azure      ${azureUser}`);
     report.fact(`websphere  ${websphereUser}`);

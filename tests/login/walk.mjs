@@ -7,6 +7,7 @@ const START_PAGE = '/index.cgi';
 const RELAY_PAGE = '/webman/ssoclient/relay.html';
 const RETURN_PAGE = '/webman/sso/return.cgi';
 const AUTHORIZATION_PARAMETERS = ['client_id', 'nonce', 'redirect_uri', 'response_type', 'scope', 'state'];
+const README_PROGRAM = '/webman/sso/sso.cgi';
 const COOKIE = /^__Host-[\w-]+=[0-9a-f]*; Path=\/; Secure; HttpOnly; SameSite=Lax(; Max-Age=\d+)?$/;
 
 export class Walk {
@@ -21,7 +22,7 @@ export class Walk {
     newBrowser() {
         return new Browser(this.authority, (exchange) => {
             this.report.browserAsked(exchange);
-            if (exchange.url.origin === this.origin) {
+            if (exchange.url.origin === this.origin && exchange.url.pathname !== README_PROGRAM) {
                 this.#checkApplianceAnswer(exchange.answer);
             }
         });
@@ -36,6 +37,17 @@ export class Walk {
         await this.log.until(/^return\.cgi: frontend: signed in: /);
         assert.equal(this.#tokenRequests(), 1);
         return this.userOf(browser);
+    }
+
+    /** The same through the program of the README, which opens no session: the log tells the name. */
+    async signInThroughReadmeProgram(browser, login) {
+        const form = await browser.open(this.origin + README_PROGRAM);
+        const relay = await browser.submit(form, {login, password: this.passwords.get(login)});
+        const view = await this.#runRelayScript(browser, relay);
+        assert.equal(view.headline, 'You are signed in');
+        const line = await this.log.until(/^sso\.cgi: signed in: /);
+        assert.equal(this.#tokenRequests(), 1);
+        return line.replace('sso.cgi: signed in: ', '');
     }
 
     /** The user whom the start page names. */
@@ -136,8 +148,8 @@ export class Walk {
         const source = /<script type="module" src="([^"]+)"><\/script>/.exec(page.text)[1];
         const {describe} = await import(await this.#fetchModule(browser, new URL(source, page.url)));
         const view = describe(page.url.hash);
-        const told = [view.headline, view.reason].filter(Boolean).join(': ');
-        this.report.fact(`the relay page says "${told}" and leads to ${view.onward}`);
+        const details = view.reason && `, in its details "${view.reason}"`;
+        this.report.fact(`the relay page says "${view.headline}. ${view.explanation}"${details}; it leads to ${view.onward}`);
         return view;
     }
 

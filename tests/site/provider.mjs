@@ -14,11 +14,11 @@ function signingKeys() {
     return {keys: [{...privateKey.export({format: 'jwk'}), kid: randomBytes(8).toString('hex'), use: 'sig'}]};
 }
 
-function registration({id, secret, algorithm, redirectURI, logoutURI}) {
+function registration({id, secret, algorithm, redirectURI, otherRedirectURI, logoutURI}) {
     return {
         client_id: id,
         client_secret: secret,
-        redirect_uris: [redirectURI],
+        redirect_uris: [redirectURI, otherRedirectURI],
         post_logout_redirect_uris: [logoutURI],
         grant_types: ['authorization_code'],
         response_types: ['code'],

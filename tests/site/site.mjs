@@ -20,7 +20,11 @@ export function makeUsers(named) {
 }
 
 function makeClients(origin, tenant) {
-    const common = {redirectURI: `${origin}/webman/sso/return.cgi`, logoutURI: `${origin}/webman/ssoclient/relay.html`};
+    const common = {
+        redirectURI: `${origin}/webman/sso/return.cgi`,
+        otherRedirectURI: `${origin}/webman/sso/sso.cgi`, // the program of the README
+        logoutURI: `${origin}/webman/ssoclient/relay.html`,
+    };
     return [
         {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant, ...common},
         {id: 'appliance-websphere', secret: randomSecret(), algorithm: 'HS256', ...common},
