@@ -6,7 +6,8 @@ namespace {
 
 bool IsSupported(const std::string &profile) { return profile == "azure" || profile == "websphere"; }
 
-// Without any of these a login is certain to fail, some only after the user has typed a password.
+// Without any of these a login is certain to fail, some only after the user has typed a password. The tenant, of which
+// the same is true, is not told by the client.
 bool HasAllSettings(const std::string &profile, TAVO::SSO::SSOClient &client) {
     return !client.GetClientID().empty() && !client.GetClientSecret().empty() && !client.GetRedirectURI().empty() &&
            !client.GetAuthEndpoint().empty() && !client.GetTokenEndpoint().empty() &&

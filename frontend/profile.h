@@ -13,7 +13,8 @@ enum class SetUp { kOff, kIncomplete, kComplete };
 /// Whether users can sign in, for pages that offer it.
 SetUp HowFarSetUp();
 
-/// The profile's name. Refuses where `OIDCLogin` does, with the same exceptions: a profile that is off or unknown.
+/// The profile's name. Refuses where `OIDCLogin` does: "sso does not enable." for a profile that is off or cannot be
+/// read, "profile not support." for one that is missing or unknown.
 std::string ProfileInForce();
 
 /// Runs `use` on a fresh client of the profile.

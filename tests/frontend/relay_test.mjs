@@ -58,6 +58,13 @@ test('explains the reasons that it knows and cuts those that are too long', () =
     assert.equal(after({success: 'false'}).reason, '');
 });
 
+test('explains an unknown algorithm whatever the token calls it', () => {
+    for (const name of ['none', 'HS256', '', 'an odd one']) {
+        const {explanation} = after({success: 'false', reason: `${name} algorithm is not supported`});
+        assert.match(explanation, /^This device could not verify/, name);
+    }
+});
+
 test("explains every exception's text that the guide lists", () => {
     const guide = readFileSync(new URL('../../docs/integration.md', import.meta.url), 'utf8');
     const table = /\n## What an exception means\n(.*?)\n## /s.exec(guide)[1];
