@@ -146,8 +146,8 @@ void AzureSSOClient::RequestKeysInfo(std::string uri, Json::Value &keys) {
     } catch (const sso_err_resp &error) {
         syslog(LOG_ERR, "%s:%d request wellknown uri %s.", SOURCE_LINE, error.what());
     }
-    // Once more than it was initialised, as the interface tells: a host that has initialised libcurl for itself must do
-    // so again, and those that exist do.
+    // Once more than it was initialised, as the interface tells: a host that has initialised libcurl for itself has to
+    // do so again.
     curl_global_cleanup();
 }
 

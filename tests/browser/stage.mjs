@@ -64,8 +64,8 @@ class Stage {
 
     /**
      * Lets visitors with a browser context of their own act, then holds against each that the pages logged an error or
-     * asked another site for something, or that the appliance logged a code. `options` are Playwright's, and `expects`, a pattern of errors that belong to
-     * the test.
+     * asked another site for something, or that the appliance logged a code. `options` are Playwright's, and `expects`,
+     * a pattern of errors that belong to the test.
      */
     async visit(act, options = {}) {
         const visitors = [];

@@ -34,13 +34,11 @@ constexpr Profile kBoth[] = {Profile::kAzure, Profile::kWebSphere};
 
 std::string BodyOf(const std::string &request) { return request.substr(request.find("\r\n\r\n") + 4); }
 
-LogLine Logged(const std::string &text) { return {LOG_ERR, text}; }
-
 LogLine TokenRequestLogged(CURLcode result) {
-    return Logged(std::string("sso:N request token uri ") + curl_easy_strerror(result) + ".");
+    return Error(std::string("sso:N request token uri ") + curl_easy_strerror(result) + ".");
 }
 
-LogLine KeyRequestLogged(const std::string &text) { return Logged("azuresso:N request wellknown uri " + text + "."); }
+LogLine KeyRequestLogged(const std::string &text) { return Error("azuresso:N request wellknown uri " + text + "."); }
 
 LogLine KeyRequestLogged(CURLcode result) { return KeyRequestLogged(curl_easy_strerror(result)); }
 
@@ -103,7 +101,7 @@ struct TokenCase {
     TokenCase &SignedUnder(const std::string &otherSecret) { return secret = otherSecret, *this; }
     TokenCase &Then(const std::function<std::string(const std::string &)> &change) { return damage = change, *this; }
     TokenCase &BeforeAnyKeyIsFetched() { return fetchesKeys = false, *this; }
-    TokenCase &Logs(const std::string &text) { return log.push_back(Logged(text)), *this; }
+    TokenCase &Logs(const std::string &text) { return log.push_back(Error(text)), *this; }
 
     std::string name;
     Profile profile;
@@ -437,8 +435,8 @@ std::vector<DocumentCase> Documents() {
     const Outcome loggedIn = LoggedIn(UserName(Profile::kAzure));
     const LogLine noURL = KeyRequestLogged(CURLE_URL_MALFORMAT);
     const LogLine notJSON = KeyRequestLogged("bad wellknown json format.");
-    const LogLine badDiscovery = Logged("sso:N bad wellknown json format.");
-    const LogLine noKeys = Logged("azuresso:N no kyes information");
+    const LogLine badDiscovery = Error("sso:N bad wellknown json format.");
+    const LogLine noKeys = Error("azuresso:N no kyes information");
 
     std::vector<DocumentCase> rows;
     const auto discovery = [&](const char *name, const std::string &document, const std::vector<LogLine> &log) {
@@ -487,7 +485,7 @@ std::vector<DocumentCase> Documents() {
            [] {
                return KeySetOf({ForeignKey(), ProviderKey().JWK(kKeyID)});
            },
-           Refused<jwt_verify_failed>("verify rsa signature failed"), {Logged("jwt:N EVP_DigestVerifyFinal failed")});
+           Refused<jwt_verify_failed>("verify rsa signature failed"), {Error("jwt:N EVP_DigestVerifyFinal failed")});
     return rows;
 }
 
@@ -507,7 +505,7 @@ TEST_F(AzureProvider, WhoseDiscoveryCannotBeReachedRefusesTheLogin) {
                       R"({"azure_wellknown": "https://127.0.0.1:)" + std::to_string(nobody.number()) + "\"}");
     provider.AnswerLogin(Token());
     EXPECT_EQ(provider.LogIn(), unknownKey_);
-    EXPECT_THAT(TakeSystemLog(), ElementsAre(Logged(std::string("sso:N ") + curl_easy_strerror(CURLE_COULDNT_CONNECT)),
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(std::string("sso:N ") + curl_easy_strerror(CURLE_COULDNT_CONNECT)),
                                              KeyRequestLogged(CURLE_URL_MALFORMAT)));
     EXPECT_THAT(provider.RequestLines(), ElementsAre("POST /token HTTP/1.1"));
 }

@@ -1,7 +1,5 @@
 #include "tests/support/system_log.h"
 
-#include <syslog.h>
-
 #include <cerrno>
 #include <cstdarg>
 #include <cstdio>
@@ -25,6 +23,8 @@ bool operator==(const LogLine &a, const LogLine &b) { return a.priority == b.pri
 std::ostream &operator<<(std::ostream &stream, const LogLine &line) {
     return stream << "<" << line.priority << "> " << line.text;
 }
+
+LogLine Error(const std::string &text) { return {LOG_ERR, text}; }
 
 std::vector<LogLine> TakeSystemLog() {
     std::vector<LogLine> taken;

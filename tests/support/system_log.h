@@ -1,6 +1,8 @@
 #ifndef TAVOSSO_TESTS_SUPPORT_SYSTEM_LOG_H
 #define TAVOSSO_TESTS_SUPPORT_SYSTEM_LOG_H
 
+#include <syslog.h>
+
 #include <iosfwd>
 #include <string>
 #include <vector>
@@ -15,6 +17,9 @@ struct LogLine {
 
 bool operator==(const LogLine &a, const LogLine &b);
 std::ostream &operator<<(std::ostream &stream, const LogLine &line);
+
+/// A line at LOG_ERR.
+LogLine Error(const std::string &text);
 
 /// Every line so far, and no more of them.
 std::vector<LogLine> TakeSystemLog();

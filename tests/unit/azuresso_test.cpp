@@ -8,6 +8,7 @@
 #include "tests/unit/platform_calls.h"
 #include "tests/unit/process.h"
 #include "tests/unit/transport.h"
+#include "tests/unit/user_identity.h"
 
 namespace Test {
 
@@ -158,7 +159,7 @@ class AzureVerification : public Library {
     Json::Value keySet;
 };
 
-const Failure kVerified{"nothing thrown", ""};
+const Failure &kVerified = kNothingThrown;
 const auto kExpired = Fails<std::invalid_argument>("id_token expired.");
 const auto kWrongTenant = Fails<std::invalid_argument>("tenant ID invalid");
 const auto kWrongAudience = Fails<std::invalid_argument>("client ID invalid");
@@ -481,23 +482,15 @@ TEST_F(AzureKeySet, WithoutATransferHandleItIsOneLine) {
     EXPECT_THAT(log[0].text, testing::StartsWith("azuresso:N curl_easy_init failed. "));
 }
 
-class AzureIdentity : public Library {
+class AzureIdentity : public Identity<AzureClient> {
   protected:
     void SetUp() override {
         Library::SetUp();
         WriteFile(kDomainTable, R"({"corp.example.net": "ACME"})");
     }
-
-    Failure NameOf(const std::string &claims) {
-        client.token = "e30." + Base64Url(claims) + ".";
-        return FailureOf([this] { client.GetUserName(userName); });
-    }
-
-    AzureClient client;
-    std::string userName = "before";
 };
 
-const Failure kNamed{"nothing thrown", ""};
+const Failure &kNamed = kNothingThrown;
 
 TEST_F(AzureIdentity, TheNameIsNetBIOSDomainBackslashUser) {
     EXPECT_EQ(NameOf(R"({"unique_name": "alice@corp.example.net"})"), kNamed);

@@ -3,7 +3,6 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <syslog.h>
 
 #include <string>
 #include <typeinfo>
@@ -22,13 +21,13 @@ class Library : public testing::Test {
     void TearDown() override;
 };
 
-inline LogLine Error(const std::string &text) { return {LOG_ERR, text}; }
-
 /// What a call throws: exactly this class, exactly this text.
 struct Failure {
     std::string type;
     std::string text;
 };
+
+inline const Failure kNothingThrown{"nothing thrown", ""};
 
 bool operator==(const Failure &a, const Failure &b);
 std::ostream &operator<<(std::ostream &stream, const Failure &failure);
@@ -45,7 +44,7 @@ Failure FailureOf(Function function) {
     } catch (const std::exception &error) {
         return {typeid(error).name(), error.what()};
     }
-    return {"nothing thrown", ""};
+    return kNothingThrown;
 }
 
 }  // namespace Test

@@ -25,7 +25,7 @@ const auto kBadHeader = Fails<std::invalid_argument>("bad jwt header format!");
 const auto kBadBody = Fails<std::invalid_argument>("bad jwt body format!");
 const auto kRSAFailed = Fails<jwt_verify_failed>("verify rsa signature failed");
 const auto kHMACFailed = Fails<jwt_verify_failed>("verify hmac signature failed");
-const Failure kVerified{"nothing thrown", ""};
+const Failure &kVerified = kNothingThrown;
 
 /// The error queue of the host program.
 std::vector<unsigned long> ErrorQueue() {

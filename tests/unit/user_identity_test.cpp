@@ -1,29 +1,25 @@
 // What both clients say of the user, as far as they are alike.
-#include "tests/support/token.h"
-#include "tests/unit/clients.h"
-#include "tests/unit/fixture.h"
+#include "tests/unit/user_identity.h"
 
 namespace Test {
 
 namespace {
 
 template <typename Client>
-class UserIdentity : public Library {
+class UserIdentity : public Identity<Client> {
   protected:
     /// What asking for the name and asking for all claims throw for this token.
     std::vector<Failure> FailuresOf(const std::string &token) {
-        client.token = token;
-        return {FailureOf([this] { client.GetUserName(userName); }), FailureOf([this] { client.GetUserInfo(info); })};
+        const Failure nameFailure = this->NameIn(token);
+        return {nameFailure, FailureOf([this] { this->client.GetUserInfo(info); })};
     }
 
     void TearDown() override {
-        EXPECT_EQ(userName, "before");
+        EXPECT_EQ(this->userName, "before");
         EXPECT_EQ(info, "before");
         Library::TearDown();
     }
 
-    Client client;
-    std::string userName = "before";
     Json::Value info = "before";
 };
 

@@ -6,6 +6,7 @@
 #include "tests/unit/platform_calls.h"
 #include "tests/unit/process.h"
 #include "tests/unit/transport.h"
+#include "tests/unit/user_identity.h"
 
 namespace Test {
 
@@ -93,7 +94,7 @@ TEST_F(WebSphereTokenResponse, AnErrorBesideATokenIsIgnored) {
 }
 
 constexpr std::time_t kNow = 1700000000;
-const Failure kVerified{"nothing thrown", ""};
+const Failure &kVerified = kNothingThrown;
 const auto kExpired = Fails<std::invalid_argument>("id_token expired.");
 const auto kWrongAudience = Fails<std::invalid_argument>("client ID invalid");
 const auto kNotEncoded = Fails<sso_op_failed>("encode base64 failed.");
@@ -264,18 +265,9 @@ TEST_F(WebSphereVerification, ATokenWithAKidNeedsNoKeySet) {
     EXPECT_EQ(Verify(), kVerified);
 }
 
-class WebSphereIdentity : public Library {
-  protected:
-    Failure NameOf(const std::string &claims) {
-        client.token = "e30." + Base64Url(claims) + ".";
-        return FailureOf([this] { client.GetUserName(userName); });
-    }
+class WebSphereIdentity : public Identity<WebSphereClient> {};
 
-    WebSphereClient client;
-    std::string userName = "before";
-};
-
-const Failure kNamed{"nothing thrown", ""};
+const Failure &kNamed = kNothingThrown;
 
 TEST_F(WebSphereIdentity, TheNameIsTheSubjectUnchangedAndEmailIsNotConsulted) {
     EXPECT_EQ(NameOf(R"({"sub": " Alice@Corp ", "email": "bob@corp.example.net"})"), kNamed);
