@@ -3,12 +3,12 @@
 #include <regex>
 #include <sstream>
 
+#include "tests/interposed/calls.h"
+#include "tests/interposed/platform_calls.h"
+#include "tests/interposed/process.h"
 #include "tests/support/token.h"
-#include "tests/unit/calls.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/platform_calls.h"
-#include "tests/unit/process.h"
 
 namespace Test {
 

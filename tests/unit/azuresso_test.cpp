@@ -1,13 +1,13 @@
 #include <locale>
 
 #include "jwt/jwt.h"
+#include "tests/interposed/platform_calls.h"
+#include "tests/interposed/process.h"
+#include "tests/interposed/transport.h"
 #include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/platform_calls.h"
-#include "tests/unit/process.h"
-#include "tests/unit/transport.h"
 #include "tests/unit/user_identity.h"
 
 namespace Test {

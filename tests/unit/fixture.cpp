@@ -2,10 +2,10 @@
 
 #include <ostream>
 
-#include "tests/unit/calls.h"
-#include "tests/unit/platform_calls.h"
-#include "tests/unit/process.h"
-#include "tests/unit/transport.h"
+#include "tests/interposed/calls.h"
+#include "tests/interposed/platform_calls.h"
+#include "tests/interposed/process.h"
+#include "tests/interposed/transport.h"
 
 namespace Test {
 

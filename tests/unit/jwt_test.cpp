@@ -7,9 +7,9 @@
 #include <fstream>
 #include <sstream>
 
+#include "tests/interposed/calls.h"
 #include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
-#include "tests/unit/calls.h"
 #include "tests/unit/fixture.h"
 
 namespace Test {

@@ -2,11 +2,11 @@
 #include <openssl/evp.h>
 
 #include "sso/sso.h"
+#include "tests/interposed/platform_calls.h"
+#include "tests/interposed/process.h"
+#include "tests/interposed/transport.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/platform_calls.h"
-#include "tests/unit/process.h"
-#include "tests/unit/transport.h"
 
 namespace Test {
 

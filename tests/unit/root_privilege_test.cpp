@@ -4,10 +4,10 @@
 #include <new>
 
 #include "sso/sso.h"
+#include "tests/interposed/calls.h"
+#include "tests/interposed/process.h"
 #include "tests/support/memory_limit.h"
-#include "tests/unit/calls.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/process.h"
 
 namespace Test {
 

@@ -3,11 +3,11 @@
 
 #include <new>
 
+#include "tests/interposed/calls.h"
+#include "tests/interposed/transport.h"
 #include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
-#include "tests/unit/calls.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/transport.h"
 
 namespace Test {
 

@@ -5,11 +5,11 @@
 #include <new>
 
 #include "sso/sso.h"
-#include "tests/unit/calls.h"
+#include "tests/interposed/calls.h"
+#include "tests/interposed/platform_calls.h"
+#include "tests/interposed/process.h"
+#include "tests/interposed/transport.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/platform_calls.h"
-#include "tests/unit/process.h"
-#include "tests/unit/transport.h"
 
 namespace Test {
 

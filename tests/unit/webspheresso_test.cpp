@@ -1,11 +1,11 @@
 #include "jwt/jwt.h"
+#include "tests/interposed/calls.h"
+#include "tests/interposed/platform_calls.h"
+#include "tests/interposed/process.h"
+#include "tests/interposed/transport.h"
 #include "tests/support/token.h"
-#include "tests/unit/calls.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
-#include "tests/unit/platform_calls.h"
-#include "tests/unit/process.h"
-#include "tests/unit/transport.h"
 #include "tests/unit/user_identity.h"
 
 namespace Test {

@@ -1,7 +1,7 @@
-#include "tests/unit/platform_calls.h"
+#include "tests/interposed/platform_calls.h"
 
 #include "platform/platform.h"
-#include "tests/unit/calls.h"
+#include "tests/interposed/calls.h"
 
 namespace Test {
 

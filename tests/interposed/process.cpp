@@ -1,4 +1,4 @@
-#include "tests/unit/process.h"
+#include "tests/interposed/process.h"
 
 #include <sys/random.h>
 #include <unistd.h>
@@ -8,7 +8,7 @@
 #include <cstdlib>
 #include <optional>
 
-#include "tests/unit/calls.h"
+#include "tests/interposed/calls.h"
 
 namespace Test {
 

@@ -1,4 +1,4 @@
-#include "tests/unit/calls.h"
+#include "tests/interposed/calls.h"
 
 #include <openssl/err.h>
 

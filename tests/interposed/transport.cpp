@@ -1,4 +1,4 @@
-#include "tests/unit/transport.h"
+#include "tests/interposed/transport.h"
 
 #include <cerrno>
 #include <cstdarg>

@@ -8,7 +8,7 @@
 #include <openssl/md5.h>
 #include <openssl/rsa.h>
 
-#include "tests/unit/calls.h"
+#include "tests/interposed/calls.h"
 
 using Test::Next;
 using Test::PassOn;
