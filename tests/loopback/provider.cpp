@@ -121,6 +121,8 @@ void Provider::Answer(const std::string &body) { server_.Answer(HTTPAnswer(WithB
 
 void Provider::AnswerByteByByte(const std::string &answer) { server_.Answer(answer); }
 
+void Provider::Play(const Script &script) { server_.Play(script); }
+
 void Provider::AnswerVerification() {
     if (profile_ == Profile::kAzure) {
         Answer(R"({"jwks_uri": "$BASE/keys"})");

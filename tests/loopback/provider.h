@@ -69,6 +69,7 @@ class Provider {
 
     void Answer(const std::string &body);
     void AnswerByteByByte(const std::string &answer);
+    void Play(const Script &script);
 
     /// Discovery document and key set, where this provider has them.
     void AnswerVerification();

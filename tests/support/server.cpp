@@ -19,11 +19,6 @@ namespace {
 
 constexpr char kEndOfHeader[] = "\r\n\r\n";
 
-struct ReleaseBIO {
-    void operator()(BIO *chain) const { BIO_free_all(chain); }  // says goodbye where it is TLS, and closes the socket
-};
-using BIOPointer = std::unique_ptr<BIO, ReleaseBIO>;
-
 void Require(bool condition, const char *what) {
     if (!condition) {
         throw std::runtime_error(what);
@@ -34,25 +29,6 @@ std::size_t BodyLength(const std::string &header) {
     constexpr char kField[] = "\r\nContent-Length: ";
     const std::size_t field = header.find(kField);
     return field == std::string::npos ? 0 : std::stoul(header.substr(field + sizeof kField - 1));
-}
-
-/// A whole request, or the empty text where none arrives.
-std::string ReadRequest(BIO *connection) {
-    std::string request;
-    std::size_t length = std::string::npos;
-    while (request.size() < length) {
-        char bytes[4096];
-        const int count = BIO_read(connection, bytes, sizeof bytes);
-        if (count <= 0) {
-            return {};
-        }
-        request.append(bytes, static_cast<std::size_t>(count));
-        const std::size_t end = request.find(kEndOfHeader);
-        if (length == std::string::npos && end != std::string::npos) {
-            length = end + sizeof kEndOfHeader - 1 + BodyLength(request.substr(0, end));
-        }
-    }
-    return request;
 }
 
 void WriteAll(BIO *connection, const std::string &bytes) {
@@ -69,7 +45,10 @@ void WriteAll(BIO *connection, const std::string &bytes) {
 
 std::shared_ptr<SSL_CTX> MakeTLS(const Credentials &credentials) {
     std::shared_ptr<SSL_CTX> context(SSL_CTX_new(TLS_server_method()), SSL_CTX_free);
-    Require(context && SSL_CTX_use_certificate(context.get(), credentials.certificate.get()) == 1 &&
+    Require(context != nullptr, "SSL_CTX_new");
+    // A server may show what a client ought to refuse.
+    SSL_CTX_set_security_level(context.get(), 0);
+    Require(SSL_CTX_use_certificate(context.get(), credentials.certificate.get()) == 1 &&
                 SSL_CTX_use_PrivateKey(context.get(), credentials.key.get()) == 1,
             "credentials of a server");
     return context;
@@ -98,6 +77,66 @@ std::string ChunkedHTTPAnswer(const std::vector<std::string> &chunks) {
     answer << "0\r\n\r\n";
     return answer.str();
 }
+
+Connection::Connection(int socket, SSL_CTX *tls, OnRequest onRequest)
+    : socket_(socket), chain_(BIO_new_socket(socket, BIO_CLOSE)), onRequest_(std::move(onRequest)) {
+    if (tls != nullptr) {
+        chain_.reset(BIO_push(BIO_new_ssl(tls, 0), chain_.release()));
+    }
+}
+
+Connection::~Connection() {
+    SSL *tls = nullptr;
+    if (BIO_get_ssl(chain_.get(), &tls) == 1) {
+        SSL_shutdown(tls);
+    }
+    shutdown(socket_, SHUT_WR);
+    while (!ReceiveRaw().empty()) {
+    }
+}
+
+std::string Connection::ReceiveRequest() {
+    std::string request;
+    std::size_t length = std::string::npos;
+    while (request.size() < length) {
+        char bytes[4096];
+        const int count = BIO_read(chain_.get(), bytes, sizeof bytes);
+        if (count <= 0) {
+            return {};
+        }
+        request.append(bytes, static_cast<std::size_t>(count));
+        const std::size_t end = request.find(kEndOfHeader);
+        if (length == std::string::npos && end != std::string::npos) {
+            length = end + sizeof kEndOfHeader - 1 + BodyLength(request.substr(0, end));
+        }
+    }
+    onRequest_(request);
+    return request;
+}
+
+void Connection::Send(const std::string &bytes) { WriteAll(chain_.get(), bytes); }
+
+void Connection::SendByteByByte(const std::string &bytes) {
+    for (const char byte : bytes) {
+        Send(std::string(1, byte));
+    }
+}
+
+std::string Connection::ReceiveRaw() {
+    char bytes[4096];
+    const ssize_t count = recv(socket_, bytes, sizeof bytes, 0);
+    return count > 0 ? std::string(bytes, static_cast<std::size_t>(count)) : std::string();
+}
+
+void Connection::SendRaw(const std::string &bytes) {
+    BIO *end = chain_.get();
+    for (BIO *next = end; next != nullptr; next = BIO_next(next)) {
+        end = next;
+    }
+    WriteAll(end, bytes);
+}
+
+void Connection::BreakOff() { shutdown(socket_, SHUT_WR); }
 
 Port::Port() : socket_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
     sockaddr_in address{};
@@ -137,9 +176,17 @@ std::string Server::URL(const std::string &path, const std::string &host) const 
     return (tls_ ? "https://" : "http://") + host + ":" + std::to_string(port_.number()) + path;
 }
 
-void Server::Answer(const std::string &bytes) {
+void Server::Play(Script script) {
     const std::lock_guard<std::mutex> lock(mutex_);
-    answers_.push_back(bytes);
+    scripts_.push_back(std::move(script));
+}
+
+void Server::Answer(const std::string &bytes) {
+    Play([bytes](Connection &connection) {
+        if (!connection.ReceiveRequest().empty()) {
+            connection.Send(bytes);
+        }
+    });
 }
 
 std::vector<std::string> Server::Requests() const {
@@ -167,31 +214,25 @@ void Server::Serve() {
         if (socket < 0) {
             continue;  // told to stop, or the client was gone before it was let in
         }
-        BIOPointer connection(BIO_new_socket(socket, BIO_CLOSE));
-        if (tls_) {
-            connection.reset(BIO_push(BIO_new_ssl(tls_.get(), 0), connection.release()));
-        }
-        Converse(connection.get());
+        ERR_clear_error();  // what the last connection left there would count as this one's
+        Connection connection(socket, tls_.get(), [this](const std::string &request) { Record(request); });
+        NextScript()(connection);
     }
 }
 
-void Server::Converse(BIO *connection) {
-    ERR_clear_error();  // what the last connection left there would count as this one's
-    const std::string request = ReadRequest(connection);
-    if (!request.empty()) {
-        WriteAll(connection, Record(request));
+Script Server::NextScript() {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    if (scripts_.empty()) {
+        return [](Connection &connection) { connection.ReceiveRequest(); };
     }
+    Script script = std::move(scripts_.front());
+    scripts_.pop_front();
+    return script;
 }
 
-std::string Server::Record(const std::string &request) {
+void Server::Record(const std::string &request) {
     const std::lock_guard<std::mutex> lock(mutex_);
     requests_.push_back(request);
-    if (answers_.empty()) {
-        return {};
-    }
-    std::string answer = std::move(answers_.front());
-    answers_.pop_front();
-    return answer;
 }
 
 }  // namespace Test

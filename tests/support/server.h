@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <deque>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -42,7 +43,48 @@ class Port {
     int socket_;
 };
 
-/// A server that answers what it was told, whatever it is asked: one answer for each connection, then it closes that.
+/// A server's end of one connection. Waiting for a client that has gone gives the empty text, and what is sent to it is
+/// lost: that is the client's right.
+class Connection {
+  public:
+    using OnRequest = std::function<void(const std::string &)>;
+
+    /// Takes the socket over. Speaks TLS where there is a context for it, and shakes hands when it first has to.
+    Connection(int socket, SSL_CTX *tls, OnRequest onRequest);
+
+    /// Says goodbye, and waits for the client to go: the kernel would take back what was sent if it closed a connection
+    /// with something unread in it.
+    ~Connection();
+    Connection(const Connection &) = delete;
+    Connection &operator=(const Connection &) = delete;
+
+    std::string ReceiveRequest();
+    void Send(const std::string &bytes);
+
+    /// Each byte in a TLS record of its own.
+    void SendByteByByte(const std::string &bytes);
+
+    /// Past TLS: what next arrives, or goes out, on the socket itself.
+    std::string ReceiveRaw();
+    void SendRaw(const std::string &bytes);
+
+    /// Nothing more goes out, TLS's own goodbye neither.
+    void BreakOff();
+
+  private:
+    struct Release {
+        void operator()(BIO *chain) const { BIO_free_all(chain); }
+    };
+
+    int socket_;
+    std::unique_ptr<BIO, Release> chain_;
+    OnRequest onRequest_;
+};
+
+/// What a server does on a connection, which ends with it.
+using Script = std::function<void(Connection &)>;
+
+/// A server that does what it was told, whatever it is asked: one script or answer for each connection.
 class Server {
   public:
     Server();                                         // HTTP
@@ -53,8 +95,11 @@ class Server {
 
     std::string URL(const std::string &path, const std::string &host = "127.0.0.1") const;
 
-    /// What it sends, byte by byte, to the next connection that has no answer yet. A connection without one is closed
-    /// as soon as it has asked.
+    /// What it does on the next connection that nothing is told for yet. A connection that nothing is told for is
+    /// closed as soon as it has asked.
+    void Play(Script script);
+
+    /// Waits for a request and sends this, byte for byte.
     void Answer(const std::string &bytes);
 
     /// Every request so far, byte by byte. A connection that never sends a whole one, because its client refused the
@@ -66,13 +111,13 @@ class Server {
 
   private:
     void Serve();
-    void Converse(BIO *connection);
-    std::string Record(const std::string &request);
+    Script NextScript();
+    void Record(const std::string &request);
 
     Port port_;
     std::shared_ptr<SSL_CTX> tls_;
     mutable std::mutex mutex_;
-    std::deque<std::string> answers_;
+    std::deque<Script> scripts_;
     std::vector<std::string> requests_;
     std::atomic<bool> stopping_{false};
     std::thread thread_;
