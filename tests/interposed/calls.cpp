@@ -1,15 +1,48 @@
 #include "tests/interposed/calls.h"
 
+#include <link.h>
 #include <openssl/err.h>
 
-#include <map>
+#include <cstdint>
+#include <cstring>
 
 namespace Test {
 
 namespace {
 
-std::map<std::string, int> &CallsUntilFailure() {
-    static std::map<std::string, int> calls;
+struct AddressRange {
+    std::uintptr_t begin = 0;
+    std::uintptr_t end = 0;
+};
+
+/// Where the library under test has its code. Asks for no memory: the first who wants to know may be malloc.
+AddressRange FindLibrary() {
+    AddressRange code;
+    dl_iterate_phdr(
+        [](dl_phdr_info *object, std::size_t, void *result) {
+            if (std::strstr(object->dlpi_name, "/libtavosso.so") == nullptr) {
+                return 0;
+            }
+            for (int i = 0; i < object->dlpi_phnum; ++i) {
+                const ElfW(Phdr) &segment = object->dlpi_phdr[i];
+                if (segment.p_type == PT_LOAD && (segment.p_flags & PF_X) != 0) {
+                    const std::uintptr_t begin = object->dlpi_addr + segment.p_vaddr;
+                    *static_cast<AddressRange *>(result) = {begin, begin + segment.p_memsz};
+                }
+            }
+            return 1;
+        },
+        &code);
+    return code;
+}
+
+struct Calls {
+    int made = 0;
+    int failing = 0;  // the number of the one to fail
+};
+
+std::map<std::string, Calls> &CallsByFunction() {
+    static std::map<std::string, Calls> calls;
     return calls;
 }
 
@@ -20,13 +53,33 @@ std::vector<std::string> &Cleansed() {
 
 }  // namespace
 
-void FailCall(const std::string &function, int n) { CallsUntilFailure()[function] = n; }
+bool FromLibrary(const void *returnAddress) {
+    static const AddressRange code = FindLibrary();
+    const auto address = reinterpret_cast<std::uintptr_t>(returnAddress);
+    return address >= code.begin && address < code.end;
+}
 
-void FailNothing() { CallsUntilFailure().clear(); }
+void FailCall(const std::string &function, int n) {
+    Calls &calls = CallsByFunction()[function];
+    calls.failing = calls.made + n;
+}
 
-bool ShouldFail(const std::string &function) {
-    const auto call = CallsUntilFailure().find(function);
-    return call != CallsUntilFailure().end() && --call->second == 0;
+void FailNothing() { CallsByFunction().clear(); }
+
+bool ShouldFail(const char *function, const void *caller) {
+    if (!FromLibrary(caller)) {
+        return false;
+    }
+    Calls &calls = CallsByFunction()[function];
+    return ++calls.made == calls.failing;
+}
+
+std::map<std::string, int> CallCounts() {
+    std::map<std::string, int> counts;
+    for (const auto &[function, calls] : CallsByFunction()) {
+        counts[function] = calls.made;
+    }
+    return counts;
 }
 
 std::vector<std::string> TakeCleansed() {

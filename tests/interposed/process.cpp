@@ -16,13 +16,12 @@ namespace {
 
 std::optional<uid_t> effectiveUID;
 std::optional<gid_t> effectiveGID;
-std::optional<std::time_t> clockTime;
-std::size_t failingCalloc = 0;
 int setIDsUntilFailure = 0;
 int setIDError = 0;
 int errnoAtOpen = 0;
 const char *modeAtOpen = "";
 int entropyReads = 0;
+FILE *failedFile = nullptr;
 
 std::vector<std::string> &SetIDCalls() {
     static std::vector<std::string> calls;
@@ -62,20 +61,14 @@ std::vector<std::string> TakeSetIDCalls() {
     return taken;
 }
 
-void SetClock(std::time_t now) { clockTime = now; }
-
 int ErrnoAtOpen() { return errnoAtOpen; }
 std::string ModeAtOpen() { return modeAtOpen; }
 
 int EntropyReads() { return entropyReads; }
 
-void FailCalloc(std::size_t size) { failingCalloc = size; }
-
 void RestoreProcess() {
     effectiveUID.reset();
     effectiveGID.reset();
-    clockTime.reset();
-    failingCalloc = 0;
     setIDsUntilFailure = 0;
     TakeSetIDCalls();
 }
@@ -88,48 +81,63 @@ uid_t geteuid() noexcept { return Test::effectiveUID ? *Test::effectiveUID : Tes
 gid_t getegid() noexcept { return Test::effectiveGID ? *Test::effectiveGID : Test::Next(getegid, "getegid")(); }
 
 int setresuid(uid_t real, uid_t effective, uid_t saved) noexcept {
+    if (Test::ShouldFail("setresuid", CALLER)) {
+        errno = EPERM;
+        return -1;
+    }
     return Test::SetID("setresuid", real, effective, saved, Test::effectiveUID);
 }
 
 int setresgid(gid_t real, gid_t effective, gid_t saved) noexcept {
+    if (Test::ShouldFail("setresgid", CALLER)) {
+        errno = EPERM;
+        return -1;
+    }
     return Test::SetID("setresgid", real, effective, saved, Test::effectiveGID);
 }
 
 FILE *fopen(const char *path, const char *mode) {
     Test::errnoAtOpen = errno;
     Test::modeAtOpen = mode;
+    if (Test::ShouldFail("fopen", CALLER)) {
+        errno = EMFILE;
+        return nullptr;
+    }
     return Test::Next(fopen, "fopen")(path, mode);
+}
+
+size_t fread(void *bytes, size_t size, size_t count, FILE *file) {
+    if (Test::ShouldFail("fread", CALLER)) {
+        Test::failedFile = file;
+        errno = EIO;
+        return 0;
+    }
+    return Test::Next(fread, "fread")(bytes, size, count, file);
+}
+
+int ferror(FILE *file) noexcept {
+    if (Test::ShouldFail("ferror", CALLER) || file == Test::failedFile) {
+        return 1;
+    }
+    return Test::Next(ferror, "ferror")(file);
+}
+
+int fclose(FILE *file) {
+    if (file == Test::failedFile) {
+        Test::failedFile = nullptr;  // its memory may become another file's
+    }
+    const bool fails = Test::ShouldFail("fclose", CALLER);
+    const int result = Test::Next(fclose, "fclose")(file);
+    return fails ? EOF : result;
 }
 
 ssize_t getrandom(void *bytes, size_t length, unsigned int flags) {
     ++Test::entropyReads;
+    if (Test::ShouldFail("getrandom", CALLER)) {
+        errno = EIO;
+        return -1;
+    }
     return Test::Next(getrandom, "getrandom")(bytes, length, flags);
-}
-
-time_t time(time_t *result) noexcept {
-    const time_t now = Test::clockTime ? *Test::clockTime : Test::Next(time, "time")(nullptr);
-    if (result != nullptr) {
-        *result = now;
-    }
-    return now;
-}
-
-void *calloc(size_t count, size_t size) noexcept {
-    static void *(*next)(size_t, size_t) = nullptr;
-    static bool looking = false;
-    if (count * size == Test::failingCalloc && count * size != 0) {
-        Test::failingCalloc = 0;
-        errno = ENOMEM;
-        return nullptr;
-    }
-    if (next == nullptr) {
-        if (looking) {
-            return nullptr;  // dlsym itself asks for memory, and does without
-        }
-        looking = true;
-        next = reinterpret_cast<void *(*)(size_t, size_t)>(dlsym(RTLD_NEXT, "calloc"));
-    }
-    return next(count, size);
 }
 
 }  // extern "C"

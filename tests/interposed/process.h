@@ -4,11 +4,10 @@
 #include <sys/types.h>
 
 #include <cerrno>
-#include <ctime>
 #include <string>
 #include <vector>
 
-// The process that the library under test sees: its effective ids, its clock, its memory.
+// The process that the library under test sees: its effective ids, its files, its entropy.
 namespace Test {
 
 /// From now on the process has these effective ids, and may change them, until RestoreProcess.
@@ -22,12 +21,6 @@ void FailSetID(int n, int error = EPERM);
 /// Every setresuid and setresgid since the last call: "setresgid(-1, 0, -1)".
 std::vector<std::string> TakeSetIDCalls();
 
-/// From now on it is this second, until RestoreProcess.
-void SetClock(std::time_t now);
-
-/// The next calloc of this many bytes fails.
-void FailCalloc(std::size_t size);
-
 /// What errno was when a file was last opened, and the mode it was opened with.
 int ErrnoAtOpen();
 std::string ModeAtOpen();
@@ -35,7 +28,7 @@ std::string ModeAtOpen();
 /// How often the system's entropy source has been read.
 int EntropyReads();
 
-/// The ids, the clock and the memory are the real ones again.
+/// The ids are the real ones again.
 void RestoreProcess();
 
 }  // namespace Test

@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <cstdarg>
+#include <memory>
 #include <new>
 
 #undef curl_easy_setopt  // a macro that checks types, in front of the function
@@ -41,8 +42,9 @@ CURLcode Perform(const Handle &handle) {
     }
     for (const std::string &chunk : answer->second.chunks) {
         // Handed over without a NUL behind it, as libcurl does: who reads on is seen by AddressSanitizer.
-        std::vector<char> data(chunk.begin(), chunk.end());
-        if (handle.write(data.data(), 1, data.size(), handle.user) != data.size()) {
+        const auto data = std::make_unique<char[]>(chunk.size());
+        chunk.copy(data.get(), chunk.size());
+        if (handle.write(data.get(), 1, chunk.size(), handle.user) != chunk.size()) {
             return CURLE_WRITE_ERROR;
         }
     }

@@ -5,17 +5,11 @@
 #include <ostream>
 
 #include "sso/sso.h"
+#include "tests/interposed/clock.h"
 #include "tests/support/authority.h"
 #include "tests/support/files.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
-
-extern "C" std::time_t time(std::time_t *where) {
-    if (where != nullptr) {
-        *where = Test::kNow;
-    }
-    return Test::kNow;
-}
 
 namespace Test {
 
@@ -109,6 +103,7 @@ Provider::Provider(Profile profile, const std::string &changes)
     : profile_(profile), server_(CertificateFor("IP:127.0.0.1")) {
     const bool azure = profile == Profile::kAzure;
     TakeSystemLog();  // what another test left
+    SetClock(kNow);
     RemoveFiles();
     TrustAuthority();
     WriteFile(kProfileFile, azure ? R"({"sso_enable": true, "sso_profile": "azure"})"

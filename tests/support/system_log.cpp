@@ -1,8 +1,10 @@
 #include "tests/support/system_log.h"
 
+#include <array>
 #include <cerrno>
 #include <cstdarg>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <ostream>
 #include <regex>
@@ -11,9 +13,17 @@ namespace Test {
 
 namespace {
 
-std::vector<LogLine> &Lines() {
-    static std::vector<LogLine> lines;
-    return lines;
+// Kept without asking for memory, as a real syslog is not refused any: tests let it run out.
+struct Record {
+    int priority;
+    std::size_t length;
+};
+std::array<char, std::size_t{4} << 20> records;
+std::size_t used = 0;
+
+LogLine Read(const Record &record, const char *text) {
+    static const std::regex sourceLine("^([a-z]+):[0-9]+ ");
+    return {record.priority, std::regex_replace(std::string(text, record.length), sourceLine, "$1:N ")};
 }
 
 }  // namespace
@@ -28,18 +38,35 @@ LogLine Error(const std::string &text) { return {LOG_ERR, text}; }
 
 std::vector<LogLine> TakeSystemLog() {
     std::vector<LogLine> taken;
-    taken.swap(Lines());
+    for (std::size_t at = 0; at < used;) {
+        Record record{};
+        std::memcpy(&record, &records[at], sizeof record);
+        taken.push_back(Read(record, &records[at + sizeof record]));
+        at += sizeof record + record.length + 1;
+    }
+    used = 0;
     return taken;
 }
 
 }  // namespace Test
 
 extern "C" void syslog(int priority, const char *format, ...) {
-    char text[8192];
+    using Test::records, Test::used;
+    Test::Record record{priority, 0};
+    if (used + sizeof record >= records.size()) {
+        std::abort();  // more than any test looks at
+    }
+    char *text = &records[used + sizeof record];
+    const std::size_t room = records.size() - used - sizeof record;
     va_list arguments;
     va_start(arguments, format);
-    std::vsnprintf(text, sizeof text, format, arguments);  // glibc's knows %m
+    const int length = std::vsnprintf(text, room, format, arguments);  // glibc's knows %m
     va_end(arguments);
-    Test::Lines().push_back({priority, std::regex_replace(text, std::regex("^([a-z]+):[0-9]+ "), "$1:N ")});
+    if (length < 0 || static_cast<std::size_t>(length) >= room) {
+        std::abort();
+    }
+    record.length = static_cast<std::size_t>(length);
+    std::memcpy(&records[used], &record, sizeof record);
+    used += sizeof record + record.length + 1;
     errno = EINTR;  // as a real one may leave it: nothing in the library may rely on it
 }

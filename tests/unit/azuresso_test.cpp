@@ -1,10 +1,11 @@
 #include <locale>
 
 #include "jwt/jwt.h"
+#include "tests/interposed/clock.h"
+#include "tests/interposed/memory.h"
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"
-#include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"

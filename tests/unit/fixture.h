@@ -4,10 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <string>
-#include <typeinfo>
-#include <vector>
-
+#include "tests/support/failure.h"
 #include "tests/support/files.h"
 #include "tests/support/system_log.h"
 
@@ -20,32 +17,6 @@ class Library : public testing::Test {
     void SetUp() override;
     void TearDown() override;
 };
-
-/// What a call throws: exactly this class, exactly this text.
-struct Failure {
-    std::string type;
-    std::string text;
-};
-
-inline const Failure kNothingThrown{"nothing thrown", ""};
-
-bool operator==(const Failure &a, const Failure &b);
-std::ostream &operator<<(std::ostream &stream, const Failure &failure);
-
-template <typename Exception>
-Failure Fails(const std::string &text) {
-    return {typeid(Exception).name(), text};
-}
-
-template <typename Function>
-Failure FailureOf(Function function) {
-    try {
-        function();
-    } catch (const std::exception &error) {
-        return {typeid(error).name(), error.what()};
-    }
-    return kNothingThrown;
-}
 
 }  // namespace Test
 

@@ -8,7 +8,7 @@
 #include <sstream>
 
 #include "tests/interposed/calls.h"
-#include "tests/support/memory_limit.h"
+#include "tests/interposed/memory.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
 

@@ -5,8 +5,8 @@
 
 #include "sso/sso.h"
 #include "tests/interposed/calls.h"
+#include "tests/interposed/memory.h"
 #include "tests/interposed/process.h"
-#include "tests/support/memory_limit.h"
 #include "tests/unit/fixture.h"
 
 namespace Test {

@@ -4,8 +4,8 @@
 #include <new>
 
 #include "tests/interposed/calls.h"
+#include "tests/interposed/memory.h"
 #include "tests/interposed/transport.h"
-#include "tests/support/memory_limit.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
 

@@ -1,5 +1,6 @@
 #include "jwt/jwt.h"
 #include "tests/interposed/calls.h"
+#include "tests/interposed/clock.h"
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"

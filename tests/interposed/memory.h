@@ -1,9 +1,9 @@
-#ifndef TAVOSSO_TESTS_SUPPORT_MEMORY_LIMIT_H
-#define TAVOSSO_TESTS_SUPPORT_MEMORY_LIMIT_H
+#ifndef TAVOSSO_TESTS_INTERPOSED_MEMORY_H
+#define TAVOSSO_TESTS_INTERPOSED_MEMORY_H
 
 #include <cstddef>
 
-// The program that links this defines `operator new` itself.
+// The program that links this defines malloc, calloc, realloc and `operator new` itself, for every library in it.
 namespace Test {
 
 /// While it lives, a single request for more memory than that fails.
@@ -15,10 +15,12 @@ class MemoryLimit {
     MemoryLimit &operator=(const MemoryLimit &) = delete;
 };
 
-/// While it lives, the n-th request for memory (1: the next) fails, of whatever size.
+/// While it lives, the n-th request of this thread for memory (1: the next) fails, of whatever size.
 class FailingAllocation {
   public:
-    explicit FailingAllocation(int n);
+    enum Which { kOne, kAllFromThere };
+
+    explicit FailingAllocation(int n, Which which = kOne);
     ~FailingAllocation();
     FailingAllocation(const FailingAllocation &) = delete;
     FailingAllocation &operator=(const FailingAllocation &) = delete;
