@@ -43,7 +43,7 @@ void WriteAll(BIO *connection, const std::string &bytes) {
     }
 }
 
-std::shared_ptr<SSL_CTX> MakeTLS(const Credentials &credentials) {
+std::shared_ptr<SSL_CTX> MakeTLS(const Credentials &credentials, int onlyVersion) {
     std::shared_ptr<SSL_CTX> context(SSL_CTX_new(TLS_server_method()), SSL_CTX_free);
     Require(context != nullptr, "SSL_CTX_new");
     // A server may show what a client ought to refuse.
@@ -51,6 +51,9 @@ std::shared_ptr<SSL_CTX> MakeTLS(const Credentials &credentials) {
     Require(SSL_CTX_use_certificate(context.get(), credentials.certificate.get()) == 1 &&
                 SSL_CTX_use_PrivateKey(context.get(), credentials.key.get()) == 1,
             "credentials of a server");
+    Require(SSL_CTX_set_min_proto_version(context.get(), onlyVersion) == 1 &&
+                SSL_CTX_set_max_proto_version(context.get(), onlyVersion) == 1,
+            "version of TLS");
     return context;
 }
 
@@ -161,7 +164,7 @@ Server::Server() {
     thread_ = std::thread(&Server::Serve, this);
 }
 
-Server::Server(const Credentials &credentials) : tls_(MakeTLS(credentials)) {
+Server::Server(const Credentials &credentials, int onlyVersion) : tls_(MakeTLS(credentials, onlyVersion)) {
     Require(listen(port_.socket(), SOMAXCONN) == 0, "listen");
     thread_ = std::thread(&Server::Serve, this);
 }

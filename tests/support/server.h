@@ -87,8 +87,8 @@ using Script = std::function<void(Connection &)>;
 /// A server that does what it was told, whatever it is asked: one script or answer for each connection.
 class Server {
   public:
-    Server();                                         // HTTP
-    explicit Server(const Credentials &credentials);  // HTTPS
+    Server();                                                              // HTTP
+    explicit Server(const Credentials &credentials, int onlyVersion = 0);  // HTTPS, of that version of TLS if any
     ~Server();
     Server(const Server &) = delete;
     Server &operator=(const Server &) = delete;
