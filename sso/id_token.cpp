@@ -18,7 +18,9 @@ JWT::Jwt SplitIDToken(const std::string &token) {
 void CheckExpiry(const Json::Value &claims) {
     // Reads as far as there are digits: no number at all is 0, long past.
     const long expiry = std::strtol(Utils::MemberText(claims, "exp").value_or("").c_str(), nullptr, 10);
-    if (std::time(nullptr) > expiry) {
+    const std::time_t now = std::time(nullptr);
+    // A clock that cannot be read tells -1, before which nothing has expired.
+    if (now == -1 || now > expiry) {
         throw std::invalid_argument("id_token expired.");
     }
 }

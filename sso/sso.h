@@ -290,6 +290,7 @@ class AzureSSOClient : public SSOClient {
      *
      * @throws sso_op_failed  "encode base64 failed.": the state does not fit
      * @throws Json::LogicError  when `state` is neither an object nor null
+     * @throws std::runtime_error  of Boost's, when the system's source of random numbers fails
      *
      * Log lines: those of `MD5Digest`, whose failure leaves the state with an empty "nonce".
      */
@@ -455,7 +456,7 @@ std::string GetAzureSSOLogoutURL(const std::string &base);
  * @param writeCallback  receives the answer, in the form of libcurl's CURLOPT_WRITEFUNCTION; must not throw
  *
  * @throws std::bad_alloc  when no handle can be made
- * @throws sso_err_resp  with libcurl's text, when the transfer fails
+ * @throws sso_err_resp  with libcurl's text, when the transfer fails or cannot be prepared
  */
 void httpGet(const std::string &url, std::string &response, bool verifySSL,
              std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *));

@@ -27,6 +27,13 @@ struct CurlGlobalState {
     CurlGlobalState &operator=(const CurlGlobalState &) = delete;
 };
 
+/// Throws sso_err_resp with libcurl's text for a failure.
+void Require(CURLcode result) {
+    if (result != CURLE_OK) {
+        throw sso_err_resp(curl_easy_strerror(result));
+    }
+}
+
 /// One request with a fresh handle: a POST of the form if there is one, else a GET.
 void Transfer(const std::string &url, const std::string *form, std::string &response, bool verifySSL,
               curl_write_callback writeCallback) {
@@ -36,20 +43,18 @@ void Transfer(const std::string &url, const std::string *form, std::string &resp
     if (!handle) {
         throw std::bad_alloc();
     }
-    curl_easy_setopt(handle.get(), CURLOPT_URL, url.c_str());
+    // An option that is not set is a failure, too: without the callback, libcurl would write to `response` as a FILE.
+    Require(curl_easy_setopt(handle.get(), CURLOPT_URL, url.c_str()));
     if (form != nullptr) {
-        curl_easy_setopt(handle.get(), CURLOPT_POSTFIELDS, form->c_str());
+        Require(curl_easy_setopt(handle.get(), CURLOPT_POSTFIELDS, form->c_str()));
     }
-    curl_easy_setopt(handle.get(), CURLOPT_WRITEFUNCTION, writeCallback);
-    curl_easy_setopt(handle.get(), CURLOPT_WRITEDATA, &response);
+    Require(curl_easy_setopt(handle.get(), CURLOPT_WRITEFUNCTION, writeCallback));
+    Require(curl_easy_setopt(handle.get(), CURLOPT_WRITEDATA, &response));
     if (!verifySSL) {
-        curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYHOST, 0L);
-        curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYPEER, 0L);
+        Require(curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYHOST, 0L));
+        Require(curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYPEER, 0L));
     }
-    const CURLcode result = curl_easy_perform(handle.get());
-    if (result != CURLE_OK) {
-        throw sso_err_resp(curl_easy_strerror(result));
-    }
+    Require(curl_easy_perform(handle.get()));
 }
 
 /// Zeroed memory from calloc, released on every way out; null when there is none.
