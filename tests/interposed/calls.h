@@ -43,10 +43,26 @@ Function *Next(Function * /*own*/, const char *name) {
 /// What libcrypto itself does when a call of it fails: leaves an entry in its error queue.
 void RaiseCryptoError();
 
+/// A call into libcrypto on its way. A function of libcrypto may end in a jump to another that stands here, which then
+/// seems to be called from where the first was: such a call is not the library's.
+class CallDepth {
+  public:
+    CallDepth() { ++depth_; }
+    ~CallDepth() { --depth_; }
+    CallDepth(const CallDepth &) = delete;
+    CallDepth &operator=(const CallDepth &) = delete;
+
+    bool Outermost() const { return depth_ == 1; }
+
+  private:
+    static inline thread_local int depth_ = 0;
+};
+
 /// Passes a call into libcrypto on, or fails it if that has been asked for.
 template <typename Result, typename Function, typename... Arguments>
 Result PassOn(const char *name, const void *caller, Result failure, Function *own, Arguments... arguments) {
-    if (ShouldFail(name, caller)) {
+    const CallDepth depth;
+    if (depth.Outermost() && ShouldFail(name, caller)) {
         RaiseCryptoError();
         return failure;
     }

@@ -65,7 +65,8 @@ bool FailingAllocation::Happened() { return requestsUntilFailure <= 0; }
 
 extern "C" {
 
-void *malloc(size_t size) noexcept {
+// Not inlined into `operator new`: the request would seem to come from there.
+[[gnu::noinline]] void *malloc(size_t size) noexcept {
     static decltype(&malloc) next = nullptr;
     return Test::Find(next, malloc, "malloc") && !Test::Refused("malloc", size, CALLER) ? next(size) : nullptr;
 }

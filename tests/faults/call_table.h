@@ -1,0 +1,121 @@
+#ifndef TAVOSSO_TESTS_FAULTS_CALL_TABLE_H
+#define TAVOSSO_TESTS_FAULTS_CALL_TABLE_H
+
+namespace Test {
+
+/// A function of another library, with C linkage, that the library under test calls.
+struct CalledFunction {
+    const char *name;
+    const char *whyItCannotFail;  // null: it can, and every call of it is made to
+};
+
+constexpr char kNoResult[] = "has no result";
+constexpr char kOnlyMemory[] = "works on memory that is there";
+constexpr char kConstant[] = "returns a constant";
+constexpr char kRuntime[] = "belongs to the compiler's run time; memory running out is swept over";
+
+constexpr CalledFunction kCalledFunctions[] = {
+    // libc
+    {"__errno_location", kConstant},
+    {"__libc_single_threaded", kConstant},
+    {"__stack_chk_fail", kRuntime},
+    {"calloc", nullptr},
+    {"fclose", nullptr},
+    {"ferror", nullptr},
+    {"fopen", nullptr},
+    {"fread", nullptr},
+    {"free", kNoResult},
+    {"getegid", "always succeeds"},
+    {"geteuid", "always succeeds"},
+    {"getrandom", nullptr},
+    {"malloc", nullptr},
+    {"memchr", kOnlyMemory},
+    {"memcmp", kOnlyMemory},
+    {"memcpy", kOnlyMemory},
+    {"memmove", kOnlyMemory},
+    {"memset", kOnlyMemory},
+    {"setresgid", nullptr},
+    {"setresuid", nullptr},
+    {"snprintf", "writes two digits of a byte"},
+    {"strcmp", kOnlyMemory},
+    {"strerror_r", "has a text for every number"},
+    {"strlen", kOnlyMemory},
+    {"strnlen", kOnlyMemory},
+    {"strtol", "reads as far as there are digits, and stops at the largest number"},
+    {"syslog", kNoResult},
+    {"time", nullptr},
+
+    // libcurl
+    {"curl_easy_cleanup", kNoResult},
+    {"curl_easy_init", nullptr},
+    {"curl_easy_perform", nullptr},
+    {"curl_easy_setopt", nullptr},
+    {"curl_easy_strerror", "has a text for every number"},
+    {"curl_global_cleanup", kNoResult},
+    {"curl_global_init", nullptr},
+
+    // libcrypto
+    {"BIO_ctrl", nullptr},
+    {"BIO_f_base64", kConstant},
+    {"BIO_free_all", kNoResult},
+    {"BIO_new", nullptr},
+    {"BIO_new_mem_buf", nullptr},
+    {"BIO_push", "links two that are there"},
+    {"BIO_read", nullptr},
+    {"BIO_s_mem", kConstant},
+    {"BIO_set_flags", kNoResult},
+    {"BIO_write", nullptr},
+    {"BN_bin2bn", nullptr},
+    {"BN_free", kNoResult},
+    {"ERR_clear_error", kNoResult},
+    {"ERR_get_error_all", "tells of the queue's end"},
+    {"ERR_new", kNoResult},
+    {"ERR_pop_to_mark", "tells of a queue without a mark, which is then empty"},
+    {"ERR_set_debug", kNoResult},
+    {"ERR_set_error", kNoResult},
+    {"ERR_set_mark", "tells of an empty queue, in which nothing has to be marked"},
+    {"EVP_DigestUpdate", nullptr},
+    {"EVP_DigestVerifyFinal", nullptr},
+    {"EVP_DigestVerifyInit", nullptr},
+    {"EVP_MD_CTX_free", kNoResult},
+    {"EVP_MD_CTX_new", nullptr},
+    {"EVP_PKEY_assign", nullptr},
+    {"EVP_PKEY_free", kNoResult},
+    {"EVP_PKEY_get_id", nullptr},
+    {"EVP_PKEY_new", nullptr},
+    {"EVP_sha256", kConstant},
+    {"EVP_sha384", kConstant},
+    {"EVP_sha512", kConstant},
+    {"HMAC", nullptr},
+    {"MD5", nullptr},
+    {"OPENSSL_cleanse", kNoResult},
+    {"RSA_free", kNoResult},
+    {"RSA_new", nullptr},
+    {"RSA_set0_key", nullptr},
+
+    // the platform
+    {"TAVOWinsUserNameFqdn2Netbios", nullptr},
+    {"TLIBCBase64Decode", nullptr},
+    {"TLIBCBase64SzEncodeFull", nullptr},
+    {"TavoCgiURLEncode", nullptr},
+
+    // the C++ run time
+    {"_Unwind_Resume", kRuntime},
+    {"__cxa_allocate_exception", kRuntime},
+    {"__cxa_atexit", kRuntime},
+    {"__cxa_begin_catch", kRuntime},
+    {"__cxa_end_catch", kRuntime},
+    {"__cxa_finalize", kRuntime},
+    {"__cxa_free_exception", kRuntime},
+    {"__cxa_pure_virtual", kRuntime},
+    {"__cxa_rethrow", kRuntime},
+    {"__cxa_throw", kRuntime},
+    {"__gxx_personality_v0", kRuntime},
+    {"_ITM_deregisterTMCloneTable", kRuntime},
+    {"_ITM_registerTMCloneTable", kRuntime},
+    {"__gmon_start__", kRuntime},
+};
+
+}  // namespace Test
+
+#endif

@@ -1,0 +1,184 @@
+#include "tests/interposed/calls.h"
+
+#include <dirent.h>
+#include <dlfcn.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <openssl/err.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <memory>
+#include <set>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "sso/sso.h"
+#include "tests/faults/call_table.h"
+#include "tests/faults/scenario.h"
+#include "tests/interposed/process.h"
+#include "tests/support/system_log.h"
+
+// Lets each call that the library makes fail, one at a time, and compares what comes of it with a table.
+namespace Test {
+
+namespace {
+
+namespace fs = std::filesystem;
+
+/// What one use of the library does when nothing, or the n-th call of one function, fails.
+struct Trial {
+    std::string ending;
+    std::vector<LogLine> log;
+    std::map<std::string, int> calls;
+};
+
+std::string DescribeIDs() {
+    const bool restored = EffectiveUID() == kUser && EffectiveGID() == kGroup;
+    return restored ? ""
+                    : ", the process stays user " + std::to_string(EffectiveUID()) + " of group " +
+                          std::to_string(EffectiveGID());
+}
+
+Trial Try(const Scenario &scenario, const std::string &function = "", int n = 0) {
+    const Use use = scenario.makeReady();
+    Ending ending{scenario.before, nullptr};
+    SetEffectiveIDs(kUser, kGroup);
+    FailNothing();
+    if (n > 0) {
+        FailCall(function, n);
+    }
+    Run(use, ending);
+    Trial trial{Describe(scenario, ending) + DescribeIDs(), TakeSystemLog(), CallCounts()};
+    FailNothing();
+    RestoreProcess();
+    return trial;
+}
+
+/// The ending, and what was logged. Where that begins with the usual lines, only the others.
+std::string Describe(const Trial &trial, const std::vector<LogLine> &usualLog) {
+    std::ostringstream text;
+    text << trial.ending << "\n";
+    const bool usual =
+        std::equal(usualLog.begin(), usualLog.end(), trial.log.begin(),
+                   trial.log.begin() + static_cast<std::ptrdiff_t>(std::min(usualLog.size(), trial.log.size())));
+    for (std::size_t i = usual ? usualLog.size() : 0; i < trial.log.size(); ++i) {
+        text << (usual ? "    " : "    only ") << trial.log[i] << "\n";
+    }
+    return text.str();
+}
+
+/// Every open descriptor; the one that looks at them is always there.
+std::ptrdiff_t OpenDescriptors() {
+    return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator());
+}
+
+void ExpectEverythingReleased(const Trial &trial, const std::string &failing) {
+    std::map<std::string, int> calls = trial.calls;
+    EXPECT_EQ(calls["curl_easy_init"], calls["curl_easy_cleanup"]);  // called with a null handle, too
+    EXPECT_EQ(calls["fopen"] - (failing == "fopen" ? 1 : 0), calls["fclose"]);
+    EXPECT_EQ(ERR_peek_error(), 0UL) << "something is left in OpenSSL's error queue";
+}
+
+/// Lets one call fail, and then tries again with none failing.
+std::string TryOne(const Scenario &scenario, const Trial &healthy, const std::string &function, int n) {
+    SCOPED_TRACE(function + " " + std::to_string(n));
+    const std::ptrdiff_t descriptors = OpenDescriptors();
+    const Trial trial = Try(scenario, function, n);
+    ExpectEverythingReleased(trial, function);
+    EXPECT_EQ(OpenDescriptors(), descriptors);
+    const Trial next = Try(scenario);
+    EXPECT_EQ(next.ending, healthy.ending);
+    EXPECT_EQ(next.log, healthy.log);
+    return Describe(trial, healthy.log);
+}
+
+/// "FUNCTION N: outcome" for each call that is made when none fails, and "FUNCTION N to M" where several end alike.
+std::string TryEachCall(const Scenario &scenario) {
+    const Trial healthy = Try(scenario);
+    std::string table = "nothing: " + Describe(healthy, {});
+    for (const auto &[function, calls] : healthy.calls) {
+        if (function == "curl_easy_cleanup" || function == "curl_global_cleanup") {
+            continue;  // counted, but with no result that could tell of a failure
+        }
+        std::vector<std::string> outcomes;
+        for (int n = 1; n <= calls; ++n) {
+            outcomes.push_back(TryOne(scenario, healthy, function, n));
+        }
+        for (std::size_t first = 0, last = 0; first < outcomes.size(); first = last + 1) {
+            last = first;
+            while (last + 1 < outcomes.size() && outcomes[last + 1] == outcomes[first]) {
+                ++last;
+            }
+            table += function + " " + std::to_string(first + 1) +
+                     (last > first ? " to " + std::to_string(last + 1) : "") + ": " + outcomes[first];
+        }
+    }
+    return table;
+}
+
+std::string Read(const fs::path &path) {
+    std::ifstream file(path);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+class EachFailingCall : public ::testing::TestWithParam<Scenario> {};
+
+TEST_P(EachFailingCall, EndsAsTheTableTells) {
+    const std::string table = TryEachCall(GetParam());
+    const std::string file = std::string(GetParam().name) + ".txt";
+    std::ofstream(TAVOSSO_OUTCOMES_FOUND "/" + file) << table;
+    EXPECT_EQ(table, Read(TAVOSSO_OUTCOMES "/" + file)) << "what was found is in " TAVOSSO_OUTCOMES_FOUND "/" << file;
+}
+
+INSTANTIATE_TEST_SUITE_P(Of, EachFailingCall, ::testing::ValuesIn(Scenarios()),
+                         [](const auto &row) { return row.param.name; });
+
+/// The names, without those of C++ and of the sanitizers, of what the built file wants from others.
+std::set<std::string> UndefinedSymbols() {
+    Dl_info library;
+    EXPECT_NE(dladdr(reinterpret_cast<void *>(TAVO::SSO::OIDCLogin), &library), 0);
+    const std::string command = std::string("nm -D --undefined-only --format=just-symbols ") + library.dli_fname;
+    const std::unique_ptr<FILE, decltype(&pclose)> pipe(popen(command.c_str(), "r"), pclose);
+    std::set<std::string> names;
+    char line[4096];
+    while (std::fgets(line, sizeof line, pipe.get()) != nullptr) {
+        const std::string symbol(line, std::strcspn(line, "@\n"));
+        if (symbol.rfind("_Z", 0) != 0 && symbol.rfind("__asan", 0) != 0 && symbol.rfind("__ubsan", 0) != 0) {
+            names.insert(symbol);
+        }
+    }
+    return names;
+}
+
+TEST(TheTableOfCalls, HasARowForEachCallOfTheBuiltLibrary) {
+    std::set<std::string> rows;
+    for (const CalledFunction &function : kCalledFunctions) {
+        rows.insert(function.name);
+    }
+    const std::set<std::string> called = UndefinedSymbols();
+    EXPECT_THAT(called, ::testing::Contains("curl_easy_perform"));
+    EXPECT_THAT(rows, ::testing::IsSupersetOf(called));
+}
+
+TEST(TheTableOfCalls, HasSeenEachCallThatCanFail) {
+    std::set<std::string> seen;
+    for (const Scenario &scenario : Scenarios()) {
+        for (const auto &[function, calls] : Try(scenario).calls) {
+            seen.insert(function);
+        }
+    }
+    for (const CalledFunction &function : kCalledFunctions) {
+        if (function.whyItCannotFail == nullptr) {
+            EXPECT_THAT(seen, ::testing::Contains(function.name));
+        }
+    }
+}
+
+}  // namespace
+
+}  // namespace Test
