@@ -2,6 +2,7 @@ include(CheckCXXCompilerFlag)
 
 option(TAVOSSO_HARDENING "Harden what is built: RELRO, immediate binding, stack protection, control-flow protection" ON)
 option(TAVOSSO_SANITIZE "Build everything with AddressSanitizer and UndefinedBehaviorSanitizer" OFF)
+option(TAVOSSO_FUZZ "Build everything for libFuzzer (clang alone), and the fuzz targets with it" OFF)
 
 check_cxx_compiler_flag(-fcf-protection=full TAVOSSO_HAS_CF_PROTECTION)
 
@@ -22,6 +23,11 @@ function(tavosso_options target)
         target_compile_options(${target} PRIVATE -fsanitize=address,undefined -fno-sanitize-recover=all
             -fno-omit-frame-pointer)
         target_link_options(${target} PRIVATE -fsanitize=address,undefined)
+    endif()
+    if(TAVOSSO_FUZZ)
+        # Counts the edges that an input reaches; _GLIBCXX_ASSERTIONS holds every index against its container's bounds.
+        target_compile_options(${target} PRIVATE -fsanitize=fuzzer-no-link)
+        target_compile_definitions(${target} PRIVATE _GLIBCXX_ASSERTIONS)
     endif()
 endfunction()
 

@@ -1,0 +1,62 @@
+// Shows a target its seeds: those whose name begins with "accepted" are good inputs, all others are not.
+//
+//   replay FOLDER
+#include <exception>
+#include <filesystem>
+#include <fstream>
+#include <iostream>
+#include <iterator>
+#include <set>
+#include <stdexcept>
+
+#include "tests/fuzz/target.h"
+
+namespace {
+
+constexpr char kGoodPrefix[] = "accepted";
+
+std::string ReadFile(const std::filesystem::path &path) {
+    std::ifstream file(path, std::ios::binary);
+    std::string content{std::istreambuf_iterator<char>(file), {}};
+    if (!file) {
+        throw std::runtime_error("cannot read " + path.string());
+    }
+    return content;
+}
+
+bool Keeps(const std::filesystem::path &seed) {
+    const std::string name = seed.filename();
+    try {
+        const bool accepted = Fuzz::Accepts(ReadFile(seed));
+        const bool good = name.rfind(kGoodPrefix, 0) == 0;
+        std::cout << name << ": " << (accepted ? "accepted" : "refused") << (accepted == good ? "" : ", WRONGLY")
+                  << std::endl;
+        return accepted == good;
+    } catch (const Fuzz::BrokenPromise &) {
+        std::cout << name << ": BREAKS A PROMISE" << std::endl;
+        return false;
+    }
+}
+
+/// How many of the folder's seeds fail; a folder without any good one proves nothing, and counts as a failure.
+int Failures(const std::filesystem::path &folder) {
+    const std::filesystem::directory_iterator entries(folder);
+    const std::set<std::filesystem::path> seeds(begin(entries), end(entries));
+    int failures = 0;
+    bool anyGood = false;
+    for (const std::filesystem::path &seed : seeds) {
+        failures += Keeps(seed) ? 0 : 1;
+        anyGood = anyGood || seed.filename().string().rfind(kGoodPrefix, 0) == 0;
+    }
+    std::cout << seeds.size() << " seeds, " << failures << " of them fail" << std::endl;
+    return anyGood ? failures : failures + 1;
+}
+
+}  // namespace
+
+int main(int argc, char **argv) try {
+    return argc == 2 && Failures(argv[1]) == 0 ? 0 : 1;
+} catch (const std::exception &error) {
+    std::cerr << error.what() << std::endl;
+    return 1;
+}

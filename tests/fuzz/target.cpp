@@ -1,0 +1,79 @@
+#include "tests/fuzz/target.h"
+
+#include <algorithm>
+#include <iostream>
+#include <sstream>
+#include <stdexcept>
+
+namespace Fuzz {
+
+namespace {
+
+constexpr std::size_t kShortestSecret = 16;
+
+std::string Text(const std::vector<Test::LogLine> &log) {
+    std::ostringstream text;
+    for (const Test::LogLine &line : log) {
+        text << line << "\n";
+    }
+    return text.str();
+}
+
+template <typename Value>
+std::string Shown(const Value &value) {
+    std::ostringstream text;
+    text << value;
+    return text.str();
+}
+
+}  // namespace
+
+void Require(bool kept, const std::string &promise) {
+    if (!kept) {
+        std::cerr << "Broken promise: " << promise << std::endl;
+        throw BrokenPromise{promise};
+    }
+}
+
+void RequireSame(const Test::Failure &failure, const Test::Failure &told) {
+    const bool textIsTold = told.type != typeid(std::logic_error).name();
+    Require(textIsTold ? failure == told : failure.type == told.type,
+            "it ends as told: " + Shown(told) + ", and not: " + Shown(failure));
+}
+
+void RequireOneOf(const Test::Failure &failure, const std::vector<Test::Failure> &told) {
+    Require(std::find(told.begin(), told.end(), failure) != told.end(),
+            "it ends in one of the ways told, and not: " + Shown(failure));
+}
+
+void RequireLog(const std::vector<std::string> &told) {
+    std::vector<Test::LogLine> lines;
+    for (const std::string &text : told) {
+        lines.push_back(Test::Error(text));
+    }
+    const std::vector<Test::LogLine> log = Test::TakeSystemLog();
+    Require(log == lines, "it logs what is told:\n" + Text(lines) + "and not:\n" + Text(log));
+}
+
+void RequireNotIn(const std::vector<Test::LogLine> &log, std::initializer_list<std::string> secrets) {
+    for (const std::string &secret : secrets) {
+        for (const Test::LogLine &line : log) {
+            Require(secret.size() < kShortestSecret || line.text.find(secret) == std::string::npos,
+                    "the log shows nobody's secret: " + line.text);
+        }
+    }
+}
+
+std::vector<std::string> Lines(const std::string &input, std::size_t count) {
+    std::vector<std::string> lines;
+    std::size_t begin = 0;
+    while (lines.size() + 1 < count) {
+        const std::size_t end = std::min(input.find('\n', begin), input.size());
+        lines.push_back(input.substr(begin, end - begin));
+        begin = std::min(end + 1, input.size());
+    }
+    lines.push_back(input.substr(begin));
+    return lines;
+}
+
+}  // namespace Fuzz

@@ -1,0 +1,94 @@
+#include "tests/fuzz/token_oracle.h"
+
+#include <sstream>
+#include <stdexcept>
+
+#include "jwt/jwt.h"
+#include "tests/fuzz/oracle.h"
+
+namespace Fuzz {
+
+namespace {
+
+constexpr char kHeaderNotJson[] = "bad jwt header format!";
+constexpr char kClaimsNotJson[] = "bad jwt body format!";
+
+/// The part's value. Throws what must be thrown of it.
+Json::Value Read(const std::string &part, const char *notJson, bool &certain) {
+    const ExpectedPart read = ReadPart(part, notJson);
+    certain = certain && read.certain;
+    if (read.failure == Test::Fails<std::logic_error>("")) {
+        throw std::logic_error("");
+    }
+    if (!(read.failure == Test::kNothingThrown)) {
+        throw std::invalid_argument(notJson);
+    }
+    return read.value;
+}
+
+}  // namespace
+
+ExpectedPart ReadPart(const std::string &part, const char *notJson) {
+    ExpectedPart read;
+    if (UpToNUL(part).empty()) {
+        read.failure = Test::Fails<std::logic_error>("");
+        return read;
+    }
+    const Decoded decoded = DecodeBase64(part);
+    read.certain = decoded.wellFormed;
+    if (const std::optional<Json::Value> value = ParseJson(UpToNUL(decoded.bytes))) {
+        read.value = *value;
+    } else {
+        read.failure = Test::Fails<std::invalid_argument>(notJson);
+    }
+    return read;
+}
+
+ExpectedToken::ExpectedToken(const std::string &token) {
+    if (token.empty()) {
+        throw std::invalid_argument("token cannot be empty");
+    }
+    const std::vector<std::string> parts = Split(token, '.');
+    if (parts.size() != 3) {
+        throw std::invalid_argument("bad jwt format!");
+    }
+    header = Read(parts[0], kHeaderNotJson, certain);
+    claims = Read(parts[1], kClaimsNotJson, certain);
+    signature = parts[2];
+    signingInput = UpToNUL(parts[0] + "." + parts[1]);
+}
+
+void ExpectedToken::CheckExpiry() const {
+    std::istringstream text(TextMember(claims, "exp").value_or(""));
+    long expiry = 0;
+    text >> expiry;
+    if (kNow > expiry) {
+        throw std::invalid_argument("id_token expired.");
+    }
+}
+
+void ExpectedToken::CheckMember(const std::string &name, const std::string &expected, const char *failure) const {
+    if (TextMember(claims, name) != expected) {
+        throw std::invalid_argument(failure);
+    }
+}
+
+const EVP_MD *ExpectedToken::ChooseDigest(const std::string &family) const {
+    const std::string algorithm = TextMember(header, "alg").value_or("");
+    const EVP_MD *digest = DigestOf(algorithm, family);
+    if (digest == nullptr) {
+        throw TAVO::JWT::jwt_not_support(algorithm + " algorithm is not supported");
+    }
+    return digest;
+}
+
+std::vector<Test::Failure> TokenFailures() {
+    std::vector<Test::Failure> failures;
+    for (const char *text : {"token cannot be empty", "bad jwt format!", kHeaderNotJson, kClaimsNotJson,
+                             "id_token expired.", "client ID invalid"}) {
+        failures.push_back(Test::Fails<std::invalid_argument>(text));
+    }
+    return failures;
+}
+
+}  // namespace Fuzz
