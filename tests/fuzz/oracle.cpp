@@ -16,6 +16,7 @@ namespace Fuzz {
 
 namespace {
 
+constexpr char kBase64[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
 constexpr char kUnreserved[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789-._~";
 
 template <typename Type>
@@ -105,6 +106,28 @@ Decoded DecodeBase64(const std::string &whole) {
     }
     decoded.bytes.resize(decoded.bytes.size() - std::min<std::size_t>(Padding(digits), 2));
     return decoded;
+}
+
+std::string EncodeBase64(const std::string &bytes) {
+    std::string text;
+    for (std::size_t i = 0; i < bytes.size(); i += 3) {
+        unsigned int bits = 0;
+        for (std::size_t j = i; j < i + 3; ++j) {
+            bits = bits << 8 | (j < bytes.size() ? static_cast<unsigned char>(bytes[j]) : 0U);
+        }
+        for (const unsigned int shift : {18U, 12U, 6U, 0U}) {
+            text += kBase64[bits >> shift & 63U];
+        }
+    }
+    for (std::size_t missing = (3 - bytes.size() % 3) % 3; missing > 0; --missing) {
+        text[text.size() - missing] = '=';
+    }
+    return text;
+}
+
+std::optional<std::string> DecodeCanonicalBase64(const std::string &text) {
+    const std::string bytes = DecodeBase64(text).bytes;
+    return EncodeBase64(bytes) == text ? std::optional(bytes) : std::nullopt;
 }
 
 std::string PercentEncode(const std::string &text) {

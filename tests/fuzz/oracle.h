@@ -25,6 +25,12 @@ struct Decoded {
 /// Up to the first NUL, with padding or without.
 Decoded DecodeBase64(const std::string &text);
 
+/// Standard base64 with padding.
+std::string EncodeBase64(const std::string &bytes);
+
+/// The bytes of a text that is exactly what EncodeBase64 makes of them; nothing of any other.
+std::optional<std::string> DecodeCanonicalBase64(const std::string &text);
+
 std::string PercentEncode(const std::string &text);
 
 /// By the reader that everything of the library's is read with; nothing where it refuses.

@@ -1,10 +1,12 @@
 #include "tests/fuzz/token_oracle.h"
 
+#include <algorithm>
 #include <sstream>
 #include <stdexcept>
 
 #include "jwt/jwt.h"
 #include "tests/fuzz/oracle.h"
+#include "tests/fuzz/target.h"
 
 namespace Fuzz {
 
@@ -14,9 +16,8 @@ constexpr char kHeaderNotJson[] = "bad jwt header format!";
 constexpr char kClaimsNotJson[] = "bad jwt body format!";
 
 /// The part's value. Throws what must be thrown of it.
-Json::Value Read(const std::string &part, const char *notJson, bool &certain) {
+Json::Value Read(const std::string &part, const char *notJson) {
     const ExpectedPart read = ReadPart(part, notJson);
-    certain = certain && read.certain;
     if (read.failure == Test::Fails<std::logic_error>("")) {
         throw std::logic_error("");
     }
@@ -24,6 +25,20 @@ Json::Value Read(const std::string &part, const char *notJson, bool &certain) {
         throw std::invalid_argument(notJson);
     }
     return read.value;
+}
+
+/// Whether a client refuses a token for a reason that is told. Of an algorithm the text names it, and of an empty part
+/// there is no told text.
+bool IsReason(const Test::Failure &failure, const std::vector<Test::Failure> &reasons) {
+    for (const char *text : {"token cannot be empty", "bad jwt format!", kHeaderNotJson, kClaimsNotJson,
+                             "id_token expired.", "client ID invalid"}) {
+        if (failure == Test::Fails<std::invalid_argument>(text)) {
+            return true;
+        }
+    }
+    return failure.type == typeid(TAVO::JWT::jwt_not_support).name() ||
+           failure.type == typeid(std::logic_error).name() ||
+           std::find(reasons.begin(), reasons.end(), failure) != reasons.end();
 }
 
 }  // namespace
@@ -44,6 +59,11 @@ ExpectedPart ReadPart(const std::string &part, const char *notJson) {
     return read;
 }
 
+bool IsCertain(const std::string &token) {
+    const std::vector<std::string> parts = Split(token, '.');
+    return parts.size() != 3 || (ReadPart(parts[0], "").certain && ReadPart(parts[1], "").certain);
+}
+
 ExpectedToken::ExpectedToken(const std::string &token) {
     if (token.empty()) {
         throw std::invalid_argument("token cannot be empty");
@@ -52,8 +72,8 @@ ExpectedToken::ExpectedToken(const std::string &token) {
     if (parts.size() != 3) {
         throw std::invalid_argument("bad jwt format!");
     }
-    header = Read(parts[0], kHeaderNotJson, certain);
-    claims = Read(parts[1], kClaimsNotJson, certain);
+    header = Read(parts[0], kHeaderNotJson);
+    claims = Read(parts[1], kClaimsNotJson);
     signature = parts[2];
     signingInput = UpToNUL(parts[0] + "." + parts[1]);
 }
@@ -82,13 +102,15 @@ const EVP_MD *ExpectedToken::ChooseDigest(const std::string &family) const {
     return digest;
 }
 
-std::vector<Test::Failure> TokenFailures() {
-    std::vector<Test::Failure> failures;
-    for (const char *text : {"token cannot be empty", "bad jwt format!", kHeaderNotJson, kClaimsNotJson,
-                             "id_token expired.", "client ID invalid"}) {
-        failures.push_back(Test::Fails<std::invalid_argument>(text));
+void RequireVerdict(const Test::Failure &failure, const Test::Failure &told, bool certain,
+                    const std::vector<Test::Failure> &reasons) {
+    if (certain) {
+        RequireSame(failure, told);
+    } else if (failure == Test::kNothingThrown) {
+        Require(told == Test::kNothingThrown, "no token is trusted that is not good");
+    } else {
+        Require(IsReason(failure, reasons), "a token is refused as told");
     }
-    return failures;
 }
 
 }  // namespace Fuzz

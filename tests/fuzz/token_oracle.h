@@ -26,6 +26,9 @@ struct ExpectedPart {
 
 ExpectedPart ReadPart(const std::string &part, const char *notJson);
 
+/// Whether header and claims are well-formed, or the token is not one at all.
+bool IsCertain(const std::string &token);
+
 /// A token taken apart, and each check as the clients must make it: throws what they must throw.
 class ExpectedToken {
   public:
@@ -35,9 +38,6 @@ class ExpectedToken {
     void CheckMember(const std::string &name, const std::string &expected, const char *failure) const;
     const EVP_MD *ChooseDigest(const std::string &family) const;
 
-    /// Whether every part was well-formed.
-    bool certain = true;
-
     Json::Value header;
     Json::Value claims;
     std::string signature;
@@ -46,8 +46,10 @@ class ExpectedToken {
     std::string signingInput;
 };
 
-/// Everything that both clients may say of a token that is not good, but for its algorithm and signature.
-std::vector<Test::Failure> TokenFailures();
+/// Holds what a client says of a token against what it must say. Where that is not certain it may not be trusted unless
+/// it is good, and is refused for one of the reasons of both clients, or for one of these.
+void RequireVerdict(const Test::Failure &failure, const Test::Failure &told, bool certain,
+                    const std::vector<Test::Failure> &reasons);
 
 }  // namespace Fuzz
 

@@ -1,0 +1,175 @@
+// What reaches the front end from outside: the lines of an input are the query, the Cookie header and any other text.
+// It is good when it concludes the login that was started, with a code.
+#include <algorithm>
+#include <filesystem>
+#include <stdexcept>
+
+#include "frontend/cgi.h"
+#include "frontend/failure.h"
+#include "frontend/pending_login.h"
+#include "frontend/private_folder.h"
+#include "frontend/session.h"
+#include "frontend/text.h"
+#include "tests/fuzz/oracle.h"
+#include "tests/fuzz/target.h"
+
+namespace Fuzz {
+
+namespace {
+
+constexpr char kLogin[] = "0123456789abcdef0123456789abcdef";
+constexpr char kLoginCookie[] = "__Host-login-01234567";
+constexpr char kState[] = "eyJjc3JmIjoiMDEyMzQ1Njc4OWFiY2RlZjAxMjM0NTY3ODlhYmNkZWYiLCJvcmlnaW4iOiIvcGFnZSJ9";
+constexpr char kSession[] = "fedcba9876543210fedcba9876543210";
+constexpr char kSessionCookie[] = "__Host-session";
+constexpr char kUser[] = "CORP\\alice";
+constexpr std::time_t kSeconds = 600;
+
+/// One login under way and one session open, whatever the last input made of them.
+void Prepare() {
+    std::filesystem::create_directories("/usr/tavo/var");
+    Frontend::PrivateFolder logins("logins", kSeconds);
+    logins.Take(kLogin);
+    logins.Keep(kLogin, kState);
+    Frontend::PrivateFolder sessions("sessions", kSeconds);
+    sessions.Take(kSession);
+    sessions.Keep(kSession, R"({"user": "CORP\\alice", "profile": "azure"})");
+}
+
+bool IsHexDigit(char c) { return c != '\0' && std::string("0123456789abcdefABCDEF").find(c) != std::string::npos; }
+
+std::string DecodePercent(const std::string &text) {
+    std::string decoded;
+    std::size_t i = 0;
+    while (i < text.size()) {
+        const std::string escape = text.substr(i, 3);
+        if (escape.size() == 3 && escape[0] == '%' && IsHexDigit(escape[1]) && IsHexDigit(escape[2])) {
+            decoded += static_cast<char>(std::stoi(escape.substr(1), nullptr, 16));
+            i += 3;
+        } else {
+            decoded += text[i] == '+' ? ' ' : text[i];
+            ++i;
+        }
+    }
+    return decoded;
+}
+
+Frontend::Parameters ExpectedParameters(const std::string &query) {
+    Frontend::Parameters parameters;
+    for (const std::string &piece : Split(query, '&')) {
+        if (!piece.empty()) {
+            const std::size_t sign = std::min(piece.find('='), piece.size());
+            const std::string value = piece.substr(std::min(sign + 1, piece.size()));
+            parameters.emplace(DecodePercent(piece.substr(0, sign)), DecodePercent(value));
+        }
+    }
+    return parameters;
+}
+
+/// Every value that the header gives to a cookie.
+std::vector<std::string> CookieValues(const std::string &header, const std::string &name) {
+    std::vector<std::string> values;
+    for (std::string piece : Split(header, ';')) {
+        piece.erase(0, std::min(piece.find_first_not_of(' '), piece.size()));
+        const std::size_t sign = std::min(piece.find('='), piece.size());
+        if (!piece.empty() && piece.substr(0, sign) == name) {
+            values.push_back(piece.substr(std::min(sign + 1, piece.size())));
+        }
+    }
+    return values;
+}
+
+bool HasOnly(const std::string &cookies, const char *name, const char *value) {
+    return CookieValues(cookies, name) == std::vector<std::string>{value};
+}
+
+void RequireSession(const std::string &cookies) {
+    std::optional<Frontend::Session> session;
+    RequireSame(FailureOf([&] { session = Frontend::FindSession(cookies); }), Test::kNothingThrown);
+    Require(session.has_value() == HasOnly(cookies, kSessionCookie, kSession), "a session is its cookie's");
+    Require(!session || session->user == kUser, "a session is its user's");
+}
+
+void RequireOneLine(const std::string &line) {
+    Require(!Frontend::HasControlCharacter(line) && line.size() <= 200, "a line is one, and not a long one");
+}
+
+std::string UnescapeHtml(std::string text) {
+    const std::pair<const char *, const char *> escapes[] = {
+        {"&lt;", "<"}, {"&gt;", ">"}, {"&quot;", "\""}, {"&#39;", "'"}, {"&amp;", "&"}};
+    for (const auto &[escape, character] : escapes) {
+        for (std::size_t at = 0; (at = text.find(escape, at)) != std::string::npos; ++at) {
+            text.replace(at, std::string(escape).size(), character);
+        }
+    }
+    return text;
+}
+
+void RequireHarmless(const std::string &text) {
+    const std::string html = Frontend::EscapeHtml(text);
+    Require(html.find_first_of("<>\"'") == std::string::npos && UnescapeHtml(html) == text, "a text is escaped, whole");
+    RequireOneLine(Frontend::OneLine(text));
+
+    const std::string origin = Frontend::SafeOrigin(text);
+    Require(origin == text || origin == "/index.cgi", "an origin is kept or replaced");
+    Require(origin[0] == '/' && origin[1] != '/' && origin.find('\\') == std::string::npos && origin.size() <= 512 &&
+                origin.find_first_of(" \"") == std::string::npos && !Frontend::HasControlCharacter(origin),
+            "an origin is a path on this site");
+}
+
+/// What a user is told of a provider's answer is the error that it names, and nothing else of it.
+void RequireDiscreet(const std::string &text) {
+    const std::string reason = Frontend::ReasonOf(std::runtime_error(text));
+    RequireOneLine(reason);
+    const std::string shown = UpToNUL(text);
+    const std::size_t begin = shown.find_first_not_of(" \t\r\n");
+    if (begin != std::string::npos && (shown[begin] == '{' || shown[begin] == '[')) {
+        const Json::Value answer = Frontend::ParseObject(shown);
+        const std::string error = StringMember(answer, "error").value_or("");
+        const std::string description = StringMember(answer, "error_description").value_or("");
+        Require(reason == Frontend::OneLine("The provider refused: " + (error.empty() ? "unknown error" : error) +
+                                            (description.empty() ? "" : " (" + description + ")")),
+                "a reason is the error that the provider names");
+    }
+}
+
+void RequireDecoded(const std::string &text) {
+    const Json::Value state = Frontend::DecodeState(text);
+    const std::optional<std::string> decoded = DecodeCanonicalBase64(text);
+    Require(state.isNull() || (state.isObject() && decoded && ParseJson(*decoded) == state),
+            "a state's object is what it encodes");
+}
+
+bool Concludes(const std::string &cookies, const std::string &state) {
+    Frontend::Answer answer;
+    const Test::Failure failure = FailureOf([&] { Frontend::ConcludeLogin(answer, cookies, state); });
+    RequireOneOf(failure,
+                 {Test::kNothingThrown, Test::Fails<Frontend::Refusal>("This sign-in was not started in this browser."),
+                  Test::Fails<Frontend::Refusal>("This sign-in took too long, or was already completed."),
+                  Test::Fails<Frontend::Refusal>("This sign-in was changed on its way.")});
+    return failure == Test::kNothingThrown;
+}
+
+}  // namespace
+
+bool Accepts(const std::string &input) {
+    const std::vector<std::string> lines = Lines(input, 3);
+    const std::string &cookies = lines[1];
+    Prepare();
+    const Frontend::Parameters parameters = Frontend::ParseQuery(lines[0]);
+    Require(parameters == ExpectedParameters(lines[0]), "parameters are the query's");
+    RequireSession(cookies);
+    RequireHarmless(lines[2]);
+    RequireDiscreet(lines[2]);
+    RequireDecoded(lines[2]);
+
+    const std::string state = Frontend::OnlyValue(parameters, "state").value_or("");
+    const bool concluded = Concludes(cookies, state);
+    Require(concluded == (state == kState && HasOnly(cookies, kLoginCookie, kLogin)),
+            "a login is concluded by its own state, in its own browser");
+    Require(!concluded || !Concludes(cookies, state), "a login is concluded once");
+    RequireLog({});
+    return concluded && parameters.count("code") == 1;
+}
+
+}  // namespace Fuzz
