@@ -18,9 +18,8 @@ std::string MakeNonce() { return to_string(boost::uuids::random_generator_mt1993
 
 /// The state carries the digest of the nonce and not the nonce: a front end can tie the ID token to its request by it,
 /// while the state alone does not give the nonce away.
-std::string MakeState(Json::Value stateInfo, const std::string &nonce) {
-    stateInfo[kNonce] = MD5Digest(nonce);
-    return EncodeBase64(Utils::WriteCompactJson(stateInfo));
+std::string MakeState(const Json::Value &stateInfo, const std::string &nonce) {
+    return EncodeBase64(Utils::WriteCompactJson(Utils::WithMember(stateInfo, kNonce, MD5Digest(nonce))));
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <cstring>
 #include <memory>
+#include <new>
 
 #include "utils/cleanse.h"
 
@@ -55,6 +56,14 @@ bool LoadJsonFile(const char *path, Json::Value &document) {
     }
     const CleanseOnExit cleanse(content.data(), content.size());
     return ParseJson(content, document);
+}
+
+Json::Value WithMember(const Json::Value &document, const char *name, const std::string &text) try {
+    Json::Value copy = document;
+    copy[name] = text;
+    return copy;
+} catch (const Json::RuntimeError &) {
+    throw std::bad_alloc();  // the library's own word for no memory
 }
 
 std::string WriteCompactJson(const Json::Value &document) { return Json::FastWriter().write(document); }

@@ -18,6 +18,10 @@ bool ParseJson(const std::string &text, Json::Value &document);
 /// Reads and parses a whole file. On failure the document is null or as it was.
 bool LoadJsonFile(const char *path, Json::Value &document);
 
+/// A copy of an object, or of null, with this member set. Throws Json::LogicError for any other document, and
+/// std::bad_alloc.
+Json::Value WithMember(const Json::Value &document, const char *name, const std::string &text);
+
 /// The compact text of a document, with the line feed that the writer puts at its end.
 std::string WriteCompactJson(const Json::Value &document);
 
