@@ -21,21 +21,58 @@ constexpr char kAzureEndpoints[] = R"({"azure_authorization_endpoint": "https://
                                        "azure_logout_endpoint": "https://idp.example/logout"})";
 constexpr char kWebSphereEndpoints[] = R"({"websphere_authorization_endpoint": "https://idp.example/authorize"})";
 
+/// Values that cannot be encoded stand as they are; a file that cannot be read leaves the settings empty.
+constexpr char kAuthorizationURL[] =
+    R"re((https://idp\.example/authorize)?\?client_id=(the( |%20)client)?&nonce=NONCE&redirect_uri=(https.*)?)re"
+    R"re(&response_type=code&scope=openid( profile email|%20profile%20email)?)re"
+    R"re(&state=<\{"nonce":"(DIGEST)?","origin":"/desk top"\}>)re";
+
 /// {"origin":"/desk top"}
 constexpr char kState[] = "eyJvcmlnaW4iOiIvZGVzayB0b3AifQ==";
 
 Use MakeReady(Profile profile, std::function<void(std::string &)> call) {
     return {std::make_unique<Provider>(profile, profile == Profile::kAzure ? kAzureEndpoints : kWebSphereEndpoints),
-            std::move(call)};
+            nullptr, std::move(call)};
 }
 
-Use LogIn(Profile profile) {
-    static const std::string tokens[] = {
-        SignedToken(TokenHeader(Profile::kAzure), TokenClaims(Profile::kAzure)),
-        SignedToken(TokenHeader(Profile::kWebSphere), TokenClaims(Profile::kWebSphere))};
-    Use use = MakeReady(profile, [](std::string &userName) { TAVO::SSO::OIDCLogin("code/1", userName); });
-    use.provider->AnswerLogin(tokens[static_cast<int>(profile)]);
+void LogIn(std::string &userName) { TAVO::SSO::OIDCLogin("code/1", userName); }
+
+template <Profile profile>
+Use MakeReadyToLogIn() {
+    static const std::string token = SignedToken(TokenHeader(profile), TokenClaims(profile));
+    Use use = MakeReady(profile, LogIn);
+    use.provider->AnswerLogin(token);
     return use;
+}
+
+/// Signed with a key and under a secret that are not the provider's.
+std::string Forge(Profile profile) {
+    static const RSAKey otherKey;
+    return profile == Profile::kAzure ? otherKey.RS256Token(TokenClaims(profile), kKeyID)
+                                      : HS256Token(TokenClaims(profile), "another secret");
+}
+
+Use MakeReadyToLogInWithoutTLS(Profile profile, const std::string &token) {
+    auto server = std::make_unique<Server>();
+    Json::Value endpoints;
+    endpoints["azure_wellknown"] = server->URL("/discovery");
+    endpoints["azure_token_endpoint"] = endpoints["websphere_token_endpoint"] = server->URL("/token");
+    server->Answer(HTTPAnswer(TokenResponse(token)));
+    server->Answer(HTTPAnswer(R"({"jwks_uri": ")" + server->URL("/keys") + "\"}"));
+    server->Answer(HTTPAnswer(KeySet()));
+    return {std::make_unique<Provider>(profile, Compact(endpoints)), std::move(server), LogIn};
+}
+
+template <Profile profile>
+Use MakeReadyForAToken() {
+    static const std::string token = SignedToken(TokenHeader(profile), TokenClaims(profile));
+    return MakeReadyToLogInWithoutTLS(profile, token);
+}
+
+template <Profile profile>
+Use MakeReadyForAForgery() {
+    static const std::string token = Forge(profile);
+    return MakeReadyToLogInWithoutTLS(profile, token);
 }
 
 void ReadProfile(std::string &result) {
@@ -46,10 +83,13 @@ void ReadProfile(std::string &result) {
 
 template <typename Client>
 void BuildAuthorizationURL(std::string &url) {
-    Json::Value state;
-    state["origin"] = "/desk top";
+    static const Json::Value state = Parse(R"({"origin": "/desk top"})");
     url = Client().GetAccessTokenReqURI(state);
 }
+
+void BuildRelayURL(std::string &url) { url = TAVO::SSO::GetSSORelayURL(true, kState, ""); }
+
+void BuildLogoutURL(std::string &url) { url = TAVO::SSO::GetAzureSSOLogoutURL("https://nas.example/webman/index.cgi"); }
 
 std::string MD5Of(const std::string &text) {
     unsigned char digest[EVP_MAX_MD_SIZE];
@@ -111,25 +151,31 @@ void PrintTo(const Scenario &scenario, std::ostream *stream) { *stream << scenar
 
 const std::vector<Scenario> &Scenarios() {
     static const std::vector<Scenario> scenarios{
-        {"AzureLogin", kUserNameBefore, [] { return LogIn(Profile::kAzure); }},
-        {"WebSphereLogin", kUserNameBefore, [] { return LogIn(Profile::kWebSphere); }},
-        {"AzureProfile", "", [] { return MakeReady(Profile::kAzure, ReadProfile); }},
-        {"WebSphereProfile", "", [] { return MakeReady(Profile::kWebSphere, ReadProfile); }},
-        {"AzureAuthorizationURL", "",
+        {"AzureLogin", kUserNameBefore, R"(CORP\\Alice)", MakeReadyToLogIn<Profile::kAzure>},
+        {"WebSphereLogin", kUserNameBefore, "alice", MakeReadyToLogIn<Profile::kWebSphere>},
+        {"AzureProfile", "", "off, , client ''|on, azure, client '(the client)?'",
+         [] { return MakeReady(Profile::kAzure, ReadProfile); }},
+        {"WebSphereProfile", "", "off, , client ''|on, websphere, client '(the client)?'",
+         [] { return MakeReady(Profile::kWebSphere, ReadProfile); }},
+        {"AzureAuthorizationURL", "", kAuthorizationURL,
          [] { return MakeReady(Profile::kAzure, BuildAuthorizationURL<TAVO::SSO::AzureSSOClient>); }},
-        {"WebSphereAuthorizationURL", "",
+        {"WebSphereAuthorizationURL", "", kAuthorizationURL,
          [] { return MakeReady(Profile::kWebSphere, BuildAuthorizationURL<TAVO::SSO::WebSphereSSOClient>); }},
-        {"RelayURL", "",
-         [] {
-             return MakeReady(Profile::kAzure,
-                              [](std::string &url) { url = TAVO::SSO::GetSSORelayURL(true, kState, ""); });
-         }},
+        {"RelayURL", "", R"(ssoclient/relay\.html#(origin=(%2Fdesk%20|/desk )top&)?success=true)",
+         [] { return MakeReady(Profile::kAzure, BuildRelayURL); }},
         {"LogoutURL", "",
-         [] {
-             return MakeReady(Profile::kAzure, [](std::string &url) {
-                 url = TAVO::SSO::GetAzureSSOLogoutURL("https://nas.example/webman/index.cgi");
-             });
-         }},
+         R"((https://idp\.example/logout)?\?post_logout_redirect_uri=https(:|%3A).*nas\.example.*relay\.html)",
+         [] { return MakeReady(Profile::kAzure, BuildLogoutURL); }},
+    };
+    return scenarios;
+}
+
+const std::vector<Scenario> &PlainLogins() {
+    static const std::vector<Scenario> scenarios{
+        {"PlainAzureLogin", kUserNameBefore, R"(CORP\\Alice)", MakeReadyForAToken<Profile::kAzure>},
+        {"PlainWebSphereLogin", kUserNameBefore, "alice", MakeReadyForAToken<Profile::kWebSphere>},
+        {"ForgedAzureLogin", kUserNameBefore, nullptr, MakeReadyForAForgery<Profile::kAzure>},
+        {"ForgedWebSphereLogin", kUserNameBefore, nullptr, MakeReadyForAForgery<Profile::kWebSphere>},
     };
     return scenarios;
 }

@@ -17,18 +17,23 @@ namespace Test {
 /// One use of the library, made ready: nothing is left to do but to call it.
 struct Use {
     std::unique_ptr<Provider> provider;
+    std::unique_ptr<Server> plainServer;
     std::function<void(std::string &result)> call;
 };
 
 struct Scenario {
     const char *name;
-    const char *before;  // what the result is before the call
+    const char *before;     // what the result is before the call
+    const char *mayReturn;  // all that it may be after one that returns, whatever fails; null: it must not return
     Use (*makeReady)();
 };
 
 void PrintTo(const Scenario &scenario, std::ostream *stream);
 
 const std::vector<Scenario> &Scenarios();
+
+/// Logins over HTTP without TLS, also with tokens whose signature is not the provider's.
+const std::vector<Scenario> &PlainLogins();
 
 /// How it ended. Kept as it came: to look at it takes memory, of which there may be none at that moment.
 struct Ending {

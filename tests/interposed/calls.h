@@ -15,6 +15,9 @@ namespace Test {
 /// for themselves is neither counted nor made to fail.
 bool FromLibrary(const void *returnAddress);
 
+/// The same for jsoncpp, which allocates with malloc.
+bool FromJsonLibrary(const void *returnAddress);
+
 /// For FromLibrary: where the function that this stands in returns to.
 #define CALLER __builtin_return_address(0)
 

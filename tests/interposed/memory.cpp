@@ -18,18 +18,20 @@ std::atomic<std::size_t> limit{kNoLimit};
 // This thread's alone: a server that the program runs beside the library has all the memory that it wants.
 thread_local bool counting = false;
 thread_local int requestsUntilFailure = 0;
-thread_local FailingAllocation::Which failing = FailingAllocation::kOne;
+thread_local FailingAllocation::Of countedRequests{};
+thread_local FailingAllocation::Until failing{};
 
-bool CountedOut() {
-    if (!counting) {
+bool CountedOut(bool ofCxx) {
+    if (!counting || (countedRequests == FailingAllocation::Of::kCxx && !ofCxx)) {
         return false;
     }
     --requestsUntilFailure;
-    return requestsUntilFailure == 0 || (requestsUntilFailure < 0 && failing == FailingAllocation::kAllFromThere);
+    return requestsUntilFailure == 0 || (requestsUntilFailure < 0 && failing == FailingAllocation::Until::kEver);
 }
 
 bool Refused(const char *function, std::size_t size, const void *caller) {
-    if (size > limit || CountedOut() || ShouldFail(function, caller)) {
+    const bool ofCxx = FromLibrary(caller) || FromJsonLibrary(caller);
+    if (size > limit || CountedOut(ofCxx) || ShouldFail(function, caller)) {
         errno = ENOMEM;
         return true;
     }
@@ -53,20 +55,21 @@ bool Find(Function *&next, Function *own, const char *name) {
 MemoryLimit::MemoryLimit(std::size_t largest) { limit = largest; }
 MemoryLimit::~MemoryLimit() { limit = kNoLimit; }
 
-FailingAllocation::FailingAllocation(int n, Which which) {
+FailingAllocation::FailingAllocation(int n, Of of, Until until) {
     requestsUntilFailure = n;
-    failing = which;
+    countedRequests = of;
+    failing = until;
     counting = true;
 }
-FailingAllocation::~FailingAllocation() { counting = false; }
+FailingAllocation::~FailingAllocation() { Stop(); }
+void FailingAllocation::Stop() { counting = false; }
 bool FailingAllocation::Happened() { return requestsUntilFailure <= 0; }
 
 }  // namespace Test
 
 extern "C" {
 
-// Not inlined into `operator new`: the request would seem to come from there.
-[[gnu::noinline]] void *malloc(size_t size) noexcept {
+void *malloc(size_t size) noexcept {
     static decltype(&malloc) next = nullptr;
     return Test::Find(next, malloc, "malloc") && !Test::Refused("malloc", size, CALLER) ? next(size) : nullptr;
 }
@@ -86,8 +89,11 @@ void *realloc(void *memory, size_t size) noexcept {
 }  // extern "C"
 
 void *operator new(std::size_t size) {
-    void *memory = std::malloc(size);
+    static decltype(&malloc) next = nullptr;
+    const bool refused = size > Test::limit || Test::CountedOut(true);
+    void *memory = !refused && Test::Find(next, std::malloc, "malloc") ? next(size) : nullptr;
     if (memory == nullptr) {
+        errno = ENOMEM;
         throw std::bad_alloc();
     }
     return memory;

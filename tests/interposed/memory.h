@@ -15,15 +15,21 @@ class MemoryLimit {
     MemoryLimit &operator=(const MemoryLimit &) = delete;
 };
 
-/// While it lives, the n-th request of this thread for memory (1: the next) fails, of whatever size.
+/// Until it is stopped or gone, the n-th request of this thread for memory (1: the next) fails, of whatever size.
 class FailingAllocation {
   public:
-    enum Which { kOne, kAllFromThere };
+    enum class Of {
+        kEveryone,
+        kCxx,  // of the C++ code: whatever goes through `operator new`, and of the library under test and of jsoncpp
+    };
+    enum class Until { kNext, kEver };
 
-    explicit FailingAllocation(int n, Which which = kOne);
+    explicit FailingAllocation(int n, Of of = Of::kEveryone, Until until = Until::kNext);
     ~FailingAllocation();
     FailingAllocation(const FailingAllocation &) = delete;
     FailingAllocation &operator=(const FailingAllocation &) = delete;
+
+    void Stop();
 
     /// Whether there were n requests.
     bool Happened();
