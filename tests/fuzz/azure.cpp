@@ -141,6 +141,12 @@ void RequireToldLog(std::vector<Test::LogLine> log, const std::vector<std::strin
     Require(log == lines, "it logs what is told");
 }
 
+void RequireVerifiedPeers() {
+    for (const std::string &call : Test::CurrentTransport().calls) {
+        Require(call.find("CURLOPT_SSL_VERIFY") == std::string::npos, "the provider's certificate is verified");
+    }
+}
+
 }  // namespace
 
 bool Accepts(const std::string &input) {
@@ -155,6 +161,7 @@ bool Accepts(const std::string &input) {
     Expected expected(lines[0], lines[1]);
     const Test::Failure told = Test::FailureOf([&] { expected.Verify(token); });
     RequireVerdict(failure, told, expected.certain, Reasons());
+    RequireVerifiedPeers();
     const std::vector<Test::LogLine> log = Test::TakeSystemLog();
     RequireNotIn(log, {kClientSecret, token});
     if (expected.certain) {
