@@ -6,7 +6,7 @@ import net from 'node:net';
 import path from 'node:path';
 
 const SETTINGS = '/usr/tavo/etc/ssoclient';
-const FRONT_END_SETTINGS = new URL('../../frontend/lighttpd.conf', import.meta.url).pathname;
+export const FRONT_END_SETTINGS = new URL('../../frontend/lighttpd.conf', import.meta.url).pathname;
 
 function writePrivately(file, settings) {
     writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode: 0o600});
@@ -56,7 +56,8 @@ export async function listen() {
     return socket;
 }
 
-export function startWebServer({socket, webroot, certificate, folder}) {
+/** `frontEndSettings` is the file of the front end's own settings. */
+export function startWebServer({socket, webroot, certificate, folder, frontEndSettings = FRONT_END_SETTINGS}) {
     const settings = path.join(folder, 'lighttpd.conf');
     const log = path.join(folder, 'lighttpd.log');
     writeFileSync(settings, `
@@ -70,7 +71,7 @@ server.modules = ( "mod_openssl" )
 ssl.engine = "enable"
 ssl.pemfile = "${certificate.certFile}"
 ssl.privkey = "${certificate.keyFile}"
-include "${FRONT_END_SETTINGS}"
+include "${frontEndSettings}"
 `);
     // The server takes the socket over when it is told its own process id, which the shell knows before it becomes it.
     // Node has no other name for a listening socket's descriptor.
@@ -79,6 +80,7 @@ include "${FRONT_END_SETTINGS}"
     });
     socket.close();
     return {
+        pid: server.pid,
         log: () => readFileSync(log, 'utf8'),
         async stop() {
             if (server.exitCode === null && server.kill()) {
