@@ -20,6 +20,7 @@
 #include "sso/names.h"
 #include "sso/sso.h"
 #include "sso/token_exchange.h"
+#include "utils/cleanse.h"
 #include "utils/json.h"
 #include "utils/root_privilege.h"
 #include "utils/source_line.h"
@@ -81,7 +82,11 @@ AzureSSOClient::AzureSSOClient() {
                              });
 }
 
-AzureSSOClient::~AzureSSOClient() = default;
+AzureSSOClient::~AzureSSOClient() {
+    Utils::Cleanse(clientSecret);
+    Utils::Cleanse(code);
+    Utils::Cleanse(token);
+}
 
 std::string AzureSSOClient::GetAccessTokenReqURI(const Json::Value &state) {
     return AuthorizationURI({authEndpoint, clientID, redirectURI, kRequestedScope}, state);
@@ -94,6 +99,7 @@ std::string AzureSSOClient::GetIDTokenReqParams() {
 }
 
 void AzureSSOClient::ProcessTokenResponse(std::string response) {
+    const Utils::CleanseTextOnExit cleanse(response);
     token.clear();
     const Json::Value tokenResponse = ParseTokenResponse(response);
     if (Utils::FindMember(tokenResponse, kError) != nullptr) {

@@ -36,7 +36,16 @@ struct ReleaseWith {
     }
 };
 
-using Bytes = std::unique_ptr<unsigned char, ReleaseWith<std::free>>;
+/// Decoded bytes, of a key or of a token: cleansed on release.
+struct ReleaseBytes {
+    std::size_t size = 0;
+    void operator()(unsigned char *bytes) const {
+        OPENSSL_cleanse(bytes, size);
+        std::free(bytes);
+    }
+};
+
+using Bytes = std::unique_ptr<unsigned char, ReleaseBytes>;
 using BIOPointer = std::unique_ptr<BIO, ReleaseWith<BIO_free_all>>;
 using BigNumber = std::unique_ptr<BIGNUM, ReleaseWith<BN_free>>;
 using DigestContext = std::unique_ptr<EVP_MD_CTX, ReleaseWith<EVP_MD_CTX_free>>;
@@ -95,7 +104,8 @@ Bytes Base64UrlDecode(const char *part, int *length) {
     if (pending <= 0) {
         return nullptr;
     }
-    Bytes decoded(static_cast<unsigned char *>(std::malloc(static_cast<std::size_t>(pending) + 1)));
+    const std::size_t size = static_cast<std::size_t>(pending) + 1;
+    Bytes decoded(static_cast<unsigned char *>(std::malloc(size)), ReleaseBytes{size});
     if (!decoded) {
         return nullptr;
     }
@@ -121,8 +131,10 @@ Json::Value ParsePart(const std::string &part, const char *notJson) {
     if (!decoded) {
         throw std::logic_error("empty jwt part");
     }
+    std::string text(reinterpret_cast<const char *>(decoded.get()));
+    const Utils::CleanseTextOnExit cleanse(text);
     Json::Value value;
-    if (!Utils::ParseJson(reinterpret_cast<const char *>(decoded.get()), value)) {
+    if (!Utils::ParseJson(text, value)) {
         throw std::invalid_argument(notJson);
     }
     return value;
@@ -231,7 +243,6 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
     if (!keyBytes) {
         return false;
     }
-    const Utils::CleanseOnExit cleanse(keyBytes.bytes.get(), static_cast<std::size_t>(keyBytes.length));
     BIOPointer filter(BIO_new(BIO_f_base64()));
     if (!filter) {
         return false;

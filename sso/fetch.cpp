@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "sso/sso.h"
+#include "utils/cleanse.h"
 #include "utils/json.h"
 
 namespace TAVO::SSO {
@@ -10,7 +11,7 @@ namespace TAVO::SSO {
 std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept {
     const std::size_t length = size * count;
     try {
-        static_cast<std::string *>(response)->append(data, strnlen(data, length));
+        Utils::AppendSecret(*static_cast<std::string *>(response), data, strnlen(data, length));
     } catch (...) {
         return 0;  // an exception through libcurl's frames would leak its connection and ruin the handle
     }

@@ -3,11 +3,13 @@
 
 #include <map>
 #include <string>
+#include <string_view>
 
 namespace TAVO::SSO {
 
-/// The parameters of a request, in the order in which they are written: by name, byte-wise.
-using Parameters = std::map<std::string, std::string>;
+/// The parameters of a request, in the order in which they are written: by name, byte-wise. Names and values stay the
+/// caller's: a copy of the client secret would have to be cleansed.
+using Parameters = std::map<std::string_view, std::string_view>;
 
 /// "name=value" pairs joined by "&", the values percent-encoded: the body of a form.
 std::string WriteForm(const Parameters &parameters);

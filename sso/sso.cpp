@@ -92,8 +92,9 @@ void SSOClient::ProcessTokenResponse(std::string /*response*/) {
 void SSOClient::OpenIDConnectLogin(std::string authorizationCode, std::string &userName) {
     SetCode(std::move(authorizationCode));
     std::string body = GetIDTokenReqParams();
-    const Utils::CleanseOnExit cleanse(body.data(), body.size());  // it holds the client secret
+    const Utils::CleanseTextOnExit cleanseBody(body);  // it holds the client secret
     std::string response;
+    const Utils::CleanseTextOnExit cleanseResponse(response);  // it holds the user's tokens
     RequestTokenEndpoint(response, body);
     ProcessTokenResponse(response);
     VerifyIDToken();

@@ -4,6 +4,7 @@
 #include <openssl/crypto.h>
 
 #include <cstddef>
+#include <string>
 
 namespace TAVO::Utils {
 
@@ -20,6 +21,23 @@ class CleanseOnExit {
     void *memory_;
     std::size_t size_;
 };
+
+inline void Cleanse(std::string &text) { OPENSSL_cleanse(text.data(), text.size()); }
+
+/// The same for a text that may still grow in the scope.
+class CleanseTextOnExit {
+  public:
+    explicit CleanseTextOnExit(std::string &text) : text_(text) {}
+    ~CleanseTextOnExit() { Cleanse(text_); }
+    CleanseTextOnExit(const CleanseTextOnExit &) = delete;
+    CleanseTextOnExit &operator=(const CleanseTextOnExit &) = delete;
+
+  private:
+    std::string &text_;
+};
+
+/// Appends to a text that may hold a secret. Where it has to move for want of room, nothing of it stays behind.
+void AppendSecret(std::string &text, const char *bytes, std::size_t length);
 
 }  // namespace TAVO::Utils
 

@@ -27,7 +27,7 @@ bool ReadFile(const char *path, std::string &content) {
     char chunk[4096];
     const CleanseOnExit cleanse(chunk, sizeof chunk);  // the client secret passes through
     while (const std::size_t length = std::fread(chunk, 1, sizeof chunk, file.get())) {
-        content.append(chunk, length);
+        AppendSecret(content, chunk, length);
     }
     return std::ferror(file.get()) == 0;
 }
@@ -38,7 +38,8 @@ bool ParseJson(const std::string &text, Json::Value &document) {
     Json::Value parsed;  // of which nothing gets out unless all of it is there
     try {
         Json::Reader reader;
-        if (reader.parse(text, parsed, true)) {
+        // By its bounds: given the string, the reader would keep a copy, and the text may hold the client secret.
+        if (reader.parse(text.data(), text.data() + text.size(), parsed, true)) {
             document.swap(parsed);
             return true;
         }
@@ -51,11 +52,8 @@ bool ParseJson(const std::string &text, Json::Value &document) {
 
 bool LoadJsonFile(const char *path, Json::Value &document) {
     std::string content;
-    if (!ReadFile(path, content)) {
-        return false;
-    }
-    const CleanseOnExit cleanse(content.data(), content.size());
-    return ParseJson(content, document);
+    const CleanseTextOnExit cleanse(content);
+    return ReadFile(path, content) && ParseJson(content, document);
 }
 
 Json::Value WithMember(const Json::Value &document, const char *name, const std::string &text) try {

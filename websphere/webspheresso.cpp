@@ -42,7 +42,11 @@ WebSphereSSOClient::WebSphereSSOClient() {
                              });
 }
 
-WebSphereSSOClient::~WebSphereSSOClient() = default;
+WebSphereSSOClient::~WebSphereSSOClient() {
+    Utils::Cleanse(clientSecret);
+    Utils::Cleanse(code);
+    Utils::Cleanse(token);
+}
 
 std::string WebSphereSSOClient::GetAccessTokenReqURI(const Json::Value &stateInfo) {
     return AuthorizationURI({authEndpoint, clientID, redirectURI, kRequestedScope}, stateInfo);
@@ -57,6 +61,7 @@ std::string WebSphereSSOClient::GetIDTokenReqParams() {
 }
 
 void WebSphereSSOClient::ProcessTokenResponse(std::string response) {
+    const Utils::CleanseTextOnExit cleanse(response);
     token.clear();
     token = FindIDToken(ParseTokenResponse(response));
 }
@@ -72,7 +77,7 @@ void WebSphereSSOClient::VerifyIDToken() {
 
     // JwtHMACVerify takes its key as base64 text; the key is the secret's own bytes.
     std::string key = EncodeBase64(clientSecret);
-    const Utils::CleanseOnExit cleanse(key.data(), key.size());
+    const Utils::CleanseTextOnExit cleanse(key);
     jwt.JwtHMACVerify(key, digest);
 }
 

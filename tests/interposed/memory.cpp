@@ -1,8 +1,11 @@
 #include "tests/interposed/memory.h"
 
+#include <malloc.h>
+
 #include <atomic>
 #include <cerrno>
 #include <cstdlib>
+#include <cstring>
 #include <limits>
 #include <new>
 
@@ -50,6 +53,11 @@ bool Find(Function *&next, Function *own, const char *name) {
     return next != nullptr;
 }
 
+/// Memory comes filled: what its last owner has left in it would be taken for the next one's.
+void *Filled(void *memory) {
+    return memory == nullptr ? nullptr : std::memset(memory, 0x55, malloc_usable_size(memory));
+}
+
 }  // namespace
 
 MemoryLimit::MemoryLimit(std::size_t largest) { limit = largest; }
@@ -71,7 +79,8 @@ extern "C" {
 
 void *malloc(size_t size) noexcept {
     static decltype(&malloc) next = nullptr;
-    return Test::Find(next, malloc, "malloc") && !Test::Refused("malloc", size, CALLER) ? next(size) : nullptr;
+    return Test::Find(next, malloc, "malloc") && !Test::Refused("malloc", size, CALLER) ? Test::Filled(next(size))
+                                                                                        : nullptr;
 }
 
 void *calloc(size_t count, size_t size) noexcept {
@@ -91,7 +100,7 @@ void *realloc(void *memory, size_t size) noexcept {
 void *operator new(std::size_t size) {
     static decltype(&malloc) next = nullptr;
     const bool refused = size > Test::limit || Test::CountedOut(true);
-    void *memory = !refused && Test::Find(next, std::malloc, "malloc") ? next(size) : nullptr;
+    void *memory = !refused && Test::Find(next, std::malloc, "malloc") ? Test::Filled(next(size)) : nullptr;
     if (memory == nullptr) {
         errno = ENOMEM;
         throw std::bad_alloc();

@@ -258,7 +258,7 @@ TEST_F(WebSphereVerification, TheSecretsBase64FormAndTheKeyAreOverwritten) {
         << "the encoder's buffer";
     EXPECT_THAT(cleansed, testing::Contains(form)) << "the key text";
     EXPECT_THAT(cleansed, testing::Contains(form + std::string(1, '\0'))) << "the decoder's scratch space";
-    EXPECT_THAT(cleansed, testing::Contains(client.clientSecret)) << "the decoded key";
+    EXPECT_THAT(cleansed, testing::Contains(testing::StartsWith(client.clientSecret))) << "the decoded key";
 }
 
 TEST_F(WebSphereVerification, ATokenWithAKidNeedsNoKeySet) {

@@ -1,0 +1,114 @@
+#include <gmock/gmock.h>
+#include <openssl/evp.h>
+
+#include <string>
+#include <vector>
+
+#include "sso/sso.h"
+#include "tests/interposed/releases.h"
+#include "tests/loopback/provider.h"
+#include "tests/support/system_log.h"
+#include "tests/support/token.h"
+
+// What a login needs to know and nobody else may: the client secret, the code, what the provider answers.
+namespace Test {
+
+namespace {
+
+using ::testing::Each;
+using ::testing::Field;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+
+std::string Base64(const std::string &bytes) {
+    std::string text(4 * ((bytes.size() + 2) / 3), '\0');
+    EVP_EncodeBlock(reinterpret_cast<unsigned char *>(text.data()),
+                    reinterpret_cast<const unsigned char *>(bytes.data()), static_cast<int>(bytes.size()));
+    return text;
+}
+
+/// A text in each of the forms that it takes on its way.
+std::vector<std::string> FormsOf(const std::string &text) { return {text, TAVO::SSO::URLEncode(text), Base64(text)}; }
+
+class Secrets : public ::testing::TestWithParam<Profile> {
+  protected:
+    static constexpr char kCode[] = "a code & long enough to need memory of its own";
+    static constexpr char kAccessToken[] = "an access token that nobody asked for";
+
+    static std::string Claims() { return Compact(TokenClaims(GetParam())); }
+
+    static std::vector<std::string> All() {
+        std::vector<std::string> secrets = FormsOf(kSecret);
+        for (const std::string &form : FormsOf(kCode)) {
+            secrets.push_back(form);
+        }
+        secrets.insert(secrets.end(), {kAccessToken, Claims(), "&client_secret="});
+        return secrets;
+    }
+
+    static std::string FailureOfLogin() {
+        std::string userName;
+        try {
+            TAVO::SSO::OIDCLogin(kCode, userName);
+        } catch (const std::exception &error) {
+            return error.what();
+        }
+        return {};
+    }
+
+    static std::string Answer(const std::string &token) {
+        return HTTPAnswer(R"({"access_token": ")" + std::string(kAccessToken) + R"(", "id_token": ")" + token + "\"}");
+    }
+};
+
+INSTANTIATE_TEST_SUITE_P(Of, Secrets, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
+                         [](const auto &row) { return Name(row.param); });
+
+TEST_P(Secrets, AreOverwrittenBeforeTheirMemoryIsReleased) {
+    Provider provider(GetParam());
+    provider.AnswerByteByByte(Answer(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()))));
+    provider.AnswerVerification();
+    const std::vector<std::string> secrets = All();
+    std::string userName;
+    const std::string code = kCode;
+    const WatchReleases releases(secrets);
+    TAVO::SSO::OIDCLogin(code, userName);
+    EXPECT_EQ(userName, UserName(GetParam()));
+    EXPECT_GT(releases.Blocks(), 100U);
+    EXPECT_THAT(releases.Found(), IsEmpty());
+}
+
+/// Answers of the token endpoint that end a login at each of its steps.
+std::vector<std::string> Failures(Profile profile) {
+    const std::string token = SignedToken(TokenHeader(profile), TokenClaims(profile));
+    return {
+        "not JSON",
+        R"({"error": "invalid_grant", "error_description": "the code is used up"})",
+        R"({"access_token": "none for you"})",
+        TokenResponse("no token"),
+        TokenResponse(token + "x"),
+        TokenResponse(SignedToken(TokenHeader(profile), Change(TokenClaims(profile), R"({"exp": 1})"))),
+        TokenResponse(SignedToken(TokenHeader(profile), Change(TokenClaims(profile), R"({"aud": "another"})"))),
+        TokenResponse(SignedToken(Change(TokenHeader(profile), R"({"alg": "none"})"), TokenClaims(profile))),
+    };
+}
+
+TEST_P(Secrets, AreInNoLogLineAndInNoException) {
+    for (const std::string &answer : Failures(GetParam())) {
+        Provider provider(GetParam());
+        provider.AnswerByteByByte(HTTPAnswer(answer));
+        provider.AnswerVerification();
+        const std::string failure = FailureOfLogin();
+        EXPECT_NE(failure, "");
+        const std::vector<LogLine> log = TakeSystemLog();
+        for (const std::string &secret : All()) {
+            EXPECT_THAT(failure, Not(HasSubstr(secret)));
+            EXPECT_THAT(log, Each(Field(&LogLine::text, Not(HasSubstr(secret)))));
+        }
+    }
+}
+
+}  // namespace
+
+}  // namespace Test
