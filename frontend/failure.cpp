@@ -2,6 +2,7 @@
 
 #include <sso/sso.h>
 #include <syslog.h>
+#include <unistd.h>
 
 #include <iostream>
 
@@ -10,6 +11,10 @@
 namespace Frontend {
 
 namespace {
+
+// In seconds; the web server's own limit is shorter, and has an answer for the browser. But lighttpd 1.4.69 does not
+// hold a program to it whose request was there when its connection was accepted.
+constexpr unsigned int kLongestRun = 70;
 
 void Fail(Answer &answer, const std::string &reason) {
     syslog(LOG_AUTH | LOG_WARNING, "frontend: sign-in failed: %s", reason.c_str());
@@ -39,6 +44,7 @@ std::string ProviderError(const std::string &error, const std::string &descripti
 }
 
 int Serve(void (*serve)(Answer &)) {
+    alarm(kLongestRun);
     Answer answer;
     try {
         serve(answer);

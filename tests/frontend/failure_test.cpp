@@ -1,6 +1,9 @@
 #include "frontend/failure.h"
 
 #include <gmock/gmock.h>
+#include <unistd.h>
+
+#include <csignal>
 
 using namespace Frontend;
 
@@ -25,6 +28,15 @@ TEST(Reason, TellsNothingOfWhatOnlyLooksLikeAnAnswer) {
 TEST(Reason, IsOneShortLine) {
     EXPECT_EQ(Reason("a\r\nSet-Cookie: b\n"), "a  Set-Cookie: b");
     EXPECT_EQ(Reason(std::string(5000, 'x')).size(), 200U);
+}
+
+TEST(AProgram, IsEndedByAnAlarmIfItRunsTooLong) {
+    const auto runTooLong = [](Answer &) {
+        if (alarm(0) > 0) {
+            raise(SIGALRM);
+        }
+    };
+    EXPECT_EXIT(Serve(runTooLong), ::testing::KilledBySignal(SIGALRM), "");
 }
 
 }  // namespace
