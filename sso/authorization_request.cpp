@@ -1,5 +1,7 @@
 #include "sso/authorization_request.h"
 
+#include <boost/random/mersenne_twister.hpp>
+#include <boost/uuid/detail/random_provider.hpp>
 #include <boost/uuid/random_generator.hpp>
 #include <boost/uuid/uuid_io.hpp>
 #include <iostream>
@@ -14,7 +16,12 @@ namespace TAVO::SSO {
 
 namespace {
 
-std::string MakeNonce() { return to_string(boost::uuids::random_generator_mt19937()()); }
+std::string MakeNonce() {
+    // Seeded as the generator seeds an engine of its own, which it would lose when the system has no random numbers.
+    boost::uuids::detail::random_provider entropy;
+    boost::random::mt19937 engine(entropy);
+    return to_string(boost::uuids::basic_random_generator<boost::random::mt19937>(engine)());
+}
 
 /// The state carries the digest of the nonce and not the nonce: a front end can tie the ID token to its request by it,
 /// while the state alone does not give the nonce away.

@@ -16,6 +16,7 @@ constexpr char kRuntime[] = "belongs to the compiler's run time; memory running 
 
 constexpr CalledFunction kCalledFunctions[] = {
     // libc
+    {"__assert_fail", "does not return"},
     {"__errno_location", kConstant},
     {"__libc_single_threaded", kConstant},
     {"__stack_chk_fail", kRuntime},

@@ -162,7 +162,10 @@ TEST(TheTableOfCalls, HasARowForEachCallOfTheBuiltLibrary) {
     }
     const std::set<std::string> called = UndefinedSymbols();
     EXPECT_THAT(called, ::testing::Contains("curl_easy_perform"));
-    EXPECT_THAT(rows, ::testing::IsSupersetOf(called));
+    std::set<std::string> withoutRow;
+    std::set_difference(called.begin(), called.end(), rows.begin(), rows.end(),
+                        std::inserter(withoutRow, withoutRow.end()));
+    EXPECT_THAT(withoutRow, ::testing::IsEmpty());
 }
 
 TEST(TheTableOfCalls, HasSeenEachCallThatCanFail) {

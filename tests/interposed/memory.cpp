@@ -23,6 +23,7 @@ thread_local bool counting = false;
 thread_local int requestsUntilFailure = 0;
 thread_local FailingAllocation::Of countedRequests{};
 thread_local FailingAllocation::Until failing{};
+thread_local bool filling = false;
 
 bool CountedOut(bool ofCxx) {
     if (!counting || (countedRequests == FailingAllocation::Of::kCxx && !ofCxx)) {
@@ -53,9 +54,8 @@ bool Find(Function *&next, Function *own, const char *name) {
     return next != nullptr;
 }
 
-/// Memory comes filled: what its last owner has left in it would be taken for the next one's.
 void *Filled(void *memory) {
-    return memory == nullptr ? nullptr : std::memset(memory, 0x55, malloc_usable_size(memory));
+    return filling && memory != nullptr ? std::memset(memory, 0x55, malloc_usable_size(memory)) : memory;
 }
 
 }  // namespace
@@ -72,6 +72,8 @@ FailingAllocation::FailingAllocation(int n, Of of, Until until) {
 FailingAllocation::~FailingAllocation() { Stop(); }
 void FailingAllocation::Stop() { counting = false; }
 bool FailingAllocation::Happened() { return requestsUntilFailure <= 0; }
+
+void FillNewMemory(bool fill) { filling = fill; }
 
 }  // namespace Test
 

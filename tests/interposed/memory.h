@@ -35,6 +35,10 @@ class FailingAllocation {
     bool Happened();
 };
 
+/// Whether this thread's memory comes filled: what a block's last owner has left in it would be taken for the next
+/// one's.
+void FillNewMemory(bool fill);
+
 }  // namespace Test
 
 #endif

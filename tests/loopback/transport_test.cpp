@@ -7,8 +7,8 @@
 #include <typeinfo>
 
 #include "sso/sso.h"
-#include "tests/support/authority.h"
 #include "tests/interposed/memory.h"
+#include "tests/support/authority.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"
 
