@@ -15,7 +15,9 @@ namespace {
 
 // strerror_r comes in two forms, chosen by the compiler's macros: one returns the text, the other fills the buffer.
 [[maybe_unused]] const char *ErrorText(const char *text, const char * /*buffer*/) { return text; }
+// GCOVR_EXCL_START: the other form is that of glibc with g++ and clang's default macros
 [[maybe_unused]] const char *ErrorText(int /*result*/, const char *buffer) { return buffer; }
+// GCOVR_EXCL_STOP
 
 /// While it lives, the process's effective ids are root's, as far as the process may change them.
 class RootPrivilege {
