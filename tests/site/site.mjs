@@ -1,7 +1,8 @@
 // A whole site for a run: the appliance with the front end, a real OpenID provider, users, and an authority that both
 // trust. Runs as root of private namespaces.
 import {randomBytes, randomUUID} from 'node:crypto';
-import {copyFileSync, mkdtempSync} from 'node:fs';
+import {appendFileSync, copyFileSync, mkdtempSync} from 'node:fs';
+import {join} from 'node:path';
 
 import {listen, startWebServer, writeDomains, writeSettings} from './appliance.mjs';
 import {makeAuthority} from './authority.mjs';
@@ -31,6 +32,11 @@ function makeClients(origin, tenant) {
     ];
 }
 
+/** For tests/secrets/search, which looks for them in all that the tests of this build print. */
+function recordSecrets(webroot, clients) {
+    appendFileSync(join(webroot, '../../secrets'), clients.map(({secret}) => `${secret}\n`).join(''), {mode: 0o600});
+}
+
 /**
  * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it gives,
  * `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
@@ -44,6 +50,7 @@ export async function startSite({webroot, nodeModules, users, onRequest, onLog})
     const origin = `https://localhost:${socket.address().port}`;
     const tenant = randomUUID();
     const clients = makeClients(origin, tenant);
+    recordSecrets(webroot, clients);
     const providerCertificate = authority.issue('provider', 'IP:127.0.0.1');
     const applianceCertificate = authority.issue('appliance', 'DNS:localhost');
     const fingerprints = [providerCertificate, applianceCertificate].map(({fingerprint}) => fingerprint);
