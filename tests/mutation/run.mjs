@@ -1,6 +1,6 @@
-// Applies each change of mutations.txt alone to a copy of the library's sources, builds, and runs the quick suites.
-// A change that no test notices is a survivor: named at the end, and the exit status tells of it, unless its reason
-// says why it makes no difference.
+// Applies each change of mutations.txt alone to a copy of the library's sources, builds, and runs the quick suites; those
+// that no test notices once more under sanitizers. A change that nobody notices then is a survivor: named at the end,
+// and the exit status tells of it, unless its reason says why it makes no difference.
 //
 //   node tests/mutation/run.mjs [FILE...]    only the changes to these sources
 //
@@ -11,7 +11,9 @@ import { dirname, join } from 'node:path';
 import { fileURLToPath } from 'node:url';
 
 const project = join(dirname(fileURLToPath(import.meta.url)), '../..');
-const copies = [1, 2].map((number) => join(project, 'build/mutation', String(number)));
+const copy = (name, preset) => ({folder: join(project, 'build/mutation', name), preset});
+const copies = [copy('1', 'dev'), copy('2', 'dev')];
+const sanitizedCopies = [copy('asan', 'asan')];
 const suites = ['unit/unit_tests', 'unit/interposition_tests', 'loopback/loopback_secrets_test',
   'loopback/loopback_login_test', 'loopback/loopback_transport_test', 'faults/faults_calls_test',
   'faults/faults_memory_test'];
@@ -47,53 +49,60 @@ function run(command, commandArguments, folder) {
   });
 }
 
-const build = (copy) => run('cmake', ['--build', 'build/dev', '--', '--quiet', '-j1', 'tavosso'], copy);
+const build = ({folder, preset}) =>
+  run('cmake', ['--build', `build/${preset}`, '--', '--quiet', '-j1', 'tavosso'], folder);
 
-async function firstFailingSuite(copy) {
+async function firstFailingSuite({folder, preset}) {
   for (const suite of suites) {
-    const passed = await run('tools/private-root', [`build/dev/tests/${suite}`, '--gtest_fail_fast'], copy);
+    const passed = await run('tools/private-root', [`build/${preset}/tests/${suite}`, '--gtest_fail_fast'], folder);
     if (!passed) return suite;
   }
   return null;
 }
 
-function prepare(copy) {
-  rmSync(copy, { recursive: true, force: true });
-  execFileSync('git', ['clone', '--quiet', project, copy]);
+async function prepare(copy) {
+  const {folder, preset} = copy;
+  rmSync(folder, { recursive: true, force: true });
+  execFileSync('git', ['clone', '--quiet', project, folder]);
   const quick = ['-DCMAKE_BUILD_TYPE=Debug', '-DCMAKE_COMPILE_WARNING_AS_ERROR=OFF'];
-  execFileSync('cmake', ['--preset', 'dev', ...quick], { cwd: copy, stdio: 'ignore' });
+  execFileSync('cmake', ['--preset', preset, ...quick], { cwd: folder, stdio: 'ignore' });
   const targets = ['tavosso', ...suites.map((suite) => suite.split('/')[1])];
-  execFileSync('cmake', ['--build', 'build/dev', '--', '--quiet', ...targets], { cwd: copy, stdio: 'inherit' });
+  execFileSync('cmake', ['--build', `build/${preset}`, '--', '--quiet', ...targets], { cwd: folder, stdio: 'inherit' });
+  const failing = await firstFailingSuite(copy);
+  if (failing) throw new Error(`${failing} fails without any change`);
 }
 
 async function examine(mutation, copy) {
-  const path = join(copy, mutation.file);
+  const path = join(copy.folder, mutation.file);
   const source = readFileSync(path, 'utf8');
   writeFileSync(path, apply(mutation, source));
   const built = await build(copy);
   mutation.noticedBy = built ? await firstFailingSuite(copy) : 'the compiler';
   writeFileSync(path, source);
   const verdict = mutation.noticedBy ?? (mutation.reason ? `nobody: ${mutation.reason}` : 'NOBODY');
-  console.log(`${mutation.file}: ${mutation.old} -> ${mutation.changed}: noticed by ${verdict}`);
+  console.log(`${copy.preset}: ${mutation.file}: ${mutation.old} -> ${mutation.changed}: noticed by ${verdict}`);
 }
+
+async function examineAll(mutations, copies) {
+  if (mutations.length === 0) return;
+  for (const copy of copies) await prepare(copy);
+  const queue = [...mutations];
+  await Promise.all(copies.map(async (copy) => {
+    for (let mutation = queue.shift(); mutation; mutation = queue.shift()) await examine(mutation, copy);
+  }));
+}
+
+const survivorsOf = (mutations) => mutations.filter(({ noticedBy, reason }) => noticedBy === null && !reason);
 
 const files = process.argv.slice(2);
 const mutations = readMutations().filter(({ file }) => files.length === 0 || files.includes(file));
 if (mutations.length === 0) throw new Error('nothing to change');
 mutations.forEach((mutation) => apply(mutation, readFileSync(join(project, mutation.file), 'utf8')));
-copies.forEach(prepare);
-for (const copy of copies) {
-  const failing = await firstFailingSuite(copy);
-  if (failing) throw new Error(`${failing} fails without any change`);
-}
-const queue = [...mutations];
-await Promise.all(copies.map(async (copy) => {
-  for (let mutation = queue.shift(); mutation; mutation = queue.shift()) await examine(mutation, copy);
-  await build(copy);
-}));
+await examineAll(mutations, copies);
+await examineAll(survivorsOf(mutations), sanitizedCopies);
 
 const uncompiled = mutations.filter(({ noticedBy }) => noticedBy === 'the compiler');
-const survivors = mutations.filter(({ noticedBy, reason }) => noticedBy === null && !reason);
+const survivors = survivorsOf(mutations);
 const needless = mutations.filter(({ noticedBy, reason }) => noticedBy !== null && reason);
 console.log(`\n${mutations.length} changes, ${uncompiled.length} of which do not compile, ${survivors.length} survive`);
 survivors.forEach(({ file, old, changed }) => console.log(`survives: ${file}: ${old} -> ${changed}`));
