@@ -1,0 +1,59 @@
+#include "tests/support/refused_calls.h"
+
+#include <linux/filter.h>
+#include <linux/seccomp.h>
+#include <sys/prctl.h>
+
+#include <cerrno>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <stdexcept>
+#include <string>
+
+namespace Test {
+
+namespace {
+
+using Filter = std::vector<sock_filter>;
+
+// An argument has 64 bits, of which an id fills the lower; a filter loads 32.
+constexpr std::size_t kLowerHalf = __BYTE_ORDER__ == __ORDER_BIG_ENDIAN__ ? 4 : 0;
+
+constexpr std::size_t OffsetOfArgument(std::size_t n) {
+    return offsetof(seccomp_data, args) + n * sizeof(std::uint64_t) + kLowerHalf;
+}
+
+void Return(Filter &filter, std::uint32_t verdict) { filter.push_back(BPF_STMT(BPF_RET | BPF_K, verdict)); }
+
+/// Goes on where the value at that offset is the wanted one, and else skips so many statements.
+void Require(Filter &filter, std::size_t offset, std::uint32_t wanted, std::uint8_t skipped) {
+    filter.push_back(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(offset)));
+    filter.push_back(BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, wanted, 0, skipped));
+}
+
+void Refuse(Filter &filter, const IdChange &change) {
+    constexpr auto kUnchanged = static_cast<std::uint32_t>(-1);
+    Require(filter, offsetof(seccomp_data, nr), static_cast<std::uint32_t>(change.call), 7);
+    Require(filter, OffsetOfArgument(0), kUnchanged, 5);
+    Require(filter, OffsetOfArgument(1), change.id, 3);
+    Require(filter, OffsetOfArgument(2), kUnchanged, 1);
+    Return(filter, SECCOMP_RET_ERRNO | EPERM);
+}
+
+}  // namespace
+
+void RefuseIdChanges(const std::vector<IdChange> &changes) {
+    Filter filter;
+    for (const IdChange &change : changes) {
+        Refuse(filter, change);
+    }
+    Return(filter, SECCOMP_RET_ALLOW);
+    const sock_fprog program{static_cast<unsigned short>(filter.size()), filter.data()};
+    // Without root's right to filter, a process may filter only what can gain no rights any more.
+    if (prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) != 0 || prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program) != 0) {
+        throw std::runtime_error(std::string("no filter for system calls: ") + std::strerror(errno));
+    }
+}
+
+}  // namespace Test
