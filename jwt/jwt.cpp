@@ -290,6 +290,7 @@ jwt_verify_failed::jwt_verify_failed(std::string message) : jwt_exception(std::m
 jwt_verify_failed::~jwt_verify_failed() = default;
 
 Jwt::Jwt(std::string token) {
+    const Utils::CleanseTextOnExit cleanse(token);
     // Counted before it is split: the pieces of a provider's 30 MB of dots would take more than a gigabyte.
     if (std::count(token.begin(), token.end(), '.') != 2) {
         throw std::invalid_argument("bad jwt format!");
@@ -301,7 +302,10 @@ Jwt::Jwt(std::string token) {
     signature = std::move(parts[2]);
 }
 
-Jwt::~Jwt() = default;
+Jwt::~Jwt() {
+    Utils::Cleanse(body);
+    Utils::Cleanse(signature);
+}
 
 Json::Value Jwt::GetHeader() { return ParsePart(header, "bad jwt header format!"); }
 Json::Value Jwt::GetBody() { return ParsePart(body, "bad jwt body format!"); }

@@ -110,6 +110,8 @@ TEST_P(FailingExchange, AnyOtherExceptionGoesThroughUnlogged) {
     EXPECT_THROW(GetParam().run(client), std::domain_error);
     transfer = [](std::string &) { throw std::runtime_error("the reason"); };
     EXPECT_THROW(GetParam().run(client), std::runtime_error);
+    transfer = [](std::string &) { throw sso_op_failed("the reason"); };
+    EXPECT_THROW(GetParam().run(client), sso_op_failed);
     EXPECT_THAT(TakeSystemLog(), testing::IsEmpty());
 }
 

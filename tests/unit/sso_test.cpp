@@ -130,6 +130,7 @@ TEST_F(ClientBase, AnUnreachableDiscoveryURLIsOneLineAndLeavesOutNull) {
 
 TEST_F(ClientBase, ADiscoveryDocumentThatIsNotJSONIsOneLineAndLeavesOutNull) {
     CurrentTransport().answers[kWellknown] = Whole("<html>not found</html>");
+    out["jwks_uri"] = "of another time";
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N bad wellknown json format.")));
