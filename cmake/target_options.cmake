@@ -1,10 +1,12 @@
 include(CheckCXXCompilerFlag)
+include(CheckPIESupported)
 
-option(TAVOSSO_HARDENING "Harden what is built: RELRO, immediate binding, stack protection, control-flow protection" ON)
+option(TAVOSSO_HARDENING "Harden what is built: RELRO, immediate binding, PIE, stack protection, control-flow protection" ON)
 option(TAVOSSO_SANITIZE "Build everything with AddressSanitizer and UndefinedBehaviorSanitizer" OFF)
 option(TAVOSSO_FUZZ "Build everything for libFuzzer (clang alone), and the fuzz targets with it" OFF)
 
 check_cxx_compiler_flag(-fcf-protection=full TAVOSSO_HAS_CF_PROTECTION)
+check_pie_supported(LANGUAGES CXX)
 
 # What everything is built with.
 function(tavosso_options target)
@@ -28,6 +30,14 @@ function(tavosso_options target)
         # Counts the edges that an input reaches; _GLIBCXX_ASSERTIONS holds every index against its container's bounds.
         target_compile_options(${target} PRIVATE -fsanitize=fuzzer-no-link)
         target_compile_definitions(${target} PRIVATE _GLIBCXX_ASSERTIONS)
+    endif()
+endfunction()
+
+# A program that is served, and what is linked into it: loaded at any address, whatever the compiler does by itself.
+function(tavosso_program_options target)
+    tavosso_options(${target})
+    if(TAVOSSO_HARDENING)
+        set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON)
     endif()
 endfunction()
 
