@@ -9,6 +9,7 @@
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"
+#include "tests/support/error_queue.h"
 #include "tests/unit/fixture.h"
 
 namespace Test {
@@ -106,21 +107,6 @@ TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
     EXPECT_EQ(response, "earlier answer");
 }
 
-/// What stands in the calling thread's error queue of OpenSSL, as texts.
-std::vector<std::string> ErrorQueue() {
-    std::vector<std::string> errors;
-    const char *file = nullptr;
-    const char *function = nullptr;
-    const char *data = nullptr;
-    int line = 0;
-    int flags = 0;
-    while (const unsigned long error = ERR_get_error_all(&file, &line, &function, &data, &flags)) {
-        errors.push_back(std::to_string(ERR_GET_REASON(error)) + " " + file + ":" + std::to_string(line) + " " +
-                         function + " " + data);
-    }
-    return errors;
-}
-
 TEST_F(Transfer, TheHostsErrorQueueSurvivesATransferThatClearsItAndLeavesItsOwn) {
     CurrentTransport().answers[kURL] = Whole("answer");
     CurrentTransport().duringPerform = [] {
@@ -133,15 +119,15 @@ TEST_F(Transfer, TheHostsErrorQueueSurvivesATransferThatClearsItAndLeavesItsOwn)
         ERR_raise(ERR_LIB_USER, 2);
     };
     hostFails();
-    const std::vector<std::string> before = ErrorQueue();
+    const std::vector<std::string> before = TakeErrorQueue();
     ASSERT_EQ(before.size(), 2u);
 
     hostFails();
     std::string response;
     httpGet(kURL, response, true, Append);
-    EXPECT_EQ(ErrorQueue(), before);
+    EXPECT_EQ(TakeErrorQueue(), before);
     httpGet(kURL, response, true, Append);
-    EXPECT_EQ(ErrorQueue(), std::vector<std::string>());
+    EXPECT_EQ(TakeErrorQueue(), std::vector<std::string>());
 }
 
 class Encoding : public Library {};
@@ -182,6 +168,13 @@ TEST_F(Encoding, WithoutMemoryTheValueStaysAsItIs) {
     EXPECT_EQ(URLEncode("a b"), "a b");
 }
 
+TEST_F(Encoding, AnyResultOfTheEncoderButZeroIsAFailure) {
+    Platform platform;
+    platform.urlEncode = [](const char *, char *, std::size_t) { return 1; };
+    ReplacePlatform(platform);
+    EXPECT_EQ(URLEncode("a b"), "a b");
+}
+
 TEST_F(Encoding, URLEncodeSeesTheTextUpToItsNUL) { EXPECT_EQ(URLEncode(std::string("a b\0c d", 7)), "a%20b"); }
 
 TEST_F(Encoding, TheEncodedTextIsOverwrittenBeforeItsMemoryIsReleased) {
@@ -206,7 +199,7 @@ TEST_F(Encoding, AFailedMD5GivesTheEmptyStringAndOneLine) {
     errno = EPERM;
     EXPECT_EQ(MD5Digest("text"), "");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("utils:N MD5 digest failed Operation not permitted")));
-    EXPECT_EQ(ErrorQueue(), std::vector<std::string>());
+    EXPECT_EQ(TakeErrorQueue(), std::vector<std::string>());
 }
 
 TEST_F(Encoding, WithoutMemoryMD5DigestGivesTheEmptyStringAndOneLine) {
