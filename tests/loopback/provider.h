@@ -45,6 +45,9 @@ Outcome Refused(const std::string &text, const std::string &userName = kUserName
 
 Outcome LoggedIn(const std::string &userName);
 
+/// Logs in with this code, through the provider that the appliance is configured for.
+Outcome LogIn(const std::string &code);
+
 /// JSON text with these members, over those of the value; a null takes a member away.
 Json::Value Change(Json::Value value, const std::string &changes);
 
