@@ -46,6 +46,14 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"syslog", kNoResult},
     {"time", nullptr},
 
+    // libc, built with _FORTIFY_SOURCE
+    {"__fread_chk", "is counted, and made to fail, as fread"},
+    {"__memcpy_chk", kOnlyMemory},
+    {"__memmove_chk", kOnlyMemory},
+    {"__memset_chk", kOnlyMemory},
+    {"__snprintf_chk", "writes two digits of a byte"},
+    {"__syslog_chk", kNoResult},
+
     // libcurl
     {"curl_easy_cleanup", kNoResult},
     {"curl_easy_init", nullptr},

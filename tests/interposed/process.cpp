@@ -1,3 +1,6 @@
+// The headers would bring a `fread` of their own with it, in the way of the one that is defined here.
+#undef _FORTIFY_SOURCE
+
 #include "tests/interposed/process.h"
 
 #include <sys/random.h>
@@ -38,6 +41,15 @@ int SetID(const char *name, unsigned int real, unsigned int effective, unsigned 
     }
     id = effective;
     return 0;
+}
+
+bool FailsToRead(FILE *file, const void *caller) {
+    if (!ShouldFail("fread", caller)) {
+        return false;
+    }
+    failedFile = file;
+    errno = EIO;
+    return true;
 }
 
 }  // namespace
@@ -107,12 +119,12 @@ FILE *fopen(const char *path, const char *mode) {
 }
 
 size_t fread(void *bytes, size_t size, size_t count, FILE *file) {
-    if (Test::ShouldFail("fread", CALLER)) {
-        Test::failedFile = file;
-        errno = EIO;
-        return 0;
-    }
-    return Test::Next(fread, "fread")(bytes, size, count, file);
+    return Test::FailsToRead(file, CALLER) ? 0 : Test::Next(fread, "fread")(bytes, size, count, file);
+}
+
+/// What a library calls that is built with _FORTIFY_SOURCE, where the compiler does not know how much is read.
+size_t __fread_chk(void *bytes, size_t room, size_t size, size_t count, FILE *file) {
+    return Test::FailsToRead(file, CALLER) ? 0 : Test::Next(__fread_chk, "__fread_chk")(bytes, room, size, count, file);
 }
 
 int ferror(FILE *file) noexcept {

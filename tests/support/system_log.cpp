@@ -26,6 +26,23 @@ LogLine Read(const Record &record, const char *text) {
     return {record.priority, std::regex_replace(std::string(text, record.length), sourceLine, "$1:N ")};
 }
 
+void Write(int priority, const char *format, std::va_list arguments) {
+    Record record{priority, 0};
+    if (used + sizeof record >= records.size()) {
+        std::abort();  // more than any test looks at
+    }
+    char *text = &records[used + sizeof record];
+    const std::size_t room = records.size() - used - sizeof record;
+    const int length = std::vsnprintf(text, room, format, arguments);  // glibc's knows %m
+    if (length < 0 || static_cast<std::size_t>(length) >= room) {
+        std::abort();
+    }
+    record.length = static_cast<std::size_t>(length);
+    std::memcpy(&records[used], &record, sizeof record);
+    used += sizeof record + record.length + 1;
+    errno = EINTR;  // as a real one may leave it: nothing in the library may rely on it
+}
+
 }  // namespace
 
 bool operator==(const LogLine &a, const LogLine &b) { return a.priority == b.priority && a.text == b.text; }
@@ -50,23 +67,21 @@ std::vector<LogLine> TakeSystemLog() {
 
 }  // namespace Test
 
-extern "C" void syslog(int priority, const char *format, ...) {
-    using Test::records, Test::used;
-    Test::Record record{priority, 0};
-    if (used + sizeof record >= records.size()) {
-        std::abort();  // more than any test looks at
-    }
-    char *text = &records[used + sizeof record];
-    const std::size_t room = records.size() - used - sizeof record;
-    va_list arguments;
+extern "C" {
+
+void syslog(int priority, const char *format, ...) {
+    std::va_list arguments;
     va_start(arguments, format);
-    const int length = std::vsnprintf(text, room, format, arguments);  // glibc's knows %m
+    Test::Write(priority, format, arguments);
     va_end(arguments);
-    if (length < 0 || static_cast<std::size_t>(length) >= room) {
-        std::abort();
-    }
-    record.length = static_cast<std::size_t>(length);
-    std::memcpy(&records[used], &record, sizeof record);
-    used += sizeof record + record.length + 1;
-    errno = EINTR;  // as a real one may leave it: nothing in the library may rely on it
 }
+
+/// What a library calls that is built with _FORTIFY_SOURCE.
+void __syslog_chk(int priority, int /*flag*/, const char *format, ...) {
+    std::va_list arguments;
+    va_start(arguments, format);
+    Test::Write(priority, format, arguments);
+    va_end(arguments);
+}
+
+}  // extern "C"
