@@ -100,6 +100,7 @@ std::string AzureSSOClient::GetIDTokenReqParams() {
 
 void AzureSSOClient::ProcessTokenResponse(std::string response) {
     const Utils::CleanseTextOnExit cleanse(response);
+    Utils::Cleanse(token);
     token.clear();
     const Json::Value tokenResponse = ParseTokenResponse(response);
     if (Utils::FindMember(tokenResponse, kError) != nullptr) {

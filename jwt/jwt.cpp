@@ -192,6 +192,16 @@ PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
 
 #pragma GCC diagnostic pop
 
+/// What is signed (RFC 7515, section 5.2).
+std::string SigningInput(const std::string &header, const std::string &body) {
+    std::string input;
+    input.reserve(header.size() + 1 + body.size());  // if it had to grow, it would leave pieces behind
+    input += header;
+    input += '.';
+    input += body;
+    return input;
+}
+
 bool VerifyRSA(const std::string &signingInput, const std::string &n, const std::string &e,
                const std::string &signature, const EVP_MD *md) {
     const Utils::KeepErrorQueue keepErrorQueue;
@@ -255,6 +265,7 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
     const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(sink));
 
     unsigned char mac[EVP_MAX_MD_SIZE] = {};
+    const Utils::CleanseOnExit cleanseMAC(mac, sizeof mac);  // of a forged token, its true signature
     unsigned int macLength = 0;
     if (HMAC(md, keyBytes.bytes.get(), keyBytes.length, reinterpret_cast<const unsigned char *>(signingInput.c_str()),
              std::strlen(signingInput.c_str()), mac, &macLength) == nullptr) {
@@ -266,6 +277,7 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
         return false;
     }
     char text[2 * EVP_MAX_MD_SIZE] = {};
+    const Utils::CleanseOnExit cleanseText(text, sizeof text);
     const long pending = BIO_pending(encoded);
     if (pending <= 0 || pending >= static_cast<long>(sizeof text) ||
         BIO_read(encoded, text, static_cast<int>(pending)) != pending) {
@@ -312,13 +324,17 @@ Json::Value Jwt::GetBody() { return ParsePart(body, "bad jwt body format!"); }
 std::string Jwt::GetSignature() { return signature; }
 
 void Jwt::JwtRSAVerify(std::string &n, std::string &e, const EVP_MD *md) {
-    if (!VerifyRSA(header + "." + body, n, e, signature, md)) {
+    std::string signingInput = SigningInput(header, body);
+    const Utils::CleanseTextOnExit cleanse(signingInput);
+    if (!VerifyRSA(signingInput, n, e, signature, md)) {
         throw jwt_verify_failed("verify rsa signature failed");
     }
 }
 
 void Jwt::JwtHMACVerify(std::string &key, const EVP_MD *md) {
-    if (!VerifyHMAC(header + "." + body, key, signature, md)) {
+    std::string signingInput = SigningInput(header, body);
+    const Utils::CleanseTextOnExit cleanse(signingInput);
+    if (!VerifyHMAC(signingInput, key, signature, md)) {
         throw jwt_verify_failed("verify hmac signature failed");
     }
 }

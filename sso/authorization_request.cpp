@@ -17,7 +17,8 @@ namespace TAVO::SSO {
 namespace {
 
 std::string MakeNonce() {
-    // Seeded as the generator seeds an engine of its own, which it would lose when the system has no random numbers.
+    // By the provider that the generator seeds an engine of its own with. That engine it would lose when the system has
+    // no random numbers.
     boost::uuids::detail::random_provider entropy;
     boost::random::mt19937 engine(entropy);
     return to_string(boost::uuids::basic_random_generator<boost::random::mt19937>(engine)());

@@ -53,7 +53,10 @@ std::string SSOClient::GetWellknownEndpoint() { return wellknownEndpoint; }
 std::string SSOClient::GetLogoutEndpoint() { return logoutEndpoint; }
 
 void SSOClient::SetRedirectURI(std::string uri) { redirectURI = std::move(uri); }
-void SSOClient::SetCode(std::string authorizationCode) { code = std::move(authorizationCode); }
+void SSOClient::SetCode(std::string authorizationCode) {
+    Utils::Cleanse(code);
+    code = std::move(authorizationCode);
+}
 
 void SSOClient::RequestWellknownInfo(Json::Value &out) {
     try {

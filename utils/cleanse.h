@@ -24,7 +24,8 @@ class CleanseOnExit {
 
 inline void Cleanse(std::string &text) { OPENSSL_cleanse(text.data(), text.size()); }
 
-/// The same for a text that may still grow in the scope.
+/// The same for a text that may still grow in the scope, by AppendSecret or within what it has reserved: growing
+/// otherwise, it would leave its old memory behind as it is.
 class CleanseTextOnExit {
   public:
     explicit CleanseTextOnExit(std::string &text) : text_(text) {}

@@ -56,12 +56,14 @@ bool LoadJsonFile(const char *path, Json::Value &document) {
     return ReadFile(path, content) && ParseJson(content, document);
 }
 
-Json::Value WithMember(const Json::Value &document, const char *name, const std::string &text) try {
-    Json::Value copy = document;
-    copy[name] = text;
-    return copy;
-} catch (const Json::RuntimeError &) {
-    throw std::bad_alloc();  // the library's own word for no memory
+Json::Value WithMember(const Json::Value &document, const char *name, const std::string &text) {
+    try {
+        Json::Value copy = document;
+        copy[name] = text;
+        return copy;
+    } catch (const Json::RuntimeError &) {
+        throw std::bad_alloc();  // the JSON library's own word for no memory
+    }
 }
 
 std::string WriteCompactJson(const Json::Value &document) { return Json::FastWriter().write(document); }

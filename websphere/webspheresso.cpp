@@ -62,6 +62,7 @@ std::string WebSphereSSOClient::GetIDTokenReqParams() {
 
 void WebSphereSSOClient::ProcessTokenResponse(std::string response) {
     const Utils::CleanseTextOnExit cleanse(response);
+    Utils::Cleanse(token);
     token.clear();
     token = FindIDToken(ParseTokenResponse(response));
 }

@@ -36,7 +36,7 @@ constexpr char kFailures[] =
 
 constexpr char kLogLines[] =
     R"(sso:N (bad_alloc\. .*|request token uri .*\.|bad wellknown json format\.|Out of memory|Couldn't resolve host name)"
-    R"(|Failed writing received data to disk/application))"
+    R"(|Failed writing received data to disk/application|URL using bad/illegal format or missing URL))"
     R"(|azuresso:N (curl_easy_init failed\. .*|request wellknown uri .*\.))"
     R"(|jwt:N EVP_(PKEY_assign_RSA|DigestVerify(Init|Update|Final)) failed)"
     R"(|utils:N (calloc failed\.|MD5 digest failed) .*)";

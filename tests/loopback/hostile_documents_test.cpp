@@ -113,7 +113,7 @@ std::vector<AddressCase> Addresses() {
         refused("WithABlank", R"("http://$INSIDE/ke ys")", KeyRequestLogged(CURLE_URL_MALFORMAT)),
         {"UpToItsFirstNUL", R"("http://$INSIDE/keys\u0000\r\nX: y")", Accepted(), {}, asked},
         refused("Of9MB", "\"http://$INSIDE/" + std::string(std::size_t{9} << 20, 'k') + "\"",
-                KeyRequestLogged(CURLE_BAD_FUNCTION_ARGUMENT)),
+                KeyRequestLogged(CURLE_URL_MALFORMAT)),
         {"ToldTwiceTheLastOneCounts",
          R"("file:///tmp/nothing", "jwks_uri": "http://$INSIDE/keys")",
          Accepted(),

@@ -1,6 +1,7 @@
 #include <gmock/gmock.h>
 #include <openssl/evp.h>
 
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -61,6 +62,15 @@ class Secrets : public ::testing::TestWithParam<Profile> {
         return R"({"access_token": ")" + std::string(kAccessToken) + R"(", "id_token": ")" + token + "\"}";
     }
 
+    template <typename Client>
+    static std::unique_ptr<TAVO::SSO::SSOClient, void (*)(TAVO::SSO::SSOClient *)> Make() {
+        return {new Client(), [](TAVO::SSO::SSOClient *client) { delete static_cast<Client *>(client); }};
+    }
+
+    static auto MakeClient(Profile profile) {
+        return profile == Profile::kAzure ? Make<TAVO::SSO::AzureSSOClient>() : Make<TAVO::SSO::WebSphereSSOClient>();
+    }
+
     static std::vector<std::string> PiecesOf(const std::string &text, std::size_t length) {
         std::vector<std::string> pieces;
         for (std::size_t at = 0; at < text.size(); at += length) {
@@ -80,13 +90,33 @@ TEST_P(Secrets, AreOverwrittenBeforeTheirMemoryIsReleased) {
     provider.AnswerByteByByte(ChunkedHTTPAnswer(PiecesOf(Answer(token), 50)));
     provider.AnswerVerification();
     std::vector<std::string> secrets = All();
-    secrets.insert(secrets.end(), {token, token.substr(token.find('.') + 1), token.substr(token.rfind('.') + 1)});
+    const std::size_t firstDot = token.find('.');
+    const std::size_t lastDot = token.rfind('.');
+    const std::string claims = token.substr(firstDot + 1, lastDot - firstDot - 1);
+    secrets.insert(secrets.end(), {token, claims, token.substr(lastDot + 1)});
     std::string userName;
     const std::string code = kCode;
     const WatchReleases releases(secrets);
     TAVO::SSO::OIDCLogin(code, userName);
     EXPECT_EQ(userName, UserName(GetParam()));
     EXPECT_GT(releases.Blocks(), 100U);
+    EXPECT_THAT(releases.Found(), IsEmpty());
+}
+
+TEST_P(Secrets, AreOverwrittenWhenOthersTakeTheirPlace) {
+    Provider provider(GetParam());
+    const std::unique_ptr<TAVO::SSO::SSOClient, void (*)(TAVO::SSO::SSOClient *)> client = MakeClient(GetParam());
+    // Without the first character, in whose place a cleared text has its end.
+    const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
+    const std::vector<std::string> secrets{token.substr(1), std::string(kCode).substr(1)};
+    const std::string answer = Answer(token);
+    const std::string nextAnswer = Answer("another token that is long enough to need memory of its own");
+    client->SetCode(kCode);
+    client->ProcessTokenResponse(answer);
+    const WatchReleases releases(secrets);
+    client->SetCode("another code that is long enough to need memory of its own");
+    client->ProcessTokenResponse(nextAnswer);
+    EXPECT_GT(releases.Blocks(), 0U);
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
