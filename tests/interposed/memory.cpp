@@ -111,6 +111,3 @@ void *operator new(std::size_t size) {
 }
 void operator delete(void *memory) noexcept { std::free(memory); }
 void operator delete(void *memory, std::size_t /*size*/) noexcept { std::free(memory); }
-
-/// LeakSanitizer overlooks what the dynamic loader keeps, by who has asked for it; here that seems to be this program.
-extern "C" const char *__lsan_default_suppressions() { return "leak:_dl_map_object_deps\n"; }

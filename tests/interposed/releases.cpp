@@ -1,12 +1,13 @@
 #include "tests/interposed/releases.h"
 
 #include <dlfcn.h>
-#include <execinfo.h>
 #include <malloc.h>
+#include <unwind.h>
 
 #include <array>
 #include <cstdlib>
 #include <cstring>
+#include <utility>
 
 #include "tests/interposed/calls.h"
 #include "tests/interposed/memory.h"
@@ -26,6 +27,22 @@ std::vector<std::string> &Finds() {
 }
 
 using Frames = std::array<void *, 24>;
+
+_Unwind_Reason_Code NoteFrame(_Unwind_Context *context, void *stack) {
+    auto &[frames, depth] = *static_cast<std::pair<Frames, int> *>(stack);
+    if (static_cast<std::size_t>(depth) == frames.size()) {
+        return _URC_END_OF_STACK;
+    }
+    frames.at(static_cast<std::size_t>(depth++)) = reinterpret_cast<void *>(_Unwind_GetIP(context));
+    return _URC_NO_REASON;
+}
+
+/// Not backtrace(3), which loads a library the first time.
+std::pair<Frames, int> CallStack() {
+    std::pair<Frames, int> stack{};
+    _Unwind_Backtrace(NoteFrame, &stack);
+    return stack;
+}
 
 /// Whether the library under test released it: what stands between is the C++ library and this program.
 bool IsTheLibrarys(const Frames &frames, int depth) {
@@ -55,14 +72,12 @@ std::string Describe(const Frames &frames, int depth) {
 
 void LookAt(void *block) {
     const std::size_t size = malloc_usable_size(block);
-    Frames frames{};
-    int depth = 0;
     ++blocks;
     for (const std::string &secret : *watched) {
         if (memmem(block, size, secret.data(), secret.size()) == nullptr) {
             continue;
         }
-        depth = depth == 0 ? backtrace(frames.data(), static_cast<int>(frames.size())) : depth;
+        const auto [frames, depth] = CallStack();
         if (IsTheLibrarys(frames, depth)) {
             Finds().push_back(secret + Describe(frames, depth));
         }
