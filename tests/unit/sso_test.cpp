@@ -187,6 +187,13 @@ TEST_F(ClientBase, TheRequestsBodyIsOverwrittenAfterALogin) {
     EXPECT_THAT(TakeCleansed(), testing::Contains("client_secret=a+secret+that+is+long+enough"));
 }
 
+TEST_F(ClientBase, AnEarlierCodeIsOverwritten) {
+    client.SetCode("the first of two codes");
+    TakeCleansed();
+    client.SetCode("the second of two codes");
+    EXPECT_THAT(TakeCleansed(), testing::Contains("the first of two codes"));
+}
+
 TEST_F(ClientBase, TheTokenRequestIsPostedAndItsAnswerAppended) {
     CurrentTransport().answers[kToken] = {CURLE_OK, {"one ", "two"}};
     response = "earlier ";
