@@ -4,7 +4,7 @@
 #include <boost/uuid/detail/random_provider.hpp>
 #include <boost/uuid/random_generator.hpp>
 #include <boost/uuid/uuid_io.hpp>
-#include <iostream>
+#include <ostream>
 
 #include "sso/base64.h"
 #include "sso/names.h"
@@ -13,6 +13,10 @@
 #include "utils/json.h"
 
 namespace TAVO::SSO {
+
+/// `std::cout`, by the name that it has for the linker. <iostream> declares it, too, and puts an initialiser into every
+/// library that includes it: that one would run in each program that loads this library.
+extern std::ostream standardOutput __asm__("_ZSt4cout");
 
 namespace {
 
@@ -44,6 +48,10 @@ std::string AuthorizationURI(const AuthorizationRequest &request, const Json::Va
                               });
 }
 
-void WriteRedirect(const std::string &uri) { std::cout << "Location: " + uri + "\n\n"; }
+void WriteRedirect(const std::string &uri) {
+    // A program without <iostream> of its own has not made the stream ready.
+    static const std::ios_base::Init initialised;
+    standardOutput << "Location: " + uri + "\n\n";
+}
 
 }  // namespace TAVO::SSO

@@ -3,6 +3,7 @@
 #include <linux/filter.h>
 #include <linux/seccomp.h>
 #include <sys/prctl.h>
+#include <sys/syscall.h>
 
 #include <cerrno>
 #include <cstddef>
@@ -41,6 +42,14 @@ void Refuse(Filter &filter, const IdChange &change) {
     Return(filter, SECCOMP_RET_ERRNO | EPERM);
 }
 
+void Install(const Filter &filter) {
+    const sock_fprog program{static_cast<unsigned short>(filter.size()), const_cast<sock_filter *>(filter.data())};
+    // Without root's right to filter, a process may filter only what can gain no rights any more.
+    if (prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) != 0 || prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program) != 0) {
+        throw std::runtime_error(std::string("no filter for system calls: ") + std::strerror(errno));
+    }
+}
+
 }  // namespace
 
 void RefuseIdChanges(const std::vector<IdChange> &changes) {
@@ -49,11 +58,19 @@ void RefuseIdChanges(const std::vector<IdChange> &changes) {
         Refuse(filter, change);
     }
     Return(filter, SECCOMP_RET_ALLOW);
-    const sock_fprog program{static_cast<unsigned short>(filter.size()), filter.data()};
-    // Without root's right to filter, a process may filter only what can gain no rights any more.
-    if (prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) != 0 || prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program) != 0) {
-        throw std::runtime_error(std::string("no filter for system calls: ") + std::strerror(errno));
+    Install(filter);
+}
+
+void ForbidWriting() {
+    Filter filter;
+    for (const long call :
+         {SYS_write, SYS_writev, SYS_pwrite64, SYS_pwritev, SYS_sendto, SYS_sendmsg, SYS_sendmmsg, SYS_socket,
+          SYS_ftruncate, SYS_mkdirat, SYS_unlinkat, SYS_renameat2, SYS_linkat, SYS_symlinkat}) {
+        Require(filter, offsetof(seccomp_data, nr), static_cast<std::uint32_t>(call), 1);
+        Return(filter, SECCOMP_RET_KILL_PROCESS);
     }
+    Return(filter, SECCOMP_RET_ALLOW);
+    Install(filter);
 }
 
 }  // namespace Test

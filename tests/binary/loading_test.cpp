@@ -1,0 +1,109 @@
+// What loading the built library does to a program, and unloading it again. The program is not linked with it.
+#include <dlfcn.h>
+#include <gmock/gmock.h>
+#include <malloc.h>
+#include <sys/wait.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+
+#include "tests/support/refused_calls.h"
+
+namespace {
+
+constexpr char kLibrary[] = TAVOSSO_LIBRARY;
+
+/// One loading, or none where the library cannot be loaded.
+class Loaded {
+  public:
+    Loaded() : handle(dlopen(kLibrary, RTLD_NOW | RTLD_LOCAL)) {}
+    ~Loaded() {
+        if (handle != nullptr) {
+            dlclose(handle);
+        }
+    }
+    Loaded(const Loaded &) = delete;
+    Loaded &operator=(const Loaded &) = delete;
+
+    explicit operator bool() const { return handle != nullptr; }
+    template <typename Function>
+    Function *Find(const char *mangled) const {
+        return reinterpret_cast<Function *>(dlsym(handle, mangled));
+    }
+
+  private:
+    void *handle;
+};
+
+bool IsStillLoaded() { return dlopen(kLibrary, RTLD_NOW | RTLD_NOLOAD) != nullptr; }
+
+/// Uses the library, so that each of its calls is bound and what it makes at the first use is made.
+std::string Digest(const Loaded &library) {
+    auto *digest = library.Find<std::string(std::string)>(
+        "_ZN4TAVO3SSO9MD5DigestENSt7__cxx1112basic_stringIcSt11char_traitsIcESaIcEEE");
+    return digest != nullptr ? digest("") : "there is no MD5Digest";
+}
+
+constexpr char kDigestOfNothing[] = "d41d8cd98f00b204e9800998ecf8427e";
+
+void LoadAndUse(int times) {
+    for (int i = 0; i < times; ++i) {
+        ASSERT_EQ(Digest(Loaded()), kDigestOfNothing);
+        ASSERT_FALSE(IsStillLoaded());
+    }
+}
+
+std::ptrdiff_t CountFiles() {
+    const std::filesystem::directory_iterator descriptors("/proc/self/fd");
+    return std::distance(begin(descriptors), end(descriptors));
+}
+
+std::size_t HeapInUse() { return mallinfo2().uordblks; }
+
+TEST(Loading, AThousandTimesLeavesNothingBehind) {
+    // Loaded and unloaded by itself, libcurl loses 50 bytes each time.
+    ASSERT_NE(dlopen("libcurl.so.4", RTLD_NOW), nullptr);
+    // The dynamic loader's own tables have grown to their size after some loadings.
+    LoadAndUse(10);
+    const auto files = CountFiles();
+    const auto heap = HeapInUse();
+    LoadAndUse(1000);
+    EXPECT_EQ(CountFiles(), files);
+    EXPECT_EQ(HeapInUse(), heap);
+}
+
+/// How a child ends that loads the library, and then does something, while the kernel ends it at its first write.
+int StatusOfLoadingWithoutWriting(void (*then)()) {
+    const pid_t child = fork();
+    if (child == 0) {
+        Test::ForbidWriting();
+        const bool isLoaded = static_cast<bool>(Loaded());
+        then();
+        _exit(isLoaded ? EXIT_SUCCESS : EXIT_FAILURE);
+    }
+    int status = 0;
+    waitpid(child, &status, 0);
+    return status;
+}
+
+TEST(Loading, WritesNothing) {
+    const int status = StatusOfLoadingWithoutWriting([] {});
+    EXPECT_TRUE(WIFEXITED(status)) << "ended by signal " << WTERMSIG(status);
+    EXPECT_EQ(WEXITSTATUS(status), EXIT_SUCCESS);
+}
+
+TEST(Loading, WouldHaveEndedHadItWrittenToAFileOrToTheLog) {
+    for (auto *write :
+         {+[] { std::ofstream("/tmp/a file") << "text" << std::flush; }, +[] { syslog(LOG_ERR, "line"); }}) {
+        const int status = StatusOfLoadingWithoutWriting(write);
+        EXPECT_TRUE(WIFSIGNALED(status));
+        EXPECT_EQ(WTERMSIG(status), SIGSYS);
+    }
+}
+
+}  // namespace
