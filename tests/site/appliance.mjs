@@ -6,6 +6,8 @@ import net from 'node:net';
 import path from 'node:path';
 
 const SETTINGS = '/usr/tavo/etc/ssoclient';
+// Where the front end is installed and enabled, the web server's own settings say what is served.
+const INSTALLED_SETTINGS = process.env.INSTALLED_LIGHTTPD_CONF;
 export const FRONT_END_SETTINGS = new URL('../../frontend/lighttpd.conf', import.meta.url).pathname;
 
 function writePrivately(file, settings) {
@@ -15,7 +17,7 @@ function writePrivately(file, settings) {
 /** The platform's domains: DNS name to NetBIOS name. */
 export function writeDomains(domains) {
     mkdirSync(SETTINGS, {recursive: true, mode: 0o755});
-    mkdirSync('/usr/tavo/var');
+    mkdirSync('/usr/tavo/var', {recursive: true});
     writeFileSync('/usr/tavo/etc/domains.conf', JSON.stringify(domains));
 }
 
@@ -60,18 +62,20 @@ export async function listen() {
 export function startWebServer({socket, webroot, certificate, folder, frontEndSettings = FRONT_END_SETTINGS}) {
     const settings = path.join(folder, 'lighttpd.conf');
     const log = path.join(folder, 'lighttpd.log');
+    const served = INSTALLED_SETTINGS
+        ? `include "${INSTALLED_SETTINGS}"`
+        : `server.document-root = "${webroot}"\ninclude "${frontEndSettings}"`;
     writeFileSync(settings, `
-server.document-root = "${webroot}"
-server.systemd-socket-activation = "enable"
-server.bind = "127.0.0.1"
-server.port = ${socket.address().port}
-server.errorlog = "${log}"
-server.breakagelog = "${log}"
-server.modules = ( "mod_openssl" )
-ssl.engine = "enable"
-ssl.pemfile = "${certificate.certFile}"
-ssl.privkey = "${certificate.keyFile}"
-include "${frontEndSettings}"
+${served}
+server.systemd-socket-activation := "enable"
+server.bind := "127.0.0.1"
+server.port := ${socket.address().port}
+server.errorlog := "${log}"
+server.breakagelog := "${log}"
+server.modules += ( "mod_openssl" )
+ssl.engine := "enable"
+ssl.pemfile := "${certificate.certFile}"
+ssl.privkey := "${certificate.keyFile}"
 `);
     // The server takes the socket over when it is told its own process id, which the shell knows before it becomes it.
     // Node has no other name for a listening socket's descriptor.
