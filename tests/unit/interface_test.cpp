@@ -19,10 +19,76 @@ static_assert(std::has_virtual_destructor_v<SSO::AzureSSOClient>);
 static_assert(std::has_virtual_destructor_v<SSO::WebSphereSSOClient>);
 static_assert(std::has_virtual_destructor_v<SSO::SSOProfile>);
 static_assert(!std::is_polymorphic_v<JWT::Jwt>);
-static_assert(std::is_same_v<decltype(&SSO::httpGet), void (*)(const std::string &, std::string &, bool,
-                                                               size_t (*)(char *, size_t, size_t, void *))>);
-static_assert(std::is_same_v<decltype(&SSO::httpPost), void (*)(const std::string &, const std::string &, std::string &,
-                                                                bool, size_t (*)(char *, size_t, size_t, void *))>);
+
+static_assert(std::is_base_of_v<SSO::SSOClient, SSO::AzureSSOClient>);
+static_assert(std::is_base_of_v<SSO::SSOClient, SSO::WebSphereSSOClient>);
+static_assert(sizeof(SSO::SSOClient) == 16 + 9 * sizeof(std::string));
+static_assert(sizeof(SSO::AzureSSOClient) == sizeof(SSO::SSOClient) + sizeof(std::string));
+static_assert(sizeof(SSO::WebSphereSSOClient) == sizeof(SSO::SSOClient));
+static_assert(sizeof(SSO::SSOProfile) == 16 + sizeof(std::string) + sizeof(SSO::SSOClient));
+static_assert(sizeof(JWT::Jwt) == 3 * sizeof(std::string));
+
+/// An exception with nothing of its own, caught as `Base` too, and made of a text that has to be named as one.
+template <typename Exception, typename Base>
+constexpr bool kIsCaughtAs =
+    std::is_base_of_v<Base, Exception> &&
+    sizeof(Exception) == sizeof(std::runtime_error) && std::is_constructible_v<Exception, std::string> &&
+    !std::is_convertible_v<std::string, Exception>;
+static_assert(kIsCaughtAs<SSO::sso_exception, std::runtime_error>);
+static_assert(kIsCaughtAs<SSO::sso_err_resp, SSO::sso_exception>);
+static_assert(kIsCaughtAs<SSO::sso_not_implemented, SSO::sso_exception>);
+static_assert(kIsCaughtAs<SSO::sso_op_failed, SSO::sso_exception>);
+static_assert(kIsCaughtAs<JWT::jwt_exception, std::runtime_error>);
+static_assert(kIsCaughtAs<JWT::jwt_not_support, JWT::jwt_exception>);
+static_assert(kIsCaughtAs<JWT::jwt_verify_failed, JWT::jwt_exception>);
+
+// Results, arguments and the lack of const and noexcept, function by function.
+template <auto function, typename Type>
+constexpr bool kIs = std::is_same_v<decltype(function), Type>;
+using Callback = std::size_t (*)(char *, std::size_t, std::size_t, void *);
+static_assert(kIs<&SSO::SSOClient::isEnable, bool (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetClientID, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetClientSecret, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetRedirectURI, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetToken, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetAuthEndpoint, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetTokenEndpoint, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetWellknownEndpoint, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetLogoutEndpoint, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::SetRedirectURI, void (SSO::SSOClient::*)(std::string)>);
+static_assert(kIs<&SSO::SSOClient::SetCode, void (SSO::SSOClient::*)(std::string)>);
+static_assert(kIs<&SSO::SSOClient::RequestWellknownInfo, void (SSO::SSOClient::*)(Json::Value &)>);
+static_assert(kIs<&SSO::SSOClient::RequestTokenEndpoint, void (SSO::SSOClient::*)(std::string &, const std::string &)>);
+static_assert(kIs<&SSO::SSOClient::VerifyIDToken, void (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetIDTokenReqParams, std::string (SSO::SSOClient::*)()>);
+static_assert(kIs<&SSO::SSOClient::GetUserName, void (SSO::SSOClient::*)(std::string &)>);
+static_assert(kIs<&SSO::SSOClient::ProcessTokenResponse, void (SSO::SSOClient::*)(std::string)>);
+static_assert(kIs<&SSO::SSOClient::OpenIDConnectLogin, void (SSO::SSOClient::*)(std::string, std::string &)>);
+static_assert(kIs<&SSO::AzureSSOClient::GetUserInfo, void (SSO::AzureSSOClient::*)(Json::Value &)>);
+static_assert(kIs<&SSO::AzureSSOClient::RequestKeysInfo, void (SSO::AzureSSOClient::*)(std::string, Json::Value &)>);
+static_assert(
+    kIs<&SSO::AzureSSOClient::GetAccessTokenReqURI, std::string (SSO::AzureSSOClient::*)(const Json::Value &)>);
+static_assert(kIs<&SSO::AzureSSOClient::RedirectAuthEndpoint, void (SSO::AzureSSOClient::*)(const Json::Value &)>);
+static_assert(kIs<&SSO::WebSphereSSOClient::GetUserInfo, void (SSO::WebSphereSSOClient::*)(Json::Value &)>);
+static_assert(
+    kIs<&SSO::WebSphereSSOClient::GetAccessTokenReqURI, std::string (SSO::WebSphereSSOClient::*)(const Json::Value &)>);
+static_assert(
+    kIs<&SSO::WebSphereSSOClient::RedirectAuthEndpoint, void (SSO::WebSphereSSOClient::*)(const Json::Value &)>);
+static_assert(kIs<&SSO::SSOProfile::SSOIsEnable, bool (SSO::SSOProfile::*)()>);
+static_assert(kIs<&SSO::SSOProfile::GetSSOProfile, std::string (SSO::SSOProfile::*)()>);
+static_assert(kIs<&SSO::SSOProfile::GetSSOClient, SSO::SSOClient *(SSO::SSOProfile::*)()>);
+static_assert(kIs<&SSO::OIDCLogin, void (*)(const std::string &, std::string &)>);
+static_assert(kIs<&SSO::GetSSORelayURL, std::string (*)(bool, const std::string &, const std::string &)>);
+static_assert(kIs<&SSO::GetAzureSSOLogoutURL, std::string (*)(const std::string &)>);
+static_assert(kIs<&SSO::httpGet, void (*)(const std::string &, std::string &, bool, Callback)>);
+static_assert(kIs<&SSO::httpPost, void (*)(const std::string &, const std::string &, std::string &, bool, Callback)>);
+static_assert(kIs<&SSO::URLEncode, std::string (*)(const std::string &)>);
+static_assert(kIs<&SSO::MD5Digest, std::string (*)(std::string)>);
+static_assert(kIs<&JWT::Jwt::GetHeader, Json::Value (JWT::Jwt::*)()>);
+static_assert(kIs<&JWT::Jwt::GetBody, Json::Value (JWT::Jwt::*)()>);
+static_assert(kIs<&JWT::Jwt::GetSignature, std::string (JWT::Jwt::*)()>);
+static_assert(kIs<&JWT::Jwt::JwtRSAVerify, void (JWT::Jwt::*)(std::string &, std::string &, const EVP_MD *)>);
+static_assert(kIs<&JWT::Jwt::JwtHMACVerify, void (JWT::Jwt::*)(std::string &, const EVP_MD *)>);
 
 using Slots = std::vector<std::string>;
 
@@ -126,14 +192,11 @@ TEST_F(Interface, TheFieldsOfTheBaseLieInTheirOrder) {
     EXPECT_THAT(fields.Offsets(),
                 testing::ElementsAre(8, 16, 16 + string, 16 + 2 * string, 16 + 3 * string, 16 + 4 * string,
                                      16 + 5 * string, 16 + 6 * string, 16 + 7 * string, 16 + 8 * string));
-    EXPECT_EQ(sizeof(SSO::SSOClient), 16 + 9 * sizeof(std::string));
 }
 
-TEST_F(Interface, AzureAddsTheTenantAndWebSphereNothing) {
+TEST_F(Interface, AzureAddsTheTenant) {
     AzureClient client;
     EXPECT_EQ(Offset(client, client.tenantID), static_cast<std::ptrdiff_t>(sizeof(SSO::SSOClient)));
-    EXPECT_EQ(sizeof(SSO::AzureSSOClient), sizeof(SSO::SSOClient) + sizeof(std::string));
-    EXPECT_EQ(sizeof(SSO::WebSphereSSOClient), sizeof(SSO::SSOClient));
 }
 
 TEST_F(Interface, TheProfileHoldsFlagNameAndClientInThisOrder) {
@@ -143,7 +206,6 @@ TEST_F(Interface, TheProfileHoldsFlagNameAndClientInThisOrder) {
     EXPECT_EQ(*reinterpret_cast<bool *>(start + 8), true);
     EXPECT_EQ(*reinterpret_cast<std::string *>(start + 16), "azure");
     EXPECT_EQ(Offset(profile, *profile.GetSSOClient()), static_cast<std::ptrdiff_t>(16 + sizeof(std::string)));
-    EXPECT_EQ(sizeof(SSO::SSOProfile), 16 + sizeof(std::string) + sizeof(SSO::SSOClient));
 }
 
 TEST_F(Interface, ATokenHoldsHeaderBodyAndSignatureInThisOrder) {
@@ -152,7 +214,6 @@ TEST_F(Interface, ATokenHoldsHeaderBodyAndSignatureInThisOrder) {
     EXPECT_EQ(parts[0], "header");
     EXPECT_EQ(parts[1], "body");
     EXPECT_EQ(parts[2], "signature");
-    EXPECT_EQ(sizeof(JWT::Jwt), 3 * sizeof(std::string));
 }
 
 TEST_F(Interface, EachExceptionsTypeInformationIsTheLibrarys) {
