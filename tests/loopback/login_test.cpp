@@ -1,8 +1,12 @@
 #include <curl/curl.h>
+#include <fcntl.h>
 #include <gmock/gmock.h>
 #include <syslog.h>
+#include <unistd.h>
 
+#include <cstdio>
 #include <functional>
+#include <memory>
 #include <ostream>
 #include <stdexcept>
 #include <string>
@@ -73,6 +77,27 @@ TEST_P(WholeLogin, WorksAgainInTheSameProcessAfterOneThatFailed) {
     provider.AnswerLogin(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam())));
     EXPECT_EQ(provider.LogIn(), Refused<std::invalid_argument>("bad jwt format!"));
     EXPECT_EQ(provider.LogIn(), LoggedIn(UserName(GetParam())));
+}
+
+/// The descriptors that a program finds open which this process executes.
+std::string DescriptorsHandedOn() {
+    const std::unique_ptr<FILE, int (*)(FILE *)> list(popen("exec ls /proc/self/fd", "r"), pclose);
+    std::string descriptors;
+    for (int c = std::getc(list.get()); c != EOF; c = std::getc(list.get())) {
+        descriptors += static_cast<char>(c);
+    }
+    return descriptors;
+}
+
+TEST_P(WholeLogin, LeavesNoDescriptorToAProgramThatIsExecutedAfterIt) {
+    Provider provider(GetParam());
+    provider.AnswerLogin(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam())));
+    const std::string before = DescriptorsHandedOn();
+    ASSERT_EQ(provider.LogIn(), LoggedIn(UserName(GetParam())));
+    EXPECT_EQ(DescriptorsHandedOn(), before);
+    const int left = open("/dev/null", O_RDONLY);  // without O_CLOEXEC
+    EXPECT_NE(DescriptorsHandedOn(), before);
+    close(left);
 }
 
 TEST_P(WholeLogin, RefusesATokenWithAnEmptyPartAsAProgrammingError) {
