@@ -13,6 +13,7 @@
 
 #pragma GCC visibility push(default)
 
+/** The token format that ID tokens have. */
 namespace TAVO::JWT {
 
 /** Root of the token failures; never thrown by itself. Malformed tokens are `std::invalid_argument`, not of this kind.

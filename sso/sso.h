@@ -1,5 +1,6 @@
 /**
- * @file
+ * @mainpage Reference
+ *
  * Single sign-on of the appliance's web front end through an external OpenID Connect provider: the relying party's
  * side of the authorization-code flow (OpenID Connect Core 1.0, section 3.1; RFC 6749, section 4.1).
  *
@@ -19,6 +20,11 @@
  * The layout of the classes and the order of their virtual functions are fixed under soname `libtavosso.so.6`:
  * programs are linked against them, and a change would break them silently.
  */
+
+/**
+ * @file
+ * The login and the addresses around it: the clients of the two providers, the profile, the exceptions.
+ */
 #ifndef TAVOSSO_SSO_SSO_H
 #define TAVOSSO_SSO_SSO_H
 
@@ -30,6 +36,7 @@
 
 #pragma GCC visibility push(default)
 
+/** Single sign-on through an OpenID Connect provider. */
 namespace TAVO::SSO {
 
 /**
@@ -140,6 +147,8 @@ class SSOClient {
     /**
      * Builds the body of the token request (RFC 6749, section 4.1.3).
      *
+     * @return nothing in this class; a provider's client gives the form-encoded body
+     *
      * @throws sso_not_implemented  "GetIDTokenReqParams not implemented", always, in this class
      */
     virtual std::string GetIDTokenReqParams();
@@ -147,12 +156,16 @@ class SSOClient {
     /**
      * Gives the appliance's name of the user whom the ID token names. Verifies nothing: call `VerifyIDToken` first.
      *
+     * @param userName  untouched in this class; a provider's client writes the name to it
+     *
      * @throws sso_not_implemented  "GetUserName not implemented", always, in this class
      */
     virtual void GetUserName(std::string &userName);
 
     /**
      * Takes the ID token out of the token endpoint's answer.
+     *
+     * @param response  the answer; not looked at in this class
      *
      * @throws sso_not_implemented  "ProcessTokenResponse not implemented", always, in this class
      */
@@ -172,16 +185,16 @@ class SSOClient {
     virtual void OpenIDConnectLogin(std::string authorizationCode, std::string &userName);
 
   protected:
-    bool enable = false;
-    std::string clientID;
-    std::string clientSecret;
-    std::string redirectURI;
-    std::string authEndpoint;
-    std::string tokenEndpoint;
-    std::string logoutEndpoint;
-    std::string wellknownEndpoint;
-    std::string code;
-    std::string token;
+    bool enable = false;            ///< what `isEnable` gives
+    std::string clientID;           ///< what `GetClientID` gives
+    std::string clientSecret;       ///< what `GetClientSecret` gives
+    std::string redirectURI;        ///< what `GetRedirectURI` gives
+    std::string authEndpoint;       ///< what `GetAuthEndpoint` gives
+    std::string tokenEndpoint;      ///< what `GetTokenEndpoint` gives
+    std::string logoutEndpoint;     ///< what `GetLogoutEndpoint` gives
+    std::string wellknownEndpoint;  ///< what `GetWellknownEndpoint` gives
+    std::string code;               ///< the authorization code that `SetCode` stored
+    std::string token;              ///< what `GetToken` gives
 };
 
 /**
@@ -209,9 +222,9 @@ class AzureSSOClient : public SSOClient {
      * issuer, not-before, issued-at and nonce are not looked at.
      *
      * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
-     * body format!"; "id_token expired." ("exp" lies before now, or is missing); "tenant ID invalid"; "client ID
-     *         invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be fetched); "RSA
-     *         public 'n' cannot be found!", "RSA public 'e' cannot be found!"
+     * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "tenant ID
+     * invalid"; "client ID invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be
+     * fetched); "RSA public 'n' cannot be found!", "RSA public 'e' cannot be found!"
      * @throws std::logic_error  when the header or the body of the token is empty, or memory runs out in decoding it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not RS256, RS384 or RS512
      * @throws TAVO::JWT::jwt_verify_failed  "verify rsa signature failed"
@@ -229,7 +242,7 @@ class AzureSSOClient : public SSOClient {
 
     /**
      * Gives the user's name as the appliance knows it: NetBIOS domain, backslash, user. It is made of the claim
-     * "unique_name" or, where that is not a string, "email", which must have the form user@domain.
+     * "unique_name" or, where that is not a string, "email", which must have the form `user@domain`.
      *
      * @param userName  receives the name, step by step: after "cannot get the user name!" it holds the part before the
      *                  first at sign, after "TAVOWinsUserNameFqdn2Netbios failed." the upper-cased domain, a backslash
@@ -305,7 +318,7 @@ class AzureSSOClient : public SSOClient {
     void RedirectAuthEndpoint(const Json::Value &state);
 
   protected:
-    std::string tenantID;
+    std::string tenantID;  ///< the tenant that the token's "tid" must equal
 };
 
 /**
@@ -327,7 +340,8 @@ class WebSphereSSOClient : public SSOClient {
      * at.
      *
      * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
-     * body format!"; "id_token expired." ("exp" lies before now, or is missing); "client ID invalid"
+     * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "client ID
+     * invalid"
      * @throws std::logic_error  when the header or the body of the token is empty, or memory runs out in decoding it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
      * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes
@@ -370,10 +384,19 @@ class WebSphereSSOClient : public SSOClient {
      */
     void GetUserInfo(Json::Value &claims);
 
-    /** As `AzureSSOClient::GetAccessTokenReqURI`, with the scope "openid profile email". */
+    /**
+     * As `AzureSSOClient::GetAccessTokenReqURI`, with the scope "openid profile email".
+     *
+     * @param stateInfo  the caller's JSON object, or null
+     * @return the authorization endpoint, as configured, and the query
+     */
     std::string GetAccessTokenReqURI(const Json::Value &stateInfo);
 
-    /** As `AzureSSOClient::RedirectAuthEndpoint`. */
+    /**
+     * As `AzureSSOClient::RedirectAuthEndpoint`.
+     *
+     * @param stateInfo  as for `GetAccessTokenReqURI`
+     */
     void RedirectAuthEndpoint(const Json::Value &stateInfo);
 };
 
@@ -425,13 +448,14 @@ class SSOProfile {
 void OIDCLogin(const std::string &code, std::string &userName);
 
 /**
- * Gives the address of the relay page, relative to the caller's web root for such pages: "ssoclient/relay.html#", then
- * "origin=ORIGIN&" and "success=true", or "reason=REASON&" and "success=false".
+ * Tells the caller where to send the browser after a login.
  *
  * @param success  whether the login succeeded
  * @param state    the state that came back with the code: base64 of a JSON object whose string "origin" is handed on,
  *                 percent-encoded. Anything else leaves the origin out. Not looked at after a failure
  * @param reason   a failure text, put in as it stands: percent-encode what is not your own. Left out when empty
+ * @return the address of the relay page, relative to the caller's web root for such pages: "ssoclient/relay.html#",
+ * then "origin=ORIGIN&" and "success=true", or "reason=REASON&" and "success=false"
  */
 std::string GetSSORelayURL(bool success, const std::string &state, const std::string &reason);
 
@@ -439,8 +463,9 @@ std::string GetSSORelayURL(bool success, const std::string &state, const std::st
  * Gives the address that ends the Azure session and brings the browser back to the relay page (OpenID Connect
  * RP-Initiated Logout 1.0, section 2). Reads `/usr/tavo/etc/ssoclient/azure.conf` as `AzureSSOClient()` does.
  *
- * @param base  where the web interface is reached; a final "/index.cgi" or one final "/" is cut off. Empty: the bare
- *              logout endpoint is returned
+ * @param base  where the web interface is reached; a final "/index.cgi" or one final "/" is cut off
+ * @return the logout endpoint, as configured, with the relay page as "post_logout_redirect_uri"; the bare endpoint when
+ *         `base` is empty
  *
  * @throws std::out_of_range  when `base` has 1 to 9 characters
  */
@@ -462,9 +487,13 @@ void httpGet(const std::string &url, std::string &response, bool verifySSL,
              std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *));
 
 /**
- * Posts a form (application/x-www-form-urlencoded); otherwise as `httpGet`.
+ * Posts a form (application/x-www-form-urlencoded); otherwise as `httpGet`, whose exceptions and side effects it has.
  *
- * @param body  sent as it stands, up to its first NUL
+ * @param url            where
+ * @param body           sent as it stands, up to its first NUL
+ * @param response       handed to the callback as its user pointer, otherwise untouched
+ * @param verifySSL      whether to verify the server's certificate and host name
+ * @param writeCallback  receives the answer, as for `httpGet`
  */
 void httpPost(const std::string &url, const std::string &body, std::string &response, bool verifySSL,
               std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *));
