@@ -185,8 +185,8 @@ function reporting(report) {
  * Starts the provider on a port of the kernel's choice.
  *
  * `users` is a map from login to {password, uniqueName} and, for one who is asked for consent, `decidesAlone`; `report`
- * is called for each request of an appliance. What it gives holds the lifetimes of codes and ID tokens in seconds, to be
- * changed at will: with a negative one they have expired when they are issued.
+ * is called for each request of an appliance. What it gives holds the lifetimes of codes and ID tokens in seconds, to
+ * be changed at will: with a negative one they have expired when they are issued.
  */
 export async function startProvider({nodeModules, certificate, users, tenant, clients, report}) {
     const load = (file) => import(pathToFileURL(path.join(nodeModules, 'oidc-provider/lib', file)));

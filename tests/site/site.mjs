@@ -17,7 +17,8 @@ const randomPassword = () => randomBytes(9).toString('base64url');
 
 /** Users by login, each with a password of this run; `named` tells their names at the provider. */
 export function makeUsers(named) {
-    return new Map(Object.entries(named).map(([login, uniqueName]) => [login, {uniqueName, password: randomPassword()}]));
+    return new Map(Object.entries(named).map(
+        ([login, uniqueName]) => [login, {uniqueName, password: randomPassword()}]));
 }
 
 function makeClients(origin, tenant) {
@@ -38,8 +39,8 @@ function recordSecrets(webroot, clients) {
 }
 
 /**
- * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it gives,
- * `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
+ * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it
+ * gives, `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
  */
 export async function startSite({webroot, nodeModules, users, onRequest, onLog}) {
     const folder = mkdtempSync('/tmp/site-');

@@ -16,8 +16,8 @@ struct IdChange {
 /// std::runtime_error when the kernel knows no filters.
 void RefuseIdChanges(const std::vector<IdChange> &changes);
 
-/// From now on, and for good, this process is ended by SIGSYS at its first call that writes, to a file or to a socket, or
-/// that makes or removes a file. Throws as above.
+/// From now on, and for good, this process is ended by SIGSYS at its first call that writes, to a file or to a socket,
+/// or that makes or removes a file. Throws as above.
 void ForbidWriting();
 
 }  // namespace Test

@@ -1,0 +1,39 @@
+// What ESLint holds the JavaScript to. Its packages are installed into build/eslint, not beside this file.
+import {createRequire} from 'node:module';
+
+const require = createRequire(new URL('build/eslint/package.json', import.meta.url));
+const js = require('@eslint/js');
+const stylistic = require('@stylistic/eslint-plugin');
+const globals = require('globals');
+
+export default [
+    {ignores: ['build/']},
+    js.configs.recommended,
+    stylistic.configs.customize({
+        arrowParens: true,
+        blockSpacing: false,
+        braceStyle: '1tbs',
+        indent: 4,
+        semi: true,
+    }),
+    {
+        rules: {
+            '@stylistic/max-len': ['error', {code: 120, ignoreTemplateLiterals: true, ignoreStrings: true}],
+            '@stylistic/object-curly-spacing': ['error', 'never'],
+            '@stylistic/operator-linebreak': ['error', 'after', {overrides: {'?': 'before', ':': 'before'}}],
+            '@stylistic/quote-props': ['error', 'as-needed'],
+            '@stylistic/quotes': ['error', 'single', {allowTemplateLiterals: 'always', avoidEscape: true}],
+            curly: 'error',
+            eqeqeq: 'error',
+            'no-implicit-globals': 'error',
+            'no-shadow': 'error',
+            'no-throw-literal': 'error',
+            'no-unused-expressions': 'error',
+            'no-var': 'error',
+            'prefer-const': 'error',
+        },
+    },
+    {files: ['**/*.mjs'], languageOptions: {globals: globals.node}},
+    // The browser tests hand functions to the page, where they run.
+    {files: ['frontend/static/*.js', 'tests/browser/*.mjs'], languageOptions: {globals: globals.browser}},
+];
