@@ -1,0 +1,28 @@
+# Test programs against the built library. They need GoogleTest; a build of what is shipped, whose files are tested as
+# they are, does without.
+include(GoogleTest)
+
+option(TAVOSSO_TEST_PROGRAMS "Build the test programs" ON)
+if(NOT TAVOSSO_TEST_PROGRAMS)
+    return()
+endif()
+
+find_package(GTest REQUIRED)
+
+add_library(test_support STATIC support/error_queue.cpp support/failure.cpp support/files.cpp support/token.cpp)
+tavosso_options(test_support)
+target_link_libraries(test_support PUBLIC OpenSSL::Crypto PkgConfig::JSONCPP)
+
+# Makes a program's tests known, each to be run on its own in private namespaces.
+function(tavosso_discover_tests label name)
+    set_target_properties(${name} PROPERTIES CROSSCOMPILING_EMULATOR ${PROJECT_SOURCE_DIR}/tools/private-root)
+    gtest_discover_tests(${name} NO_PRETTY_VALUES TEST_PREFIX ${label}. DISCOVERY_TIMEOUT 60
+                         PROPERTIES LABELS ${label} TIMEOUT 120)
+endfunction()
+
+function(tavosso_test label name)
+    add_executable(${name} ${ARGN})
+    tavosso_options(${name})
+    target_link_libraries(${name} PRIVATE tavosso test_support GTest::gmock_main)
+    tavosso_discover_tests(${label} ${name})
+endfunction()
