@@ -1,0 +1,39 @@
+// What stands in the documents' blocks is what it says it is.
+import assert from 'node:assert/strict';
+import {execFileSync} from 'node:child_process';
+import {mkdtempSync, readdirSync, readFileSync, rmSync} from 'node:fs';
+import {tmpdir} from 'node:os';
+import path from 'node:path';
+import {test} from 'node:test';
+
+import {blocks, documents, PROJECT, proseLines} from './documents.mjs';
+
+const LANGUAGES = ['conf', 'cpp', 'json', 'mermaid', 'sh', 'text'];
+const all = documents.flatMap(blocks);
+const inLanguage = (wanted) => all.filter(({language}) => language === wanted);
+
+test(`each of ${all.length} blocks says what it is`, () => {
+    assert.ok(all.length > 15);
+    assert.deepEqual(all.filter(({language}) => !LANGUAGES.includes(language)), []);
+    assert.deepEqual(documents.flatMap(proseLines).filter(({text}) => /^(\t| {4}[^ |*0-9-])/.test(text)), []);
+});
+
+test('each JSON block is JSON', () => {
+    assert.ok(inLanguage('json').length > 2);
+    inLanguage('json').forEach(({text}) => JSON.parse(text));
+});
+
+test('each C++ block is one of the programs that are compiled as they stand', () => {
+    const folder = mkdtempSync(path.join(tmpdir(), 'programs-'));
+    try {
+        execFileSync(path.join(PROJECT, 'tests/consumer/programs'), [folder]);
+        const compiled = readdirSync(folder, {recursive: true}).filter((file) => /\.(cpp|h)$/.test(file))
+            .map((file) => readFileSync(path.join(folder, file), 'utf8').trim());
+        assert.ok(compiled.length > 3);
+        const told = inLanguage('cpp').map(({text}) => text);
+        assert.equal(told.length, compiled.length);
+        assert.deepEqual(told.filter((text) => !compiled.includes(text)).map((text) => text.split('\n')[0]), []);
+    } finally {
+        rmSync(folder, {recursive: true});
+    }
+});

@@ -1,0 +1,73 @@
+// The commands that the documents tell their readers to run, and how a test runs each.
+import {execFileSync} from 'node:child_process';
+
+import {blocks, codeSpans, documents, PROJECT, proseLines} from './documents.mjs';
+
+/** Commands of blocks that are not run here, and why. */
+const ELSEWHERE = new Map([
+    ['./check', 'is what runs this'],
+    ['tests/package/machine --clone /home/ada/tavosso --user ada ./check style', 'is how these commands are run'],
+]);
+
+// What a span of text begins with that is a command. A file's name alone is none.
+const COMMAND = new RegExp('^(?:\\./|(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|git|journalctl|ldd|lintian|ls|' +
+    'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|ulimit) |tests/\\w+/\\w+ |tools/[\\w-]+ )');
+
+/** Commands within the text that cannot be run to the letter, and what is run for them. */
+const FILLED_IN = new Map([
+    ['./demo serve', 'until_it_waits ./demo serve'],
+    ['./demo serve websphere', 'until_it_waits ./demo serve websphere'],
+    ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
+    ['ls -l FILE', 'ls -l build/first/profile.conf'],
+    ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
+]);
+
+/** Commands within the text that are not run here, and why. */
+const NOT_HERE = new Map([
+    ['dpkg-buildpackage -us -uc -b', 'tests/package/run does'],
+    ['dpkg-buildpackage -us -uc', 'tests/package/run does, without the sources'],
+    ['git commit', 'by hand'],
+    ['git tag -a vVERSION', 'by hand'],
+    ['node tests/mutation/run.mjs', 'by hand: an hour'],
+    ['openssl s_server -www', 'tells how a figure was measured'],
+    ['tests/fuzz/run --hours 1', 'by hand: an hour'],
+    ['tests/fuzz/run --report', 'by hand, after that'],
+]);
+
+const shellBlocks = documents.flatMap(blocks).filter(({language}) => language === 'sh');
+const isRun = ({text}) => !ELSEWHERE.has(text.trim());
+
+const partsOfCheck = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding: 'utf8'});
+
+const spans = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
+    codeSpans(text).filter((span) => COMMAND.test(span)).map((span) => ({document, line, text: span})));
+
+/** Is this `./check` with parts? Those commands are run by one of them, and the others take as long. */
+function isPartOfCheck({text}) {
+    const parts = /^\.\/check ([a-z ]+)$/.exec(text)?.[1].split(' ');
+    return parts?.every((part) => new RegExp(`^ .*\\b${part}\\b`, 'm').test(partsOfCheck));
+}
+
+const withinText = spans.filter(({text}, index) => spans.findIndex((span) => span.text === text) === index)
+    .filter((span) => !ELSEWHERE.has(span.text) && !NOT_HERE.has(span.text) && !isPartOfCheck(span));
+
+/** What stands in the tables above, and in no document any more. */
+export const needless = [
+    ...[...FILLED_IN.keys(), ...NOT_HERE.keys()].filter((command) => !spans.some(({text}) => text === command)),
+    ...[...ELSEWHERE.keys()].filter((command) => !shellBlocks.some(({text}) => text.trim() === command)),
+];
+
+/**
+ * A script of one line for each, in the order of the documents: "run" or "administer", where it stands, and the
+ * commands. Blocks come first: what stands within text may need what they make.
+ */
+export function script() {
+    const quoted = (text) => `'${text.replaceAll('\'', '\'\\\'\'')}'`;
+    const line = ({document, line: number, text}) => {
+        const how = document === 'docs/operations.md' ? 'administer' : 'run';
+        return `${how} ${quoted(`${document}:${number}`)} ${quoted(FILLED_IN.get(text) ?? text)}\n`;
+    };
+    return [...shellBlocks.filter(isRun), ...withinText].map(line).join('');
+}
+
+export const count = shellBlocks.filter(isRun).length + withinText.length;

@@ -1,0 +1,90 @@
+// The documents of the project, taken apart.
+import {execFileSync} from 'node:child_process';
+import {readFileSync} from 'node:fs';
+import path from 'node:path';
+
+export const PROJECT = new URL('../..', import.meta.url).pathname;
+
+export function read(file) {
+    return readFileSync(path.join(PROJECT, file), 'utf8');
+}
+
+/** Files that are ours and match: of a clone those under version control, else those that lie there. */
+export function filesMatching(...patterns) {
+    const files = execFileSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],
+        {cwd: PROJECT, encoding: 'utf8'}).split('\n').filter(Boolean);
+    if (files.length === 0) {
+        throw new Error(`there is no ${patterns}`);
+    }
+    return files;
+}
+
+export const documents = filesMatching('*.md');
+
+/** Fenced blocks of a document: language, text, and the line that the text begins in. */
+export function blocks(document) {
+    const found = [];
+    let open;
+    read(document).split('\n').forEach((line, index) => {
+        const fence = /^```(.*)$/.exec(line);
+        if (!fence) {
+            open?.lines.push(line);
+        } else if (open) {
+            found.push({document, language: open.language, line: open.line, text: open.lines.join('\n')});
+            open = undefined;
+        } else {
+            open = {language: fence[1], line: index + 2, lines: []};
+        }
+    });
+    if (open) {
+        throw new Error(`${document}:${open.line}: the block has no end`);
+    }
+    return found;
+}
+
+/** The document without its fenced blocks, line by line. */
+export function proseLines(document) {
+    let inside = false;
+    return read(document).split('\n').map((text, index) => {
+        const isFence = text.startsWith('```');
+        inside = isFence ? !inside : inside;
+        return {document, line: index + 1, text: inside || isFence ? '' : text};
+    });
+}
+
+/** What stands in backticks in a text. */
+export function codeSpans(text) {
+    return [...text.matchAll(/`([^`]+)`/g)].map(([, span]) => span);
+}
+
+/** The rows of a document's tables, each with the heading that it stands under and its table's header. */
+export function tableRows(document) {
+    const rows = [];
+    let heading = '';
+    let header;
+    for (const {line, text} of proseLines(document)) {
+        heading = /^#+ (.*)/.exec(text)?.[1] ?? heading;
+        if (!text.startsWith('|')) {
+            header = undefined;
+            continue;
+        }
+        const cells = text.replace(/^\|\s*|\s*\|\s*$/g, '').split(/\s*(?<!\\)\|\s*/);
+        if (header === undefined) {
+            header = cells;
+        } else if (!/^[-| :]+$/.test(text)) {
+            rows.push({document, line, heading, header, cells});
+        }
+    }
+    return rows;
+}
+
+/** What is in one list and not in the other, and what is there twice: all empty where documents and sources agree. */
+export function differences({told, real}) {
+    return {
+        notTold: real.filter((item) => !told.includes(item)),
+        notThere: told.filter((item) => !real.includes(item)),
+        toldTwice: told.filter((item, index) => told.indexOf(item) !== index),
+    };
+}
+
+export const NO_DIFFERENCES = {notTold: [], notThere: [], toldTwice: []};

@@ -1,0 +1,99 @@
+// The texts that the library, the stand-in and the front end can log or throw, and the keys that they read, as they
+// stand in the sources.
+import path from 'node:path';
+
+import {filesMatching, read} from './documents.mjs';
+
+const FOLDERS = ['azure', 'frontend', 'jwt', 'platform', 'sso', 'utils', 'websphere'];
+const LITERAL = /"((?:[^"\\]|\\.)*)"/g;
+
+const sources = filesMatching(...FOLDERS.flatMap((folder) => [`${folder}/*.cpp`, `${folder}/*.h`]))
+    .map((file) => ({file, name: path.parse(file).name, text: withoutComments(read(file))}));
+
+function withoutComments(text) {
+    return text.replace(/\/\*[^]*?\*\/|(^|[^:"])\/\/.*$/gm, '$1');
+}
+
+function literals(text) {
+    return [...text.matchAll(LITERAL)].map(([, literal]) => literal);
+}
+
+const unique = (list) => [...new Set(list)];
+
+/** The arguments of each call of a function, or what follows each keyword, up to the semicolon. */
+function statements(text, beginning) {
+    return text.split(beginning).slice(1).map((rest) => rest.slice(0, rest.indexOf(';')));
+}
+
+const LEVELS = {LOG_ERR: 'err', LOG_WARNING: 'warning', LOG_INFO: 'info', LOG_AUTH: 'auth'};
+
+function level(priority) {
+    const names = priority.match(/LOG_[A-Z]+/g).map((name) => LEVELS[name] ?? name);
+    return names.sort((a, b) => (a === 'auth') - (b === 'auth')).join(', ');
+}
+
+/**
+ * What can be logged: format, level, and the name of the source that stands for "%s:%d". A format that a function is
+ * given is each of those texts of the same file that look like one.
+ */
+export function logFormats() {
+    return sources.flatMap(({file, name, text}) => {
+        const calls = statements(text, /\bsyslog\(/);
+        const handedOver = literals(text).filter((literal) => literal.startsWith('%s:%d ') &&
+            !calls.some((call) => call.includes(`"${literal}"`)));
+        return calls.flatMap((call) => {
+            const [, priority, format] = /^([^,]+),\s*(?:"((?:[^"\\]|\\.)*)"|\w+)/.exec(call);
+            const formats = format === undefined ? handedOver : [format];
+            if (formats.length === 0) {
+                throw new Error(`${file}: no format for syslog(${call})`);
+            }
+            // One class serves several sources, by whose names it logs.
+            const source = call.includes('source_') ? 'SOURCE' : name;
+            return formats.map((each) => ({format: each, level: level(priority), source}));
+        });
+    });
+}
+
+/** Texts of exceptions that the sources throw, with their classes; "ALG" stands for the name of an algorithm. */
+export function thrownTexts() {
+    const thrown = sources.filter(({file}) => !file.startsWith('frontend/')).flatMap(({file, text}) =>
+        statements(text, /\bthrow\b/).filter((statement) => statement.includes('(')).flatMap((statement) => {
+            const [, type, argument] = /^\s*(?:\w+::)*?((?:std::)?\w+)\(([^]*)\)$/.exec(statement) ?? [];
+            return textsOf(argument, text).map((thrownText) => ({file, type, text: thrownText}));
+        }));
+    return thrown.filter(({text}) => text !== undefined);
+}
+
+function textsOf(argument, file) {
+    if (argument === '') {
+        return [];
+    }
+    const [literal] = literals(argument);
+    if (literal !== undefined) {
+        return [argument.startsWith('"') ? literal : `ALG${literal}`];
+    }
+    if (/^\w+$/.test(argument)) { // a parameter: what the function is called with
+        const before = file.slice(0, file.search(new RegExp(`throw [\\w:]+\\(${argument}\\)`)));
+        const name = [...before.matchAll(/^[\w:<>&* ]+?(\w+)\([^;]*?\) \{/gm)].at(-1)[1];
+        const texts = statements(file, new RegExp(`\\b${name}\\(`)).flatMap(literals);
+        if (texts.length > 0) {
+            return texts;
+        }
+    }
+    // Texts of others: the provider's answer, libcurl's.
+    if (['Utils::WriteCompactJson(tokenResponse)', 'curl_easy_strerror(result)'].includes(argument)) {
+        return [];
+    }
+    throw new Error(`what does this throw: ${argument}`);
+}
+
+/** The keys of the configuration files, by file. */
+export function configurationKeys() {
+    const named = (folder, pattern) => unique(sources.filter(({file}) => file.startsWith(folder))
+        .flatMap(({text}) => literals(text)).filter((literal) => pattern.test(literal)));
+    return {
+        'profile.conf': named('sso/', /^sso_[a-z_]+$/),
+        'azure.conf': named('azure/', /^azure_[a-z_]+$/),
+        'websphere.conf': named('websphere/', /^websphere_[a-z_]+$/),
+    };
+}
