@@ -17,7 +17,7 @@ test(`each of ${count} commands and blocks of commands works`, () => {
     try {
         writeFileSync(path.join(folder, 'commands'), script());
         const run = spawnSync('tests/package/machine', ['--clone', '/home/ada/tavosso', '--user', 'ada',
-            '--bind', folder, '/commands', 'tests/documents/run_commands', '/commands/commands'],
+            '--copy', folder, '/commands', 'tests/documents/run_commands', '/commands/commands'],
         {cwd: PROJECT, stdio: ['ignore', 'inherit', 'inherit']});
         assert.equal(run.status, 0);
     } finally {
