@@ -10,14 +10,24 @@ const ELSEWHERE = new Map([
 ]);
 
 // What a span of text begins with that is a command. A file's name alone is none.
-const COMMAND = new RegExp('^(?:\\./|(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|git|journalctl|ldd|lintian|ls|' +
+const COMMAND = new RegExp('^(?:\\./|(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|lintian|ls|' +
     'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|ulimit) |tests/\\w+/\\w+ |tools/[\\w-]+ )');
 
 /** Commands within the text that cannot be run to the letter, and what is run for them. */
 const FILLED_IN = new Map([
     ['./demo serve', 'until_it_waits ./demo serve'],
     ['./demo serve websphere', 'until_it_waits ./demo serve websphere'],
+    ['cmake --preset release -DTAVOSSO_PLATFORM_LIBRARIES="/path/to/one.so;/path/to/other.so"',
+        'cmake --preset release -B build/appliance -DTAVOSSO_PLATFORM_LIBRARIES=/usr/local/lib/libtavoplatform.so.0 &&' +
+        ' cmake --build build/appliance --target tavosso'],
+    ['g++ -std=c++17 sso.cpp -o sso.cgi $(pkg-config --cflags --libs tavosso)',
+        'cd build/first && g++ -std=c++17 sso.cpp -o sso.cgi $(pkg-config --cflags --libs tavosso)'],
+    ['g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)',
+        'mkdir build/guide && tests/consumer/programs build/guide && cd build/guide/guide &&' +
+        ' g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
+    // Also after the interface was described anew.
+    ['git status --short', 'git status --short && [ -z "$(git status --short)" ]'],
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
 ]);
@@ -39,8 +49,11 @@ const isRun = ({text}) => !ELSEWHERE.has(text.trim());
 
 const partsOfCheck = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding: 'utf8'});
 
-const spans = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
-    codeSpans(text).filter((span) => COMMAND.test(span)).map((span) => ({document, line, text: span})));
+// Commands with places to fill in do not stand in blocks of shell.
+const spans = documents.flatMap((document) => [
+    ...proseLines(document).flatMap(({line, text}) => codeSpans(text).map((span) => ({document, line, text: span}))),
+    ...blocks(document).filter(({language}) => language === 'text'),
+]).filter(({text}) => COMMAND.test(text));
 
 /** Is this `./check` with parts? Those commands are run by one of them, and the others take as long. */
 function isPartOfCheck({text}) {
