@@ -1,10 +1,12 @@
 // What ESLint holds the JavaScript to. Its packages are installed into build/eslint, not beside this file.
 import {createRequire} from 'node:module';
+import {pathToFileURL} from 'node:url';
 
-const require = createRequire(new URL('build/eslint/package.json', import.meta.url));
-const js = require('@eslint/js');
-const stylistic = require('@stylistic/eslint-plugin');
-const globals = require('globals');
+const {resolve} = createRequire(new URL('build/eslint/package.json', import.meta.url));
+const load = async (name) => (await import(pathToFileURL(resolve(name)))).default;
+const js = await load('@eslint/js');
+const stylistic = await load('@stylistic/eslint-plugin');
+const globals = await load('globals');
 
 export default [
     {ignores: ['build/']},
