@@ -1,0 +1,102 @@
+// The manual pages: well-formed, complete, and of the same mind as the headers and the sources.
+import assert from 'node:assert/strict';
+import {execFileSync, spawnSync} from 'node:child_process';
+import {existsSync, mkdirSync, mkdtempSync, rmSync, symlinkSync, writeFileSync} from 'node:fs';
+import {tmpdir} from 'node:os';
+import path from 'node:path';
+import {test} from 'node:test';
+
+import {differences, filesMatching, NO_DIFFERENCES, PROJECT, read} from './documents.mjs';
+import {configurationKeys, thrownTexts} from './sources.mjs';
+
+const files = filesMatching('docs/man/*');
+const links = files.filter((file) => read(file).startsWith('.so '));
+const pages = files.filter((file) => !links.includes(file))
+    .map((file) => ({file, section: file.at(-1), source: read(file), text: render(file)}));
+const ELSEWHERE = ['curl_easy_perform 3', 'journalctl 1', 'libcurl 3', 'lighttpd 8', 'pkg-config 1', 'setresuid 2',
+    'strerror 3', 'syslog 3', 'update-ca-certificates 8'];
+
+function render(file) {
+    const text = execFileSync('mandoc', ['-T', 'ascii', '-O', 'width=1000', file], {cwd: PROJECT, encoding: 'utf8'});
+    return text.replace(/.\x08/g, ''); // eslint-disable-line no-control-regex -- bold and underlined
+}
+
+function part(text, heading) {
+    return text.split(/^(?=[A-Z])/m).filter((each) => each.startsWith(heading)).join('');
+}
+
+const normal = (text) => text.replace(/\s+/g, ' ').replace(/\( /g, '(').trim();
+
+test(`mandoc has nothing to say of ${files.length} pages`, () => {
+    assert.ok(pages.length > 10 && links.length > 3);
+    const lint = spawnSync('mandoc', ['-T', 'lint', '-W', 'warning', ...pages.map(({file}) => file)],
+        {cwd: PROJECT, encoding: 'utf8'});
+    assert.equal(lint.stdout + lint.stderr, '');
+    assert.deepEqual(links.filter((file) => !existsSync(path.join(PROJECT, 'docs/man',
+        read(file).replace(/^\.so man3\//, '').trim()))), []);
+});
+
+test('each page that another refers to is there', () => {
+    const known = [...files.map((file) => path.basename(file).replace(/\.(\d)$/, ' $1')), ...ELSEWHERE];
+    const referred = pages.flatMap(({file, source}) =>
+        [...source.matchAll(/^\.Xr (\S+) (\d)/gm)].map(([, name, section]) => ({file, page: `${name} ${section}`})));
+    assert.ok(referred.length > 20);
+    assert.deepEqual(referred.filter(({page}) => !known.includes(page)), []);
+});
+
+test('each exported function has its declaration in one synopsis, as in the header', () => {
+    const declared = normal((read('sso/sso.h') + read('jwt/jwt.h')).replace(/\/\*[^]*?\*\/|\/\/.*$/gm, ''));
+    const synopses = pages.map(({file, text}) => ({file, synopsis: normal(part(text, 'SYNOPSIS'))}));
+    const names = [...new Set([...read('cmake/libtavosso.map').matchAll(/"TAVO::\w+::(?:\w+::)?(\w+)(?:\[[^"(]*)?\(/g)]
+        .map(([, name]) => name))];
+    assert.ok(names.length > 30);
+    const declarations = names.flatMap((name) =>
+        [...declared.matchAll(new RegExp(`[^;{}:]*\\b(?<!~)${name}\\([^;{]*;`, 'g'))].map(([text]) => normal(text)));
+    assert.ok(declarations.length > names.length);
+    assert.deepEqual(declarations.filter((text) => !synopses.some(({synopsis}) => synopsis.includes(text))), []);
+    console.log(`${declarations.length} declarations`);
+});
+
+test('each text that is thrown stands in a page, and none stands among the errors that is not', () => {
+    const thrown = [...new Set(thrownTexts().map(({text}) => text))];
+    const text = normal(pages.map((page) => page.text).join('\n'));
+    assert.deepEqual(thrown.filter((each) => !text.includes(`"${each}"`)), []);
+    const libcurls = ['Couldn\'t connect to server'];
+    const told = pages.flatMap((page) => [...normal(part(page.text, 'ERRORS')).matchAll(/"([^" ][^"]* [^"]*[^" ])"/g)]
+        .map(([, quoted]) => ({file: page.file, quoted})));
+    assert.ok(told.length > 20);
+    assert.deepEqual(told.filter(({quoted}) => ![...thrown, ...libcurls].includes(quoted)), []);
+    console.log(`${thrown.length} texts`);
+});
+
+test('each key of a configuration file stands in the page of that file', () => {
+    for (const [file, real] of Object.entries(configurationKeys())) {
+        const {source} = pages.find((page) => page.file === `docs/man/tavosso-${file}.5`);
+        const told = [...source.matchAll(/^\.It (?:Li|Cm|Va|Ic) (\w+)/gm)].map(([, key]) => key);
+        assert.deepEqual(differences({told, real}), NO_DIFFERENCES);
+    }
+});
+
+test('each example that is a program compiles', () => {
+    const programs = pages.flatMap(({source}) => [...source.matchAll(/^\.Bd -literal.*\n([^]*?)^\.Ed/gm)])
+        .map(([, text]) => text.replaceAll('\\(aq', '\'').replaceAll('\\(dq', '"').replaceAll('\\e', '\\')
+            .replaceAll('\\-', '-').replaceAll('\\&', ''))
+        .filter((text) => text.includes('int main') || text.includes('main('));
+    assert.ok(programs.length > 0);
+    const folder = mkdtempSync(path.join(tmpdir(), 'examples-'));
+    try {
+        mkdirSync(path.join(folder, 'tavosso'));
+        for (const header of ['sso/sso.h', 'jwt/jwt.h']) {
+            symlinkSync(path.join(PROJECT, header), path.join(folder, 'tavosso', path.basename(header)));
+        }
+        const flags = execFileSync('pkg-config', ['--cflags', 'jsoncpp'], {encoding: 'utf8'}).trim().split(/\s+/);
+        programs.forEach((program, index) => {
+            const file = path.join(folder, `example${index}.cpp`);
+            writeFileSync(file, program);
+            execFileSync('g++', ['-std=c++17', '-Wall', '-Wextra', '-Werror', '-fsyntax-only', ...flags, `-I${folder}`, file]);
+        });
+    } finally {
+        rmSync(folder, {recursive: true});
+    }
+    console.log(`${programs.length} programs`);
+});
