@@ -59,7 +59,7 @@ class Jwt {
      * @return the JOSE header, decoded and parsed afresh: any JSON value, not only an object
      *
      * @throws std::invalid_argument  "bad jwt header format!": not JSON
-     * @throws std::logic_error  (itself) when the part is empty or cannot be decoded for want of memory
+     * @throws std::logic_error  (itself) "empty jwt part": the part is empty, or memory runs out over it
      */
     Json::Value GetHeader();
 
@@ -67,7 +67,7 @@ class Jwt {
      * @return the claims, decoded and parsed afresh: any JSON value, not only an object
      *
      * @throws std::invalid_argument  "bad jwt body format!": not JSON
-     * @throws std::logic_error  (itself) when the part is empty or cannot be decoded for want of memory
+     * @throws std::logic_error  (itself) "empty jwt part": the part is empty, or memory runs out over it
      */
     Json::Value GetBody();
 

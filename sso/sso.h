@@ -225,7 +225,8 @@ class AzureSSOClient : public SSOClient {
      * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "tenant ID
      * invalid"; "client ID invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be
      * fetched); "RSA public 'n' cannot be found!", "RSA public 'e' cannot be found!"
-     * @throws std::logic_error  when the header or the body of the token is empty, or memory runs out in decoding it
+     * @throws std::logic_error  (itself) "empty jwt part": header or body of the token is empty, or memory runs out
+     * over it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not RS256, RS384 or RS512
      * @throws TAVO::JWT::jwt_verify_failed  "verify rsa signature failed"
      *
@@ -251,7 +252,7 @@ class AzureSSOClient : public SSOClient {
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
      *         (`VerifyIDToken`); "cannot find the user name!" (neither claim is a string); "cannot get the user name!"
      *         (not exactly one at sign)
-     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
+     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
      * @throws sso_op_failed  "TAVOWinsUserNameFqdn2Netbios failed.": the platform does not know the domain
      */
     void GetUserName(std::string &userName) override;
@@ -274,7 +275,7 @@ class AzureSSOClient : public SSOClient {
      * @param info  receives the decoded body; untouched on failure
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
+     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
      */
     void GetUserInfo(Json::Value &info);
 
@@ -342,7 +343,8 @@ class WebSphereSSOClient : public SSOClient {
      * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
      * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "client ID
      * invalid"
-     * @throws std::logic_error  when the header or the body of the token is empty, or memory runs out in decoding it
+     * @throws std::logic_error  (itself) "empty jwt part": header or body of the token is empty, or memory runs out
+     * over it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
      * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes
      * @throws TAVO::JWT::jwt_verify_failed  "verify hmac signature failed", also under an empty client secret
@@ -359,7 +361,7 @@ class WebSphereSSOClient : public SSOClient {
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
      *         (`VerifyIDToken`); "cannot find the user name!": "sub" is missing or not a string
-     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
+     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
      */
     void GetUserName(std::string &userName) override;
 
@@ -380,7 +382,7 @@ class WebSphereSSOClient : public SSOClient {
      * @param claims  receives the decoded body; untouched on failure
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  when the body of the token is empty, or memory runs out in decoding it
+     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
      */
     void GetUserInfo(Json::Value &claims);
 
@@ -478,7 +480,8 @@ std::string GetAzureSSOLogoutURL(const std::string &base);
  * @param url            where
  * @param response       handed to the callback as its user pointer, otherwise untouched
  * @param verifySSL      whether to verify the server's certificate and host name
- * @param writeCallback  receives the answer, in the form of libcurl's CURLOPT_WRITEFUNCTION; must not throw
+ * @param writeCallback  receives the answer, in the form of libcurl's CURLOPT_WRITEFUNCTION; must not throw, nor be
+ * null
  *
  * @throws std::bad_alloc  when no handle can be made
  * @throws sso_err_resp  with libcurl's text, when the transfer fails or cannot be prepared

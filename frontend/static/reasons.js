@@ -22,6 +22,7 @@ const EXPLANATIONS = new Map([
         'For your safety this sign-in was stopped: the answer belongs to another one.'],
     ['TAVOWinsUserNameFqdn2Netbios failed.', `Your account's domain is not known to this device. ${ASK}`],
     ['tenant ID invalid', `Your account belongs to an organisation that this device does not serve. ${ASK}`],
+    ['empty jwt part', NOT_VERIFIED],
     ['client ID invalid', NOT_VERIFIED],
     ['kid does not exist', NOT_VERIFIED],
     ['RSA public', NOT_VERIFIED],
