@@ -13,8 +13,17 @@ add_library(test_support STATIC support/error_queue.cpp support/failure.cpp supp
 tavosso_options(test_support)
 target_link_libraries(test_support PUBLIC OpenSSL::Crypto PkgConfig::JSONCPP)
 
+# all_LABEL_tests builds the test programs of one label: all of them together take minutes.
+function(tavosso_label_program label name)
+    if(NOT TARGET all_${label}_tests)
+        add_custom_target(all_${label}_tests)
+    endif()
+    add_dependencies(all_${label}_tests ${name})
+endfunction()
+
 # Makes a program's tests known, each to be run on its own in private namespaces.
 function(tavosso_discover_tests label name)
+    tavosso_label_program(${label} ${name})
     set_target_properties(${name} PROPERTIES CROSSCOMPILING_EMULATOR ${PROJECT_SOURCE_DIR}/tools/private-root)
     gtest_discover_tests(${name} NO_PRETTY_VALUES TEST_PREFIX ${label}. DISCOVERY_TIMEOUT 60
                          PROPERTIES LABELS ${label} TIMEOUT 120)

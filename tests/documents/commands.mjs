@@ -34,7 +34,6 @@ const FILLED_IN = new Map([
 
 /** Commands within the text that are not run here, and why. */
 const NOT_HERE = new Map([
-    ['dpkg-buildpackage -us -uc -b', 'tests/package/run does'],
     ['dpkg-buildpackage -us -uc', 'tests/package/run does, without the sources'],
     ['git commit', 'by hand'],
     ['git tag -a vVERSION', 'by hand'],
