@@ -26,8 +26,6 @@ const FILLED_IN = new Map([
         'mkdir build/guide && tests/consumer/programs build/guide && cd build/guide/guide &&' +
         ' g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
-    // Also after the interface was described anew.
-    ['git status --short', 'git status --short && [ -z "$(git status --short)" ]'],
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
 ]);
