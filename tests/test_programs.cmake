@@ -9,7 +9,7 @@ endif()
 
 find_package(GTest REQUIRED)
 
-add_library(test_support STATIC support/error_queue.cpp support/failure.cpp support/files.cpp support/token.cpp)
+add_library(test_support STATIC support/encoding.cpp support/error_queue.cpp support/failure.cpp support/files.cpp support/token.cpp)
 tavosso_options(test_support)
 target_link_libraries(test_support PUBLIC OpenSSL::Crypto PkgConfig::JSONCPP)
 

@@ -10,6 +10,7 @@
 #include <sstream>
 
 #include "sso/sso.h"
+#include "tests/support/encoding.h"
 #include "tests/support/files.h"
 #include "tests/support/token.h"
 
@@ -102,33 +103,11 @@ std::string MD5Of(const std::string &text) {
     return hexadecimal.str();
 }
 
-std::string PercentDecode(const std::string &text) {
-    std::string decoded;
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        if (text[i] == '%') {
-            decoded += static_cast<char>(std::stoi(text.substr(i + 1, 2), nullptr, 16));
-            i += 2;
-        } else {
-            decoded += text[i];
-        }
-    }
-    return decoded;
-}
-
-std::string Base64Decode(const std::string &text) {
-    std::string bytes(text.size(), '\0');
-    const int length =
-        EVP_DecodeBlock(reinterpret_cast<unsigned char *>(bytes.data()),
-                        reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size()));
-    bytes.resize(length < 0 ? 0 : static_cast<std::size_t>(length));
-    return bytes.c_str();  // without the zero bytes that padding counts as
-}
-
 /// Shows what is inside of the state, and hides what is new in every URL.
 std::string Readable(std::string url) {
     std::smatch match;
     if (std::regex_search(url, match, std::regex("&state=([^&]*)"))) {
-        Json::Value state = Parse(Base64Decode(PercentDecode(match[1])));
+        Json::Value state = Parse(FromBase64(PercentDecode(match[1])));
         url = match.prefix().str() + "&state=<" + Compact(state) + ">" + match.suffix().str();
     }
     if (std::regex_search(url, match, std::regex("&nonce=([0-9a-f]{8}-([0-9a-f]{4}-){3}[0-9a-f]{12})&"))) {

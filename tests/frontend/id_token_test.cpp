@@ -4,6 +4,7 @@
 #include <sso/sso.h>
 
 #include "frontend/failure.h"
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 
 using namespace Frontend;

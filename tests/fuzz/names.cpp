@@ -8,6 +8,7 @@
 #include "tests/fuzz/oracle.h"
 #include "tests/fuzz/target.h"
 #include "tests/fuzz/token_oracle.h"
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 
 namespace Fuzz {

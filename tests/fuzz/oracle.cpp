@@ -8,6 +8,7 @@
 #include <memory>
 #include <stdexcept>
 
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"  // Json::Reader, whose verdict is the one that is promised

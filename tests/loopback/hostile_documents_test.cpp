@@ -9,6 +9,7 @@
 
 #include "jwt/jwt.h"
 #include "tests/loopback/provider.h"
+#include "tests/support/encoding.h"
 #include "tests/support/files.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"

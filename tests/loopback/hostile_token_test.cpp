@@ -8,6 +8,7 @@
 #include "jwt/jwt.h"
 #include "sso/sso.h"
 #include "tests/loopback/provider.h"
+#include "tests/support/encoding.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"

@@ -15,6 +15,7 @@
 #include "jwt/jwt.h"
 #include "sso/sso.h"
 #include "tests/loopback/provider.h"
+#include "tests/support/encoding.h"
 #include "tests/support/files.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"

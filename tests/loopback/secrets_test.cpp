@@ -1,5 +1,4 @@
 #include <gmock/gmock.h>
-#include <openssl/evp.h>
 
 #include <memory>
 #include <string>
@@ -8,6 +7,7 @@
 #include "sso/sso.h"
 #include "tests/interposed/releases.h"
 #include "tests/loopback/provider.h"
+#include "tests/support/encoding.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
@@ -21,13 +21,6 @@ using ::testing::Field;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
-
-std::string Base64(const std::string &bytes) {
-    std::string text(4 * ((bytes.size() + 2) / 3), '\0');
-    EVP_EncodeBlock(reinterpret_cast<unsigned char *>(text.data()),
-                    reinterpret_cast<const unsigned char *>(bytes.data()), static_cast<int>(bytes.size()));
-    return text;
-}
 
 /// A text in each of the forms that it takes on its way.
 std::vector<std::string> FormsOf(const std::string &text) { return {text, TAVO::SSO::URLEncode(text), Base64(text)}; }

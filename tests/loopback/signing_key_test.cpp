@@ -10,6 +10,7 @@
 
 #include "jwt/jwt.h"
 #include "tests/loopback/provider.h"
+#include "tests/support/encoding.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 

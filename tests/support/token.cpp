@@ -9,6 +9,8 @@
 #include <stdexcept>
 #include <vector>
 
+#include "tests/support/encoding.h"
+
 namespace Test {
 
 namespace {
@@ -31,16 +33,6 @@ std::string Component(EVP_PKEY *key, const char *name) {
 }
 
 }  // namespace
-
-std::string Base64Url(const std::string &bytes) {
-    std::string text(4 * ((bytes.size() + 2) / 3), '\0');
-    EVP_EncodeBlock(reinterpret_cast<unsigned char *>(text.data()), Bytes(bytes), static_cast<int>(bytes.size()));
-    text.resize(text.find_last_not_of('=') + 1);
-    for (char &c : text) {
-        c = c == '+' ? '-' : c == '/' ? '_' : c;
-    }
-    return text;
-}
 
 std::string Compact(const Json::Value &value) {
     Json::StreamWriterBuilder writer;

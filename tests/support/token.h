@@ -10,7 +10,6 @@
 // What an identity provider does with tokens, by OpenSSL's high-level calls: independent of the code under test.
 namespace Test {
 
-std::string Base64Url(const std::string &bytes);
 std::string Compact(const Json::Value &value);
 Json::Value Parse(const std::string &text);
 

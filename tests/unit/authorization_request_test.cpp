@@ -6,6 +6,7 @@
 #include "tests/interposed/calls.h"
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
@@ -15,29 +16,6 @@ namespace Test {
 namespace {
 
 using namespace TAVO::SSO;
-
-std::string FromBase64(const std::string &text) {
-    std::string bytes(3 * text.size() / 4, '\0');
-    EVP_DecodeBlock(reinterpret_cast<unsigned char *>(bytes.data()),
-                    reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size()));
-    for (auto end = text.rbegin(); end != text.rend() && *end == '='; ++end) {
-        bytes.pop_back();
-    }
-    return bytes;
-}
-
-std::string PercentDecode(const std::string &text) {
-    std::string decoded;
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        if (text[i] == '%') {
-            decoded += static_cast<char>(std::stoi(text.substr(i + 1, 2), nullptr, 16));
-            i += 2;
-        } else {
-            decoded += text[i];
-        }
-    }
-    return decoded;
-}
 
 /// The value of a query's parameter, as a provider would read it.
 std::string Parameter(const std::string &uri, const std::string &name) {

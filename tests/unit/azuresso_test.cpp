@@ -6,6 +6,7 @@
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"

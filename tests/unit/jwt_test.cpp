@@ -9,6 +9,7 @@
 
 #include "tests/interposed/calls.h"
 #include "tests/interposed/memory.h"
+#include "tests/support/encoding.h"
 #include "tests/support/error_queue.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"

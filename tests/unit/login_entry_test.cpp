@@ -1,10 +1,10 @@
 // OIDCLogin up to the client's own steps, and GetSSORelayURL.
-#include <openssl/evp.h>
 
 #include "sso/sso.h"
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
 
@@ -88,13 +88,6 @@ TEST_F(LoginEntry, TheCodeIsSentToTheTokenEndpoint) {
     EXPECT_EQ(CurrentTransport().form,
               "client_id=&client_secret=&code=abc&grant_type=authorization_code&redirect_uri=");
     TakeSystemLog();
-}
-
-std::string Base64(const std::string &text) {
-    std::string encoded(4 * ((text.size() + 2) / 3), '\0');
-    EVP_EncodeBlock(reinterpret_cast<unsigned char *>(encoded.data()),
-                    reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size()));
-    return encoded;
 }
 
 class RelayURL : public Library {};

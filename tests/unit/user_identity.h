@@ -1,6 +1,7 @@
 #ifndef TAVOSSO_TESTS_UNIT_USER_IDENTITY_H
 #define TAVOSSO_TESTS_UNIT_USER_IDENTITY_H
 
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
