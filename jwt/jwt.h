@@ -48,6 +48,8 @@ class jwt_verify_failed : public jwt_exception {
 class Jwt {
   public:
     /**
+     * Splits a token.
+     *
      * @param token  the compact token; nothing is decoded or checked here but the number of its parts
      *
      * @throws std::invalid_argument  "bad jwt format!": not exactly three parts joined by dots
@@ -56,7 +58,9 @@ class Jwt {
     ~Jwt();
 
     /**
-     * @return the JOSE header, decoded and parsed afresh: any JSON value, not only an object
+     * Decodes the JOSE header.
+     *
+     * @return the header, parsed afresh: any JSON value, not only an object
      *
      * @throws std::invalid_argument  "bad jwt header format!": not JSON
      * @throws std::logic_error  (itself) "empty jwt part": the part is empty, or memory runs out over it
@@ -64,14 +68,16 @@ class Jwt {
     Json::Value GetHeader();
 
     /**
-     * @return the claims, decoded and parsed afresh: any JSON value, not only an object
+     * Decodes the claims, unverified.
+     *
+     * @return the claims, parsed afresh: any JSON value, not only an object
      *
      * @throws std::invalid_argument  "bad jwt body format!": not JSON
      * @throws std::logic_error  (itself) "empty jwt part": the part is empty, or memory runs out over it
      */
     Json::Value GetBody();
 
-    /** @return the signature part as it stands in the token: base64url text */
+    /** Gives the signature part. @return as it stands in the token: base64url text */
     std::string GetSignature();
 
     /**

@@ -83,28 +83,30 @@ class sso_op_failed : public sso_exception {
  */
 class SSOClient {
   public:
-    /** @return whether single sign-on through this client is switched on in its configuration file (Azure only;
-     *          always false for WebSphere, where the profile alone decides) */
+    /**
+     * Tells whether the client's own file switches it on. Logins go by the profile instead.
+     * @return "azure_sso_enable"; always false for WebSphere, whose file has no such key
+     */
     virtual bool isEnable();
-    /** @return the client identifier registered at the provider (RFC 6749, section 2.2) */
+    /** Gives the client identifier. @return as registered at the provider (RFC 6749, section 2.2) */
     virtual std::string GetClientID();
-    /** @return the client secret: never show it or log it */
+    /** Gives the client secret. @return as registered at the provider: never show it or log it */
     virtual std::string GetClientSecret();
-    /** @return the redirect URI registered at the provider */
+    /** Gives the redirect URI. @return as registered at the provider, or as `SetRedirectURI` set it */
     virtual std::string GetRedirectURI();
-    /** @return the ID token of the login (compact JWT); empty before `ProcessTokenResponse` and after it failed */
+    /** Gives the ID token. @return the compact token; empty before `ProcessTokenResponse`, and after it failed */
     virtual std::string GetToken();
-    /** @return the authorization endpoint */
+    /** Gives the authorization endpoint. @return as configured */
     virtual std::string GetAuthEndpoint();
-    /** @return the token endpoint */
+    /** Gives the token endpoint. @return as configured */
     virtual std::string GetTokenEndpoint();
-    /** @return the address of the discovery document */
+    /** Gives the address of the discovery document. @return as configured */
     virtual std::string GetWellknownEndpoint();
-    /** @return the logout endpoint */
+    /** Gives the logout endpoint. @return as configured */
     virtual std::string GetLogoutEndpoint();
-    /** @param uri  takes the place of the configured redirect URI; not checked */
+    /** Sets another redirect URI. @param uri  takes the place of the configured one; not checked */
     virtual void SetRedirectURI(std::string uri);
-    /** @param authorizationCode  the code of this login; not checked, and never given out again */
+    /** Sets the code. @param authorizationCode  that of this login; not checked, and never given out again */
     virtual void SetCode(std::string authorizationCode);
 
     /**
@@ -179,8 +181,8 @@ class SSOClient {
      * @param userName           receives the user's name; see the client's `GetUserName` for what it holds after a
      *                           failure
      *
-     * @throws whatever a step throws; the steps after it are skipped. On a plain base client that is
-     *         sso_not_implemented "GetIDTokenReqParams not implemented", after the code has been stored
+     * What a step throws passes through, and the steps after it are skipped. On a plain base client that is
+     * sso_not_implemented "GetIDTokenReqParams not implemented", after the code has been stored.
      */
     virtual void OpenIDConnectLogin(std::string authorizationCode, std::string &userName);
 
@@ -236,7 +238,9 @@ class AzureSSOClient : public SSOClient {
     void VerifyIDToken() override;
 
     /**
-     * @return the body of the token request: client_id, client_secret, code, grant_type and redirect_uri, form-encoded.
+     * Builds the body of the token request (RFC 6749, section 4.1.3).
+     *
+     * @return client_id, client_secret, code, grant_type and redirect_uri, form-encoded.
      *         It holds the client secret and the code
      */
     std::string GetIDTokenReqParams() override;
@@ -351,7 +355,7 @@ class WebSphereSSOClient : public SSOClient {
      */
     void VerifyIDToken() override;
 
-    /** @return the body of the token request, as `AzureSSOClient::GetIDTokenReqParams` gives it */
+    /** Builds the body of the token request. @return as `AzureSSOClient::GetIDTokenReqParams` gives it */
     std::string GetIDTokenReqParams() override;
 
     /**
@@ -416,14 +420,16 @@ class SSOProfile {
     SSOProfile();
     virtual ~SSOProfile();
 
-    /** @return whether "sso_enable" is true */
+    /** Tells whether single sign-on is on. @return whether "sso_enable" is true */
     bool SSOIsEnable();
-    /** @return "sso_profile": "azure", "websphere", or whatever else stands in the file */
+    /** Gives the profile's name. @return "sso_profile": "azure", "websphere", or whatever else stands in the file */
     std::string GetSSOProfile();
     /**
-     * @return the settings of the chosen client; never null, empty where single sign-on is off. It belongs to this
-     *         object and cannot log in: its provider steps throw `sso_not_implemented`. Whether single sign-on is on
-     *         is `SSOIsEnable`, never this client's `isEnable`
+     * Gives the settings of the chosen client. It cannot log in: its provider steps throw `sso_not_implemented`.
+     * Whether single sign-on is on is `SSOIsEnable`, never this client's `isEnable`.
+     *
+     * @return never null; empty where single sign-on is off or the profile is unknown. It belongs to this object: do
+     *         not delete it, and do not use it when this object is gone
      */
     SSOClient *GetSSOClient();
 
@@ -442,7 +448,7 @@ class SSOProfile {
  *
  * @throws sso_op_failed  "read profile file failed."; "sso does not enable."; "not specify sso profile"
  * @throws sso_exception  (itself) "profile not support."
- * @throws whatever the client's construction and `OpenIDConnectLogin` throw
+ * What the client's construction and its `OpenIDConnectLogin` throw passes through.
  *
  * Log lines and side effects: those of the client's construction, which raises the process's ids for a moment, and of
  * its login.
@@ -510,6 +516,8 @@ void httpPost(const std::string &url, const std::string &body, std::string &resp
 std::string URLEncode(const std::string &value);
 
 /**
+ * Digests a text, as the state carries that of the nonce.
+ *
  * @param data  any bytes, NUL included
  * @return the MD5 digest (RFC 1321) as 32 lowercase hexadecimal digits. Empty on failure, with one line at `LOG_ERR`:
  *         "utils:LINE MD5 digest failed SYSTEM TEXT" or "utils:LINE calloc failed. SYSTEM TEXT"
