@@ -28,6 +28,14 @@ static_assert(sizeof(SSO::WebSphereSSOClient) == sizeof(SSO::SSOClient));
 static_assert(sizeof(SSO::SSOProfile) == 16 + sizeof(std::string) + sizeof(SSO::SSOClient));
 static_assert(sizeof(JWT::Jwt) == 3 * sizeof(std::string));
 
+// Where an alignment changes no size, nothing else would show it.
+template <typename... Types>
+constexpr bool kAreAlignedAsPointers = ((alignof(Types) == alignof(void *)) && ...);
+static_assert(
+    kAreAlignedAsPointers<SSO::SSOClient, SSO::AzureSSOClient, SSO::WebSphereSSOClient, SSO::SSOProfile, JWT::Jwt,
+                          SSO::sso_exception, SSO::sso_err_resp, SSO::sso_not_implemented, SSO::sso_op_failed,
+                          JWT::jwt_exception, JWT::jwt_not_support, JWT::jwt_verify_failed>);
+
 /// An exception with nothing of its own, caught as `Base` too, and made of a text that has to be named as one.
 template <typename Exception, typename Base>
 constexpr bool kIsCaughtAs =
@@ -185,6 +193,15 @@ struct BaseFields : SSO::SSOClient {
                 Offset(*this, token)};
     }
 };
+
+TEST_F(Interface, TheBaseIsOffAndEmptyAtFirst) {
+    SSO::SSOClient client;
+    EXPECT_FALSE(client.isEnable());
+    EXPECT_EQ(client.GetClientID() + client.GetClientSecret() + client.GetRedirectURI() + client.GetToken() +
+                  client.GetAuthEndpoint() + client.GetTokenEndpoint() + client.GetWellknownEndpoint() +
+                  client.GetLogoutEndpoint(),
+              "");
+}
 
 TEST_F(Interface, TheFieldsOfTheBaseLieInTheirOrder) {
     constexpr std::ptrdiff_t string = sizeof(std::string);
