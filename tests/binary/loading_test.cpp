@@ -97,9 +97,16 @@ TEST(Loading, WritesNothing) {
     EXPECT_EQ(WEXITSTATUS(status), EXIT_SUCCESS);
 }
 
-TEST(Loading, WouldHaveEndedHadItWrittenToAFileOrToTheLog) {
-    for (auto *write :
-         {+[] { std::ofstream("/tmp/a file") << "text" << std::flush; }, +[] { syslog(LOG_ERR, "line"); }}) {
+TEST(Loading, WouldHaveEndedHadItWrittenAnything) {
+    for (auto *write : {
+             +[] { std::ofstream("/tmp/file") << "text" << std::flush; },
+             +[] { std::ofstream("/dev/null", std::ios::app); },
+             +[] { std::filesystem::create_directory("/tmp/folder"); },
+             +[] { std::filesystem::rename("/tmp/there is none", "/tmp/file"); },
+             +[] { std::filesystem::remove("/tmp/there is none"); },
+             +[] { syslog(LOG_ERR, "line"); },
+             +[] { static_cast<void>(::write(STDOUT_FILENO, "", 0)); },
+         }) {
         const int status = StatusOfLoadingWithoutWriting(write);
         EXPECT_TRUE(WIFSIGNALED(status));
         EXPECT_EQ(WTERMSIG(status), SIGSYS);

@@ -1,5 +1,6 @@
 #include "tests/support/refused_calls.h"
 
+#include <fcntl.h>
 #include <linux/filter.h>
 #include <linux/seccomp.h>
 #include <sys/prctl.h>
@@ -42,6 +43,26 @@ void Refuse(Filter &filter, const IdChange &change) {
     Return(filter, SECCOMP_RET_ERRNO | EPERM);
 }
 
+/// Calls that write, or that make, move or remove a file. The older ones are not on every machine.
+constexpr long kWriting[] = {
+    SYS_write,    SYS_writev,   SYS_pwrite64, SYS_pwritev,  SYS_pwritev2,  SYS_sendto,    SYS_sendmsg,
+    SYS_sendmmsg, SYS_socket,   SYS_sendfile, SYS_splice,   SYS_truncate,  SYS_ftruncate, SYS_fallocate,
+    SYS_mkdirat,  SYS_mknodat,  SYS_unlinkat, SYS_renameat, SYS_renameat2, SYS_linkat,    SYS_symlinkat,
+    SYS_fchmod,   SYS_fchmodat, SYS_fchown,   SYS_fchownat, SYS_utimensat, SYS_setxattr,
+#ifdef SYS_mkdir
+    SYS_mkdir,    SYS_mknod,    SYS_rmdir,    SYS_unlink,   SYS_rename,    SYS_link,      SYS_symlink,
+    SYS_creat,    SYS_chmod,    SYS_chown,
+#endif
+};
+
+/// Ends the process at a call that opens a file not only to read it; its flags are the argument of that number.
+void RefuseOpeningToWrite(Filter &filter, long call, std::size_t flags) {
+    Require(filter, offsetof(seccomp_data, nr), static_cast<std::uint32_t>(call), 3);
+    filter.push_back(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(OffsetOfArgument(flags))));
+    filter.push_back(BPF_JUMP(BPF_JMP | BPF_JSET | BPF_K, O_WRONLY | O_RDWR | O_CREAT | O_TRUNC, 0, 1));
+    Return(filter, SECCOMP_RET_KILL_PROCESS);
+}
+
 void Install(const Filter &filter) {
     const sock_fprog program{static_cast<unsigned short>(filter.size()), const_cast<sock_filter *>(filter.data())};
     // Without root's right to filter, a process may filter only what can gain no rights any more.
@@ -63,12 +84,14 @@ void RefuseIdChanges(const std::vector<IdChange> &changes) {
 
 void ForbidWriting() {
     Filter filter;
-    for (const long call :
-         {SYS_write, SYS_writev, SYS_pwrite64, SYS_pwritev, SYS_sendto, SYS_sendmsg, SYS_sendmmsg, SYS_socket,
-          SYS_ftruncate, SYS_mkdirat, SYS_unlinkat, SYS_renameat2, SYS_linkat, SYS_symlinkat}) {
+    for (const long call : kWriting) {
         Require(filter, offsetof(seccomp_data, nr), static_cast<std::uint32_t>(call), 1);
         Return(filter, SECCOMP_RET_KILL_PROCESS);
     }
+    RefuseOpeningToWrite(filter, SYS_openat, 2);
+#ifdef SYS_open
+    RefuseOpeningToWrite(filter, SYS_open, 1);
+#endif
     Return(filter, SECCOMP_RET_ALLOW);
     Install(filter);
 }
