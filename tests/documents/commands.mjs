@@ -9,9 +9,11 @@ const ELSEWHERE = new Map([
     ['tests/package/machine --clone /home/ada/tavosso --user ada ./check style', 'is how these commands are run'],
 ]);
 
-// What a span of text begins with that is a command. A file's name alone is none.
+// What a span of text begins with that is a command, or what follows a command's name: an option. A file's name alone
+// is none.
 const COMMAND = new RegExp('^(?:\\./|(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|lintian|ls|' +
-    'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|ulimit) |tests/\\w+/\\w+ |tools/[\\w-]+ )');
+    'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|ulimit|xargs) |tests/\\w+/\\w+ |' +
+    'tools/[\\w-]+ |[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
 
 /** Commands within the text that cannot be run to the letter, and what is run for them. */
 const FILLED_IN = new Map([
@@ -41,6 +43,10 @@ const NOT_HERE = new Map([
     ['tests/fuzz/run --report', 'by hand, after that'],
 ]);
 
+export function isCommand(text) {
+    return COMMAND.test(text);
+}
+
 const shellBlocks = documents.flatMap(blocks).filter(({language}) => language === 'sh');
 const isRun = ({text}) => !ELSEWHERE.has(text.trim());
 
@@ -50,7 +56,7 @@ const partsOfCheck = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding
 const spans = documents.flatMap((document) => [
     ...proseLines(document).flatMap(({line, text}) => codeSpans(text).map((span) => ({document, line, text: span}))),
     ...blocks(document).filter(({language}) => language === 'text'),
-]).filter(({text}) => COMMAND.test(text));
+]).filter(({text}) => isCommand(text));
 
 /** Is this `./check` with parts? Those commands are run by one of them, and the others take as long. */
 function isPartOfCheck({text}) {
@@ -67,17 +73,38 @@ export const needless = [
     ...[...ELSEWHERE.keys()].filter((command) => !shellBlocks.some(({text}) => text.trim() === command)),
 ];
 
+/** What a command prints, where the document shows it behind the command: a pattern for each line; "..." is anything. */
+function expectedOutput(block) {
+    const inDocument = blocks(block.document);
+    const next = inDocument[inDocument.findIndex(({line}) => line === block.line) + 1];
+    if (next?.language !== 'text' || isCommand(next.text) || headingBetween(block, next)) {
+        return '';
+    }
+    return next.text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&').replaceAll('\\.\\.\\.', '.*');
+}
+
+function headingBetween(block, next) {
+    return proseLines(block.document)
+        .some(({line, text}) => line > block.line && line < next.line && text.startsWith('#'));
+}
+
 /**
- * A script of one line for each, in the order of the documents: "run" or "administer", where it stands, and the
- * commands. Blocks come first: what stands within text may need what they make.
+ * A script of one line for each, in the order of the documents: "run" or "administer", where it stands, the commands,
+ * and what they have to print. Blocks come first: what stands within text may need what they make.
  */
 export function script() {
     const quoted = (text) => `'${text.replaceAll('\'', '\'\\\'\'')}'`;
-    const line = ({document, line: number, text}) => {
+    const line = ({document, line: number, text}, output) => {
         const how = document === 'docs/operations.md' ? 'administer' : 'run';
-        return `${how} ${quoted(`${document}:${number}`)} ${quoted(FILLED_IN.get(text) ?? text)}\n`;
+        return `${[how, ...[`${document}:${number}`, FILLED_IN.get(text) ?? text, output].map(quoted)].join(' ')}\n`;
     };
-    return [...shellBlocks.filter(isRun), ...withinText].map(line).join('');
+    return [
+        ...shellBlocks.filter(isRun).map((block) => line(block, expectedOutput(block))),
+        ...withinText.map((span) => line(span, '')),
+    ].join('');
 }
+
+/** How many commands have something to print. */
+export const countWithOutput = shellBlocks.filter(isRun).filter((block) => expectedOutput(block) !== '').length;
 
 export const count = shellBlocks.filter(isRun).length + withinText.length;

@@ -2,8 +2,9 @@
 import {execFileSync} from 'node:child_process';
 import {readFileSync} from 'node:fs';
 import path from 'node:path';
+import {fileURLToPath} from 'node:url';
 
-export const PROJECT = new URL('../..', import.meta.url).pathname;
+export const PROJECT = fileURLToPath(new URL('../..', import.meta.url));
 
 export function read(file) {
     return readFileSync(path.join(PROJECT, file), 'utf8');

@@ -2,8 +2,8 @@
 import assert from 'node:assert/strict';
 import {test} from 'node:test';
 
-import {blocks, codeSpans, differences, NO_DIFFERENCES, tableRows} from './documents.mjs';
-import {configurationKeys} from './sources.mjs';
+import {blocks, codeSpans, differences, documents, filesMatching, NO_DIFFERENCES, read, tableRows} from './documents.mjs';
+import {booleanKeys, configurationKeys, thrownTexts} from './sources.mjs';
 
 const keys = configurationKeys();
 const rows = tableRows('docs/configuration.md').filter(({header}) => header[0] === 'key');
@@ -18,6 +18,24 @@ for (const [file, real] of Object.entries(keys)) {
         assert.ok(examples.some((example) => example.join() === told.join()), 'no example holds all of them in this order');
     });
 }
+
+test('each key has its type and its default', () => {
+    const booleans = booleanKeys();
+    assert.equal(booleans.length, 2);
+    const wrong = rows.filter(({cells: [key, type, byDefault]}) => booleans.includes(codeSpans(key)[0])
+        ? type !== 'boolean' || byDefault !== '`false`'
+        : type !== 'string' || byDefault !== 'empty');
+    assert.deepEqual(wrong, []);
+});
+
+test('what looks like a key, in any document and manual page, is one', () => {
+    const known = [...Object.values(keys).flat(), ...thrownTexts().map(({type}) => type)];
+    const files = [...documents, ...filesMatching('docs/man/*', 'debian/*.README.Debian')];
+    const named = files.flatMap((file) => [...read(file).matchAll(/\b(?:sso|azure|websphere)_[a-z_]+\b/g)]
+        .map(([name]) => ({file, name})));
+    assert.ok(named.length > 100);
+    assert.deepEqual(named.filter(({name}) => !known.includes(name)), []);
+});
 
 test('no other file has keys', () => {
     assert.deepEqual([...new Set(rows.map(({heading}) => heading))], Object.keys(keys));

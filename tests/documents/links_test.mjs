@@ -30,6 +30,12 @@ test('each anchor is a heading there', () => {
     assert.deepEqual(anchored.filter(({file, anchor}) => !anchors(file).includes(anchor)), []);
 });
 
+test('links have no other form, which would not be looked at', () => {
+    const others = documents.flatMap(proseLines).map(({document, line, text}) =>
+        ({document, line, text: text.replace(/`[^`]*`/g, '``')}));
+    assert.deepEqual(others.filter(({text}) => /\]\[|^\[[^\]]*\]:|<(img|a) |\]\([^)]* "/.test(text)), []);
+});
+
 test('the index leads to every chapter', () => {
     const led = links.filter(({document}) => document === 'docs/README.md').map(({file}) => file);
     const chapters = documents.filter((document) => document.startsWith('docs/') && document !== 'docs/README.md');

@@ -7,7 +7,7 @@ import path from 'node:path';
 import {test} from 'node:test';
 
 import {differences, filesMatching, NO_DIFFERENCES, PROJECT, read} from './documents.mjs';
-import {configurationKeys, thrownTexts} from './sources.mjs';
+import {configurationKeys, loggedBy, thrownTexts} from './sources.mjs';
 
 const files = filesMatching('docs/man/*');
 const links = files.filter((file) => read(file).startsWith('.so '));
@@ -44,6 +44,37 @@ test('each page that another refers to is there', () => {
     assert.deepEqual(referred.filter(({page}) => !known.includes(page)), []);
 });
 
+test('a page that is a link leads to one that has its name', () => {
+    const wrong = links.filter((file) => {
+        const target = pages.find((page) => path.basename(page.file) === path.basename(read(file).trim()));
+        return !target.source.includes(`.Nm ${path.basename(file, '.3')}`);
+    });
+    assert.deepEqual(wrong, []);
+});
+
+test('each line of log that a page tells of can be logged', () => {
+    const told = pages.flatMap(({file, text}) => [...text.matchAll(/^ +(\w+:LINE \S.*)$/gm)].map(([, line]) =>
+        ({file, line: line.replace(':LINE', ':N').replace('SYSTEM TEXT', 'SYSTEM')})));
+    assert.ok(told.length > 20);
+    assert.deepEqual(told.filter(({line}) => loggedBy(line).length === 0), []);
+    console.log(`${told.length} lines of log`);
+});
+
+test('each text that a page quotes among the errors is thrown as the class that it stands under', () => {
+    const thrown = thrownTexts();
+    const told = pages.flatMap(({file, text}) => {
+        let type;
+        return part(text, 'ERRORS').split('\n').flatMap((line) => {
+            type = /^ {5}(\w[\w:]*)( itself)?$/.exec(line)?.[1] ?? type;
+            const [, quoted] = /^ +"([^"]+)"$/.exec(line) ?? [];
+            return quoted === undefined ? [] : [{file, quoted, type}];
+        });
+    });
+    assert.ok(told.length > 25);
+    assert.deepEqual(told.filter(({quoted, type}) =>
+        !thrown.some((each) => each.text === quoted && type.endsWith(each.type))), []);
+});
+
 test('each exported function has its declaration in one synopsis, as in the header', () => {
     const declared = normal((read('sso/sso.h') + read('jwt/jwt.h')).replace(/\/\*[^]*?\*\/|\/\/.*$/gm, ''));
     const synopses = pages.map(({file, text}) => ({file, synopsis: normal(part(text, 'SYNOPSIS'))}));
@@ -54,6 +85,10 @@ test('each exported function has its declaration in one synopsis, as in the head
         [...declared.matchAll(new RegExp(`[^;{}:]*\\b(?<!~)${name}\\([^;{]*;`, 'g'))].map(([text]) => normal(text)));
     assert.ok(declarations.length > names.length);
     assert.deepEqual(declarations.filter((text) => !synopses.some(({synopsis}) => synopsis.includes(text))), []);
+    const told = synopses.flatMap(({file, synopsis}) => [...synopsis.matchAll(/\b\w+\([^;{}]*\)(?= *(?:override)?;)/g)]
+        .map(([text]) => ({file, text})));
+    assert.ok(told.length >= declarations.length);
+    assert.deepEqual(told.filter(({text}) => !declared.includes(text)), []);
     console.log(`${declarations.length} declarations`);
 });
 
@@ -74,6 +109,8 @@ test('each key of a configuration file stands in the page of that file', () => {
         const {source} = pages.find((page) => page.file === `docs/man/tavosso-${file}.5`);
         const told = [...source.matchAll(/^\.It (?:Li|Cm|Va|Ic) (\w+)/gm)].map(([, key]) => key);
         assert.deepEqual(differences({told, real}), NO_DIFFERENCES);
+        const [, example] = /^\.Bd -literal.*\n(\{[^]*?)^\.Ed/m.exec(source);
+        assert.deepEqual(Object.keys(JSON.parse(example.replaceAll('\\-', '-'))), real);
     }
 });
 

@@ -87,6 +87,39 @@ function textsOf(argument, file) {
     throw new Error(`what does this throw: ${argument}`);
 }
 
+const asPattern = (text) => text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&');
+
+/**
+ * Tells which formats can have made a line, in which `number` stands for the number of the source's line. What is not
+ * fixed in it is a word of capitals, one of `texts`, or the text of an exception.
+ */
+export function loggedBy(line, number = 'N', texts = []) {
+    const text = [...thrownTexts().map((thrown) => thrown.text), ...texts].map(asPattern).join('|');
+    return logFormats().filter(({format, source}) => {
+        const names = source === 'SOURCE' ? '(?:SOURCE|azuresso|webspheresso|profile)' : source;
+        return new RegExp('^' + asPattern(format).replace('%s:%d', `${names}:${number}`)
+            .replaceAll('%m', 'SYSTEM(?: TEXT)?').replaceAll('%d', '(?:-?\\d+|ID)').replaceAll('\'%s\'', '\'\\w*\'')
+            .replaceAll('[%s]', '\\[SYSTEM(?: TEXT)?\\]').replaceAll('\\[%s\\]', '\\[SYSTEM(?: TEXT)?\\]')
+            .replaceAll('%s', `(?:[A-Z]+|resuid|resgid|${text})`) + '$').test(line);
+    });
+}
+
+/** How the reasons begin that the front end gives of its own, without the library. */
+export function frontEndReasons() {
+    return unique(sources.filter(({file}) => /^frontend\/.*\.cpp$/.test(file)).flatMap(({text}) =>
+        [...statements(text, /\bthrow\b|\bThrowSystemError\(/).map((statement) => literals(statement)[0] ?? ''),
+            ...literals(text).filter((literal) => /^(The provider refused: |unexpected failure)$/.test(literal))])
+        .filter((literal) => /^[A-Z].* |^unexpected/.test(literal)).map((literal) => literal.trim()));
+}
+
+/** The keys whose values are booleans; those of all others are strings. */
+export function booleanKeys() {
+    const constants = Object.fromEntries(sources.flatMap(({text}) =>
+        [...text.matchAll(/constexpr char (k\w+)\[\] = "([^"]*)"/g)].map(([, name, value]) => [name, `"${value}"`])));
+    return unique(sources.flatMap(({text}) => [...text.matchAll(/ReadMember\(\w+, ("\w+"|k\w+), enable\)/g)])
+        .map(([, key]) => (constants[key] ?? key).replaceAll('"', '')));
+}
+
 /** The keys of the configuration files, by file. */
 export function configurationKeys() {
     const named = (folder, pattern) => unique(sources.filter(({file}) => file.startsWith(folder))

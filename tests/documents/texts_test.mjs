@@ -1,41 +1,51 @@
 // Each text that is logged or thrown is told in the documents, once, and none that is not.
 import assert from 'node:assert/strict';
+import {execFileSync} from 'node:child_process';
 import {test} from 'node:test';
 
-import {codeSpans, differences, documents, NO_DIFFERENCES, proseLines, tableRows} from './documents.mjs';
-import {logFormats, thrownTexts} from './sources.mjs';
+import {isCommand} from './commands.mjs';
+import {blocks, codeSpans, differences, documents, NO_DIFFERENCES, proseLines, tableRows} from './documents.mjs';
+import {frontEndReasons, logFormats, loggedBy, thrownTexts} from './sources.mjs';
 
 const formats = logFormats();
 const thrown = thrownTexts();
-const escape = (text) => text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&');
+const spans = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
+    codeSpans(text).map((span) => ({document, line, span})));
 
-// What an argument can be: a placeholder of capitals, a name that a call is made of, or the text of an exception.
-const TEXT = `(?:[A-Z]+|resuid|resgid|${[...new Set(thrown.map(({text}) => escape(text)))].join('|')})`;
-
-function pattern({format, source}) {
-    return new RegExp('^' + escape(format).replace('%s:%d', `${source}:N`).replaceAll('%m', 'SYSTEM')
-        .replaceAll('%d', '(?:-?\\d+|ID)').replaceAll('%s', TEXT) + '$');
-}
-
-const loggedAs = (line) => formats.filter((format) => pattern(format).test(line));
+// Spans with a blank in them that are neither a text of ours nor a command.
+const OTHER = [
+    '/* */', '== passed', 'Cache-Control: no-store', 'Location: ', 'OIDCLogin(code, user)', 'Referrer-Policy: no-referrer',
+    'TimeOut 60', 'find_package(tavosso REQUIRED)', 'frame-ancestors \'none\'', 'libgtest-dev libgmock-dev',
+    'project(tavosso VERSION ...)', 'target_link_libraries(sso.cgi PRIVATE tavosso::tavosso)',
+];
 
 const logRows = tableRows('docs/operations.md').filter(({header}) => header.join() === 'line,level,cause,remedy');
+const curlTexts = tableRows('docs/operations.md').filter(({header}) => header[0] === 'CURL').map(({cells}) => cells[0]);
 
 test('each log line of the sources is told, once, with its level, and none that cannot be logged', () => {
     assert.ok(formats.length > 15 && logRows.length > 10, `${formats.length} formats, ${logRows.length} rows`);
     const told = logRows.flatMap(({cells}) => codeSpans(cells[0]).map((line) => ({line, level: cells[1]})));
-    assert.deepEqual(told.filter(({line, level}) => !loggedAs(line).some((format) => format.level === level)), []);
-    assert.deepEqual(formats.filter((format) => !told.some(({line}) => pattern(format).test(line))), []);
+    const by = told.flatMap(({line}) => loggedBy(line)).map(({format, source}) => source + format);
+    assert.deepEqual(told.filter(({line, level}) => !loggedBy(line).some((format) => format.level === level)), []);
+    assert.deepEqual(formats.filter(({format, source}) => !by.includes(source + format)), []);
     const lines = told.map(({line}) => line);
     assert.deepEqual(lines.filter((line, index) => lines.indexOf(line) !== index), []);
     console.log(`${formats.length} formats, ${lines.length} lines`);
 });
 
-test('each log line that any document names can be logged', () => {
-    const named = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
-        codeSpans(text).filter((span) => /^\w+:N /.test(span)).map((span) => ({document, line, span})));
-    assert.ok(named.length > 15);
-    assert.deepEqual(named.filter(({span}) => loggedAs(span.replace(/'\w*'/, '\'NAME\'')).length === 0), []);
+test('what is told of libcurl is what libcurl says', () => {
+    const library = execFileSync('sh', ['-c', 'ldconfig -p | sed -n "s/.*libcurl.so.4 .*=> //p" | head -n 1'],
+        {encoding: 'utf8'}).trim();
+    const strings = execFileSync('strings', [library], {encoding: 'utf8', maxBuffer: 1 << 26}).split('\n');
+    assert.ok(curlTexts.length > 5);
+    assert.deepEqual(curlTexts.filter((text) => !strings.includes(text)), []);
+});
+
+test('each line of log that is shown as an example can be logged', () => {
+    const shown = documents.flatMap(blocks).filter(({language}) => language === 'text').flatMap(({document, text}) =>
+        [...text.matchAll(/^\S+\[\d+\]: (.*)$/gm)].map(([, line]) => ({document, line})));
+    assert.ok(shown.length > 1);
+    assert.deepEqual(shown.filter(({line}) => loggedBy(line, '\\d+', curlTexts).length === 0), []);
 });
 
 const textRows = tableRows('docs/integration.md').filter(({heading}) => heading === 'What an exception means');
@@ -51,9 +61,21 @@ test('each text that is thrown is told, once, with its class, and none that is n
     console.log(`${real.length} texts`);
 });
 
-test('each exception that any document names is thrown', () => {
-    const named = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
-        [...text.matchAll(/\bexceptions? `([^`]+)`/g)].map(([, span]) => ({document, line, span})));
-    assert.ok(named.length > 10);
-    assert.deepEqual(named.filter(({span}) => !thrown.some(({text}) => text === span)), []);
+test('whatever else is quoted with a blank in it is one of these texts, a part of one, or a command', () => {
+    const parts = formats.flatMap(({format}) => format.split(/%[sdm]|:/).concat(format.replace('%s:%d ', '')))
+        .map((part) => part.trim()).filter((part) => part.includes(' '));
+    const isKnown = (span) => thrown.some(({text}) => text === span) || loggedBy(span).length > 0 ||
+        parts.includes(span) || isCommand(span) || OTHER.includes(span);
+    const quoted = spans.filter(({span}) => span.includes(' '));
+    assert.ok(quoted.length > 80);
+    assert.deepEqual(quoted.filter(({span}) => !isKnown(span)), []);
+    assert.deepEqual(OTHER.filter((other) => !quoted.some(({span}) => span === other)), []);
+});
+
+test('each reason of the front end is told, once, and none that it never gives', () => {
+    const rows = tableRows('docs/operations.md').filter(({header}) => header[0] === 'reason');
+    const told = rows.flatMap(({cells}) => cells[0].split('<br>'))
+        .map((text) => text.replace(/: SYSTEM$| ERROR .*| (state|code)\.$/, ''));
+    assert.ok(told.length > 8);
+    assert.deepEqual(differences({told: [...new Set(told)], real: frontEndReasons()}), NO_DIFFERENCES);
 });
