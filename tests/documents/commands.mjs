@@ -73,7 +73,7 @@ export const needless = [
     ...[...ELSEWHERE.keys()].filter((command) => !shellBlocks.some(({text}) => text.trim() === command)),
 ];
 
-/** What a command prints, where the document shows it behind the command: a pattern for each line; "..." is anything. */
+/** Patterns of the lines that a command prints, where the document shows them behind it; "..." is anything. */
 function expectedOutput(block) {
     const inDocument = blocks(block.document);
     const next = inDocument[inDocument.findIndex(({line}) => line === block.line) + 1];
@@ -84,8 +84,8 @@ function expectedOutput(block) {
 }
 
 function headingBetween(block, next) {
-    return proseLines(block.document)
-        .some(({line, text}) => line > block.line && line < next.line && text.startsWith('#'));
+    return proseLines(block.document).some(({line, text}) =>
+        line > block.line && line < next.line && text.startsWith('#'));
 }
 
 /**
