@@ -14,6 +14,9 @@ constexpr std::size_t kLongestOrigin = 512;
 
 bool IsControl(char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7f; }
 
+/// Of UTF-8: a byte within a character, not its first.
+bool ContinuesCharacter(char c) { return (static_cast<unsigned char>(c) & 0xc0) == 0x80; }
+
 // What a browser leaves as it is in a path and its query, and JSON in a string. A backslash would be a slash to it.
 bool IsPathCharacter(char c) { return c > 0x20 && c < 0x7f && c != '\\' && c != '"'; }
 
@@ -48,7 +51,14 @@ std::string EscapeHtml(const std::string &text) {
 bool HasControlCharacter(const std::string &text) { return std::any_of(text.begin(), text.end(), IsControl); }
 
 std::string OneLine(std::string text) {
-    text.resize(std::min(text.size(), kLongestLine));
+    if (text.size() > kLongestLine) {
+        std::size_t end = kLongestLine;
+        // No character has more than three bytes after its first.
+        while (end > kLongestLine - 3 && ContinuesCharacter(text[end])) {
+            --end;
+        }
+        text.resize(end);
+    }
     std::replace_if(text.begin(), text.end(), IsControl, ' ');
     text.erase(text.find_last_not_of(' ') + 1);
     return text;

@@ -30,6 +30,14 @@ TEST(Reason, IsOneShortLine) {
     EXPECT_EQ(Reason(std::string(5000, 'x')).size(), 200U);
 }
 
+TEST(Reason, IsCutBetweenTwoCharacters) {
+    const std::string most(198, 'x');
+    EXPECT_EQ(Reason(most + "xü"), most + "x");
+    EXPECT_EQ(Reason(most + "ü"), most + "ü");
+    EXPECT_EQ(Reason(most + "€"), most);
+    EXPECT_EQ(Reason(std::string(5000, '\x80')).size(), 197U) << "no character is that long";
+}
+
 TEST(AProgram, IsEndedByAnAlarmIfItRunsTooLong) {
     const auto runTooLong = [](Answer &) {
         if (alarm(0) > 0) {
