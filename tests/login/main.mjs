@@ -32,6 +32,7 @@ async function walkAzure(walk, report) {
     useProfile('azure');
     report.title('Profile azure: alice signs in');
     const browser = walk.newBrowser();
+    await walk.openSite(browser);
     const user = await walk.signIn(browser, 'alice');
     assert.equal(user, 'ACME\\alice');
 

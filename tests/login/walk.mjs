@@ -50,6 +50,14 @@ export class Walk {
         return line.replace('sso.cgi: signed in: ', '');
     }
 
+    /** The site's bare address, which is what a user types. */
+    async openSite(browser) {
+        const site = await browser.open(`${this.origin}/`);
+        const start = await browser.open(this.origin + START_PAGE);
+        assert.equal(site.url.href, `${this.origin}/`);
+        assert.equal(site.text, start.text, 'the bare address shows another page than the start page');
+    }
+
     /** The user whom the start page names. */
     async userOf(browser) {
         const start = await browser.open(this.origin + START_PAGE);
