@@ -27,6 +27,11 @@ const FILLED_IN = new Map([
     ['g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)',
         'mkdir build/guide && tests/consumer/programs build/guide && cd build/guide/guide &&' +
         ' g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)'],
+    ['sudo apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb ./tavosso-frontend_*.deb',
+        'cd .. && apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb' +
+        ' ./tavosso-frontend_*.deb'],
+    ['sudo lighty-disable-mod tavosso-frontend',
+        'lighty-enable-mod tavosso-frontend && lighty-disable-mod tavosso-frontend'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
@@ -34,7 +39,8 @@ const FILLED_IN = new Map([
 
 /** Commands within the text that are not run here, and why. */
 const NOT_HERE = new Map([
-    ['dpkg-buildpackage -us -uc', 'tests/package/run does, without the sources'],
+    ['cmake --install', 'names the command of the README'],
+    ['dpkg-buildpackage -us -uc -b', 'stands in a block, too'],
     ['git commit', 'by hand'],
     ['git tag -a vVERSION', 'by hand'],
     ['node tests/mutation/run.mjs', 'by hand: an hour'],
@@ -56,7 +62,7 @@ const partsOfCheck = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding
 const spans = documents.flatMap((document) => [
     ...proseLines(document).flatMap(({line, text}) => codeSpans(text).map((span) => ({document, line, text: span}))),
     ...blocks(document).filter(({language}) => language === 'text'),
-]).filter(({text}) => isCommand(text));
+].sort((a, b) => a.line - b.line)).filter(({text}) => isCommand(text));
 
 /** Is this `./check` with parts? Those commands are run by one of them, and the others take as long. */
 function isPartOfCheck({text}) {
