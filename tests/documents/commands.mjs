@@ -32,6 +32,7 @@ const FILLED_IN = new Map([
         ' ./tavosso-frontend_*.deb'],
     ['sudo lighty-disable-mod tavosso-frontend',
         'lighty-enable-mod tavosso-frontend && lighty-disable-mod tavosso-frontend'],
+    ['clang-format -i FILE', 'clang-format -i sso/sso.cpp'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
