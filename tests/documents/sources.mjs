@@ -106,10 +106,13 @@ export function loggedBy(line, number = 'N', texts = []) {
 
 /** How the reasons begin that the front end gives of its own, without the library. */
 export function frontEndReasons() {
-    return unique(sources.filter(({file}) => /^frontend\/.*\.cpp$/.test(file)).flatMap(({text}) =>
-        [...statements(text, /\bthrow\b|\bThrowSystemError\(/).map((statement) => literals(statement)[0] ?? ''),
-            ...literals(text).filter((literal) => /^(The provider refused: |unexpected failure)$/.test(literal))])
-        .filter((literal) => /^[A-Z].* |^unexpected/.test(literal)).map((literal) => literal.trim()));
+    const handedOn = /^(The front end's .*|The provider refused: |unexpected failure)$/;
+    const texts = sources.filter(({file}) => /^frontend\/.*\.cpp$/.test(file)).flatMap(({text}) => [
+        ...statements(text, /\bthrow\b|\bThrowSystemError\(/).flatMap((statement) => literals(statement).slice(0, 1)),
+        ...literals(text).filter((literal) => handedOn.test(literal)),
+    ]);
+    // Sentences: what begins otherwise is a text of the library's, repeated.
+    return unique(texts.filter((text) => /^[A-Z].* |^unexpected/.test(text)).map((text) => text.trim()));
 }
 
 /** The keys whose values are booleans; those of all others are strings. */
