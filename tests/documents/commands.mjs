@@ -43,6 +43,7 @@ const NOT_HERE = new Map([
     ['cmake --install', 'names the command of the README'],
     ['dpkg-buildpackage -us -uc -b', 'stands in a block, too'],
     ['git commit', 'by hand'],
+    ['git grep', 'names a command'],
     ['git tag -a vVERSION', 'by hand'],
     ['node tests/mutation/run.mjs', 'by hand: an hour'],
     ['openssl s_server -www', 'tells how a figure was measured'],
