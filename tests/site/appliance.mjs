@@ -4,11 +4,12 @@ import {once} from 'node:events';
 import {mkdirSync, readFileSync, writeFileSync} from 'node:fs';
 import net from 'node:net';
 import path from 'node:path';
+import {fileURLToPath} from 'node:url';
 
 const SETTINGS = '/usr/tavo/etc/ssoclient';
 // Where the front end is installed and enabled, the web server's own settings say what is served.
 const INSTALLED_SETTINGS = process.env.INSTALLED_LIGHTTPD_CONF;
-export const FRONT_END_SETTINGS = new URL('../../frontend/lighttpd.conf', import.meta.url).pathname;
+export const FRONT_END_SETTINGS = fileURLToPath(new URL('../../frontend/lighttpd.conf', import.meta.url));
 
 function writePrivately(file, settings) {
     writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode: 0o600});
