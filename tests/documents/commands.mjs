@@ -1,7 +1,7 @@
 // The commands that the documents tell their readers to run, and how a test runs each.
 import {execFileSync} from 'node:child_process';
 
-import {blocks, codeSpans, documents, PROJECT, proseLines} from './documents.mjs';
+import {asPattern, blocks, codeSpans, documents, PROJECT, proseLines} from './documents.mjs';
 
 /** Commands of blocks that are not run here, and why. */
 const ELSEWHERE = new Map([
@@ -88,7 +88,7 @@ function expectedOutput(block) {
     if (next?.language !== 'text' || isCommand(next.text) || headingBetween(block, next)) {
         return '';
     }
-    return next.text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&').replaceAll('\\.\\.\\.', '.*');
+    return asPattern(next.text).replaceAll('\\.\\.\\.', '.*');
 }
 
 function headingBetween(block, next) {

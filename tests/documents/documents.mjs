@@ -10,6 +10,11 @@ export function read(file) {
     return readFileSync(path.join(PROJECT, file), 'utf8');
 }
 
+/** A regular expression for this very text. */
+export function asPattern(text) {
+    return text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&');
+}
+
 /** Files that are ours and match: of a clone those under version control, else those that lie there. */
 export function filesMatching(...patterns) {
     const files = execFileSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],

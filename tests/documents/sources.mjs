@@ -2,7 +2,7 @@
 // stand in the sources.
 import path from 'node:path';
 
-import {filesMatching, read} from './documents.mjs';
+import {asPattern, filesMatching, read} from './documents.mjs';
 
 const FOLDERS = ['azure', 'frontend', 'jwt', 'platform', 'sso', 'utils', 'websphere'];
 const LITERAL = /"((?:[^"\\]|\\.)*)"/g;
@@ -56,12 +56,11 @@ export function logFormats() {
 
 /** Texts of exceptions that the sources throw, with their classes; "ALG" stands for the name of an algorithm. */
 export function thrownTexts() {
-    const thrown = sources.filter(({file}) => !file.startsWith('frontend/')).flatMap(({file, text}) =>
+    return sources.filter(({file}) => !file.startsWith('frontend/')).flatMap(({file, text}) =>
         statements(text, /\bthrow\b/).filter((statement) => statement.includes('(')).flatMap((statement) => {
             const [, type, argument] = /^\s*(?:\w+::)*?((?:std::)?\w+)\(([^]*)\)$/.exec(statement) ?? [];
             return textsOf(argument, text).map((thrownText) => ({file, type, text: thrownText}));
         }));
-    return thrown.filter(({text}) => text !== undefined);
 }
 
 function textsOf(argument, file) {
@@ -87,8 +86,6 @@ function textsOf(argument, file) {
     throw new Error(`what does this throw: ${argument}`);
 }
 
-const asPattern = (text) => text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&');
-
 /**
  * Tells which formats can have made a line, in which `number` stands for the number of the source's line. What is not
  * fixed in it is a word of capitals, one of `texts`, or the text of an exception.
@@ -99,7 +96,7 @@ export function loggedBy(line, number = 'N', texts = []) {
         const names = source === 'SOURCE' ? '(?:SOURCE|azuresso|webspheresso|profile)' : source;
         return new RegExp('^' + asPattern(format).replace('%s:%d', `${names}:${number}`)
             .replaceAll('%m', 'SYSTEM(?: TEXT)?').replaceAll('%d', '(?:-?\\d+|ID)').replaceAll('\'%s\'', '\'\\w*\'')
-            .replaceAll('[%s]', '\\[SYSTEM(?: TEXT)?\\]').replaceAll('\\[%s\\]', '\\[SYSTEM(?: TEXT)?\\]')
+            .replaceAll('\\[%s\\]', '\\[SYSTEM(?: TEXT)?\\]')
             .replaceAll('%s', `(?:[A-Z]+|resuid|resgid|${text})`) + '$').test(line);
     });
 }
