@@ -72,9 +72,12 @@ TEST(Loading, AThousandTimesLeavesNothingBehind) {
     LoadAndUse(10);
     const auto files = CountFiles();
     const auto heap = HeapInUse();
-    LoadAndUse(1000);
+    constexpr int kTimes = 1000;
+    LoadAndUse(kTimes);
     EXPECT_EQ(CountFiles(), files);
-    EXPECT_EQ(HeapInUse(), heap);
+    // A block that is free again may count as in use while the allocator keeps it for the next request; blocks that
+    // were lost, of which none is smaller than 24 bytes, would be one for each time.
+    EXPECT_LT(HeapInUse(), heap + kTimes);
 }
 
 /// How a child ends that loads the library, and then does something, while the kernel ends it at its first write.
