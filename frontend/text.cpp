@@ -8,7 +8,6 @@ namespace Frontend {
 namespace {
 
 constexpr char kStartPage[] = "/index.cgi";
-constexpr std::size_t kLongestLine = 200;
 // With the random value beside it, the longest origin must fit into the state: 721 bytes of compact JSON.
 constexpr std::size_t kLongestOrigin = 512;
 
@@ -50,11 +49,11 @@ std::string EscapeHtml(const std::string &text) {
 
 bool HasControlCharacter(const std::string &text) { return std::any_of(text.begin(), text.end(), IsControl); }
 
-std::string OneLine(std::string text) {
-    if (text.size() > kLongestLine) {
-        std::size_t end = kLongestLine;
+std::string OneLine(std::string text, std::size_t longest) {
+    if (text.size() > longest) {
+        std::size_t end = longest;
         // No character has more than three bytes after its first.
-        while (end > kLongestLine - 3 && ContinuesCharacter(text[end])) {
+        while (end > longest - 3 && ContinuesCharacter(text[end])) {
             --end;
         }
         text.resize(end);

@@ -14,8 +14,10 @@ std::string EscapeHtml(const std::string &text);
 
 bool HasControlCharacter(const std::string &text);
 
+constexpr std::size_t kLongestLine = 200;
+
 /// On one line and of a sane length.
-std::string OneLine(std::string text);
+std::string OneLine(std::string text, std::size_t longest = kLongestLine);
 
 /// The page to come back to after a login: `origin` where that is a path on this very site, else the start page.
 std::string SafeOrigin(const std::string &origin);

@@ -1,0 +1,47 @@
+#include "doctor/client.h"
+
+#include "doctor/watch.h"
+#include "frontend/failure.h"
+
+namespace Doctor {
+
+std::string NameOf(Profile profile) { return profile == Profile::kAzure ? "azure" : "websphere"; }
+
+void AzureClient::RequestWellknownInfo(Json::Value &out) {
+    if (!mayFetch) {
+        throw not_fetched();
+    }
+    AzureSSOClient::RequestWellknownInfo(out);
+}
+
+Client::Client(Profile profile)
+    : profile_(profile),
+      client_(profile == Profile::kAzure ? Library(std::in_place_type<AzureClient>)
+                                         : Library(std::in_place_type<TAVO::SSO::WebSphereSSOClient>)) {}
+
+TAVO::SSO::SSOClient *Client::operator->() {
+    return std::visit([](auto &client) -> TAVO::SSO::SSOClient * { return &client; }, client_);
+}
+
+std::string Client::AuthorizationURI(const Json::Value &state) {
+    return std::visit([&](auto &client) { return client.GetAccessTokenReqURI(state); }, client_);
+}
+
+std::optional<std::string> RefusalOfProfile() {
+    const RefuseTransfers refuse;
+    std::string refusal;
+    try {
+        std::string userName;
+        TAVO::SSO::OIDCLogin("", userName);
+    } catch (const std::exception &failure) {
+        refusal = failure.what();
+    }
+    // The client's first step is a transfer: where there was none, nobody got to the client.
+    const bool isAccepted = !TakeTransfers().empty();
+    TakeLogLines();
+    return isAccepted ? std::nullopt : std::optional(refusal);
+}
+
+std::string TextOf(const std::exception &failure) { return Frontend::ReasonOf(failure); }
+
+}  // namespace Doctor

@@ -1,0 +1,64 @@
+#ifndef TAVOSSO_DOCTOR_CLIENT_H
+#define TAVOSSO_DOCTOR_CLIENT_H
+
+#include <sso/sso.h>
+
+#include <exception>
+#include <optional>
+#include <string>
+#include <variant>
+
+// The library's own clients: whatever they can decide is decided by them.
+namespace Doctor {
+
+enum class Profile { kAzure, kWebSphere };
+
+std::string NameOf(Profile profile);
+
+/// In the place of a request that was not asked for.
+class not_fetched : public std::exception {
+  public:
+    const char *what() const noexcept override { return "not fetched"; }
+};
+
+/// The Azure client, whose requests can be forbidden: its verification then ends where it would make the first one.
+class AzureClient : public TAVO::SSO::AzureSSOClient {
+  public:
+    bool mayFetch = true;
+
+    std::string GetTenantID() { return tenantID; }
+
+    /// @throws not_fetched  unless it may
+    void RequestWellknownInfo(Json::Value &out) override;
+};
+
+/// The client of the profile in force, as the library makes it of its file.
+class Client {
+  public:
+    explicit Client(Profile profile);
+
+    Profile profile() const { return profile_; }
+    TAVO::SSO::SSOClient *operator->();
+    std::string AuthorizationURI(const Json::Value &state);
+
+    /// Null for another profile.
+    AzureClient *Azure() { return std::get_if<AzureClient>(&client_); }
+
+  private:
+    using Library = std::variant<AzureClient, TAVO::SSO::WebSphereSSOClient>;
+
+    Profile profile_;
+    Library client_;
+};
+
+/// What a login says to the profile file: the text of the exception that ends it before a client is asked for anything;
+/// nothing where it goes on.
+std::optional<std::string> RefusalOfProfile();
+
+/// What an exception of the library says. An error answer of the provider, which may hold anything, is reduced to the
+/// members that tell of the error (RFC 6749, section 5.2).
+std::string TextOf(const std::exception &failure);
+
+}  // namespace Doctor
+
+#endif

@@ -1,0 +1,167 @@
+#include "doctor/login_walk.h"
+
+#include <termios.h>
+#include <unistd.h>
+
+#include <boost/algorithm/string/trim.hpp>
+#include <iostream>
+#include <string>
+
+#include "doctor/address.h"
+#include "doctor/checks.h"
+#include "doctor/settings_file.h"
+#include "doctor/watch.h"
+#include "frontend/cgi.h"
+#include "frontend/failure.h"
+#include "frontend/id_token.h"
+#include "frontend/text.h"
+
+namespace Doctor {
+
+namespace {
+
+/// A terminal that does not show what is typed, for the code in it, and takes lines of any length. As it was at the
+/// end.
+class SilentTerminal {
+  public:
+    SilentTerminal() : isTerminal_(tcgetattr(STDIN_FILENO, &before_) == 0) {
+        if (isTerminal_) {
+            termios silent = before_;
+            silent.c_lflag &= ~static_cast<tcflag_t>(ECHO | ICANON);
+            tcsetattr(STDIN_FILENO, TCSANOW, &silent);
+        }
+    }
+    ~SilentTerminal() {
+        if (isTerminal_) {
+            tcsetattr(STDIN_FILENO, TCSANOW, &before_);
+        }
+    }
+    SilentTerminal(const SilentTerminal &) = delete;
+    SilentTerminal &operator=(const SilentTerminal &) = delete;
+
+  private:
+    termios before_{};
+    bool isTerminal_;
+};
+
+std::string ReadAddress() {
+    const SilentTerminal silent;
+    std::string address;
+    std::getline(std::cin, address);
+    return boost::trim_copy(address);
+}
+
+/// What the provider was told to hand back: the state of an address.
+std::string StateOf(const std::string &authorizationURI) {
+    const std::size_t query = authorizationURI.rfind('?');
+    const auto state = Frontend::OnlyValue(Frontend::ParseQuery(authorizationURI.substr(query + 1)), "state");
+    return state.value_or("");
+}
+
+std::string NonceOf(const std::string &authorizationURI) {
+    const std::size_t query = authorizationURI.rfind('?');
+    const auto nonce = Frontend::OnlyValue(Frontend::ParseQuery(authorizationURI.substr(query + 1)), "nonce");
+    return nonce.value_or("");
+}
+
+class LoginWalk {
+  public:
+    LoginWalk(Report &report, Client &client) : report_(report), client_(client) {}
+
+    bool Run() {
+        report_.Section("Login");
+        const std::string uri = client_.AuthorizationURI(Json::objectValue);
+        report_.Say("Open this address in a browser, and sign in:\n\n  " + uri +
+                    "\n\nThe provider then sends the browser to " + client_->GetRedirectURI() +
+                    ".\nCopy the whole address that it was sent to, with the code in it, before the page there answers"
+                    "\n(the browser's network tools show it), paste it here, and press Enter. It is not shown.\n");
+        const std::string address = ReadAddress();
+        if (address.empty()) {
+            return false;
+        }
+        const Frontend::Parameters answer = Frontend::ParseQuery(SplitAddress(address).query);
+        if (CheckAnswer(answer, StateOf(uri))) {
+            Exchange(*Frontend::OnlyValue(answer, "code"), NonceOf(uri));
+        }
+        return true;
+    }
+
+  private:
+    bool CheckAnswer(const Frontend::Parameters &answer, const std::string &state) {
+        const std::string error = Frontend::OnlyValue(answer, "error").value_or("");
+        const auto code = Frontend::OnlyValue(answer, "code");
+        report_.Hide(code.value_or(""));
+        if (!error.empty()) {
+            report_.Finding(
+                "login.answer", "answer of the provider",
+                Frontend::ProviderError(error, Frontend::OnlyValue(answer, "error_description").value_or("")),
+                "look for this error in the provider's documentation");
+            return false;
+        }
+        if (!code || code->empty()) {
+            report_.Finding("login.answer", "answer of the provider", "there is no code in the address, or two",
+                            "copy the whole address that the provider sent the browser to");
+            return false;
+        }
+        report_.Good("login.answer", "answer of the provider", "a code");
+        if (Frontend::OnlyValue(answer, "state") != state) {
+            report_.Finding("login.state", "state", "is not the one that was sent",
+                            "take the address of this very login; a provider has to give the state back unchanged");
+            return false;
+        }
+        report_.Good("login.state", "state", "is the one that was sent");
+        return true;
+    }
+
+    void Exchange(const std::string &code, const std::string &nonce) {
+        TakeTransfers();
+        client_->SetCode(code);
+        std::string response;
+        client_->RequestTokenEndpoint(response, client_->GetIDTokenReqParams());
+        std::string log;
+        for (const std::string &line : TakeLogLines()) {
+            log += "; " + line;
+        }
+        try {
+            client_->ProcessTokenResponse(response);
+        } catch (const std::exception &failure) {
+            const std::string found = FoundIn(response);
+            report_.Add({"login.exchange", "exchange of the code", Mark::kFinding, found + log,
+                         "run tavosso-doctor, which looks at the token endpoint and the client", TextOf(failure)});
+            return;
+        }
+        report_.Good("login.exchange", "exchange of the code", "the provider has given an ID token");
+        const std::string token = client_->GetToken();
+        CheckToken(report_, client_, token, true);
+        CheckNonce(token, nonce);
+    }
+
+    static std::string FoundIn(const std::string &response) {
+        const Json::Value answer = Frontend::ParseObject(response);
+        return response.empty()    ? "no answer"
+               : answer.isObject() ? Frontend::ProviderError(Frontend::StringMember(answer, "error"),
+                                                             Frontend::StringMember(answer, "error_description"))
+                                   : "the answer is no JSON";
+    }
+
+    void CheckNonce(const std::string &token, const std::string &nonce) {
+        Json::Value sent;
+        sent["nonce"] = TAVO::SSO::MD5Digest(nonce);
+        try {
+            Frontend::RequireNonce(token, sent);
+            report_.Good("login.nonce", "nonce", "the token is of this login");
+        } catch (const std::exception &) {
+            report_.Finding("login.nonce", "nonce", "the token is not of this login",
+                            "the provider has to put the nonce into the token: without it a front end refuses");
+        }
+    }
+
+    Report &report_;
+    Client &client_;
+};
+
+}  // namespace
+
+bool WalkLogin(Report &report, Client &client) { return LoginWalk(report, client).Run(); }
+
+}  // namespace Doctor

@@ -1,0 +1,72 @@
+// The profile file.
+#include <unistd.h>
+
+#include "doctor/checks.h"
+#include "doctor/settings_file.h"
+
+namespace Doctor {
+
+namespace {
+
+constexpr char kEnable[] = "sso_enable";
+constexpr char kName[] = "sso_profile";
+
+void ReportRefusal(Report &report, const std::string &id, const std::string &subject, const std::string &found,
+                   const std::string &remedy, const std::string &library) {
+    report.Add({id, subject, Mark::kFinding, found, remedy, library});
+}
+
+std::string Describe(const Json::Value &file, const char *key) {
+    if (!file.isMember(key)) {
+        return "is missing";
+    }
+    switch (file[key].type()) {
+        case Json::booleanValue:
+            return file[key].asBool() ? "is true" : "is false";
+        case Json::stringValue:
+            return "is the text " + Quoted(file[key].asString());
+        case Json::nullValue:
+            return "is null";
+        case Json::arrayValue:
+            return "is a list";
+        case Json::objectValue:
+            return "is an object";
+        default:
+            return "is a number";
+    }
+}
+
+}  // namespace
+
+std::optional<Profile> CheckProfile(Report &report) {
+    report.Section("Profile");
+    const SettingsFile file = ReadSettingsFile(kProfileFile);
+    const std::optional<std::string> refusal = RefusalOfProfile();
+    const std::string library = refusal.value_or("");
+    if (!file.problem.empty()) {
+        ReportRefusal(report, "profile.file", "file", file.problem, file.remedy, library);
+        return std::nullopt;
+    }
+    report.Good("profile.file", "file",
+                file.path + " is JSON, and can be read by a program of user " + std::to_string(geteuid()));
+    ReportUnknownKeys(report, "profile.unknown_key", file, {kEnable, kName});
+    ReportRights(report, "profile.rights", file, false);
+
+    const bool isOn = file.content[kEnable].isBool() && file.content[kEnable].asBool();
+    if (!isOn) {
+        ReportRefusal(report, "profile.sso_enable", kEnable, Describe(file.content, kEnable),
+                      "set it to true, the boolean and not a text, to switch single sign-on on", library);
+        return std::nullopt;
+    }
+    report.Good("profile.sso_enable", kEnable, Describe(file.content, kEnable));
+    if (refusal) {
+        ReportRefusal(report, "profile.sso_profile", kName, Describe(file.content, kName),
+                      "set it to \"azure\" or \"websphere\"; capitals count", library);
+        return std::nullopt;
+    }
+    const std::string name = TAVO::SSO::SSOProfile().GetSSOProfile();
+    report.Good("profile.sso_profile", kName, "is the text " + Quoted(name));
+    return name == NameOf(Profile::kAzure) ? Profile::kAzure : Profile::kWebSphere;
+}
+
+}  // namespace Doctor

@@ -1,0 +1,369 @@
+// An ID token, step by step as the library verifies it.
+#include <jwt/jwt.h>
+#include <openssl/evp.h>
+
+#include <algorithm>
+#include <boost/algorithm/string/predicate.hpp>
+#include <cstdlib>
+#include <ctime>
+#include <iterator>
+
+#include "doctor/checks.h"
+#include "doctor/key_set.h"
+#include "doctor/settings_file.h"
+#include "doctor/watch.h"
+#include "frontend/text.h"
+
+namespace Doctor {
+
+namespace {
+
+/// The steps, by what the library says when it stops there.
+struct Stop {
+    const char *text;
+    const char *id;
+};
+
+const Stop kStops[] = {
+    {"token cannot be empty", "token.form"},
+    {"bad jwt format!", "token.form"},
+    {"bad jwt header format!", "token.header"},
+    {"bad jwt body format!", "token.claims"},
+    {"id_token expired.", "token.expiry"},
+    {"tenant ID invalid", "token.tenant"},
+    {"client ID invalid", "token.audience"},
+    {"kid does not exist in Azure verified kyes", "token.key"},
+    {"RSA public 'n' cannot be found!", "token.key_numbers"},
+    {"RSA public 'e' cannot be found!", "token.key_numbers"},
+    {"encode base64 failed.", "token.secret"},
+    {"verify rsa signature failed", "token.signature"},
+    {"verify hmac signature failed", "token.signature"},
+    {"cannot find the user name!", "token.user_name"},
+    {"cannot get the user name!", "token.user_name"},
+    {"TAVOWinsUserNameFqdn2Netbios failed.", "token.domain"},
+};
+constexpr char kNoAlgorithm[] = " algorithm is not supported";  // behind the algorithm's name
+constexpr char kEmptyPart[] = "empty jwt part";                 // of header or claims
+
+struct Algorithm {
+    const char *name;
+    const EVP_MD *(*digest)();
+};
+constexpr Algorithm kRSA[] = {{"RS256", EVP_sha256}, {"RS384", EVP_sha384}, {"RS512", EVP_sha512}};
+constexpr Algorithm kHMAC[] = {{"HS256", EVP_sha256}, {"HS384", EVP_sha384}, {"HS512", EVP_sha512}};
+
+/// A member as the library compares it: a text, or what a number or boolean reads as.
+std::string TextOfMember(const Json::Value &object, const char *name) {
+    if (!object.isObject()) {
+        return {};
+    }
+    const Json::Value &member = object[name];
+    return member.isArray() || member.isObject() ? "" : member.asString();
+}
+
+std::string Describe(const Json::Value &object, const char *name) {
+    if (!object.isObject() || !object.isMember(name)) {
+        return "missing";
+    }
+    const Json::Value &member = object[name];
+    return Frontend::OneLine(Frontend::WriteCompact(member));
+}
+
+std::string TimeOf(std::time_t time) {
+    char text[sizeof "2026-01-01 00:00:00 UTC"];
+    std::tm utc{};
+    const bool isTime = gmtime_r(&time, &utc) != nullptr && std::strftime(text, sizeof text, "%F %T UTC", &utc) != 0;
+    return isTime ? text : std::to_string(time);
+}
+
+/// The text of what the library's own verification throws, empty where it passes; and whether it got to the end.
+struct Verdict {
+    std::string text;
+    bool isWhole = true;
+};
+
+Verdict Ask(Client &client, const std::string &token, bool mayFetch, std::string &userName) {
+    if (client.Azure() != nullptr) {
+        client.Azure()->mayFetch = mayFetch;
+    }
+    Json::Value response;
+    response["id_token"] = token;
+    try {
+        client->ProcessTokenResponse(Frontend::WriteCompact(response));
+        client->VerifyIDToken();
+        client->GetUserName(userName);
+        return {};
+    } catch (const not_fetched &) {
+        return {"", false};
+    } catch (const std::exception &failure) {
+        return {TextOf(failure), true};
+    }
+}
+
+class TokenCheck {
+  public:
+    TokenCheck(Report &report, Client &client, const std::string &token, bool mayFetch)
+        : report_(report), client_(client), token_(token), mayFetch_(mayFetch) {}
+
+    std::string Run() {
+        verdict_ = Ask(client_, token_, mayFetch_, userName_);
+        for (const std::string &line : TakeLogLines()) {
+            report_.Detail("log: " + line);
+        }
+        if (!CheckForm()) {
+            return stop_;
+        }
+        CheckExpiry();
+        if (client_.Azure() != nullptr) {
+            Compare("token.tenant", "tenant: \"tid\"", "tid", client_.Azure()->GetTenantID(), "azure_tenant_id",
+                    "the user belongs to another organisation, or azure_tenant_id is wrong");
+        }
+        Compare("token.audience", "audience: \"aud\"", "aud", client_->GetClientID(),
+                NameOf(client_.profile()) + "_client_id",
+                "the token was made for another client, the provider gives a list, or the client's id is wrong");
+        if (client_.Azure() != nullptr) {
+            CheckRSASignature();
+        } else {
+            CheckHMACSignature();
+        }
+        CheckUserName();
+        return stop_;
+    }
+
+  private:
+    /// One step. The library's own word stands at the one where it stops.
+    void Step(const std::string &id, const std::string &subject, bool isGood, const std::string &found,
+              const std::string &remedy) {
+        Check check{id, subject, isGood ? Mark::kGood : Mark::kFinding, found, isGood ? "" : remedy, ""};
+        if (stop_.empty() && id == StopOf(verdict_.text)) {
+            stop_ = id;
+            check.library = verdict_.text;
+            check.mark = Mark::kFinding;
+        }
+        report_.Add(check);
+    }
+
+    std::string StopOf(const std::string &text) const {
+        if (text == kEmptyPart) {
+            return isHeaderGood_ ? "token.claims" : "token.header";
+        }
+        if (boost::ends_with(text, kNoAlgorithm)) {
+            return "token.algorithm";
+        }
+        const auto *stop =
+            std::find_if(std::begin(kStops), std::end(kStops), [&](const Stop &other) { return text == other.text; });
+        return stop != std::end(kStops) ? stop->id : "";
+    }
+
+    bool CheckForm() {
+        const auto dots = std::count(token_.begin(), token_.end(), '.');
+        const bool hasForm = dots == 2;
+        Step("token.form", "form", hasForm,
+             token_.empty() ? "there is no token"
+                            : std::to_string(dots + 1) + " parts, " + std::to_string(token_.size()) + " bytes",
+             "an ID token has three parts with a dot between them (RFC 7515): is this the \"id_token\" of the "
+             "provider's answer, and the whole of it?");
+        return hasForm && ReadPart("token.header", "header", &TAVO::JWT::Jwt::GetHeader, header_) &&
+               ReadPart("token.claims", "claims", &TAVO::JWT::Jwt::GetBody, claims_);
+    }
+
+    bool ReadPart(const std::string &id, const std::string &subject, Json::Value (TAVO::JWT::Jwt::*get)(),
+                  Json::Value &part) {
+        const std::string remedy = "the provider's \"id_token\" is no ID token, or a part of it is lost";
+        try {
+            TAVO::JWT::Jwt jwt(token_);
+            part = (jwt.*get)();
+        } catch (const std::exception &failure) {
+            Step(id, subject, false, failure.what(), remedy);
+            return false;
+        }
+        isHeaderGood_ = true;
+        Step(id, subject, true, "JSON, " + std::to_string(part.isObject() ? part.size() : 0) + " members", remedy);
+        return true;
+    }
+
+    void CheckExpiry() {
+        const std::time_t now = std::time(nullptr);
+        const std::time_t expiry = std::strtol(TextOfMember(claims_, "exp").c_str(), nullptr, 10);
+        const bool isGood = now <= expiry;
+        Step(
+            "token.expiry", "lifetime: \"exp\"", isGood,
+            Describe(claims_, "exp") + (isGood ? ", until " : ", expired ") + TimeOf(expiry) + "; it is " + TimeOf(now),
+            "is the clock of this machine right (timedatectl)? an old token is no sign of anything else");
+    }
+
+    void Compare(const std::string &id, const std::string &subject, const char *claim, const std::string &configured,
+                 const std::string &key, const std::string &remedy) {
+        const bool isEqual = TextOfMember(claims_, claim) == configured && !IsList(claims_, claim);
+        Step(id, subject, isEqual, Describe(claims_, claim) + "; " + key + " is " + Quoted(configured), remedy);
+    }
+
+    static bool IsList(const Json::Value &object, const char *name) {
+        return object.isObject() && (object[name].isArray() || object[name].isObject());
+    }
+
+    const EVP_MD *CheckAlgorithm(const Algorithm (&supported)[3]) {
+        const std::string name = TextOfMember(header_, "alg");
+        const auto *algorithm = std::find_if(std::begin(supported), std::end(supported),
+                                             [&](const Algorithm &other) { return name == other.name; });
+        const bool isSupported = algorithm != std::end(supported);
+        Step("token.algorithm", "algorithm: \"alg\"", isSupported,
+             Describe(header_, "alg") + (isSupported ? ""
+                                                     : "; this profile takes " + std::string(supported[0].name) + ", " +
+                                                           supported[1].name + " and " + supported[2].name),
+             "let the provider sign this client's tokens with " + std::string(supported[0].name));
+        return isSupported ? algorithm->digest() : nullptr;
+    }
+
+    void CheckRSASignature() {
+        if (!mayFetch_) {
+            CheckAlgorithm(kRSA);
+            report_.NotChecked("token.key", "key: \"kid\"", Describe(header_, "kid") + "; --fetch asks for the keys");
+            report_.NotChecked("token.signature", "signature", "--fetch asks for the keys");
+            return;
+        }
+        const Json::Value key = FindKey();
+        if (key.isNull()) {
+            CheckAlgorithm(kRSA);
+            report_.NotChecked("token.signature", "signature", "there is no key for it");
+            return;
+        }
+        std::string n = Frontend::StringMember(key, "n");
+        std::string e = Frontend::StringMember(key, "e");
+        const bool hasNumbers = key["n"].isString() && key["e"].isString();
+        Step("token.key_numbers", "numbers of the key", hasNumbers,
+             hasNumbers ? std::to_string(SizeOf(key)) + " bits" : "it lacks \"n\" or \"e\"",
+             "the provider's key is no RSA key: let the provider sign with one");
+        const EVP_MD *digest = CheckAlgorithm(kRSA);
+        CheckSignature(
+            hasNumbers && digest != nullptr, [&](TAVO::JWT::Jwt &jwt) { jwt.JwtRSAVerify(n, e, digest); },
+            "does azure_wellknown belong to the provider that made the token? or was the token changed?");
+    }
+
+    /// The key that the token names, null where there is none.
+    Json::Value FindKey() {
+        Json::Value discovery;
+        Json::Value keySet;
+        client_->RequestWellknownInfo(discovery);
+        client_.Azure()->RequestKeysInfo(TextOfMember(discovery, "jwks_uri"), keySet);
+        std::string found = Describe(header_, "kid");
+        for (const std::string &line : TakeLogLines()) {
+            found += "; " + line;
+        }
+        Json::Value named;
+        const Json::Value keys = keySet.isObject() ? keySet["keys"] : Json::Value();
+        if (keys.isArray() && !IsList(header_, "kid")) {
+            const auto key = std::find_if(keys.begin(), keys.end(), [&](const Json::Value &other) {
+                return other.isObject() && other.isMember("kid") && !IsList(other, "kid") &&
+                       TextOfMember(other, "kid") == TextOfMember(header_, "kid");
+            });
+            named = key != keys.end() ? *key : Json::Value();
+        }
+        found += named.isNull() ? "; among " + std::to_string(keys.isArray() ? keys.size() : 0) +
+                                      " keys of the provider none has it"
+                                : "; the provider has published it";
+        Step("token.key", "key: \"kid\"", !named.isNull(), found,
+             "run tavosso-doctor: can discovery document and key set be fetched? does azure_wellknown belong to the "
+             "provider that made the token?");
+        return named;
+    }
+
+    void CheckHMACSignature() {
+        const EVP_MD *digest = CheckAlgorithm(kHMAC);
+        const std::string secret = client_->GetClientSecret();
+        constexpr std::size_t kLongest = 765;
+        Step("token.secret", "client secret", !secret.empty() && secret.size() <= kLongest,
+             std::to_string(secret.size()) + " bytes", "set websphere_client_secret: 1 to 765 bytes");
+        std::string key = EncodeBase64(secret);
+        CheckSignature(
+            digest != nullptr && !secret.empty(), [&](TAVO::JWT::Jwt &jwt) { jwt.JwtHMACVerify(key, digest); },
+            "another client secret than the provider's is set, or the token was changed");
+    }
+
+    static std::string EncodeBase64(const std::string &bytes) {
+        std::string text(4 * ((bytes.size() + 2) / 3), '\0');
+        EVP_EncodeBlock(reinterpret_cast<unsigned char *>(text.data()),
+                        reinterpret_cast<const unsigned char *>(bytes.data()), static_cast<int>(bytes.size()));
+        return text;
+    }
+
+    template <typename Verify>
+    void CheckSignature(bool canVerify, Verify verify, const std::string &remedy) {
+        if (!canVerify) {
+            Step("token.signature", "signature", false, "cannot be verified, for what stands above", remedy);
+            return;
+        }
+        bool isGood = true;
+        try {
+            TAVO::JWT::Jwt jwt(token_);
+            verify(jwt);
+        } catch (const std::exception &) {
+            isGood = false;
+        }
+        TakeLogLines();
+        Step("token.signature", "signature", isGood, isGood ? "is the key's" : "is not the key's", remedy);
+    }
+
+    void CheckUserName() {
+        const bool isAzure = client_.Azure() != nullptr;
+        const char *claim = !isAzure                                                  ? "sub"
+                            : claims_.isObject() && claims_["unique_name"].isString() ? "unique_name"
+                                                                                      : "email";
+        const std::string name = Frontend::StringMember(claims_, claim);
+        const bool isText = claims_.isObject() && claims_[claim].isString();
+        const bool hasForm = isText && (!isAzure || std::count(name.begin(), name.end(), '@') == 1);
+        Step("token.user_name", "user name: \"" + std::string(claim) + "\"", hasForm, Describe(claims_, claim),
+             isAzure ? "the provider has to send \"unique_name\" or \"email\" in the form user@domain"
+                     : "the provider has to send \"sub\" as a text");
+        if (!hasForm) {
+            return;
+        }
+        std::string userName;
+        bool isGood = true;
+        std::string found;
+        try {
+            client_->GetUserName(userName);
+            found = "signs in as " + Quoted(userName);
+        } catch (const std::exception &failure) {
+            isGood = false;
+            found = "is not known here";
+        }
+        for (const std::string &line : TakeLogLines()) {
+            found += "; " + line;
+        }
+        Step("token.domain", isAzure ? "domain of the user" : "user", isGood, found,
+             "join the domain, or write it into /usr/tavo/etc/domains.conf");
+    }
+
+    Report &report_;
+    Client &client_;
+    const std::string &token_;
+    bool mayFetch_;
+    Verdict verdict_;
+    std::string userName_;
+    std::string stop_;
+    bool isHeaderGood_ = false;
+    Json::Value header_;
+    Json::Value claims_;
+};
+
+/// The whole of it, and what nobody else may have of it: what it says, and what proves it.
+void HideToken(Report &report, const std::string &token) {
+    report.Hide(token);
+    const std::size_t claims = token.find('.') + 1;
+    const std::size_t signature = token.rfind('.') + 1;
+    if (claims < signature) {
+        report.Hide(token.substr(claims, signature - claims - 1));
+        report.Hide(token.substr(signature));
+    }
+}
+
+}  // namespace
+
+std::string CheckToken(Report &report, Client &client, const std::string &token, bool mayFetch) {
+    report.Section("ID token (" + NameOf(client.profile()) + ")");
+    HideToken(report, token);
+    return TokenCheck(report, client, token, mayFetch).Run();
+}
+
+}  // namespace Doctor
