@@ -23,17 +23,17 @@ std::string Piece(CURLU *url, CURLUPart part) {
 
 }  // namespace
 
-Address SplitAddress(const std::string &text) {
-    const std::unique_ptr<CURLU, CloseURL> url(curl_url());
-    if (!url || curl_url_set(url.get(), CURLUPART_URL, text.c_str(), CURLU_NON_SUPPORT_SCHEME) != CURLUE_OK) {
+Address SplitAddress(const std::string &url) {
+    const std::unique_ptr<CURLU, CloseURL> parsed(curl_url());
+    if (!parsed || curl_url_set(parsed.get(), CURLUPART_URL, url.c_str(), CURLU_NON_SUPPORT_SCHEME) != CURLUE_OK) {
         return {};
     }
     return {true,
-            Piece(url.get(), CURLUPART_SCHEME),
-            Piece(url.get(), CURLUPART_HOST),
-            Piece(url.get(), CURLUPART_PATH),
-            Piece(url.get(), CURLUPART_QUERY),
-            Piece(url.get(), CURLUPART_FRAGMENT)};
+            Piece(parsed.get(), CURLUPART_SCHEME),
+            Piece(parsed.get(), CURLUPART_HOST),
+            Piece(parsed.get(), CURLUPART_PATH),
+            Piece(parsed.get(), CURLUPART_QUERY),
+            Piece(parsed.get(), CURLUPART_FRAGMENT)};
 }
 
 }  // namespace Doctor

@@ -3,13 +3,14 @@
 #include <fnmatch.h>
 
 #include <algorithm>
+#include <array>
 #include <boost/algorithm/string.hpp>
 #include <cctype>
 #include <cstring>
 #include <optional>
 #include <sstream>
 
-#include "doctor/guides.h"
+#include "doctor/built_in.h"
 #include "frontend/text.h"
 
 namespace Doctor {
@@ -19,10 +20,10 @@ namespace {
 /// A kind of table, by what its first column is headed with.
 struct Kind {
     const char *head;
-    std::vector<std::string> placeholders;  // words of its texts that stand for something else
+    std::array<const char *, 7> placeholders;  // words of its texts that stand for something else
 };
 
-const Kind kKinds[] = {
+constexpr Kind kKinds[] = {
     {"line", {"N", "CURL", "SYSTEM", "NAME", "ID", "SOURCE", "REASON"}},
     {"reason", {"SYSTEM", "ERROR", "DESCRIPTION"}},
     {"text", {"ALG"}},
@@ -75,7 +76,9 @@ std::string PatternOf(const std::string &text, const Kind &kind) {
     std::string word;
     const auto endWord = [&] {
         const auto &names = kind.placeholders;
-        pattern += std::find(names.begin(), names.end(), word) != names.end() ? "*" : word;
+        const bool isPlaceholder =
+            std::any_of(names.begin(), names.end(), [&](const char *name) { return name != nullptr && word == name; });
+        pattern += isPlaceholder ? "*" : word;
         word.clear();
     };
     for (const char c : text) {

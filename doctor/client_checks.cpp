@@ -27,12 +27,12 @@ enum class Kind {
 };
 
 struct Key {
-    std::string name;  // without the profile's prefix
+    const char *name;  // without the profile's prefix
     Kind kind;
     std::string (*read)(Client &client);  // as the library has read it; null for the switch
 };
 
-const Key kAzureKeys[] = {
+constexpr Key kAzureKeys[] = {
     {"sso_enable", Kind::kSwitch, nullptr},
     {"wellknown", Kind::kEndpoint, [](Client &client) { return client->GetWellknownEndpoint(); }},
     {"client_id", Kind::kIdentifier, [](Client &client) { return client->GetClientID(); }},
@@ -44,7 +44,7 @@ const Key kAzureKeys[] = {
     {"logout_endpoint", Kind::kQueried, [](Client &client) { return client->GetLogoutEndpoint(); }},
 };
 
-const Key kWebSphereKeys[] = {
+constexpr Key kWebSphereKeys[] = {
     {"wellknown", Kind::kSpare, [](Client &client) { return client->GetWellknownEndpoint(); }},
     {"client_id", Kind::kIdentifier, [](Client &client) { return client->GetClientID(); }},
     {"client_secret", Kind::kSecret, [](Client &client) { return client->GetClientSecret(); }},
@@ -69,7 +69,7 @@ class KeyCheck {
 
     void Run(const Key &key) {
         name_ = NameOf(client_.profile()) + "_" + key.name;
-        id_ = "client." + key.name;
+        id_ = std::string("client.") + key.name;
         if (key.kind == Kind::kSwitch) {
             CheckSwitch();
             return;
@@ -123,9 +123,9 @@ class KeyCheck {
                                                                  : "is no text: the library takes it for empty";
         if (key.kind == Kind::kSpare) {
             report_.Good(id_, name_, found + "; no login uses it");
-        } else if (key.name == "logout_endpoint") {
+        } else if (id_ == "client.logout_endpoint") {
             report_.Note(id_, name_, found + ": a sign-out ends at this machine, and not at the provider",
-                         "set it to the provider's \"end_session_endpoint\"");
+                         "set it to the provider's " + Quoted("end_session_endpoint"));
         } else {
             Finding(found, "set it, in quotation marks, as the provider has registered or published it");
         }
@@ -150,7 +150,7 @@ class KeyCheck {
                     "use the provider's https address");
         } else if (kind == Kind::kQueried && (!address.query.empty() || !address.fragment.empty())) {
             Finding(Quoted(value_) + " has a query or fragment of its own, behind which a second query would be put",
-                    "leave out what stands from \"?\" or \"#\" on");
+                    R"(leave out what stands from "?" or "#" on)");
         } else {
             report_.Good(id_, name_, Quoted(value_));
         }

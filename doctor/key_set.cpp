@@ -59,7 +59,7 @@ std::string FaultOf(const Json::Value &key) {
         return "has no \"kid\", by which a token could name it";
     }
     if (!key["n"].isString() || !key["e"].isString()) {
-        return "is no RSA key: it lacks \"n\" or \"e\"";
+        return R"(is no RSA key: it lacks "n" or "e")";
     }
     if (SizeOf(key) == 0 || DecodeBase64Url(key["e"].asString()).empty()) {
         return "holds numbers that are not base64url";

@@ -13,6 +13,7 @@
 #include <string>
 
 #include "doctor/book.h"
+#include "doctor/built_in.h"
 #include "doctor/checks.h"
 #include "doctor/login_walk.h"
 #include "doctor/watch.h"
@@ -164,7 +165,7 @@ int main(int argc, char **argv) try {
     Options options;
     CLI::App app("Tells why a single sign-on login fails, from this machine's configuration and its provider.",
                  "tavosso-doctor");
-    app.set_version_flag("--version", "tavosso-doctor " TAVOSSO_VERSION);
+    app.set_version_flag("--version", std::string("tavosso-doctor ") + Doctor::kVersion);
     app.add_flag("--json", options.isJson, "Write one JSON object");
     app.add_flag("--verbose", options.isVerbose, "Show the library's requests and log lines, too");
     app.add_option("--timeout", options.timeout, "Seconds to wait for each answer of the provider")

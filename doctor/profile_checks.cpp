@@ -61,7 +61,7 @@ std::optional<Profile> CheckProfile(Report &report) {
     report.Good("profile.sso_enable", kEnable, Describe(file.content, kEnable));
     if (refusal) {
         ReportRefusal(report, "profile.sso_profile", kName, Describe(file.content, kName),
-                      "set it to \"azure\" or \"websphere\"; capitals count", library);
+                      R"(set it to "azure" or "websphere"; capitals count)", library);
         return std::nullopt;
     }
     const std::string name = TAVO::SSO::SSOProfile().GetSSOProfile();

@@ -3,6 +3,7 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <array>
 #include <boost/algorithm/string/predicate.hpp>
 #include <cerrno>
 #include <cstring>
@@ -16,20 +17,25 @@ namespace {
 
 // Names that are further from each other were hardly meant to be the same.
 constexpr std::size_t kFarthestSlip = 4;
+constexpr std::size_t kLongestKey = 64;
 
-/// How many characters have to be put in, taken away or exchanged (the Levenshtein distance).
-std::size_t Distance(const std::string &a, const std::string &b) {
-    std::vector<std::size_t> row(b.size() + 1);
+/// How many characters have to be put in, taken away or exchanged (the Levenshtein distance). A name that is longer
+/// than any key is far from all of them.
+std::size_t Distance(const std::string &name, const std::string &key) {
+    std::array<std::size_t, kLongestKey + 1> row{};
+    if (name.size() > kLongestKey || key.size() > kLongestKey) {
+        return kLongestKey;
+    }
     std::iota(row.begin(), row.end(), 0);
-    for (const char c : a) {
+    for (const char c : name) {
         std::size_t diagonal = row[0]++;
-        for (std::size_t i = 0; i < b.size(); ++i) {
-            const std::size_t exchanged = diagonal + (c == b[i] ? 0 : 1);
+        for (std::size_t i = 0; i < key.size(); ++i) {
+            const std::size_t exchanged = diagonal + (c == key[i] ? 0 : 1);
             diagonal = row[i + 1];
             row[i + 1] = std::min({exchanged, row[i] + 1, row[i + 1] + 1});
         }
     }
-    return row.back();
+    return row[key.size()];
 }
 
 std::string NearestOf(const std::vector<std::string> &known, const std::string &name) {

@@ -232,7 +232,7 @@ class TokenCheck {
         std::string e = Frontend::StringMember(key, "e");
         const bool hasNumbers = key["n"].isString() && key["e"].isString();
         Step("token.key_numbers", "numbers of the key", hasNumbers,
-             hasNumbers ? std::to_string(SizeOf(key)) + " bits" : "it lacks \"n\" or \"e\"",
+             hasNumbers ? std::to_string(SizeOf(key)) + " bits" : R"(it lacks "n" or "e")",
              "the provider's key is no RSA key: let the provider sign with one");
         const EVP_MD *digest = CheckAlgorithm(kRSA);
         CheckSignature(
@@ -313,15 +313,18 @@ class TokenCheck {
         const bool isText = claims_.isObject() && claims_[claim].isString();
         const bool hasForm = isText && (!isAzure || std::count(name.begin(), name.end(), '@') == 1);
         Step("token.user_name", "user name: \"" + std::string(claim) + "\"", hasForm, Describe(claims_, claim),
-             isAzure ? "the provider has to send \"unique_name\" or \"email\" in the form user@domain"
+             isAzure ? R"(the provider has to send "unique_name" or "email" in the form user@domain)"
                      : "the provider has to send \"sub\" as a text");
-        if (!hasForm) {
-            return;
+        if (hasForm) {
+            CheckDomain(isAzure);
         }
-        std::string userName;
+    }
+
+    void CheckDomain(bool isAzure) {
         bool isGood = true;
         std::string found;
         try {
+            std::string userName;
             client_->GetUserName(userName);
             found = "signs in as " + Quoted(userName);
         } catch (const std::exception &failure) {
