@@ -1,0 +1,89 @@
+#ifndef TAVOSSO_TESTS_DOCTOR_APPLIANCE_H
+#define TAVOSSO_TESTS_DOCTOR_APPLIANCE_H
+
+#include <json/json.h>
+
+#include <functional>
+#include <map>
+#include <mutex>
+#include <string>
+#include <vector>
+
+#include "tests/loopback/provider.h"
+#include "tests/support/server.h"
+
+// A machine that is completely set up, and its provider, by which everyone who looks finds the same: as often as it is
+// asked, and in whatever order. Under the real clock, for the doctor is a process of its own.
+namespace Test {
+
+constexpr char kClientSecret[] = "q7Zp-Lw2x&K%9vTe Rb4n+Ym8s";
+constexpr char kClientID[] = "the client";
+constexpr char kCode[] = "0.AXkA-good/code&of-one=sign-in";
+constexpr char kTenant[] = "4f6d2c1e-9b7a-4c3d-8e5f-0a1b2c3d4e5f";
+constexpr char kReturnURI[] = "https://nas.example/webman/sso/return.cgi";
+
+/// What a token says that was made now.
+Json::Value GoodClaims(Profile profile);
+
+/// Signed as the header's "alg" says.
+std::string MakeToken(const Json::Value &header, const Json::Value &claims);
+std::string GoodToken(Profile profile);
+
+class Appliance {
+  public:
+    using Answer = std::function<std::string(const std::string &request)>;  // both byte by byte
+
+    explicit Appliance(Profile profile, const Credentials &credentials = CertificateFor("IP:127.0.0.1"));
+
+    Profile profile() const { return profile_; }
+    std::string ClientFile() const;
+
+    /// The key as the client's file has it: "azure_" or "websphere_", and its name.
+    std::string Key(const std::string &name) const;
+
+    /// JSON text over the client's file and the discovery document; a null takes a member away.
+    void ChangeClientFile(const std::string &changes);
+    void ChangeDiscovery(const std::string &changes);
+
+    void SetClient(const std::string &name, const Json::Value &value);
+
+    /// In the client's file and in what the provider publishes.
+    void MoveEndpoint(const std::string &name, const std::string &url);
+
+    /// What the provider answers at the end of a path: "/discovery", "/keys" or "/token".
+    void AnswerAt(const std::string &path, Answer answer);
+    void AnswerAt(const std::string &path, const std::string &body, const std::string &status = "200 OK");
+
+    /// Whatever the code is.
+    void RefuseCodes(const std::string &error, const std::string &description = "");
+
+    /// The token that the provider gives for the one good code.
+    void GiveToken(const std::string &token);
+    void GiveToken(const std::string &headerChanges, const std::string &claimChanges);
+    std::string Token() const { return token_; }
+
+    std::string URL(const std::string &path) const { return server_.URL("/" + std::string(kTenant) + path); }
+    std::vector<std::string> Requests() const { return server_.Requests(); }
+
+    Outcome LogIn() const { return Test::LogIn(kCode); }
+
+  private:
+    using Lock = std::lock_guard<std::mutex>;
+
+    void WriteClientFile() const;
+    void Serve(Connection &connection);
+    std::string AnswerTo(const std::string &request);
+    std::string AnswerCode(const std::string &request) const;
+
+    Profile profile_;
+    Json::Value client_;
+    Json::Value discovery_;
+    std::string token_;
+    std::mutex mutex_;
+    std::map<std::string, Answer> answers_;
+    Server server_;  // the last: its thread uses all the others
+};
+
+}  // namespace Test
+
+#endif

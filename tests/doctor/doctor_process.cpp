@@ -1,0 +1,292 @@
+#include "tests/doctor/doctor_process.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <pty.h>
+#include <spawn.h>
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <termios.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
+#include <memory>
+#include <stdexcept>
+#include <utility>
+
+#include "sso/sso.h"
+#include "tests/support/token.h"
+
+namespace Test {
+
+namespace {
+
+// The shortest piece of a secret that nothing holds by chance.
+constexpr std::size_t kPiece = 12;
+
+Strings secrets;
+
+void Require(bool condition, const char *what) {
+    if (!condition) {
+        throw std::runtime_error(what);
+    }
+}
+
+/// A file without a name.
+int MakeFile(const std::string &content = "") {
+    const int file = memfd_create("doctor", MFD_CLOEXEC);
+    Require(file >= 0 && write(file, content.data(), content.size()) == static_cast<ssize_t>(content.size()) &&
+                lseek(file, 0, SEEK_SET) == 0,
+            "memfd_create");
+    return file;
+}
+
+/// What is left to read; closes the file. A terminal that nobody holds any more ends with an error.
+std::string ReadAll(int file) {
+    std::string content;
+    char bytes[4096];
+    for (ssize_t count = 0; (count = read(file, bytes, sizeof bytes)) > 0;) {
+        content.append(bytes, static_cast<std::size_t>(count));
+    }
+    close(file);
+    return content;
+}
+
+std::string ReadFile(int file) {
+    lseek(file, 0, SEEK_SET);
+    return ReadAll(file);
+}
+
+/// What a process starts with.
+class Start {
+  public:
+    Start() {
+        posix_spawn_file_actions_init(&actions_);
+        posix_spawnattr_init(&attributes_);
+    }
+    ~Start() {
+        posix_spawn_file_actions_destroy(&actions_);
+        posix_spawnattr_destroy(&attributes_);
+    }
+    Start(const Start &) = delete;
+    Start &operator=(const Start &) = delete;
+
+    void Give(int file, int as) { posix_spawn_file_actions_adddup2(&actions_, file, as); }
+
+    /// In a session of its own, whose terminal it is.
+    void GiveTerminal(const char *path) {
+        posix_spawnattr_setflags(&attributes_, POSIX_SPAWN_SETSID);
+        posix_spawn_file_actions_addopen(&actions_, STDIN_FILENO, path, O_RDWR, 0);
+        Give(STDIN_FILENO, STDOUT_FILENO);
+        Give(STDIN_FILENO, STDERR_FILENO);
+    }
+
+    pid_t Doctor(const Strings &arguments, const Strings &variables) {
+        Strings words{TAVOSSO_DOCTOR};
+        words.insert(words.end(), arguments.begin(), arguments.end());
+        Strings environment = variables;
+        for (char **variable = environ; *variable != nullptr; ++variable) {
+            environment.emplace_back(*variable);
+        }
+        pid_t process = -1;
+        Require(posix_spawn(&process, TAVOSSO_DOCTOR, &actions_, &attributes_, Pointers(words).data(),
+                            Pointers(environment).data()) == 0,
+                "posix_spawn");
+        return process;
+    }
+
+  private:
+    static std::vector<char *> Pointers(Strings &texts) {
+        std::vector<char *> pointers;
+        for (std::string &text : texts) {
+            pointers.push_back(text.data());
+        }
+        pointers.push_back(nullptr);
+        return pointers;
+    }
+
+    posix_spawn_file_actions_t actions_{};
+    posix_spawnattr_t attributes_{};
+};
+
+int WaitFor(pid_t process) {
+    int status = 0;
+    Require(waitpid(process, &status, 0) == process, "waitpid");
+    return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
+}
+
+/// Tells which secret by its number: it is not for the test's output either.
+void ExpectNoSecret(const std::string &text) {
+    for (std::size_t i = 0; i < secrets.size(); ++i) {
+        const std::string &secret = secrets[i];
+        for (std::size_t begin = 0; begin + kPiece <= secret.size(); ++begin) {
+            if (text.find(secret.substr(begin, kPiece)) != std::string::npos) {
+                ADD_FAILURE() << "secret " << i << " is in the output, from its byte " << begin << " on";
+                break;
+            }
+        }
+    }
+}
+
+bool IsControl(char c) { return (static_cast<unsigned char>(c) < 0x20 && c != '\n') || c == 0x7f; }
+
+void ExpectHarmless(const Run &run) {
+    for (const std::string &text : {run.output, run.errors}) {
+        ExpectNoSecret(text);
+        EXPECT_EQ(std::count_if(text.begin(), text.end(), IsControl), 0) << "control characters in the output";
+    }
+    EXPECT_LT(run.status, 128) << "a signal has ended it: " << run.errors;
+}
+
+Strings With(Strings arguments, const std::string &more) {
+    arguments.push_back(more);
+    return arguments;
+}
+
+}  // namespace
+
+void KeepSecret(const std::string &text) {
+    for (const std::string &form : {text, TAVO::SSO::URLEncode(text)}) {
+        if (std::find(secrets.begin(), secrets.end(), form) == secrets.end()) {
+            secrets.push_back(form);
+        }
+    }
+}
+
+Run RunDoctor(const Strings &arguments, const std::string &input) {
+    const int in = MakeFile(input);
+    const int out = MakeFile();
+    const int errors = MakeFile();
+    Start start;
+    start.Give(in, STDIN_FILENO);
+    start.Give(out, STDOUT_FILENO);
+    start.Give(errors, STDERR_FILENO);
+    Run run;
+    run.status = WaitFor(start.Doctor(arguments, {}));
+    close(in);
+    run.output = ReadFile(out);
+    run.errors = ReadFile(errors);
+    ExpectHarmless(run);
+    return run;
+}
+
+Check Report::Find(const std::string &id, const std::string &mark) const {
+    const auto check = std::find_if(checks.begin(), checks.end(),
+                                    [&](const Check &other) { return other.id == id && other.mark == mark; });
+    return check != checks.end() ? *check : Check{};
+}
+
+Check Report::FirstFinding() const {
+    const auto check =
+        std::find_if(checks.begin(), checks.end(), [](const Check &other) { return other.mark == "finding"; });
+    return check != checks.end() ? *check : Check{};
+}
+
+Strings Report::Findings() const {
+    Strings ids;
+    for (const Check &check : checks) {
+        if (check.mark == "finding") {
+            ids.push_back(check.id);
+        }
+    }
+    return ids;
+}
+
+Report Ask(const Strings &arguments, const std::string &input) {
+    const Run forPeople = RunDoctor(With(arguments, "--verbose"), input);
+    const Run forMachines = RunDoctor(With(arguments, "--json"), input);
+    EXPECT_EQ(forPeople.status, forMachines.status);
+    EXPECT_EQ(forMachines.errors, "");
+    Report report;
+    report.status = forMachines.status;
+    report.json = Parse(forMachines.output);
+    for (const Json::Value &check : report.json["checks"]) {
+        report.checks.push_back({check["id"].asString(), check["mark"].asString(), check["subject"].asString(),
+                                 check["found"].asString(), check["remedy"].asString(), check["library"].asString()});
+    }
+    EXPECT_FALSE(report.checks.empty()) << "nothing was looked at";
+    EXPECT_EQ(report.json["healthy"].asBool(), report.Findings().empty());
+    EXPECT_EQ(report.status, report.Findings().empty() ? 0 : 1);
+    return report;
+}
+
+Dialogue::Dialogue(Over over, const Strings &arguments, const Strings &variables) {
+    Start start;
+    if (over == Over::kTerminal) {
+        int terminal = -1;
+        char path[64];
+        Require(openpty(&output_, &terminal, path, nullptr, nullptr) == 0, "openpty");
+        fcntl(output_, F_SETFD, FD_CLOEXEC);
+        start.GiveTerminal(path);
+        process_ = start.Doctor(arguments, variables);
+        close(terminal);
+        input_ = dup(output_);
+        return;
+    }
+    int in[2];
+    int out[2];
+    Require(pipe2(in, O_CLOEXEC) == 0 && pipe2(out, O_CLOEXEC) == 0, "pipe2");
+    errors_ = MakeFile();
+    start.Give(in[0], STDIN_FILENO);
+    start.Give(out[1], STDOUT_FILENO);
+    start.Give(errors_, STDERR_FILENO);
+    process_ = start.Doctor(arguments, variables);
+    close(in[0]);
+    close(out[1]);
+    input_ = in[1];
+    output_ = out[0];
+}
+
+Dialogue::~Dialogue() {
+    if (process_ > 0) {
+        kill(process_, SIGKILL);
+        Finish();
+    }
+}
+
+std::string Dialogue::ReadUntil(const std::string &text) {
+    char bytes[4096];
+    while (printed_.find(text) == std::string::npos) {
+        const ssize_t count = read(output_, bytes, sizeof bytes);
+        if (count <= 0) {
+            break;
+        }
+        printed_.append(bytes, static_cast<std::size_t>(count));
+    }
+    return printed_;
+}
+
+void Dialogue::Write(const std::string &bytes) const {
+    std::size_t written = 0;
+    while (written < bytes.size()) {
+        const ssize_t count = write(input_, bytes.data() + written, bytes.size() - written);
+        Require(count > 0, "write to the doctor");
+        written += static_cast<std::size_t>(count);
+    }
+}
+
+void Dialogue::CloseInput() { close(std::exchange(input_, -1)); }
+
+Run Dialogue::Finish() {
+    CloseInput();
+    Run run;
+    run.output = printed_ + ReadAll(output_);
+    run.status = WaitFor(std::exchange(process_, -1));
+    if (errors_ >= 0) {
+        run.errors = ReadFile(errors_);
+        ExpectHarmless(run);
+    } else {
+        ExpectNoSecret(run.output);
+    }
+    return run;
+}
+
+unsigned int Dialogue::LocalModes() const {
+    termios modes{};
+    Require(tcgetattr(output_, &modes) == 0, "tcgetattr");
+    return modes.c_lflag;
+}
+
+}  // namespace Test

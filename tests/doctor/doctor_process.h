@@ -1,0 +1,92 @@
+#ifndef TAVOSSO_TESTS_DOCTOR_DOCTOR_PROCESS_H
+#define TAVOSSO_TESTS_DOCTOR_DOCTOR_PROCESS_H
+
+#include <json/json.h>
+#include <sys/types.h>
+
+#include <string>
+#include <vector>
+
+// The built tavosso-doctor, as an administrator runs it: a process of its own, with this machine's clock.
+namespace Test {
+
+constexpr char kEscape = '\033';
+
+using Strings = std::vector<std::string>;
+
+/// What a process has left behind.
+struct Run {
+    int status = -1;  // the signal's number and 128 where one ended it, as a shell tells it
+    std::string output;
+    std::string errors;
+};
+
+/// Makes it a failure of the test if any run from now on prints a piece of this text, or of its percent-encoding.
+void KeepSecret(const std::string &text);
+
+/// Runs the doctor to its end, without a terminal. That it prints neither a secret nor a control character is looked at
+/// here, whatever the test is about.
+Run RunDoctor(const Strings &arguments, const std::string &input = "");
+
+/// One check of a report.
+struct Check {
+    std::string id;
+    std::string mark;
+    std::string subject;
+    std::string found;
+    std::string remedy;
+    std::string library;
+};
+
+struct Report {
+    int status = -1;
+    Json::Value json;
+    std::vector<Check> checks;
+
+    /// The check of this id with this mark, if there is one; else an empty one.
+    Check Find(const std::string &id, const std::string &mark) const;
+
+    /// The first finding of any id; an empty check if there is none.
+    Check FirstFinding() const;
+
+    Strings Findings() const;  // their ids
+};
+
+/// Runs the doctor for machines and for people: what the latter read is looked at as in `RunDoctor`.
+Report Ask(const Strings &arguments, const std::string &input = "");
+
+/// A doctor that one talks with.
+class Dialogue {
+  public:
+    enum class Over { kPipes, kTerminal };
+
+    /// The variables, each as NAME=VALUE, stand in its environment beside this process's own.
+    Dialogue(Over over, const Strings &arguments, const Strings &variables = {});
+    ~Dialogue();
+    Dialogue(const Dialogue &) = delete;
+    Dialogue &operator=(const Dialogue &) = delete;
+
+    /// Waits until it has printed this, or has ended. Gives all that it has printed so far.
+    std::string ReadUntil(const std::string &text);
+
+    void Write(const std::string &bytes) const;
+
+    /// Nothing more will be written. Waits for its end.
+    Run Finish();
+
+    /// Of the terminal, in the kernel's bits.
+    unsigned int LocalModes() const;
+
+  private:
+    void CloseInput();
+
+    pid_t process_ = -1;
+    int input_ = -1;
+    int output_ = -1;
+    int errors_ = -1;
+    std::string printed_;
+};
+
+}  // namespace Test
+
+#endif
