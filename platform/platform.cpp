@@ -1,20 +1,29 @@
 // A working stand-in for the appliance's libraries, for machines that are not the appliance.
 #include "platform/platform.h"
 
-#include <json/json.h>
 #include <openssl/evp.h>
+#include <syslog.h>
 
 #include <algorithm>
-#include <boost/algorithm/string/predicate.hpp>
-#include <fstream>
 #include <limits>
-#include <locale>
+#include <optional>
 #include <string>
+
+#include "platform/domain_table.h"
+#include "platform/winbind.h"
+
+// As in the library, whose headers the platform does not include: the two arguments behind the "%s:%d" of a log line.
+#define SOURCE_LINE kSourceName, __LINE__
 
 namespace {
 
-/// DNS domain names and their NetBIOS names: a JSON object of strings.
-constexpr char kDomainTable[] = "/usr/tavo/etc/domains.conf";
+using TAVO::Platform::AskWinbind;
+using TAVO::Platform::FindInDomainTable;
+using TAVO::Platform::WinbindAnswer;
+
+constexpr char kSourceName[] = "platform";
+
+constexpr std::size_t kLongestShown = 255;  // that a domain of the DNS can be
 
 constexpr std::size_t kLongestInput = std::numeric_limits<int>::max() / 2;  // OpenSSL's coder counts in int
 
@@ -61,28 +70,58 @@ bool DecodeBase64(const std::string &text, std::string &bytes) {
     return EncodeBase64(bytes) == text;
 }
 
-bool FindNetBIOSName(const std::string &domain, std::string &netBIOSName) {
-    std::ifstream file(kDomainTable);
-    Json::Value table;
-    if (!Json::parseFromStream(Json::CharReaderBuilder(), file, &table, nullptr) || !table.isObject()) {
-        return false;
-    }
-    for (const std::string &name : table.getMemberNames()) {
-        if (boost::iequals(name, domain, std::locale::classic()) && table[name].isString()) {
-            netBIOSName = table[name].asString();
-            return !netBIOSName.empty();
-        }
-    }
-    return false;
+/// A domain as a log line shows it: whoever wrote the token chose it, and may have put a line feed into it.
+std::string Shown(const std::string &domain) {
+    std::string shown = domain.substr(0, kLongestShown);
+    std::replace_if(
+        shown.begin(), shown.end(), [](char c) { return static_cast<unsigned char>(c) < ' ' || c == '\x7f'; }, '?');
+    return shown;
 }
 
-bool ConvertDomain(const std::string &name, std::string &converted) {
-    const std::size_t backslash = name.find('\\');
-    if (backslash == std::string::npos || !FindNetBIOSName(name.substr(0, backslash), converted)) {
-        return false;
+/// What the administrator has written goes before what the directory says. Logs why there is nothing.
+std::optional<std::string> FindNetBIOSName(const std::string &domain) {
+    if (std::optional<std::string> netBIOSName = FindInDomainTable(domain)) {
+        return netBIOSName;
     }
-    converted += name.substr(backslash);
-    return true;
+    const WinbindAnswer answer = AskWinbind(domain);
+    const std::string shown = Shown(domain);
+    switch (answer.kind) {
+        case WinbindAnswer::Kind::kKnown:
+            return answer.text;
+        case WinbindAnswer::Kind::kUnknown:
+            syslog(LOG_ERR, "%s:%d domain '%s' is not in domains.conf, and winbindd does not know it", SOURCE_LINE,
+                   shown.c_str());
+            break;
+        case WinbindAnswer::Kind::kNotAvailable:
+            syslog(LOG_ERR, "%s:%d domain '%s' is not in domains.conf, and winbindd is not available", SOURCE_LINE,
+                   shown.c_str());
+            break;
+        case WinbindAnswer::Kind::kSilent:
+            syslog(LOG_ERR, "%s:%d domain '%s' is not in domains.conf, and winbindd does not answer", SOURCE_LINE,
+                   shown.c_str());
+            break;
+        case WinbindAnswer::Kind::kNotAsked:
+            syslog(LOG_ERR, "%s:%d domain '%s' is not in domains.conf, and winbindd cannot be asked: %s", SOURCE_LINE,
+                   shown.c_str(), answer.text.c_str());
+            break;
+    }
+    return std::nullopt;
+}
+
+/// DOMAIN\user with the domain's NetBIOS name. Logs why there is nothing.
+std::optional<std::string> ConvertDomain(const std::string &name) {
+    const std::size_t backslash = name.find('\\');
+    if (backslash == std::string::npos) {
+        syslog(LOG_ERR, "%s:%d name without a domain", SOURCE_LINE);
+        return std::nullopt;
+    }
+    const std::string domain = name.substr(0, backslash);
+    if (backslash + 1 == name.size()) {
+        syslog(LOG_ERR, "%s:%d name of domain '%s' without a user", SOURCE_LINE, Shown(domain).c_str());
+        return std::nullopt;
+    }
+    const std::optional<std::string> netBIOSName = FindNetBIOSName(domain);
+    return netBIOSName ? std::optional(*netBIOSName + name.substr(backslash)) : std::nullopt;
 }
 
 /// Copies a text and its NUL into a buffer that holds `usableSize` characters and the NUL.
@@ -131,11 +170,20 @@ int TLIBCBase64Decode(const char *src, size_t len, char *dst, size_t *len_inout)
 }
 
 int TAVOWinsUserNameFqdn2Netbios(const char *src, char *dst, size_t size) try {
-    std::string converted;
-    if (src == nullptr || dst == nullptr || !ConvertDomain(src, converted)) {
+    if (src == nullptr || dst == nullptr) {
+        syslog(LOG_ERR, "%s:%d no name, or no buffer for it", SOURCE_LINE);
         return -1;
     }
-    return CopyText(converted, dst, size) ? 0 : -1;
+    const std::optional<std::string> converted = ConvertDomain(src);
+    if (!converted) {
+        return -1;
+    }
+    if (!CopyText(*converted, dst, size)) {
+        syslog(LOG_ERR, "%s:%d name is too long for its buffer", SOURCE_LINE);
+        return -1;
+    }
+    return 0;
 } catch (const std::exception &) {
+    syslog(LOG_ERR, "%s:%d memory ran out, or domains.conf is nested too deeply", SOURCE_LINE);
     return -1;
 }

@@ -51,11 +51,17 @@ int TLIBCBase64Decode(const char *src, size_t len, char *dst, size_t *len_inout)
 /**
  * Turns DOMAIN\\user, the domain by its DNS name, into the same with the domain's NetBIOS name.
  *
+ * The stand-in looks into /usr/tavo/etc/domains.conf first, and then asks the machine's winbindd. It waits for that for
+ * a second at most: a child process asks, which the kernel then ends. The child is collected before the function
+ * returns; a program that catches SIGCHLD is told of its end, and one that collects all of its children may be given
+ * its process id.
+ *
  * @param src   NUL-terminated name
  * @param dst   receives the converted name and a NUL; untouched on failure
  * @param size  usable size of `dst`
- * @return 0 on success; negative when the domain is unknown, the name has no backslash, the result does not fit, or an
- *         argument is null
+ * @return 0 on success; negative, with one line in the system's log, when the domain is unknown, nobody can be asked
+ * for it, the name has no backslash or no user behind it, the result does not fit, memory runs out, or an argument is
+ *         null
  */
 int TAVOWinsUserNameFqdn2Netbios(const char *src, char *dst, size_t size);
 

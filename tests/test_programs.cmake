@@ -9,8 +9,9 @@ endif()
 
 find_package(GTest REQUIRED)
 
-add_library(test_support STATIC support/encoding.cpp support/error_queue.cpp support/failure.cpp support/files.cpp support/token.cpp)
+add_library(test_support STATIC support/conversion.cpp support/encoding.cpp support/error_queue.cpp support/failure.cpp support/files.cpp support/token.cpp)
 tavosso_options(test_support)
+target_compile_definitions(test_support PRIVATE TAVOSSO_WINBIND=$<BOOL:${TAVOSSO_WINBIND}>)
 target_link_libraries(test_support PUBLIC OpenSSL::Crypto PkgConfig::JSONCPP)
 
 # all_LABEL_tests builds the test programs of one label: all of them together take minutes.

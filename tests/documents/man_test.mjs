@@ -14,7 +14,7 @@ const links = files.filter((file) => read(file).startsWith('.so '));
 const pages = files.filter((file) => !links.includes(file))
     .map((file) => ({file, section: file.at(-1), source: read(file), text: render(file)}));
 const ELSEWHERE = ['curl_easy_perform 3', 'journalctl 1', 'libcurl 3', 'lighttpd 8', 'pkg-config 1', 'setresuid 2',
-    'strerror 3', 'syslog 3', 'update-ca-certificates 8'];
+    'strerror 3', 'syslog 3', 'update-ca-certificates 8', 'wbinfo 1', 'winbindd 8'];
 
 function render(file) {
     const text = execFileSync('mandoc', ['-T', 'ascii', '-O', 'width=1000', file], {cwd: PROJECT, encoding: 'utf8'});

@@ -39,7 +39,8 @@ constexpr char kLogLines[] =
     R"(|Failed writing received data to disk/application|URL using bad/illegal format or missing URL))"
     R"(|azuresso:N (curl_easy_init failed\. .*|request wellknown uri .*\.))"
     R"(|jwt:N EVP_(PKEY_assign_RSA|DigestVerify(Init|Update|Final)) failed)"
-    R"(|utils:N (calloc failed\.|MD5 digest failed) .*)";
+    R"(|utils:N (calloc failed\.|MD5 digest failed) .*)"
+    R"(|platform:N memory ran out, or domains\.conf is nested too deeply)";
 
 struct Trial {
     std::string ending;

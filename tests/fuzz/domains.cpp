@@ -2,7 +2,10 @@
 
 #include <strings.h>
 
+#include <algorithm>
+
 #include "tests/fuzz/oracle.h"
+#include "tests/support/conversion.h"
 #include "tests/support/files.h"
 
 namespace Fuzz {
@@ -21,17 +24,42 @@ std::optional<std::string> NetBIOSName(const std::string &domain) {
     return strcasecmp(domain.c_str(), "lab.example") == 0 ? std::optional("LAB") : std::nullopt;
 }
 
+/// As a log line shows it.
+std::string Shown(std::string domain) {
+    domain.resize(std::min<std::size_t>(domain.size(), 255));
+    for (char &c : domain) {
+        c = (c >= '\0' && c < ' ') || c == '\x7f' ? '?' : c;
+    }
+    return domain;
+}
+
 }  // namespace
+
+std::vector<std::string> Lines(const Conversion &conversion) {
+    return conversion.line ? std::vector{*conversion.line} : std::vector<std::string>();
+}
 
 void WriteDomainTable() { Test::WriteFile(Test::kDomainTable, kTable); }
 
-std::optional<std::string> ToNetBIOS(const std::string &name, std::size_t longest) {
+Conversion ToNetBIOS(const std::string &name, std::size_t longest) {
     const std::string text = UpToNUL(name);
     const std::size_t backslash = text.find('\\');
-    const std::optional<std::string> domain =
-        backslash == std::string::npos ? std::nullopt : NetBIOSName(text.substr(0, backslash));
-    const std::optional<std::string> converted = domain ? std::optional(*domain + text.substr(backslash)) : domain;
-    return converted && converted->size() <= longest ? converted : std::nullopt;
+    if (backslash == std::string::npos) {
+        return {std::nullopt, "platform:N name without a domain"};
+    }
+    const std::string domain = text.substr(0, backslash);
+    if (backslash + 1 == text.size()) {
+        return {std::nullopt, "platform:N name of domain '" + Shown(domain) + "' without a user"};
+    }
+    const std::optional<std::string> netBIOSName = NetBIOSName(domain);
+    if (!netBIOSName) {
+        return {std::nullopt, domain.empty() ? Test::EmptyDomain() : Test::UnknownDomain(Shown(domain))};
+    }
+    const std::string converted = *netBIOSName + text.substr(backslash);
+    if (converted.size() > longest) {
+        return {std::nullopt, "platform:N name is too long for its buffer"};
+    }
+    return {converted, std::nullopt};
 }
 
 }  // namespace Fuzz

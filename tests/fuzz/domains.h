@@ -3,14 +3,22 @@
 
 #include <optional>
 #include <string>
+#include <vector>
 
 // The domains that the platform's stand-in knows in these programs.
 namespace Fuzz {
 
 void WriteDomainTable();
 
-/// What the conversion must make of DOMAIN\user; nothing where it must fail, also for want of room.
-std::optional<std::string> ToNetBIOS(const std::string &name, std::size_t longest);
+/// What must come of DOMAIN\user: a name, or the line that tells why not, also for want of room.
+struct Conversion {
+    std::optional<std::string> name;
+    std::optional<std::string> line;
+};
+Conversion ToNetBIOS(const std::string &name, std::size_t longest);
+
+/// For RequireLog.
+std::vector<std::string> Lines(const Conversion &conversion);
 
 }  // namespace Fuzz
 

@@ -31,7 +31,7 @@ Json::Value Claims(const std::string &part) {
 struct WebSphere : TAVO::SSO::WebSphereSSOClient {
     using WebSphereSSOClient::token;
 
-    static void Expected(const std::string &part, std::string &userName) {
+    static void Expected(const std::string &part, std::string &userName, std::vector<std::string> & /*log*/) {
         const std::optional<std::string> name = StringMember(Claims(part), "sub");
         if (!name) {
             throw std::invalid_argument("cannot find the user name!");
@@ -43,7 +43,7 @@ struct WebSphere : TAVO::SSO::WebSphereSSOClient {
 struct Azure : TAVO::SSO::AzureSSOClient {
     using AzureSSOClient::token;
 
-    static void Expected(const std::string &part, std::string &userName) {
+    static void Expected(const std::string &part, std::string &userName, std::vector<std::string> &log) {
         const Json::Value claims = Claims(part);
         const std::optional<std::string> unique = StringMember(claims, "unique_name");
         const std::optional<std::string> principal = unique ? unique : StringMember(claims, "email");
@@ -59,11 +59,12 @@ struct Azure : TAVO::SSO::AzureSSOClient {
             c = c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
         }
         userName = pieces[1] + "\\" + pieces[0];
-        const std::optional<std::string> converted = ToNetBIOS(userName, kLongestName);
-        if (!converted) {
+        const Conversion conversion = ToNetBIOS(userName, kLongestName);
+        log = Lines(conversion);
+        if (!conversion.name) {
             throw TAVO::SSO::sso_op_failed("TAVOWinsUserNameFqdn2Netbios failed.");
         }
-        userName = *converted;
+        userName = *conversion.name;
     }
 };
 
@@ -74,14 +75,15 @@ bool Names(const std::string &part) {
     std::string userName = "as it was";
     const Test::Failure failure = FailureOf([&] { client.GetUserName(userName); });
     std::string expected = "as it was";
-    RequireSame(failure, Test::FailureOf([&] { Client::Expected(part, expected); }));
+    std::vector<std::string> log;
+    RequireSame(failure, Test::FailureOf([&] { Client::Expected(part, expected, log); }));
     Require(userName == expected, "the name is told, also what is left of it after a failure");
 
     Json::Value info = "as it was";
     Json::Value claims = "as it was";
     RequireSame(FailureOf([&] { client.GetUserInfo(info); }), Test::FailureOf([&] { claims = Claims(part); }));
     Require(info == claims, "all claims are given, and none after a failure");
-    RequireLog({});
+    RequireLog(log);
     return failure == Test::kNothingThrown;
 }
 

@@ -79,9 +79,11 @@ bool Converts(const std::string &name, std::size_t size) {
     WriteDomainTable();
     Buffer buffer(size + 1);
     const int result = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.data(), size);
-    const std::optional<std::string> expected = AsText(ToNetBIOS(name, size), size);
+    const Conversion conversion = ToNetBIOS(name, size);
+    const std::optional<std::string> expected = AsText(conversion.name, size);
     Require((result >= 0) == expected.has_value(), "a name of a known domain is converted where it fits");
     buffer.Require(expected);
+    RequireLog(Lines(conversion));
     return result >= 0;
 }
 

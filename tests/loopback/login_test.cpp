@@ -15,6 +15,7 @@
 #include "jwt/jwt.h"
 #include "sso/sso.h"
 #include "tests/loopback/provider.h"
+#include "tests/support/conversion.h"
 #include "tests/support/encoding.h"
 #include "tests/support/files.h"
 #include "tests/support/server.h"
@@ -408,7 +409,8 @@ std::vector<TokenCase> Identity() {
         TokenCase("WithTwoAtSigns", azure, noName("alice")).Claims(R"({"unique_name": "alice@x@corp.example"})"),
         TokenCase("OfAnUnknownDomain", azure,
                   Refused<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed.", R"(ELSEWHERE.EXAMPLE\Alice)"))
-            .Claims(R"({"unique_name": "Alice@elsewhere.example"})"),
+            .Claims(R"({"unique_name": "Alice@elsewhere.example"})")
+            .Logs(UnknownDomain("ELSEWHERE.EXAMPLE")),
         TokenCase("SubjectBeforeEmail", webSphere, LoggedIn("alice")).Claims(R"({"email": "bob@corp.example"})"),
         TokenCase("EmptySubject", webSphere, LoggedIn("")).Claims(R"({"sub": ""})"),
         TokenCase("NoSubject", webSphere, notFound).Claims(R"({"sub": null, "email": "bob@corp.example"})"),

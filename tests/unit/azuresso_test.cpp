@@ -6,6 +6,7 @@
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"
+#include "tests/support/conversion.h"
 #include "tests/support/encoding.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
@@ -544,6 +545,7 @@ TEST_F(AzureIdentity, AnUnknownDomainFailsAndTheBackslashFormIsWritten) {
     EXPECT_EQ(NameOf(R"({"unique_name": "Alice@elsewhere.example"})"),
               Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
     EXPECT_EQ(userName, "ELSEWHERE.EXAMPLE\\Alice");
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(UnknownDomain("ELSEWHERE.EXAMPLE"))));
 }
 
 TEST_F(AzureIdentity, TheUserKeepsItsCaseWhileTheDomainIsUpperCased) {
@@ -573,6 +575,7 @@ TEST_F(AzureIdentity, TheDomainIsUpperCasedByTheGlobalLocale) {
               Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
     std::locale::global(before);
     EXPECT_EQ(userName, "cor#.exam#le\\pat");
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(UnknownDomain("cor#.exam#le"))));
 }
 
 TEST_F(AzureIdentity, AnEmptyUserIsHandedOnAsALoneBackslash) {

@@ -8,7 +8,10 @@
 #include <string>
 #include <vector>
 
+#include "tests/interposed/memory.h"
+#include "tests/support/conversion.h"
 #include "tests/support/files.h"
+#include "tests/support/system_log.h"
 
 namespace Test {
 
@@ -149,6 +152,7 @@ class DomainConversion : public testing::Test {
   protected:
     void SetUp() override {
         RemoveFiles();
+        TakeSystemLog();
         WriteFile(kDomainTable, R"({"corp.example.net": "ACME", "Lab.Example.Net": "LAB", "number": 5,
             "empty": ""})");
     }
@@ -161,7 +165,16 @@ class DomainConversion : public testing::Test {
             return "refused";
         }
         EXPECT_EQ(result, 0);
+        EXPECT_THAT(TakeSystemLog(), testing::IsEmpty());
         return buffer.Text();
+    }
+
+    /// Why a name was refused: the one line that was logged.
+    static std::string Refusal(const std::string &name, std::size_t size = 1023) {
+        EXPECT_EQ(Convert(name, size), "refused") << name;
+        const std::vector<LogLine> log = TakeSystemLog();
+        EXPECT_THAT(log, testing::SizeIs(1)) << name;
+        return log.size() == 1 && log[0].priority == LOG_ERR ? log[0].text : "logged otherwise";
     }
 };
 
@@ -172,36 +185,79 @@ TEST_F(DomainConversion, PutsTheNetBIOSNameInThePlaceOfTheDNSNameWithoutRegardTo
 }
 
 TEST_F(DomainConversion, KeepsTheUserAsItIs) {
-    EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\"), "ACME\\");
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\a\\b c"), "ACME\\a\\b c");
+    EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\\\"), "ACME\\\\");
 }
 
 TEST_F(DomainConversion, RefusesWhatTheTableDoesNotName) {
-    for (const char *name : {"ELSEWHERE.EXAMPLE\\alice", "CORP\\alice", "CORP.EXAMPLE.NET.\\alice", "\\alice", "alice",
-                             "", "NUMBER\\alice", "EMPTY\\alice"}) {
-        EXPECT_EQ(Convert(name), "refused") << name;
+    for (const char *domain :
+         {"ELSEWHERE.EXAMPLE", "CORP", "CORP.EXAMPLE.NET.", "CORP.EXAMPLE.NET ", "NUMBER", "EMPTY"}) {
+        EXPECT_EQ(Refusal(std::string(domain) + "\\alice"), UnknownDomain(domain));
     }
 }
 
+TEST_F(DomainConversion, RefusesANameWithoutADomainAndOneWithoutAUser) {
+    EXPECT_EQ(Refusal("alice"), "platform:N name without a domain");
+    EXPECT_EQ(Refusal(""), "platform:N name without a domain");
+    EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\"), "platform:N name of domain 'CORP.EXAMPLE.NET' without a user");
+}
+
 TEST_F(DomainConversion, RefusesEverythingWithoutATable) {
-    for (const char *table : {"", "[]", "{\"corp.example.net\": \"ACME\"", "5"}) {
+    for (const char *table : {"", "[]", "{\"corp.example.net\": \"ACME\"", "5", "[5]"}) {
         WriteFile(kDomainTable, table);
-        EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice"), "refused") << table;
+        EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), UnknownDomain("CORP.EXAMPLE.NET")) << table;
     }
     RemoveFiles();
-    EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice"), "refused");
+    EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), UnknownDomain("CORP.EXAMPLE.NET"));
+    WriteFile(std::string(kDomainTable) + "/file", "");
+    EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), UnknownDomain("CORP.EXAMPLE.NET")) << "a directory";
+}
+
+TEST_F(DomainConversion, RefusesEverythingWithATableThatIsNestedTooDeeply) {
+    WriteFile(kDomainTable, std::string(5000, '['));
+    EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), "platform:N memory ran out, or domains.conf is nested too deeply");
 }
 
 TEST_F(DomainConversion, FillsTheUsableSizeAndNoMore) {
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice", 10), "ACME\\alice");
-    EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice", 9), "refused");
-    EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice", 0), "refused");
+    EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice", 9), "platform:N name is too long for its buffer");
+    EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice", 0), "platform:N name is too long for its buffer");
 }
 
 TEST_F(DomainConversion, RefusesNullPointers) {
     char byte = 0;
     EXPECT_LT(TAVOWinsUserNameFqdn2Netbios(nullptr, &byte, 1), 0);
     EXPECT_LT(TAVOWinsUserNameFqdn2Netbios("CORP.EXAMPLE.NET\\alice", nullptr, 1), 0);
+    const LogLine line = Error("platform:N no name, or no buffer for it");
+    EXPECT_THAT(TakeSystemLog(), testing::ElementsAre(line, line));
+}
+
+TEST_F(DomainConversion, LogsADomainOnOneLineWhateverItHolds) {
+    EXPECT_EQ(Refusal("%s%n\n\t\x7f\xc3\xa9\\alice"), UnknownDomain("%s%n???\xc3\xa9"));
+    EXPECT_EQ(Refusal(std::string(3000, 'a') + "\\alice"), UnknownDomain(std::string(255, 'a')));
+}
+
+TEST_F(DomainConversion, IsRefusedWhereMemoryRunsOut) {
+    const std::string name = "CORP.EXAMPLE.NET\\alice";
+    int n = 1;
+    for (bool ranOut = true; ranOut; ++n) {
+        Buffer buffer(1023);
+        FailingAllocation failing(n, FailingAllocation::Of::kCxx, FailingAllocation::Until::kEver);
+        const int result = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.bytes.data(), buffer.size);
+        failing.Stop();
+        ranOut = failing.Happened();
+        const std::vector<LogLine> log = TakeSystemLog();
+        if (result == 0) {
+            EXPECT_EQ(buffer.Text(), "ACME\\alice");
+            EXPECT_THAT(log, testing::IsEmpty());
+        } else {
+            EXPECT_TRUE(ranOut);
+            EXPECT_TRUE(buffer.Untouched());
+            EXPECT_THAT(log,
+                        testing::ElementsAre(Error("platform:N memory ran out, or domains.conf is nested too deeply")));
+        }
+    }
+    EXPECT_GT(n, 5);
 }
 
 }  // namespace

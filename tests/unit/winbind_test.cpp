@@ -1,0 +1,322 @@
+// How the stand-in asks winbindd, where a real one cannot be had to do what is needed: this program defines the calls
+// of the question itself. A real winbindd is asked in tests/directory.
+#include <dlfcn.h>
+#include <fcntl.h>
+#include <gmock/gmock.h>
+#include <pthread.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <iterator>
+#include <string>
+
+#include "platform/platform.h"
+#include "tests/support/files.h"
+#include "tests/support/system_log.h"
+
+extern "C" {
+#include <wbclient.h>
+}
+
+namespace Test {
+
+namespace {
+
+int pipeError = 0;
+int forkError = 0;
+int forks = 0;
+
+/// What winbindd answers; runs in the process that asks.
+wbcErr (*answer)(const char *domain, struct wbcDomainInfo &information) = nullptr;
+
+char dnsName[1000];
+char shortName[1000];
+
+wbcErr AnswerACME(const char * /*domain*/, struct wbcDomainInfo &information) {
+    std::strcpy(dnsName, "corp.example.net");
+    std::strcpy(shortName, "ACME");
+    information.dns_name = dnsName;
+    information.short_name = shortName;
+    return WBC_ERR_SUCCESS;
+}
+
+[[noreturn]] void WaitForEver() {
+    for (;;) {
+        pause();
+    }
+}
+
+void Ignore(int /*signal*/) {}
+
+std::ptrdiff_t OpenDescriptors() { return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {}); }
+
+/// Those that a program gets that this one starts.
+std::ptrdiff_t DescriptorsForPrograms() {
+    return std::count_if(std::filesystem::directory_iterator("/proc/self/fd"), {}, [](const auto &entry) {
+        const int flags = fcntl(std::atoi(entry.path().filename().c_str()), F_GETFD);
+        return flags >= 0 && (flags & FD_CLOEXEC) == 0;
+    });
+}
+
+/// Collects the children that are left: what comes of waiting for any is ECHILD where there is none.
+int ErrorOfWaiting() {
+    errno = 0;
+    return waitpid(-1, nullptr, WNOHANG) < 0 ? errno : 0;
+}
+
+/// What a host does with a signal, for as long as this lives.
+class Disposition {
+  public:
+    Disposition(int signal, void (*handler)(int), int flags = 0) : signal_(signal) {
+        struct sigaction action {};
+        action.sa_handler = handler;
+        action.sa_flags = flags;
+        sigaction(signal, &action, &before_);
+    }
+    ~Disposition() { sigaction(signal_, &before_, nullptr); }
+    Disposition(const Disposition &) = delete;
+    Disposition &operator=(const Disposition &) = delete;
+
+  private:
+    int signal_;
+    struct sigaction before_ {};
+};
+
+class Question : public testing::Test {
+  protected:
+    void SetUp() override {
+        RemoveFiles();
+        TakeSystemLog();
+        answer = AnswerACME;
+        pipeError = forkError = forks = 0;
+        descriptors_ = OpenDescriptors();
+    }
+    void TearDown() override {
+        EXPECT_EQ(OpenDescriptors(), descriptors_);
+        EXPECT_EQ(ErrorOfWaiting(), ECHILD) << "a child is left";
+    }
+
+    /// The converted name, or the one line that was logged, without its beginning.
+    static std::string Convert(const std::string &domain = "CORP.EXAMPLE.NET") {
+        char buffer[1024] = "untouched";
+        const int result = TAVOWinsUserNameFqdn2Netbios((domain + "\\alice").c_str(), buffer, sizeof buffer - 1);
+        const std::vector<LogLine> log = TakeSystemLog();
+        if (result == 0) {
+            EXPECT_THAT(log, testing::IsEmpty());
+            return buffer;
+        }
+        EXPECT_STREQ(buffer, "untouched");
+        EXPECT_LT(result, 0);
+        EXPECT_THAT(log, testing::SizeIs(1));
+        const std::string beginning = "platform:N domain '" + domain + "' is not in domains.conf, and winbindd ";
+        EXPECT_EQ(log[0].text.substr(0, beginning.size()), beginning);
+        return log[0].text.substr(beginning.size());
+    }
+
+  private:
+    std::ptrdiff_t descriptors_ = 0;
+};
+
+TEST_F(Question, GivesTheNameAsTheDirectorySpellsIt) {
+    EXPECT_EQ(Convert(), "ACME\\alice");
+    EXPECT_EQ(Convert("Corp.Example.Net"), "ACME\\alice");
+    EXPECT_EQ(forks, 2);
+}
+
+TEST_F(Question, IsNotAskedAboutADomainOfTheTableNorAboutNone) {
+    WriteFile(kDomainTable, R"({"corp.example.net": "TABLE"})");
+    EXPECT_EQ(Convert(), "TABLE\\alice");
+    EXPECT_EQ(Convert(""), "does not know it");
+    EXPECT_EQ(forks, 0);
+}
+
+TEST_F(Question, TakesTheAnswerForTheDNSNameThatWasAskedForAlone) {
+    EXPECT_EQ(Convert("ACME"), "does not know it");
+    EXPECT_EQ(Convert("CORP"), "does not know it");
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        AnswerACME(domain, information);
+        dnsName[0] = '\0';  // BUILTIN, and the machine's own domain
+        return WBC_ERR_SUCCESS;
+    };
+    EXPECT_EQ(Convert("BUILTIN"), "does not know it");
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        AnswerACME(domain, information);
+        information.dns_name = nullptr;
+        return WBC_ERR_SUCCESS;
+    };
+    EXPECT_EQ(Convert(), "does not know it");
+}
+
+TEST_F(Question, TakesNoAnswerWithoutANameOrWithOneThatIsNone) {
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        AnswerACME(domain, information);
+        shortName[0] = '\0';
+        return WBC_ERR_SUCCESS;
+    };
+    EXPECT_EQ(Convert(), "does not know it");
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        AnswerACME(domain, information);
+        std::memset(shortName, 'A', sizeof shortName - 1);
+        return WBC_ERR_SUCCESS;
+    };
+    EXPECT_EQ(Convert(), "does not know it");
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        AnswerACME(domain, information);
+        std::memset(dnsName, 'a', sizeof dnsName - 1);
+        return WBC_ERR_SUCCESS;
+    };
+    EXPECT_EQ(Convert(std::string(255, 'a')), "does not know it");
+}
+
+TEST_F(Question, TellsEachFailureOfLibwbclient) {
+    answer = [](const char *, struct wbcDomainInfo &) { return WBC_ERR_DOMAIN_NOT_FOUND; };
+    EXPECT_EQ(Convert(), "does not know it");
+    answer = [](const char *, struct wbcDomainInfo &) { return WBC_ERR_WINBIND_NOT_AVAILABLE; };
+    EXPECT_EQ(Convert(), "is not available");
+    answer = [](const char *, struct wbcDomainInfo &) { return WBC_ERR_NO_MEMORY; };
+    EXPECT_EQ(Convert(), "cannot be asked: WBC_ERR_NO_MEMORY");
+}
+
+TEST_F(Question, FailsWithoutAPipeOrAChildAndTellsWhy) {
+    pipeError = EMFILE;
+    EXPECT_EQ(Convert(), "cannot be asked: Too many open files");
+    EXPECT_EQ(forks, 0);
+    pipeError = 0;
+    forkError = EAGAIN;
+    EXPECT_EQ(Convert(), "cannot be asked: Resource temporarily unavailable");
+}
+
+TEST_F(Question, EndsUnansweredWhereTheChildCrashes) {
+    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { _exit(0); };
+    EXPECT_EQ(Convert(), "does not answer");
+    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr {
+        raise(SIGKILL);
+        return WBC_ERR_SUCCESS;
+    };
+    EXPECT_EQ(Convert(), "does not answer");
+}
+
+// No clock is looked at in these: without its alarm the child would wait for ever, and the test with it.
+
+TEST_F(Question, EndsByTheChildsAlarm) {
+    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForEver(); };
+    EXPECT_EQ(Convert(), "does not answer");
+}
+
+TEST_F(Question, EndsByTheChildsAlarmWhereTheHostCatchesAndBlocksItsOwn) {
+    const Disposition caught(SIGALRM, Ignore);
+    sigset_t alarms;
+    sigset_t before;
+    sigemptyset(&alarms);
+    sigaddset(&alarms, SIGALRM);
+    pthread_sigmask(SIG_BLOCK, &alarms, &before);
+    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForEver(); };
+    EXPECT_EQ(Convert(), "does not answer");
+    pthread_sigmask(SIG_SETMASK, &before, nullptr);
+}
+
+TEST_F(Question, LeavesTheHostsOwnAlarmAlone) {
+    alarm(1000);
+    EXPECT_EQ(Convert(), "ACME\\alice");
+    EXPECT_GT(alarm(0), 0U);
+}
+
+TEST_F(Question, IsAnsweredWhereTheHostHasItsChildrenCollected) {
+    {
+        const Disposition ignored(SIGCHLD, SIG_IGN);
+        EXPECT_EQ(Convert(), "ACME\\alice");
+    }
+    const Disposition collected(SIGCHLD, [](int) {
+        while (waitpid(-1, nullptr, WNOHANG) > 0) {
+        }
+    });
+    for (int i = 0; i < 20; ++i) {
+        EXPECT_EQ(Convert(), "ACME\\alice");
+    }
+}
+
+TEST_F(Question, IsAnsweredWhereTheHostIsInterruptedWhileItWaits) {
+    const Disposition caught(SIGUSR1, Ignore);
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        for (int i = 0; i < 20; ++i) {
+            kill(getppid(), SIGUSR1);
+        }
+        return AnswerACME(domain, information);
+    };
+    EXPECT_EQ(Convert(), "ACME\\alice");
+}
+
+TEST_F(Question, IsNotTurnedByTheEnvironment) {
+    setenv("_NO_WINBINDD", "1", 1);
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        return std::getenv("_NO_WINBINDD") == nullptr && std::getenv("PATH") == nullptr
+                   ? AnswerACME(domain, information)
+                   : WBC_ERR_DOMAIN_NOT_FOUND;
+    };
+    EXPECT_EQ(Convert(), "ACME\\alice");
+    EXPECT_STREQ(std::getenv("_NO_WINBINDD"), "1") << "the host's own environment";
+    unsetenv("_NO_WINBINDD");
+}
+
+TEST_F(Question, LeavesNoDescriptorToAProgramThatTheHostStarts) {
+    static std::ptrdiff_t before;
+    before = DescriptorsForPrograms();
+    answer = [](const char *domain, struct wbcDomainInfo &information) {
+        return DescriptorsForPrograms() == before ? AnswerACME(domain, information) : WBC_ERR_DOMAIN_NOT_FOUND;
+    };
+    EXPECT_EQ(Convert(), "ACME\\alice");
+}
+
+TEST_F(Question, RunsNothingOfTheHostsEndInTheChild) {
+    static pid_t host;
+    host = getpid();
+    std::atexit([] {
+        if (getpid() != host) {
+            kill(host, SIGKILL);
+        }
+    });
+    EXPECT_EQ(Convert(), "ACME\\alice");
+}
+
+}  // namespace
+
+template <typename Function>
+Function *Next(const char *name) {
+    return reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name));
+}
+
+}  // namespace Test
+
+extern "C" {
+
+int pipe2(int ends[2], int flags) noexcept {
+    if (Test::pipeError != 0) {
+        errno = Test::pipeError;
+        return -1;
+    }
+    return Test::Next<int(int *, int)>("pipe2")(ends, flags);
+}
+
+pid_t fork() noexcept {
+    if (Test::forkError != 0) {
+        errno = Test::forkError;
+        return -1;
+    }
+    ++Test::forks;
+    return Test::Next<pid_t()>("fork")();
+}
+
+wbcErr wbcDomainInfo(const char *domain, struct wbcDomainInfo **information) {
+    *information = new struct wbcDomainInfo();
+    return Test::answer(domain, **information);
+}
+
+void wbcFreeMemory(void *memory) { delete static_cast<struct wbcDomainInfo *>(memory); }
+
+}  // extern "C"
