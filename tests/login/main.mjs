@@ -1,32 +1,11 @@
 // Signs users in at a real OpenID provider through the front end, or serves both until it is ended. Runs as root of
 // private namespaces; see `run`.
 import assert from 'node:assert/strict';
-import {copyFileSync, readFileSync, rmSync} from 'node:fs';
+import {copyFileSync, rmSync} from 'node:fs';
 
-import {useProfile, writeSettings} from '../site/appliance.mjs';
-import {makeUsers, startSite} from '../site/site.mjs';
-import {Report} from './report.mjs';
-import {Walk} from './walk.mjs';
-
-const USERS = {alice: 'alice@corp.example.net', bob: 'bob@corp.example.net', carol: 'carol@elsewhere.example.org'};
-
-async function startEverything(webroot, nodeModules) {
-    const asked = [];
-    const report = new Report();
-    const site = await startSite({
-        webroot,
-        nodeModules,
-        users: makeUsers(USERS),
-        onRequest(request) {
-            asked.push(request);
-            report.applianceAsked(request);
-        },
-        onLog: (line) => report.logged(line),
-    });
-    report.nameSite(site.origin, 'appliance');
-    report.nameSite(site.provider.address, 'provider');
-    return {...site, asked, report};
-}
+import {Controller} from '../directory/controller.mjs';
+import {useProfile, writeDomains, writeSettings} from '../site/appliance.mjs';
+import {makeWalk, startEverything} from './stage.mjs';
 
 async function walkAzure(walk, report) {
     useProfile('azure');
@@ -92,15 +71,7 @@ async function walkReadmeProgram(walk, report, {provider, clients}) {
 
 async function walkEverything(running) {
     const {report} = running;
-    const walk = new Walk({
-        origin: running.origin,
-        provider: running.provider.address,
-        passwords: new Map([...running.users].map(([login, {password}]) => [login, password])),
-        authority: readFileSync(running.authority),
-        asked: running.asked,
-        log: running.log,
-        report,
-    });
+    const walk = makeWalk(running);
     const azureUser = await walkAzure(walk, report);
     const websphereUser = await walkWebsphere(walk, report);
     await walkReadmeProgram(walk, report, running);
@@ -127,11 +98,27 @@ async function serve(running, profile, authorityFile) {
     rmSync(authorityFile);
 }
 
-const [webroot, nodeModules, profile, authorityFile] = process.argv.slice(2);
+/** The same walk, on a machine whose domain is known to its directory and to no file. */
+async function walkWithDirectory(running) {
+    const controller = await Controller.start();
+    try {
+        running.report.title(`A domain controller of CORP.EXAMPLE.NET, NetBIOS name ACME, runs after ${controller.seconds} s`);
+        writeDomains({});
+        running.report.fact('domains.conf names no domain: winbindd is asked');
+        await walkEverything(running);
+        running.report.fact('directory  CORP.EXAMPLE.NET is ACME, as winbindd told; domains.conf is empty');
+    } finally {
+        await controller.stop();
+    }
+}
+
+const [webroot, nodeModules, mode, authorityFile] = process.argv.slice(2);
 const running = await startEverything(webroot, nodeModules);
 try {
-    if (profile) {
-        await serve(running, profile, authorityFile);
+    if (mode === 'directory') {
+        await walkWithDirectory(running);
+    } else if (mode) {
+        await serve(running, mode, authorityFile);
     } else {
         await walkEverything(running);
     }

@@ -1,0 +1,51 @@
+// Converts the names on its standard input, one on each line, and tells in a line of JSON what came of each: the name,
+// or null, and the lines that were logged.
+//
+//   convert [UID]      as an ordinary user, where one is told
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <iostream>
+#include <string>
+
+#include "platform/platform.h"
+#include "tests/support/system_log.h"
+#include "tests/support/token.h"
+
+namespace {
+
+constexpr char kMark = '#';
+
+Json::Value Convert(const std::string &name) {
+    std::string buffer(1024, kMark);
+    const std::string untouched = buffer;
+    const int result = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.data(), buffer.size() - 1);
+    Json::Value told;
+    if (result >= 0) {
+        told["name"] = buffer.c_str();
+    } else {
+        told["name"] = buffer == untouched ? Json::Value() : Json::Value("the buffer is not as it was");
+    }
+    told["log"] = Json::Value(Json::arrayValue);
+    for (const Test::LogLine &line : Test::TakeSystemLog()) {
+        told["log"].append(line.text);
+    }
+    return told;
+}
+
+}  // namespace
+
+int main(int argc, char **argv) {
+    if (argc == 2) {
+        const auto id = static_cast<uid_t>(std::strtoul(argv[1], nullptr, 10));
+        if (setresgid(id, id, id) != 0 || setresuid(id, id, id) != 0) {
+            std::cerr << std::strerror(errno) << std::endl;
+            return 1;
+        }
+    }
+    for (std::string name; std::getline(std::cin, name);) {
+        std::cout << Test::Compact(Convert(name)) << std::endl;
+    }
+}
