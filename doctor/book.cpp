@@ -127,7 +127,8 @@ void ReadRows(const char *guide, std::vector<Row> &rows) {
             }
             for (const std::string &text : TextsOf(cells.front())) {
                 explanation.about = text;
-                rows.push_back({kind, PatternOf(text, *kind), explanation});
+                // A provider need not describe its error, and the word before that takes whatever comes.
+                rows.push_back({kind, PatternOf(boost::erase_last_copy(text, " (DESCRIPTION)"), *kind), explanation});
             }
         }
     }

@@ -1,7 +1,7 @@
 #include "doctor/client.h"
 
 #include "doctor/watch.h"
-#include "frontend/failure.h"
+#include "frontend/text.h"
 
 namespace Doctor {
 
@@ -42,6 +42,16 @@ std::optional<std::string> RefusalOfProfile() {
     return isAccepted ? std::nullopt : std::optional(refusal);
 }
 
-std::string TextOf(const std::exception &failure) { return Frontend::ReasonOf(failure); }
+std::string ErrorText(const Json::Value &answer) {
+    const std::string error = Frontend::StringMember(answer, "error");
+    const std::string description = Frontend::StringMember(answer, "error_description");
+    return "The provider refused: " + (error.empty() ? "unknown error" : error) +
+           (description.empty() ? "" : " (" + description + ")");
+}
+
+std::string TextOf(const std::exception &failure) {
+    const std::string text = failure.what();
+    return text.empty() || text.front() != '{' ? text : ErrorText(Frontend::ParseObject(text));
+}
 
 }  // namespace Doctor

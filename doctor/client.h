@@ -55,6 +55,10 @@ class Client {
 /// nothing where it goes on.
 std::optional<std::string> RefusalOfProfile();
 
+/// What "error" and "error_description" of an answer tell, in the front end's words. It is as long as they are: of a
+/// secret in them that was cut, the rest could not be found and hidden any more.
+std::string ErrorText(const Json::Value &answer);
+
 /// What an exception of the library says. An error answer of the provider, which may hold anything, is reduced to the
 /// members that tell of the error (RFC 6749, section 5.2).
 std::string TextOf(const std::exception &failure);

@@ -12,6 +12,9 @@ namespace Doctor {
 /// Counts up when a member of the JSON is taken away or changes its meaning. One more member or id does not change it.
 constexpr int kJsonVersion = 1;
 
+/// On one line, and of characters alone that a terminal shows and does not obey. What is none in UTF-8 is replaced.
+std::string Printable(const std::string &text);
+
 /// On standard output.
 void WriteJson(const Json::Value &json);
 

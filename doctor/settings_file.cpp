@@ -8,8 +8,8 @@
 #include <cerrno>
 #include <cstring>
 #include <fstream>
-#include <iterator>
 #include <numeric>
+#include <sstream>
 
 namespace Doctor {
 
@@ -84,8 +84,9 @@ std::string ProblemOf(const std::string &text, Json::Value &content) {
 SettingsFile ReadSettingsFile(const std::string &path) {
     SettingsFile file{path, Json::Value(), "", ""};
     errno = 0;
-    std::ifstream stream(path, std::ios::binary);
-    const std::string text{std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+    const std::ifstream stream(path, std::ios::binary);
+    std::ostringstream content;
+    content << stream.rdbuf();  // which throws nothing where it is a directory
     if (errno != 0) {
         const bool isMissing = errno == ENOENT;
         file.problem = path + (isMissing ? " is missing" : std::string(" cannot be read: ") + std::strerror(errno));
@@ -94,11 +95,9 @@ SettingsFile ReadSettingsFile(const std::string &path) {
                       : "look at what it is, who owns it, and who may read it: ls -l " + path;
         return file;
     }
-    Json::Value content;
-    const std::string problem = ProblemOf(text, content);
-    if (problem.empty()) {
-        file.content = content;
-    } else {
+    const std::string problem = ProblemOf(content.str(), file.content);
+    if (!problem.empty()) {
+        file.content = Json::Value();
         file.problem = path + " " + problem;
         file.remedy = "mend the file at that place; the library treats it as if it were missing";
     }
