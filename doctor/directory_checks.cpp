@@ -1,7 +1,6 @@
 // The conversion of domain names: the platform's table, and whatever it asks beside that.
 #include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>
-#include <boost/algorithm/string/join.hpp>
 #include <boost/algorithm/string/predicate.hpp>
 #include <filesystem>
 
@@ -26,12 +25,13 @@ Conversion Convert(Report &report, const std::string &domain) {
     // As a login asks: the domain in capitals, the room for the NUL not counted.
     const std::string name = boost::to_upper_copy(domain) + kUser;
     const bool isConverted = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer, sizeof buffer - 1) >= 0;
-    const std::vector<std::string> lines = TakeLogLines();
-    for (const std::string &line : lines) {
+    std::string log;
+    for (const std::string &line : TakeLogLines()) {
         report.Detail("log: " + line);
+        log += (log.empty() ? "" : "; ") + MessageOf(line);
     }
     const std::string converted = buffer;
-    return {isConverted ? converted.substr(0, converted.find('\\')) : "", boost::join(lines, "; ")};
+    return {isConverted ? converted.substr(0, converted.find('\\')) : "", log};
 }
 
 bool IsInTable(const Json::Value &table, const std::string &domain) {
@@ -59,7 +59,9 @@ SettingsFile CheckTable(Report &report) {
             return table;
         }
     }
-    report.Good(kID, kSubject, std::string(kDomainTable) + " has " + std::to_string(table.content.size()) + " domains");
+    report.Good(kID, kSubject,
+                std::string(kDomainTable) + " has " + std::to_string(table.content.size()) +
+                    (table.content.size() == 1 ? " domain" : " domains"));
     return table;
 }
 

@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <boost/algorithm/string/trim.hpp>
+#include <csignal>
 #include <iostream>
 #include <string>
 
@@ -12,7 +13,6 @@
 #include "doctor/settings_file.h"
 #include "doctor/watch.h"
 #include "frontend/cgi.h"
-#include "frontend/failure.h"
 #include "frontend/id_token.h"
 #include "frontend/text.h"
 
@@ -24,28 +24,44 @@ namespace {
 /// end.
 class SilentTerminal {
   public:
-    SilentTerminal() : isTerminal_(tcgetattr(STDIN_FILENO, &before_) == 0) {
+    SilentTerminal() : isTerminal_(tcgetattr(STDIN_FILENO, &before) == 0) {
         if (isTerminal_) {
-            termios silent = before_;
+            for (const int signal : kEnds) {
+                std::signal(signal, RestoreAndEnd);
+            }
+            termios silent = before;
             silent.c_lflag &= ~static_cast<tcflag_t>(ECHO | ICANON);
             tcsetattr(STDIN_FILENO, TCSANOW, &silent);
         }
     }
     ~SilentTerminal() {
         if (isTerminal_) {
-            tcsetattr(STDIN_FILENO, TCSANOW, &before_);
+            tcsetattr(STDIN_FILENO, TCSANOW, &before);
+            for (const int signal : kEnds) {
+                std::signal(signal, SIG_DFL);
+            }
         }
     }
     SilentTerminal(const SilentTerminal &) = delete;
     SilentTerminal &operator=(const SilentTerminal &) = delete;
 
   private:
-    termios before_{};
+    static constexpr int kEnds[] = {SIGHUP, SIGINT, SIGQUIT, SIGTERM};
+
+    /// Whoever gives up wants to see what they type next.
+    static void RestoreAndEnd(int signal) {
+        tcsetattr(STDIN_FILENO, TCSANOW, &before);
+        std::signal(signal, SIG_DFL);
+        std::raise(signal);
+    }
+
+    static termios before;  // of the one terminal that there is
     bool isTerminal_;
 };
 
+termios SilentTerminal::before{};
+
 std::string ReadAddress() {
-    const SilentTerminal silent;
     std::string address;
     std::getline(std::cin, address);
     return boost::trim_copy(address);
@@ -71,11 +87,7 @@ class LoginWalk {
     bool Run() {
         report_.Section("Login");
         const std::string uri = client_.AuthorizationURI(Json::objectValue);
-        report_.Say("Open this address in a browser, and sign in:\n\n  " + uri +
-                    "\n\nThe provider then sends the browser to " + client_->GetRedirectURI() +
-                    ".\nCopy the whole address that it was sent to, with the code in it, before the page there answers"
-                    "\n(the browser's network tools show it), paste it here, and press Enter. It is not shown.\n");
-        const std::string address = ReadAddress();
+        const std::string address = AskForAddress(uri);
         if (address.empty()) {
             return false;
         }
@@ -87,15 +99,25 @@ class LoginWalk {
     }
 
   private:
+    std::string AskForAddress(const std::string &uri) {
+        const SilentTerminal silent;  // before it is asked for: someone may be quick
+        report_.Say("Open this address in a browser, and sign in:\n\n  " + Printable(uri) +
+                    "\n\nThe provider then sends the browser to " + Printable(client_->GetRedirectURI()) +
+                    ".\nCopy the whole address that it was sent to, with the code in it, before the page there answers"
+                    "\n(the browser's network tools show it), paste it here, and press Enter. It is not shown.\n");
+        return ReadAddress();
+    }
+
     bool CheckAnswer(const Frontend::Parameters &answer, const std::string &state) {
         const std::string error = Frontend::OnlyValue(answer, "error").value_or("");
         const auto code = Frontend::OnlyValue(answer, "code");
         report_.Hide(code.value_or(""));
         if (!error.empty()) {
-            report_.Finding(
-                "login.answer", "answer of the provider",
-                Frontend::ProviderError(error, Frontend::OnlyValue(answer, "error_description").value_or("")),
-                "look for this error in the provider's documentation");
+            Json::Value told;
+            told["error"] = error;
+            told["error_description"] = Frontend::OnlyValue(answer, "error_description").value_or("");
+            report_.Finding("login.answer", "answer of the provider", ErrorText(told),
+                            "look for this error in the provider's documentation");
             return false;
         }
         if (!code || code->empty()) {
@@ -120,7 +142,7 @@ class LoginWalk {
         client_->RequestTokenEndpoint(response, client_->GetIDTokenReqParams());
         std::string log;
         for (const std::string &line : TakeLogLines()) {
-            log += "; " + line;
+            log += "; " + MessageOf(line);
         }
         try {
             client_->ProcessTokenResponse(response);
@@ -138,10 +160,10 @@ class LoginWalk {
 
     static std::string FoundIn(const std::string &response) {
         const Json::Value answer = Frontend::ParseObject(response);
-        return response.empty()    ? "no answer"
-               : answer.isObject() ? Frontend::ProviderError(Frontend::StringMember(answer, "error"),
-                                                             Frontend::StringMember(answer, "error_description"))
-                                   : "the answer is no JSON";
+        return response.empty()            ? "no answer"
+               : !answer.isObject()        ? "the answer is no JSON"
+               : !answer.isMember("error") ? "the answer has no \"id_token\", and tells of no error"
+                                           : ErrorText(answer);
     }
 
     void CheckNonce(const std::string &token, const std::string &nonce) {

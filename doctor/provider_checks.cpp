@@ -4,6 +4,7 @@
 #include <boost/algorithm/string/predicate.hpp>
 #include <cmath>
 #include <iterator>
+#include <set>
 #include <vector>
 
 #include "doctor/address.h"
@@ -12,7 +13,6 @@
 #include "doctor/key_set.h"
 #include "doctor/settings_file.h"
 #include "doctor/watch.h"
-#include "frontend/failure.h"
 #include "frontend/text.h"
 
 namespace Doctor {
@@ -85,8 +85,9 @@ class ProviderCheck {
         if (transfer.result != CURLE_OK) {
             const std::string text = curl_easy_strerror(transfer.result);
             const std::string cause = CauseOf(text);
-            report_.Finding(id + ".reachable", subject, transfer.url + ": " + text,
-                            cause.empty() ? "ask from this machine: curl -v " + transfer.url : cause);
+            report_.Finding(id + ".reachable", subject,
+                            transfer.url + ": " + text + (cause.empty() ? "" : " (" + cause + ")"),
+                            "see what this machine gets from there: curl -v " + transfer.url);
             if (transfer.result == CURLE_PEER_FAILED_VERIFICATION) {
                 ExplainRefusedCertificate(id, transfer.url);
             }
@@ -124,6 +125,9 @@ class ProviderCheck {
                                             [](const auto &a, const auto &b) { return a.expires < b.expires; });
         const long left = first->expires - std::time(nullptr);
         const std::string found = Describe(*first) + ", " + std::to_string(left / kDay) + " days left";
+        if (!toldCertificates_.insert(found).second) {
+            return;  // one server mostly has it all
+        }
         if (left < kSoon) {
             report_.Finding(id + ".certificate", "certificate of the server", found,
                             "the provider has to renew it: from that day on every login fails");
@@ -176,7 +180,8 @@ class ProviderCheck {
         CheckEndpoint("authorization_endpoint", client_->GetAuthEndpoint());
         CheckEndpoint("token_endpoint", client_->GetTokenEndpoint());
         if (!client_->GetLogoutEndpoint().empty()) {
-            CheckEndpoint("end_session_endpoint", client_->GetLogoutEndpoint());
+            // An organisation may have a page of its own for it.
+            CheckEndpoint("end_session_endpoint", client_->GetLogoutEndpoint(), Mark::kNote);
         }
         CheckOffer("id_token_signing_alg_values_supported", "discovery.algorithms", "signatures of tokens",
                    client_.Azure() != nullptr ? std::vector<std::string>{"RS256", "RS384", "RS512"}
@@ -201,7 +206,7 @@ class ProviderCheck {
         }
     }
 
-    void CheckEndpoint(const std::string &member, const std::string &configured) {
+    void CheckEndpoint(const std::string &member, const std::string &configured, Mark mark = Mark::kFinding) {
         const std::string published = Frontend::StringMember(discovery_, member.c_str());
         const std::string id = "discovery." + member;
         if (published.empty()) {
@@ -209,9 +214,9 @@ class ProviderCheck {
         } else if (published == configured) {
             report_.Good(id, member, "as configured");
         } else {
-            report_.Finding(id, member,
-                            "the provider publishes " + Quoted(published) + ", the file has " + Quoted(configured),
-                            "take the provider's, unless you know better");
+            report_.Add({id, member, mark,
+                         "the provider publishes " + Quoted(published) + ", the file has " + Quoted(configured),
+                         "take the provider's, unless you know better", ""});
         }
     }
 
@@ -276,7 +281,7 @@ class ProviderCheck {
                     LibraryOn(response)};
         const Json::Value answer = Frontend::ParseObject(response);
         const std::string error = Frontend::StringMember(answer, "error");
-        check.found = Frontend::ProviderError(error, Frontend::StringMember(answer, "error_description"));
+        check.found = ErrorText(answer);
         if (!answer.isObject()) {
             check.found = "the answer is no JSON: HTTP " + std::to_string(transfer.status);
             check.remedy = "compare the address with the provider's";
@@ -315,6 +320,7 @@ class ProviderCheck {
     Client &client_;
     Json::Value discovery_;
     bool knowsClock_ = false;
+    std::set<std::string> toldCertificates_;
 };
 
 }  // namespace

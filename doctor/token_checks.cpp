@@ -65,8 +65,7 @@ std::string Describe(const Json::Value &object, const char *name) {
     if (!object.isObject() || !object.isMember(name)) {
         return "missing";
     }
-    const Json::Value &member = object[name];
-    return Frontend::OneLine(Frontend::WriteCompact(member));
+    return Frontend::WriteCompact(object[name]);
 }
 
 std::string TimeOf(std::time_t time) {
@@ -248,7 +247,7 @@ class TokenCheck {
         client_.Azure()->RequestKeysInfo(TextOfMember(discovery, "jwks_uri"), keySet);
         std::string found = Describe(header_, "kid");
         for (const std::string &line : TakeLogLines()) {
-            found += "; " + line;
+            found += "; " + MessageOf(line);
         }
         Json::Value named;
         const Json::Value keys = keySet.isObject() ? keySet["keys"] : Json::Value();
@@ -306,11 +305,12 @@ class TokenCheck {
 
     void CheckUserName() {
         const bool isAzure = client_.Azure() != nullptr;
-        const char *claim = !isAzure                                                  ? "sub"
-                            : claims_.isObject() && claims_["unique_name"].isString() ? "unique_name"
-                                                                                      : "email";
-        const std::string name = Frontend::StringMember(claims_, claim);
-        const bool isText = claims_.isObject() && claims_[claim].isString();
+        const Json::Value &claims = claims_;  // a look at one that can be changed would put what is missing into it
+        const char *claim = !isAzure                                                ? "sub"
+                            : claims.isObject() && claims["unique_name"].isString() ? "unique_name"
+                                                                                    : "email";
+        const std::string name = Frontend::StringMember(claims, claim);
+        const bool isText = claims.isObject() && claims[claim].isString();
         const bool hasForm = isText && (!isAzure || std::count(name.begin(), name.end(), '@') == 1);
         Step("token.user_name", "user name: \"" + std::string(claim) + "\"", hasForm, Describe(claims_, claim),
              isAzure ? R"(the provider has to send "unique_name" or "email" in the form user@domain)"
@@ -332,7 +332,7 @@ class TokenCheck {
             found = "is not known here";
         }
         for (const std::string &line : TakeLogLines()) {
-            found += "; " + line;
+            found += "; " + MessageOf(line);
         }
         Step("token.domain", isAzure ? "domain of the user" : "user", isGood, found,
              "join the domain, or write it into /usr/tavo/etc/domains.conf");

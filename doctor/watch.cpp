@@ -8,7 +8,7 @@
 #include <cstdio>
 #include <utility>
 
-#include "frontend/text.h"
+#include "doctor/report.h"
 
 namespace Doctor {
 
@@ -68,7 +68,7 @@ class Progress {
   public:
     explicit Progress(const std::string &url) {
         if (rules.showProgress) {
-            std::fprintf(stderr, "\r\033[K       asking %s ...", Frontend::OneLine(url).c_str());
+            std::fprintf(stderr, "\r\033[K       asking %s ...", Printable(url).c_str());
         }
     }
     ~Progress() {
@@ -112,6 +112,11 @@ void AddLogLine(const char *format, std::va_list arguments) {
 }  // namespace
 
 std::vector<std::string> TakeLogLines() { return std::exchange(logLines, {}); }
+std::string MessageOf(const std::string &logLine) {
+    const std::size_t blank = logLine.find(' ');
+    return blank == std::string::npos ? logLine : logLine.substr(blank + 1);
+}
+
 std::vector<Transfer> TakeTransfers() { return std::exchange(transfers, {}); }
 void SetTransferRules(const TransferRules &newRules) { rules = newRules; }
 

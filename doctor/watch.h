@@ -29,6 +29,9 @@ struct Transfer {
 /// The lines that would have gone to the system's log, since they were last taken.
 std::vector<std::string> TakeLogLines();
 
+/// A line without the source and its line, which tell an administrator nothing.
+std::string MessageOf(const std::string &logLine);
+
 /// The transfers since they were last taken.
 std::vector<Transfer> TakeTransfers();
 

@@ -12,7 +12,7 @@ const ELSEWHERE = new Map([
 // What a span of text begins with that is a command, or what follows a command's name: an option. A file's name alone
 // is none.
 const COMMAND = new RegExp('^(?:\\./|(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|lintian|ls|' +
-    'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|ulimit|xargs) |tests/\\w+/\\w+ |' +
+    'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|tavosso-doctor|ulimit|xargs) |tests/\\w+/\\w+ |' +
     'tools/[\\w-]+ |[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
 
 /** Commands within the text that cannot be run to the letter, and what is run for them. */
@@ -34,6 +34,10 @@ const FILLED_IN = new Map([
         'lighty-enable-mod tavosso-frontend && lighty-disable-mod tavosso-frontend'],
     ['clang-format -i FILE', 'clang-format -i sso/sso.cpp'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
+    ['man tavosso-doctor', 'man ./docs/man/tavosso-doctor.8'],
+    ['tavosso-doctor explain TEXT', '/usr/local/sbin/tavosso-doctor explain "profile not support."'],
+    ['sudo tavosso-doctor --domain corp.example.net',
+        'tavosso-doctor --domain corp.example.net || [ $? = 1 ]'], // no profile is set up there
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
 ]);
@@ -47,6 +51,9 @@ const NOT_HERE = new Map([
     ['git tag -a vVERSION', 'by hand'],
     ['node tests/mutation/run.mjs', 'by hand: an hour'],
     ['openssl s_server -www', 'tells how a figure was measured'],
+    ['sudo tavosso-doctor login', 'asks a person: tests/doctor answers it'],
+    ['tavosso-doctor login', 'the same'],
+    ['tavosso-doctor token FILE', 'needs a token: tests/doctor has them'],
     ['tests/fuzz/run --hours 1', 'by hand: an hour'],
     ['tests/fuzz/run --report', 'by hand, after that'],
 ]);

@@ -24,7 +24,7 @@ export function makeAuthority(folder) {
         writeFileSync(file('.cnf'), settings);
         execFileSync('openssl', [
             'req', '-x509', '-config', file('.cnf'), '-newkey', 'ec', '-pkeyopt', 'ec_paramgen_curve:P-256', '-nodes',
-            '-days', '2', '-keyout', file('.key'), '-out', file('.pem'), ...options,
+            '-days', '60', '-keyout', file('.key'), '-out', file('.pem'), ...options,
         ], {stdio: ['ignore', 'ignore', 'pipe']});
         return {keyFile: file('.key'), certFile: file('.pem')};
     };

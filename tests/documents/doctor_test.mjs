@@ -1,0 +1,38 @@
+// Each check of the doctor is told in its chapter, once, and none that it does not make.
+import assert from 'node:assert/strict';
+import {test} from 'node:test';
+
+import {codeSpans, differences, filesMatching, NO_DIFFERENCES, read, tableRows} from './documents.mjs';
+
+const sources = filesMatching('doctor/*.cpp').map(read).join('\n');
+
+/** The ids that stand in the sources, and those that are put together there. */
+function ids() {
+    const whole = [...sources.matchAll(/"((?:profile|client|discovery|keys|token_endpoint|token|directory|state|login)\.[a-z_]+)"/g)]
+        .map(([, id]) => id);
+    const keys = [...sources.matchAll(/^ +\{"([a-z_]+)", Kind::/gm)].map(([, key]) => `client.${key}`);
+    const endpoints = [...sources.matchAll(/CheckEndpoint\("([a-z_]+)"/g)].map(([, member]) => `discovery.${member}`);
+    const transfers = [...sources.matchAll(/CheckTransfer\("([a-z_]+)"/g)].flatMap(([, id]) =>
+        [`${id}.reachable`, `${id}.certificate`]);
+    assert.ok(keys.length > 10 && endpoints.length === 3 && transfers.length === 6);
+    return [...new Set([...whole, ...keys, ...endpoints, ...transfers, 'clock'])];
+}
+
+test('each check is told, once, and none that is not made', () => {
+    const rows = tableRows('docs/doctor.md').filter(({header}) => header[0] === 'id');
+    const told = rows.flatMap(({cells}) => codeSpans(cells[0]));
+    assert.ok(told.length > 40, `${told.length} checks`);
+    assert.deepEqual(differences({told, real: ids()}), NO_DIFFERENCES);
+    console.log(`${told.length} checks`);
+});
+
+test('each option is told in the manual page and can be completed, and none that is not one', () => {
+    const real = [...sources.matchAll(/(?:flag|option)\("(--[a-z-]+)"/g)].map(([, option]) => option).concat('--help');
+    assert.ok(real.length > 8, `${real.length} options`);
+    const manual = read('docs/man/tavosso-doctor.8');
+    const told = [...manual.matchAll(/^\.It Fl -([a-z-]+)/gm)].map(([, name]) => `--${name}`);
+    const inSynopsis = [...manual.matchAll(/^\.Op Fl -([a-z-]+)/gm)].map(([, name]) => `--${name}`);
+    assert.deepEqual(differences({told: [...told, ...inSynopsis], real}), NO_DIFFERENCES);
+    const completed = [...new Set(read('doctor/completion.bash').match(/--[a-z-]+(?=[' ])/g))];
+    assert.deepEqual(differences({told: completed, real}), NO_DIFFERENCES);
+});
