@@ -53,9 +53,8 @@ class Descriptor {
 
 /// A text that is missing, or too long to be a name, leaves the copy empty.
 void Copy(const char *text, std::array<char, 256> &copy) {
-    const std::size_t size = text == nullptr ? copy.size() : std::strlen(text);
-    if (size < copy.size()) {
-        std::memcpy(copy.data(), text, size);
+    if (text != nullptr && std::strlen(text) < copy.size()) {
+        std::memcpy(copy.data(), text, std::strlen(text));
     }
 }
 
