@@ -28,7 +28,8 @@ std::string ErrorAnswer(const std::string &error, const std::string &description
 void KeepTokenSecret(const std::string &token) {
     const std::size_t claims = token.find('.');
     if (claims != std::string::npos) {
-        KeepSecret(token.substr(claims + 1));
+        // A state is encoded as claims are, and has a nonce as well: twelve bytes can be the same.
+        KeepSecret(token.substr(claims + 1), 20);
     }
 }
 
@@ -143,6 +144,7 @@ void Appliance::WriteClientFile() const { WriteFile(ClientFile(), Compact(client
 
 void Appliance::Serve(Connection &connection) {
     server_.Play([this](Connection &next) { Serve(next); });
+    ++connections_;
     const std::string request = connection.ReceiveRequest();
     if (!request.empty()) {
         connection.Send(AnswerTo(request));

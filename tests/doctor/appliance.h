@@ -3,6 +3,7 @@
 
 #include <json/json.h>
 
+#include <atomic>
 #include <functional>
 #include <map>
 #include <mutex>
@@ -65,6 +66,8 @@ class Appliance {
     std::string URL(const std::string &path) const { return server_.URL("/" + std::string(kTenant) + path); }
     std::vector<std::string> Requests() const { return server_.Requests(); }
 
+    int Connections() const { return connections_; }
+
     Outcome LogIn() const { return Test::LogIn(kCode); }
 
   private:
@@ -79,6 +82,7 @@ class Appliance {
     Json::Value client_;
     Json::Value discovery_;
     std::string token_;
+    std::atomic<int> connections_{0};
     std::mutex mutex_;
     std::map<std::string, Answer> answers_;
     Server server_;  // the last: its thread uses all the others

@@ -4,29 +4,29 @@
 #include <json/json.h>
 #include <sys/types.h>
 
+#include <cstddef>
 #include <string>
 #include <vector>
 
 // The built tavosso-doctor, as an administrator runs it: a process of its own, with this machine's clock.
 namespace Test {
 
-constexpr char kEscape = '\033';
-
 using Strings = std::vector<std::string>;
 
 /// What a process has left behind.
-struct Run {
+struct DoctorRun {
     int status = -1;  // the signal's number and 128 where one ended it, as a shell tells it
     std::string output;
     std::string errors;
 };
 
-/// Makes it a failure of the test if any run from now on prints a piece of this text, or of its percent-encoding.
-void KeepSecret(const std::string &text);
+/// Makes it a failure of the test if any run from now on prints a piece of this text, or of its percent-encoding. A
+/// piece is so many bytes that nothing else holds them by chance.
+void KeepSecret(const std::string &text, std::size_t piece = 12);
 
 /// Runs the doctor to its end, without a terminal. That it prints neither a secret nor a control character is looked at
 /// here, whatever the test is about.
-Run RunDoctor(const Strings &arguments, const std::string &input = "");
+DoctorRun RunDoctor(const Strings &arguments, const std::string &input = "");
 
 /// One check of a report.
 struct Check {
@@ -55,6 +55,16 @@ struct Report {
 /// Runs the doctor for machines and for people: what the latter read is looked at as in `RunDoctor`.
 Report Ask(const Strings &arguments, const std::string &input = "");
 
+/// For machines alone, where many are asked.
+Report AskMachine(const Strings &arguments, const std::string &input = "");
+
+/// Of a token's report the library's own word, empty where it takes the token.
+std::string LibraryIn(const Report &report);
+
+/// Of a token's report: the library stops at the first finding, or at none where there is none. Whether the client's
+/// secret can verify anything is told before its signature.
+void ExpectToStopAtTheFirstFinding(const Report &report);
+
 /// A doctor that one talks with.
 class Dialogue {
   public:
@@ -72,10 +82,14 @@ class Dialogue {
     void Write(const std::string &bytes) const;
 
     /// Nothing more will be written. Waits for its end.
-    Run Finish();
+    DoctorRun Finish();
 
-    /// Of the terminal, in the kernel's bits.
+    /// Its status, as long as the terminal is still there to look at.
+    int WaitForEnd();
+
+    /// Of the terminal, in the kernel's bits; and what they were before the doctor began.
     unsigned int LocalModes() const;
+    unsigned int FirstLocalModes() const { return firstLocalModes_; }
 
   private:
     void CloseInput();
@@ -84,6 +98,7 @@ class Dialogue {
     int input_ = -1;
     int output_ = -1;
     int errors_ = -1;
+    unsigned int firstLocalModes_ = 0;
     std::string printed_;
 };
 

@@ -62,7 +62,7 @@ std::string LoginDialogue::ReturnAddress(const std::string &code) const {
 
 Report LoginDialogue::Paste(const std::string &address) {
     dialogue_.Write(address + "\n");
-    const Run run = dialogue_.Finish();
+    const DoctorRun run = dialogue_.Finish();
     Report report;
     report.status = run.status;
     report.checks = ReadChecks(run.output);

@@ -1,0 +1,201 @@
+#include "tests/support/files.h"
+
+#include <gmock/gmock.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <string>
+
+#include "tests/doctor/appliance.h"
+#include "tests/doctor/doctor_process.h"
+
+// What an administrator can get wrong in the files, and what is told of it.
+namespace Test {
+
+namespace {
+
+using ::testing::AllOf;
+using ::testing::Contains;
+using ::testing::ElementsAre;
+using ::testing::EndsWith;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+
+constexpr uid_t kNobody = 65534;
+
+class Files : public ::testing::Test {
+  protected:
+    /// The one finding that there is.
+    static Check OnlyFinding(const Strings &arguments = {}) {
+        const Report report = Ask(arguments);
+        EXPECT_EQ(report.Findings().size(), 1U) << ::testing::PrintToString(report.Findings());
+        return report.FirstFinding();
+    }
+
+    Check FirstFindingWith(const std::string &clientKey, const Json::Value &value) {
+        appliance.SetClient(clientKey, value);
+        const Check finding = Ask({}).FirstFinding();
+        EXPECT_EQ(finding.id, "client." + clientKey);
+        return finding;
+    }
+
+    Appliance appliance{Profile::kAzure};
+};
+
+TEST_F(Files, ErrorInJSONIsToldByLineAndColumn) {
+    WriteFile(kAzureFile, "{\n  \"azure_client_id\": \"the client\",\n  \"azure_tenant_id\" \"the tenant\"\n}\n");
+    EXPECT_THAT(Ask({}).Find("client.file", "finding").found, HasSubstr("line 3, column 21: "));
+}
+
+TEST_F(Files, SecretWithoutQuotationMarksIsNotPrinted) {
+    WriteFile(kAzureFile, "{\"azure_client_secret\": -" + std::string(kClientSecret) + "}");
+    EXPECT_EQ(Ask({}).FirstFinding().id, "client.file");
+}
+
+TEST_F(Files, TextInThePlaceOfABooleanIsNoted) {
+    appliance.SetClient("sso_enable", "yes");
+    EXPECT_THAT(Ask({}).Find("client.sso_enable", "note").found, HasSubstr("no boolean"));
+}
+
+TEST_F(Files, NumberInThePlaceOfATextIsAFinding) {
+    EXPECT_THAT(FirstFindingWith("client_id", 4711).found, HasSubstr("no text"));
+}
+
+TEST_F(Files, MissingKeyIsAFinding) {
+    EXPECT_THAT(FirstFindingWith("redirect_uri", Json::Value()).found, HasSubstr("is no text"));
+    appliance.ChangeClientFile(R"({"azure_redirect_uri": null})");
+    EXPECT_EQ(OnlyFinding().found, "is missing");
+}
+
+TEST_F(Files, UnknownKeyIsToldWithTheOneThatItIsLike) {
+    appliance.ChangeClientFile(R"({"azure_Client_id": "the client", "azure_client_id": null})");
+    const Report report = Ask({});
+    EXPECT_THAT(report.Findings(), ElementsAre("client.unknown_key", "client.client_id", "token_endpoint.client"));
+    EXPECT_THAT(report.FirstFinding().remedy, HasSubstr("\"azure_client_id\""));
+}
+
+TEST_F(Files, UnknownKeyThatIsLikeNoneIsNoted) {
+    appliance.ChangeClientFile(R"({"written_by": "the administrator"})");
+    const Report report = Ask({});
+    EXPECT_THAT(report.Find("client.unknown_key", "note").found, HasSubstr("\"written_by\""));
+    EXPECT_THAT(report.Findings(), IsEmpty());
+}
+
+TEST_F(Files, UnknownKeyOfTheProfileIsToldWithTheOneThatItIsLike) {
+    WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure", "SSO_Profile": "websphere"})");
+    EXPECT_THAT(OnlyFinding().remedy, HasSubstr("\"sso_profile\""));
+}
+
+TEST_F(Files, TokenEndpointWithoutTLSIsAFindingAndGetsNoSecret) {
+    appliance.MoveEndpoint("token_endpoint", "http" + appliance.URL("/token_endpoint").substr(5));
+    const Report report = Ask({});
+    EXPECT_THAT(report.Findings(), ElementsAre("client.token_endpoint"));
+    EXPECT_EQ(report.Find("token_endpoint.reachable", "not checked").id, "token_endpoint.reachable");
+    EXPECT_THAT(appliance.Requests(), Not(Contains(HasSubstr("client_secret"))));
+}
+
+TEST_F(Files, EndpointThatIsNoAddressIsAFinding) {
+    EXPECT_THAT(FirstFindingWith("authorization_endpoint", "https://").found, HasSubstr("no address"));
+}
+
+TEST_F(Files, QueryInTheAuthorizationEndpointIsAFinding) {
+    appliance.MoveEndpoint("authorization_endpoint", appliance.URL("/authorization_endpoint?p=policy"));
+    EXPECT_THAT(OnlyFinding().found, HasSubstr("query"));
+}
+
+TEST_F(Files, BlankAroundAValueIsAFinding) {
+    EXPECT_THAT(FirstFindingWith("tenant_id", std::string(kTenant) + " ").found, HasSubstr("blanks"));
+}
+
+TEST_F(Files, RedirectURIOfAnotherPathIsAFindingUnlessTheProgramIsThere) {
+    EXPECT_THAT(FirstFindingWith("redirect_uri", "https://nas.example/sso/back.cgi").found,
+                HasSubstr("\"/sso/back.cgi\""));
+    EXPECT_THAT(Ask({"--return-program", "/sso/back.cgi"}).Findings(), IsEmpty());
+}
+
+TEST_F(Files, EndpointOfAnotherTenantIsAFinding) {
+    appliance.MoveEndpoint("end_session_endpoint", appliance.URL("/end"));
+    appliance.SetClient("authorization_endpoint", "https://127.0.0.1/99999999-9b7a-4c3d-8e5f-0a1b2c3d4e5f/authorize");
+    EXPECT_THAT(Ask({}).Find("client.tenant", "finding").found, HasSubstr("99999999-9b7a-4c3d-8e5f-0a1b2c3d4e5f"));
+}
+
+TEST_F(Files, SecretThatOthersCanReadIsAFinding) {
+    for (const mode_t mode : {0640U, 0604U}) {
+        ASSERT_EQ(chmod(kAzureFile, mode), 0);
+        EXPECT_THAT(OnlyFinding().found, HasSubstr("read the client secret"));
+    }
+}
+
+TEST_F(Files, FileThatOthersCanWriteIsAFinding) {
+    ASSERT_EQ(chmod(kAzureFile, 0620), 0);
+    EXPECT_THAT(OnlyFinding().found, HasSubstr("can change it"));
+    ASSERT_EQ(chmod(kAzureFile, 0600), 0);
+    ASSERT_EQ(chmod(kProfileFile, 0646), 0);
+    EXPECT_EQ(OnlyFinding().id, "profile.rights");
+}
+
+TEST_F(Files, DirectoryInThePlaceOfTheProfileIsAFinding) {
+    ASSERT_EQ(std::remove(kProfileFile), 0);
+    ASSERT_EQ(mkdir(kProfileFile, 0755), 0);
+    EXPECT_THAT(OnlyFinding().found, HasSubstr("Is a directory"));
+    EXPECT_EQ(appliance.LogIn().text, "read profile file failed.");
+}
+
+TEST_F(Files, DirectoryInThePlaceOfTheClientsFileIsAFinding) {
+    ASSERT_EQ(std::remove(kAzureFile), 0);
+    ASSERT_EQ(mkdir(kAzureFile, 0755), 0);
+    EXPECT_THAT(Ask({}).Find("client.file", "finding").found, HasSubstr("Is a directory"));
+}
+
+TEST_F(Files, ListInThePlaceOfTheClientsKeysIsAFinding) {
+    WriteFile(kAzureFile, "[\"azure_client_id\", \"the client\"]");
+    EXPECT_THAT(Ask({}).Find("client.file", "finding").found, EndsWith("is JSON, but no object"));
+}
+
+TEST_F(Files, TableOfDomainsThatIsNoJSONIsAFinding) {
+    WriteFile(kDomainTable, "corp.example = CORP\n");
+    EXPECT_THAT(Ask({}).Find("directory.table", "finding").found, HasSubstr("line 1, column 1: "));
+}
+
+TEST_F(Files, DomainThatNobodyConvertsIsAFinding) {
+    EXPECT_EQ(Ask({"--domain", "corp.example"}).Find("directory.domain", "good").found, "is \"CORP\", by the table");
+    EXPECT_EQ(OnlyFinding({"--domain", "elsewhere.example"}).id, "directory.domain");
+}
+
+/// What a program can see that does not run as root.
+class RightsOfAUser : public Files {
+  protected:
+    void SetUp() override {
+        const std::string probe = "/tmp/probe";
+        WriteFile(probe, "");
+        if (chown(probe.c_str(), kNobody, kNobody) != 0) {
+            GTEST_SKIP() << "needs the ids of other users";
+        }
+    }
+};
+
+TEST_F(RightsOfAUser, FileOfAnotherOwnerIsAFinding) {
+    ASSERT_EQ(chown(kAzureFile, kNobody, kNobody), 0);
+    EXPECT_THAT(OnlyFinding().found, HasSubstr("can change it"));
+}
+
+TEST_F(RightsOfAUser, ProfileForRootAloneIsAFinding) {
+    EXPECT_THAT(Ask({}).Findings(), IsEmpty());
+    const Check finding = OnlyFinding({"--user", "nobody"});
+    EXPECT_EQ(finding.id, "profile.file");
+    EXPECT_THAT(finding.found, HasSubstr("Permission denied"));
+    EXPECT_EQ(finding.library, "read profile file failed.");
+}
+
+TEST_F(RightsOfAUser, ClientsFileForRootAloneIsAFinding) {
+    ASSERT_EQ(chmod(kProfileFile, 0644), 0);
+    const Report report = Ask({"--user", "nobody"});
+    EXPECT_EQ(report.FirstFinding().id, "client.ids");
+    EXPECT_THAT(report.Find("client.file", "finding").found, HasSubstr("Permission denied"));
+}
+
+}  // namespace
+
+}  // namespace Test

@@ -1,0 +1,128 @@
+#include <gmock/gmock.h>
+
+#include <string>
+
+#include "sso/sso.h"
+#include "tests/doctor/appliance.h"
+#include "tests/doctor/doctor_process.h"
+#include "tests/doctor/login_dialogue.h"
+#include "tests/support/files.h"
+
+// `tavosso-doctor login`, with a person who signs in at the provider.
+namespace Test {
+
+namespace {
+
+using ::testing::Each;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::StartsWith;
+
+class LoginOf : public ::testing::TestWithParam<Profile> {
+  protected:
+    /// As a provider does: the token tells of which login it is.
+    void SignIn(const LoginDialogue &dialogue) {
+        appliance.GiveToken("{}", "{\"nonce\": \"" + dialogue.Parameter("nonce") + "\"}");
+    }
+
+    void ExpectNoTokenRequest() { EXPECT_THAT(appliance.Requests(), Each(Not(StartsWith("POST ")))); }
+
+    Appliance appliance{GetParam()};
+};
+
+INSTANTIATE_TEST_SUITE_P(Doctor, LoginOf, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
+                         [](const auto &profile) { return Name(profile.param); });
+
+TEST_P(LoginOf, AKnownUserHasNoFindings) {
+    LoginDialogue dialogue;
+    SignIn(dialogue);
+    const Report report = dialogue.Paste(dialogue.ReturnAddress(kCode));
+    EXPECT_THAT(report.Findings(), IsEmpty());
+    EXPECT_EQ(report.status, 0);
+    EXPECT_EQ(report.checks.back().subject, "nonce");
+}
+
+TEST_P(LoginOf, AnotherLoginsTokenIsAFinding) {
+    const Report report = WalkLogin();
+    EXPECT_EQ(report.FirstFinding().subject, "nonce");
+    EXPECT_EQ(report.status, 1);
+}
+
+TEST_P(LoginOf, AnotherLoginsStateIsAFindingAndTheCodeIsNotSent) {
+    LoginDialogue dialogue;
+    const Report report = dialogue.Paste(std::string(kReturnURI) + "?code=c&state=c3RhdGU%3D");
+    EXPECT_EQ(report.FirstFinding().subject, "state");
+    ExpectNoTokenRequest();
+}
+
+TEST_P(LoginOf, ARefusedUserIsAFindingInTheProvidersWords) {
+    LoginDialogue dialogue;
+    const Report report =
+        dialogue.Paste(std::string(kReturnURI) + "?error=access_denied&error_description=not+today&state=s");
+    EXPECT_EQ(report.FirstFinding().found, "The provider refused: access_denied (not today)");
+    EXPECT_EQ(report.status, 1);
+}
+
+TEST_P(LoginOf, AnAddressWithoutACodeIsAFinding) {
+    for (const char *query : {"", "?", "?state=s", "?code=", "?code=a&code=b"}) {
+        LoginDialogue dialogue;
+        EXPECT_THAT(dialogue.Paste(kReturnURI + std::string(query)).FirstFinding().found, HasSubstr("no code"))
+            << query;
+    }
+    LoginDialogue dialogue;
+    EXPECT_EQ(dialogue.Paste("no address at all").status, 1);
+    ExpectNoTokenRequest();
+}
+
+TEST_P(LoginOf, ACodeThatIsRefusedIsAFinding) {
+    LoginDialogue dialogue;
+    const Report report = dialogue.Paste(dialogue.ReturnAddress("a code that was used"));
+    EXPECT_EQ(report.FirstFinding().subject, "exchange of the code");
+    EXPECT_EQ(report.FirstFinding().found, "The provider refused: invalid_grant");
+}
+
+TEST_P(LoginOf, AnAnswerWithoutATokenIsAFinding) {
+    appliance.AnswerAt("/token_endpoint", R"({"access_token": "without OpenID Connect"})");
+    EXPECT_THAT(WalkLogin().FirstFinding().found, HasSubstr("no \"id_token\""));
+}
+
+TEST_P(LoginOf, ATokenThatCannotBeVerifiedStopsWhereTheLibraryStops) {
+    appliance.GiveToken("{}", R"({"aud": "another client"})");
+    const Check finding = WalkLogin().FirstFinding();
+    EXPECT_THAT(finding.subject, HasSubstr("\"aud\""));
+    EXPECT_EQ(finding.library, "client ID invalid");
+}
+
+TEST_P(LoginOf, AnotherRedirectURIIsSentToTheProvider) {
+    LoginDialogue dialogue({"login", "--redirect-uri", "https://other.example/back"});
+    EXPECT_EQ(dialogue.Parameter("redirect_uri"), TAVO::SSO::URLEncode("https://other.example/back"));
+    SignIn(dialogue);
+    EXPECT_EQ(dialogue.Paste(dialogue.ReturnAddress(kCode)).status, 0);
+    EXPECT_THAT(appliance.Requests()[0], HasSubstr(TAVO::SSO::URLEncode("https://other.example/back")));
+}
+
+TEST_P(LoginOf, NobodyIsGivenUpWithoutAnAddress) {
+    for (const std::string input : {"", "\n", " \n"}) {
+        const DoctorRun run = RunDoctor({"login"}, input);
+        EXPECT_EQ(run.status, 2);
+        EXPECT_THAT(run.errors, HasSubstr("no address was given"));
+    }
+}
+
+TEST_P(LoginOf, AMachineIsRefused) {
+    const DoctorRun run = RunDoctor({"login", "--json"});
+    EXPECT_EQ(run.status, 2);
+    EXPECT_THAT(run.errors, HasSubstr("login talks with a person"));
+}
+
+TEST(Login, NeedsAProfile) {
+    RemoveFiles();
+    const DoctorRun run = RunDoctor({"login"});
+    EXPECT_EQ(run.status, 2);
+    EXPECT_THAT(run.errors, HasSubstr("no profile is in force"));
+}
+
+}  // namespace
+
+}  // namespace Test

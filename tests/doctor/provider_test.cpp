@@ -1,0 +1,212 @@
+#include <gmock/gmock.h>
+
+#include <ctime>
+#include <string>
+
+#include "tests/doctor/appliance.h"
+#include "tests/doctor/doctor_process.h"
+#include "tests/support/authority.h"
+#include "tests/support/server.h"
+#include "tests/support/token.h"
+
+// What is wrong with a provider, and what is told of it.
+namespace Test {
+
+namespace {
+
+using ::testing::AllOf;
+using ::testing::Contains;
+using ::testing::Each;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::StartsWith;
+
+constexpr char kHost[] = "IP:127.0.0.1";
+constexpr std::time_t kHour = 3600;
+constexpr std::time_t kDay = 24 * kHour;
+
+std::string TimeText(const char *format, std::time_t time) {
+    char text[64];
+    std::tm utc{};
+    gmtime_r(&time, &utc);
+    return {text, std::strftime(text, sizeof text, format, &utc)};
+}
+
+Credentials CertificateUntil(std::time_t time) {
+    CertificateText text;
+    text.alternativeName = kHost;
+    text.notAfter = TimeText("%Y%m%d%H%M%SZ", time);
+    return Certify(text, &Authority());
+}
+
+/// A key set of these.
+std::string KeysOf(std::initializer_list<Json::Value> keys) {
+    Json::Value keySet;
+    for (const Json::Value &key : keys) {
+        keySet["keys"].append(key);
+    }
+    return Compact(keySet);
+}
+
+Json::Value GoodKey() { return ProviderKey().JWK(kKeyID); }
+
+TEST(ProvidersCertificate, ThatSoonExpiresIsAFinding) {
+    const Appliance appliance(Profile::kAzure, CertificateUntil(std::time(nullptr) + 5 * kDay + kHour));
+    const Report report = Ask({});
+    EXPECT_THAT(report.Findings(), ElementsAre("discovery.certificate")) << "one server, and told once";
+    EXPECT_THAT(report.FirstFinding().found, HasSubstr(", 5 days left"));
+}
+
+TEST(ProvidersCertificate, ThatHasExpiredIsAFinding) {
+    const Appliance appliance(Profile::kAzure, ExpiredCertificateFor(kHost));
+    EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").found, HasSubstr("it has expired"));
+}
+
+TEST(ProvidersCertificate, ForAnotherHostIsToldWithTheHost) {
+    const Appliance appliance(Profile::kAzure, CertificateFor("DNS:localhost"));
+    EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").remedy, HasSubstr("is \"127.0.0.1\" its name?"));
+}
+
+TEST(ProvidersCertificate, ThatIsRefusedGetsNoSecret) {
+    for (const Credentials &credentials : {SelfSignedCertificateFor(kHost), ExpiredCertificateFor(kHost)}) {
+        for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
+            const Appliance appliance(profile, credentials);
+            const Report report = Ask({});
+            EXPECT_NE(report.Find("token_endpoint.certificate", "finding").found, "");
+            EXPECT_THAT(appliance.Requests(), Each(StartsWith("GET ")));
+            EXPECT_THAT(appliance.Requests(), Each(Not(HasSubstr("client_"))));
+        }
+    }
+}
+
+class AProvider : public ::testing::Test {
+  protected:
+    static Check OnlyFinding(const Strings &arguments = {}) {
+        const Report report = Ask(arguments);
+        EXPECT_EQ(report.Findings().size(), 1U) << ::testing::PrintToString(report.Findings());
+        return report.FirstFinding();
+    }
+
+    void TellTime(std::time_t time) {
+        std::string answer = HTTPAnswer(KeySet());
+        answer.insert(answer.find("\r\n"), "\r\nDate: " + TimeText("%a, %d %b %Y %H:%M:%S GMT", time));
+        appliance.AnswerAt("/keys", [answer](const std::string & /*request*/) { return answer; });
+    }
+
+    Appliance appliance{Profile::kAzure};
+};
+
+TEST_F(AProvider, ClockThatIsBehindIsAFinding) {
+    TellTime(std::time(nullptr) - kHour);
+    const Check finding = OnlyFinding();
+    EXPECT_EQ(finding.id, "clock");
+    EXPECT_THAT(finding.found, HasSubstr(" s ahead of the provider's"));
+}
+
+TEST_F(AProvider, ClockThatIsAheadIsAFinding) {
+    TellTime(std::time(nullptr) + kHour);
+    EXPECT_THAT(OnlyFinding().found, HasSubstr(" s behind the provider's"));
+}
+
+TEST_F(AProvider, ClockThatIsTheSameIsGood) {
+    TellTime(std::time(nullptr));
+    EXPECT_EQ(Ask({}).Find("clock", "good").id, "clock");
+}
+
+TEST_F(AProvider, EndpointThatIsNotTheConfiguredOneIsAFinding) {
+    for (const std::string endpoint : {"authorization_endpoint", "token_endpoint"}) {
+        Appliance other(Profile::kAzure);
+        other.ChangeDiscovery(R"({")" + endpoint + R"(": "https://login.example/other"})");
+        const Check finding = OnlyFinding();
+        EXPECT_EQ(finding.id, "discovery." + endpoint);
+        EXPECT_THAT(finding.found, AllOf(HasSubstr("\"https://login.example/other\""),
+                                         HasSubstr("\"" + other.URL("/" + endpoint) + "\"")));
+    }
+}
+
+TEST_F(AProvider, LogoutThatIsNotTheConfiguredOneIsNotedForItMayBeAPageOfItsOwn) {
+    appliance.ChangeDiscovery(R"({"end_session_endpoint": "https://login.example/other"})");
+    const Report report = Ask({});
+    EXPECT_THAT(report.Findings(), IsEmpty());
+    EXPECT_THAT(report.Find("discovery.end_session_endpoint", "note").found, HasSubstr("https://login.example/other"));
+}
+
+TEST_F(AProvider, AlgorithmsThatAreNotOfferedAreAFinding) {
+    appliance.ChangeDiscovery(R"({"id_token_signing_alg_values_supported": ["ES256", "PS256"]})");
+    EXPECT_EQ(OnlyFinding().id, "discovery.algorithms");
+}
+
+TEST_F(AProvider, ClientAuthenticationThatIsNotOfferedIsAFinding) {
+    appliance.ChangeDiscovery(R"({"token_endpoint_auth_methods_supported": ["client_secret_basic"]})");
+    EXPECT_EQ(OnlyFinding().id, "discovery.client_authentication");
+}
+
+TEST_F(AProvider, KeysThatCannotBeUsedAreNotedBesideOneThatCan) {
+    Json::Value withoutN = ProviderKey().JWK("third key");
+    withoutN.removeMember("n");
+    const Json::Value ofACurve = Parse(R"({"kty": "EC", "kid": "second key", "crv": "P-256", "x": "AQ", "y": "AQ"})");
+    appliance.AnswerAt("/keys", KeysOf({ofACurve, withoutN, Parse("\"no key\""), GoodKey()}));
+    const Report report = Ask({});
+    EXPECT_THAT(report.Findings(), IsEmpty());
+    EXPECT_THAT(report.Find("keys.unusable", "note").found, HasSubstr("\"second key\", EC is no RSA key"));
+    EXPECT_EQ(report.Find("keys.set", "good").found, "1 of 4 keys can be used");
+}
+
+TEST_F(AProvider, WeakKeyIsAFinding) {
+    const RSAKey weak(1024);
+    appliance.AnswerAt("/keys", KeysOf({GoodKey(), weak.JWK("weak key")}));
+    const Check finding = OnlyFinding();
+    EXPECT_EQ(finding.id, "keys.weak");
+    EXPECT_THAT(finding.found, AllOf(HasSubstr("\"weak key\""), HasSubstr("1024 bits")));
+}
+
+TEST_F(AProvider, SecondKeyOfTheSameNameIsNoted) {
+    appliance.AnswerAt("/keys", KeysOf({GoodKey(), GoodKey()}));
+    const Report report = Ask({});
+    EXPECT_THAT(report.Findings(), IsEmpty());
+    EXPECT_THAT(report.Find("keys.duplicate", "note").found, HasSubstr("the first one of this \"kid\" is taken"));
+}
+
+TEST_F(AProvider, CodeThatIsRefusedIsTheAnswerToAGoodClient) {
+    EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").library, "");
+    EXPECT_THAT(appliance.Requests(), Contains(HasSubstr("code=tavosso-doctor-made-this-up")));
+}
+
+TEST_F(AProvider, ClientThatIsRefusedIsAFinding) {
+    for (const char *error : {"invalid_client", "unauthorized_client"}) {
+        appliance.RefuseCodes(error);
+        const Check finding = OnlyFinding();
+        EXPECT_EQ(finding.id, "token_endpoint.client");
+        EXPECT_THAT(finding.remedy, HasSubstr("compare the client's id and secret"));
+    }
+}
+
+TEST_F(AProvider, RequestThatIsRefusedIsNotedForItMayBeTheMadeUpCode) {
+    appliance.RefuseCodes("invalid_request");
+    EXPECT_NE(Ask({}).Find("token_endpoint.client", "note").remedy, "");
+}
+
+TEST_F(AProvider, AnyOtherErrorIsAFindingInTheProvidersWords) {
+    appliance.RefuseCodes("temporarily_unavailable", "we are moving");
+    const Check finding = OnlyFinding();
+    EXPECT_EQ(finding.found, "The provider refused: temporarily_unavailable (we are moving)");
+    EXPECT_EQ(finding.library, finding.found);
+}
+
+TEST_F(AProvider, ThatHangsIsAFindingAfterTheTimeOut) {
+    Server hanging(CertificateFor(kHost));
+    const auto hang = [](Connection &connection) {
+        connection.ReceiveRequest();
+        connection.ReceiveRaw();  // until the client has gone
+    };
+    hanging.Play(hang);
+    hanging.Play(hang);
+    appliance.SetClient("wellknown", hanging.URL("/discovery"));
+    EXPECT_THAT(Ask({"--timeout", "1"}).Find("discovery.reachable", "finding").found, HasSubstr("Timeout was reached"));
+}
+
+}  // namespace
+
+}  // namespace Test

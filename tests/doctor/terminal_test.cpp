@@ -1,0 +1,76 @@
+#include <gmock/gmock.h>
+#include <termios.h>
+
+#include <csignal>
+#include <string>
+
+#include "tests/doctor/appliance.h"
+#include "tests/doctor/doctor_process.h"
+#include "tests/doctor/login_dialogue.h"
+
+// What depends on the terminal, on a real one.
+namespace Test {
+
+namespace {
+
+using ::testing::HasSubstr;
+using ::testing::Not;
+
+constexpr char kGreen[] = "\033[32m[ ok ]";
+constexpr unsigned int kShowsInput = ECHO;
+
+constexpr Dialogue::Over kTerminal = Dialogue::Over::kTerminal;
+
+class Terminal : public ::testing::Test {
+  protected:
+    Appliance appliance{Profile::kWebSphere};
+};
+
+std::string OutputOn(Dialogue::Over over, const Strings &arguments, const Strings &variables = {}) {
+    return Dialogue(over, arguments, variables).Finish().output;
+}
+
+TEST_F(Terminal, ShowsColours) { EXPECT_THAT(OutputOn(kTerminal, {}), HasSubstr(kGreen)); }
+
+TEST_F(Terminal, ShowsNoColoursUnderNO_COLOR) {
+    EXPECT_THAT(OutputOn(kTerminal, {}, {"NO_COLOR=1"}), Not(HasSubstr("\033[32m")));
+    EXPECT_THAT(OutputOn(kTerminal, {}, {"NO_COLOR="}), HasSubstr(kGreen)) << "an empty one counts as none";
+}
+
+TEST_F(Terminal, ShowsJSONAsItIs) { EXPECT_THAT(OutputOn(kTerminal, {"--json"}), Not(HasSubstr("\033"))); }
+
+TEST_F(Terminal, ElsewhereThereAreNoColours) {
+    EXPECT_THAT(OutputOn(Dialogue::Over::kPipes, {}), Not(HasSubstr("\033")));
+}
+
+TEST_F(Terminal, DoesNotShowTheAddressThatIsPasted) {
+    Dialogue dialogue(kTerminal, {"login"});
+    const unsigned int before = dialogue.FirstLocalModes();
+    ASSERT_EQ(before & kShowsInput, kShowsInput);
+    EXPECT_THAT(dialogue.ReadUntil("It is not shown."), HasSubstr("paste it here"));
+    EXPECT_EQ(dialogue.LocalModes() & kShowsInput, 0U);
+    dialogue.Write(kReturnURI + ("?state=not+this&code=pasted-" + std::string(20, 'x')) + "\n");
+    EXPECT_THAT(dialogue.ReadUntil("finding"), Not(HasSubstr("pasted-")));
+    EXPECT_EQ(dialogue.LocalModes(), before);
+    EXPECT_EQ(dialogue.Finish().status, 1);
+}
+
+TEST_F(Terminal, TakesAnAddressOf6000Bytes) {
+    Dialogue dialogue(kTerminal, {"login"});
+    dialogue.ReadUntil("It is not shown.");
+    dialogue.Write(kReturnURI + ("?code=" + std::string(6000, 'c')) + "&error=seen_to_the_end\n");
+    EXPECT_THAT(dialogue.Finish().output, HasSubstr("seen_to_the_end"));
+}
+
+TEST_F(Terminal, IsAsItWasAfterALoginThatIsGivenUp) {
+    Dialogue dialogue(kTerminal, {"login"});
+    const unsigned int before = dialogue.FirstLocalModes();
+    dialogue.ReadUntil("It is not shown.");
+    dialogue.Write("\x03");  // Ctrl-C
+    EXPECT_EQ(dialogue.WaitForEnd(), 128 + SIGINT);
+    EXPECT_EQ(dialogue.LocalModes(), before);
+}
+
+}  // namespace
+
+}  // namespace Test

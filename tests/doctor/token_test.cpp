@@ -1,0 +1,149 @@
+#include "tests/support/token.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <iostream>
+#include <random>
+#include <string>
+
+#include "sso/sso.h"
+#include "tests/doctor/appliance.h"
+#include "tests/doctor/doctor_process.h"
+#include "tests/support/failure.h"
+#include "tests/support/files.h"
+
+// `tavosso-doctor token`: its own look at each step never says anything else than the library, which has the last word.
+namespace Test {
+
+namespace {
+
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+
+constexpr int kMutations = 150;
+
+template <typename Client>
+std::string VerificationBy(const std::string &token) {
+    Client client;
+    Json::Value response;
+    response["id_token"] = token;
+    return FailureOf([&] {
+               std::string userName;
+               client.ProcessTokenResponse(Compact(response));
+               client.VerifyIDToken();
+               client.GetUserName(userName);
+           })
+        .text;
+}
+
+/// What the library says of a token, empty where it takes it.
+std::string Verification(Profile profile, const std::string &token) {
+    return profile == Profile::kAzure ? VerificationBy<TAVO::SSO::AzureSSOClient>(token)
+                                      : VerificationBy<TAVO::SSO::WebSphereSSOClient>(token);
+}
+
+/// One byte is another one, and none that the doctor would take for the end of a line.
+class Mutations {
+  public:
+    explicit Mutations(unsigned int seed) : random_(seed) {}
+
+    std::string Of(std::string token) {
+        char &byte = token[random_() % token.size()];
+        const char before = byte;
+        do {
+            byte = static_cast<char>('!' + random_() % ('~' - '!' + 1));
+        } while (byte == before);
+        return token;
+    }
+
+  private:
+    std::mt19937 random_;
+};
+
+bool IsPlain(const std::string &text) {
+    return std::all_of(text.begin(), text.end(), [](char c) { return c >= 0x20 && c < 0x7f; });
+}
+
+class Token : public ::testing::TestWithParam<Profile> {
+  protected:
+    Appliance appliance{GetParam()};
+};
+
+INSTANTIATE_TEST_SUITE_P(Doctor, Token, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
+                         [](const auto &profile) { return Name(profile.param); });
+
+TEST_P(Token, WithAnyByteChangedStopsWhereTheLibraryDoes) {
+    const unsigned int seed = std::random_device()();
+    std::cout << "seed " << seed << std::endl;
+    Mutations mutations(seed);
+    for (int i = 0; i < kMutations && !HasFailure(); ++i) {
+        SCOPED_TRACE("mutation " + std::to_string(i) + " of seed " + std::to_string(seed));
+        const std::string token = mutations.Of(appliance.Token());
+        const Report report = AskMachine({"token", "-", "--fetch"}, token);
+        const std::string text = Verification(GetParam(), token);
+        // The algorithm's name is in one of the texts, with whatever the byte has become in it.
+        EXPECT_TRUE(LibraryIn(report) == text || !IsPlain(text)) << text;
+        EXPECT_EQ(LibraryIn(report).empty(), text.empty());
+        ExpectToStopAtTheFirstFinding(report);
+    }
+}
+
+TEST_P(Token, WithoutLeaveToFetchIsReadWithoutAskingAnyone) {
+    const Report report = Ask({"token", "-"}, appliance.Token());
+    EXPECT_THAT(report.Findings(), IsEmpty());
+    EXPECT_EQ(appliance.Connections(), 0);
+}
+
+TEST_P(Token, ThatHasExpiredStopsThereWithoutAskingAnyone) {
+    appliance.GiveToken("{}", R"({"exp": 1700000000})");
+    EXPECT_EQ(Ask({"token", "-"}, appliance.Token()).json["stops_at"], "token.expiry");
+    EXPECT_EQ(appliance.Connections(), 0);
+}
+
+TEST_P(Token, IsReadFromAFileToo) {
+    WriteFile("/tmp/token", appliance.Token() + "\r\n");
+    EXPECT_THAT(Ask({"token", "/tmp/token", "--fetch"}).Findings(), IsEmpty());
+}
+
+TEST_P(Token, ThatCannotBeReadEndsTheCommand) {
+    const DoctorRun missing = RunDoctor({"token", "/tmp/no such file"});
+    EXPECT_EQ(missing.status, 2);
+    EXPECT_THAT(missing.errors, HasSubstr("/tmp/no such file cannot be read"));
+
+    const DoctorRun large = RunDoctor({"token", "-"}, std::string((1 << 20) + 1, 'a'));
+    EXPECT_EQ(large.status, 2);
+    EXPECT_THAT(large.errors, HasSubstr("longer than 1 MiB"));
+}
+
+TEST_P(Token, CannotBeJudgedWithoutAProfile) {
+    RemoveFiles();
+    const DoctorRun run = RunDoctor({"token", "-"}, appliance.Token());
+    EXPECT_EQ(run.status, 2);
+    EXPECT_THAT(run.errors, HasSubstr("no profile is in force"));
+    EXPECT_EQ(run.output, "");
+}
+
+TEST_P(Token, OfManyUnusualClaimsIsReadToTheEnd) {
+    for (const char *claims :
+         {R"({"exp": {}})", R"({"aud": {"a": [1]}})", R"({"tid": 1.5, "sub": null})",
+          R"({"unique_name": ["a@b"], "email": 7, "sub": {}})", R"({"exp": "99999999999999999999"})",
+          R"({"unique_name": "a@b@c", "sub": ""})", R"({"exp": 1e300})"}) {
+        appliance.GiveToken("{}", claims);
+        const Report report = Ask({"token", "-", "--fetch"}, appliance.Token());
+        EXPECT_EQ(LibraryIn(report), Verification(GetParam(), appliance.Token())) << claims;
+        ExpectToStopAtTheFirstFinding(report);
+    }
+}
+
+TEST_P(Token, OfPartsThatAreNoObjectsIsReadToTheEnd) {
+    for (const char *token : {"W10.W10.e30", "MQ.MQ.MQ", "bnVsbA.bnVsbA.e30", "e30.e30.e30", "..", "...", "e30.e30."}) {
+        const Report report = Ask({"token", "-", "--fetch"}, token);
+        EXPECT_EQ(LibraryIn(report), Verification(GetParam(), token)) << token;
+        ExpectToStopAtTheFirstFinding(report);
+    }
+}
+
+}  // namespace
+
+}  // namespace Test
