@@ -1,8 +1,9 @@
 // Each check of the doctor is told in its chapter, once, and none that it does not make.
 import assert from 'node:assert/strict';
+import {execFileSync} from 'node:child_process';
 import {test} from 'node:test';
 
-import {codeSpans, differences, filesMatching, NO_DIFFERENCES, read, tableRows} from './documents.mjs';
+import {codeSpans, differences, filesMatching, NO_DIFFERENCES, PROJECT, read, tableRows} from './documents.mjs';
 
 const sources = filesMatching('doctor/*.cpp').map(read).join('\n');
 
@@ -35,4 +36,16 @@ test('each option is told in the manual page and can be completed, and none that
     assert.deepEqual(differences({told: [...told, ...inSynopsis], real}), NO_DIFFERENCES);
     const completed = [...new Set(read('doctor/completion.bash').match(/--[a-z-]+(?=[' ])/g))];
     assert.deepEqual(differences({told: completed, real}), NO_DIFFERENCES);
+});
+
+test('bash completes commands, options and files', () => {
+    const script = 'source doctor/completion.bash; COMP_WORDS=(tavosso-doctor "$@"); COMP_CWORD=$#; _tavosso_doctor 2>/dev/null;' +
+        ' echo "${COMPREPLY[*]}"';
+    const complete = (...words) => execFileSync('bash', ['-c', script, 'bash', ...words], {cwd: PROJECT, encoding: 'utf8'}).trim();
+    assert.equal(complete('to'), 'token');
+    assert.equal(complete('--js'), '--json');
+    assert.equal(complete('token', '--f'), '--fetch');
+    assert.equal(complete('login', '--f'), '');
+    assert.equal(complete('token', 'READ'), 'README.md');
+    assert.equal(complete('--user', 'roo'), 'root');
 });

@@ -14,9 +14,9 @@ const spans = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
 
 // Spans with a blank in them that are neither a text of ours nor a command.
 const OTHER = [
-    '/* */', '--user NAME', '== passed', '[ -- ]', '[ ok ]', 'Cache-Control: no-store', 'Location: ', 'OIDCLogin(code, user)', 'Referrer-Policy: no-referrer',
-    'TimeOut 60', 'find_package(tavosso REQUIRED)', 'frame-ancestors \'none\'', 'libgtest-dev libgmock-dev',
-    'project(tavosso VERSION ...)', 'target_link_libraries(sso.cgi PRIVATE tavosso::tavosso)',
+    '/* */', '--user NAME', '== passed', '[ -- ]', '[ ok ]', 'Cache-Control: no-store', 'Location: ',
+    'OIDCLogin(code, user)', 'Referrer-Policy: no-referrer', 'TimeOut 60', 'find_package(tavosso REQUIRED)', 'frame-ancestors \'none\'',
+    'libgtest-dev libgmock-dev', 'project(tavosso VERSION ...)', 'target_link_libraries(sso.cgi PRIVATE tavosso::tavosso)',
 ];
 
 const logRows = tableRows('docs/operations.md').filter(({header}) => header.join() === 'line,level,cause,remedy');
