@@ -35,6 +35,13 @@ class Converter {
         return JSON.parse(value);
     }
 
+    /** Ends it with the test, also with one that has failed: it would keep this program waiting. */
+    static forTest(context, options) {
+        const converter = new Converter(options);
+        context.after(() => converter.end());
+        return converter;
+    }
+
     async end() {
         this.process.stdin.end();
         const [status] = await once(this.process, 'exit');
@@ -100,18 +107,17 @@ describe('The directory', () => {
         await expectConverted('LAB.EXAMPLE.NET\\bob', 'LABOR\\bob');
     });
 
-    test('is asked whatever the environment says', async () => {
-        const other = new Converter({environment: {_NO_WINBINDD: '1', SELFTEST_WINBINDD_SOCKET_DIR: '/tmp'}});
+    test('is asked whatever the environment says', async (context) => {
+        const environment = {_NO_WINBINDD: '1', SELFTEST_WINBINDD_SOCKET_DIR: '/tmp'};
+        const other = Converter.forTest(context, {environment});
         await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice', other);
-        await other.end();
     });
 
     test('answers an ordinary user as it does root', {skip: !mayBeAnyone && 'not run: needs the ids of other users'},
-        async () => {
-            const other = new Converter({args: [String(NOBODY)]});
+        async (context) => {
+            const other = Converter.forTest(context, {args: [String(NOBODY)]});
             await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice', other);
             await expectConverted('LAB.EXAMPLE.NET\\bob', 'LABOR\\bob', other);
-            await other.end();
         });
 });
 
