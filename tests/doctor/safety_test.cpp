@@ -68,8 +68,8 @@ TEST_P(Output, HoldsNoSecretThatStandsInThePlaceOfAnotherValue) {
     }
 }
 
-TEST_P(Output, HoldsNoCodeAndNoTokenWhereTheProviderSendsThemBack) {
-    appliance.AnswerAt("/token_endpoint", [this](const std::string &request) {
+TEST_P(Output, HoldsNoCodeThatIsSentBack) {
+    appliance.AnswerAt("/token_endpoint", [](const std::string &request) {
         const std::string form = PercentDecode(FormOf(request));
         return HTTPAnswer(Compact(ErrorAnswer("invalid_grant", std::string(100, '.') + form)));
     });
