@@ -83,6 +83,12 @@ TEST_P(Output, HoldsNoCodeThatIsSentBack) {
               "answer of the provider");
 }
 
+TEST_P(Output, HoldsNoTokenThatStandsInTheFile) {
+    appliance.SetClient("client_id", appliance.Token());
+    EXPECT_THAT(Ask({"token", "-"}, appliance.Token()).Find("token.audience", "finding").found,
+                HasSubstr("client_id is \"[hidden]\""));
+}
+
 TEST_P(Output, HoldsNoControlCharacterOfAProvider) {
     for (const char *member : {"issuer", "jwks_uri", "authorization_endpoint", "token_endpoint", "end_session_endpoint",
                                "id_token_signing_alg_values_supported", "token_endpoint_auth_methods_supported"}) {

@@ -20,6 +20,7 @@ namespace {
 
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
+using ::testing::StartsWith;
 
 constexpr int kMutations = 150;
 
@@ -122,6 +123,13 @@ TEST_P(Token, CannotBeJudgedWithoutAProfile) {
     EXPECT_EQ(run.status, 2);
     EXPECT_THAT(run.errors, HasSubstr("no profile is in force"));
     EXPECT_EQ(run.output, "");
+}
+
+TEST_P(Token, WithoutAClaimIsToldToLackIt) {
+    appliance.GiveToken("{}", R"({"aud": null, "unique_name": null, "sub": null})");
+    const Report report = Ask({"token", "-", "--fetch"}, appliance.Token());
+    EXPECT_THAT(report.Find("token.audience", "finding").found, StartsWith("missing; "));
+    EXPECT_EQ(report.Find("token.user_name", "finding").found, "missing");
 }
 
 TEST_P(Token, OfManyUnusualClaimsIsReadToTheEnd) {
