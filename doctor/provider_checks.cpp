@@ -87,7 +87,8 @@ class ProviderCheck {
             const std::string cause = CauseOf(text);
             report_.Finding(id + ".reachable", subject,
                             transfer.url + ": " + text + (cause.empty() ? "" : " (" + cause + ")"),
-                            "see what this machine gets from there: curl -v " + transfer.url);
+                            // Not as a command to copy: the provider may have chosen the address.
+                            "ask that address from this machine by other means, curl -v for instance");
             if (transfer.result == CURLE_PEER_FAILED_VERIFICATION) {
                 ExplainRefusedCertificate(id, transfer.url);
             }
