@@ -35,9 +35,9 @@ const FILLED_IN = new Map([
     ['clang-format -i FILE', 'clang-format -i sso/sso.cpp'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
     ['man tavosso-doctor', 'man ./docs/man/tavosso-doctor.8'],
-    ['tavosso-doctor explain TEXT', '/usr/local/sbin/tavosso-doctor explain "profile not support."'],
+    ['tavosso-doctor explain TEXT', 'build/release/doctor/tavosso-doctor explain "profile not support."'],
     ['sudo tavosso-doctor --domain corp.example.net',
-        'tavosso-doctor --domain corp.example.net || [ $? = 1 ]'], // no profile is set up there
+        'build/release/doctor/tavosso-doctor --domain corp.example.net || [ $? = 1 ]'], // no profile is set up there
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
 ]);

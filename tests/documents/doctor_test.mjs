@@ -9,8 +9,8 @@ const sources = filesMatching('doctor/*.cpp').map(read).join('\n');
 
 /** The ids that stand in the sources, and those that are put together there. */
 function ids() {
-    const whole = [...sources.matchAll(/"((?:profile|client|discovery|keys|token_endpoint|token|directory|state|login)\.[a-z_]+)"/g)]
-        .map(([, id]) => id);
+    const groups = 'profile|client|discovery|keys|token_endpoint|token|directory|state|login';
+    const whole = [...sources.matchAll(new RegExp(`"((?:${groups})\\.[a-z_]+)"`, 'g'))].map(([, id]) => id);
     const keys = [...sources.matchAll(/^ +\{"([a-z_]+)", Kind::/gm)].map(([, key]) => `client.${key}`);
     const endpoints = [...sources.matchAll(/CheckEndpoint\("([a-z_]+)"/g)].map(([, member]) => `discovery.${member}`);
     const transfers = [...sources.matchAll(/CheckTransfer\("([a-z_]+)"/g)].flatMap(([, id]) =>

@@ -12,14 +12,14 @@ const GUIDE = fileURLToPath(new URL('../../docs/operations.md', import.meta.url)
 const TRANSCRIPT = /(?<=^```text\n)\nProfile\n[^]*?\d+ findings\.\n(?=```$)/m;
 const SETTINGS = '/usr/tavo/etc/ssoclient';
 
-// As they may be after an afternoon: a key misspelt, another page as return program, rights as an editor left them.
+// As they may be after an afternoon: a key with a capital, another page as return program, rights as an editor left them.
 const FILES = {
     [`${SETTINGS}/profile.conf`]: {sso_enable: true, sso_profile: 'azure'},
     [`${SETTINGS}/azure.conf`]: {
         azure_sso_enable: true,
         azure_wellknown: 'https://login.example.com/9f3c/.well-known/openid-configuration',
         azure_client_id: '5d1b0c6e-6f3e-4c4d-9d55-0e1f2a3b4c5d',
-        azure_client_secert: 'a long random text of the provider',
+        Azure_client_secret: 'a long random text of the provider',
         azure_tenant_id: '9f3c',
         azure_authorization_endpoint: 'https://login.example.com/9f3c/oauth2/authorize',
         azure_token_endpoint: 'https://login.example.com/9f3c/oauth2/token',
