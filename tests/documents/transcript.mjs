@@ -12,7 +12,7 @@ const GUIDE = fileURLToPath(new URL('../../docs/operations.md', import.meta.url)
 const TRANSCRIPT = /(?<=^```text\n)\nProfile\n[^]*?\d+ findings\.\n(?=```$)/m;
 const SETTINGS = '/usr/tavo/etc/ssoclient';
 
-// As they may be after an afternoon: a key with a capital, another page as return program, rights as an editor left them.
+// As they may be after an afternoon: a key with a capital, another page to return to, rights as an editor left them.
 const FILES = {
     [`${SETTINGS}/profile.conf`]: {sso_enable: true, sso_profile: 'azure'},
     [`${SETTINGS}/azure.conf`]: {
