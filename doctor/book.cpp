@@ -20,11 +20,11 @@ namespace {
 /// A kind of table, by what its first column is headed with.
 struct Kind {
     const char *head;
-    std::array<const char *, 7> placeholders;  // words of its texts that stand for something else
+    std::array<const char *, 8> placeholders;  // words of its texts that stand for something else
 };
 
 constexpr Kind kKinds[] = {
-    {"line", {"N", "CURL", "SYSTEM", "NAME", "ID", "SOURCE", "REASON"}},
+    {"line", {"N", "CURL", "SYSTEM", "NAME", "ID", "SOURCE", "REASON", "DOMAIN"}},
     {"reason", {"SYSTEM", "ERROR", "DESCRIPTION"}},
     {"text", {"ALG"}},
     {"CURL", {}},

@@ -19,12 +19,13 @@ std::optional<Profile> CheckProfile(Report &report);
 /// The file of the profile's client, key by key.
 void CheckClientFile(Report &report, Client &client, const std::string &returnProgram);
 
-/// The discovery document, the certificate of its server, the key set and the clock, and the token endpoint. The latter
-/// is asked to exchange a code that was made up, which tells whether it takes the client's id and secret.
+/// The discovery document, the certificate of its server, the clock, the authorization endpoint, the key set, and the
+/// token endpoint. The latter is asked to exchange a code that was made up, which tells whether it takes the client's
+/// id and secret.
 void CheckProvider(Report &report, Client &client);
 
-/// What the platform converts domains by; of one domain, if one is told, which of its sources answers.
-void CheckDirectory(Report &report, const std::optional<std::string> &domain);
+/// What the platform converts domains by; of one domain, or that of a user, if one is told, which source answers.
+void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser);
 
 /// How much of what a front end remembers fits into the state.
 void CheckState(Report &report, Client &client);

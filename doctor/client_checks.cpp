@@ -229,7 +229,11 @@ void CheckClientFile(Report &report, Client &client, const std::string &returnPr
     ReportIDs(report);
     const SettingsFile file = ReadSettingsFile(client.profile() == Profile::kAzure ? kAzureFile : kWebSphereFile);
     if (!file.problem.empty()) {
-        report.Finding("client.file", "file", file.problem, file.remedy);
+        report.Finding("client.file", "file", file.problem,
+                       file.isRefused
+                           ? "leave its rights as they are, for it holds the secret: the web server has to start its "
+                             "programs as root, or with root as saved ids"
+                           : file.remedy);
         return;
     }
     report.Good("client.file", "file", file.path + " is JSON");

@@ -101,10 +101,13 @@ class LoginWalk {
   private:
     std::string AskForAddress(const std::string &uri) {
         const SilentTerminal silent;  // before it is asked for: someone may be quick
-        report_.Say("Open this address in a browser, and sign in:\n\n  " + Printable(uri) +
-                    "\n\nThe provider then sends the browser to " + Printable(client_->GetRedirectURI()) +
-                    ".\nCopy the whole address that it was sent to, with the code in it, before the page there answers"
-                    "\n(the browser's network tools show it), paste it here, and press Enter. It is not shown.\n");
+        report_.Say(
+            "Open this address in a browser, and sign in:\n\n  " + Printable(uri) +
+            "\n\nThe provider then sends the browser to " + Printable(client_->GetRedirectURI()) +
+            ".\nCopy the whole address that it was sent to, with the code in it. Should the page there replace it at\n"
+            "once, look for it in the browser's network tools, or end this and take a redirect URI that nobody\n"
+            "serves, if one is registered (--redirect-uri). An error page of the provider tells what is wrong.\n\n"
+            "Paste the address here, and press Enter. It is not shown.\n");
         return ReadAddress();
     }
 
@@ -121,7 +124,7 @@ class LoginWalk {
             return false;
         }
         if (!code || code->empty()) {
-            report_.Finding("login.answer", "answer of the provider", "there is no code in the address, or two",
+            report_.Finding("login.answer", "answer of the provider", "that is no address with one code in it",
                             "copy the whole address that the provider sent the browser to");
             return false;
         }

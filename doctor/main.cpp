@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <CLI/CLI.hpp>
+#include <boost/algorithm/string/join.hpp>
 #include <boost/algorithm/string/trim.hpp>
 #include <cstdlib>
 #include <fstream>
@@ -11,6 +12,7 @@
 #include <iterator>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "doctor/book.h"
 #include "doctor/built_in.h"
@@ -40,7 +42,7 @@ struct Options {
     std::string tokenFile;
     bool mayFetch = false;
     std::string redirectURI;
-    std::string text;
+    std::vector<std::string> words;
 };
 
 /// Why the command cannot run at all.
@@ -132,7 +134,7 @@ int Login(Report &report, const Options &options) {
 }
 
 int Explain(const Options &options) {
-    const std::vector<Doctor::Explanation> explanations = Doctor::LookUp(options.text);
+    const std::vector<Doctor::Explanation> explanations = Doctor::LookUp(boost::join(options.words, " "));
     Json::Value json;
     json["version"] = Doctor::kJsonVersion;
     json["command"] = "explain";
@@ -154,7 +156,7 @@ int Explain(const Options &options) {
     if (options.isJson) {
         Doctor::WriteJson(json);
     } else if (explanations.empty()) {
-        std::cout << "The guides do not know this text.\n";
+        std::cout << "The guides do not know this text. Try a whole line of the log, or an exception's text.\n";
     }
     return explanations.empty() ? kFindings : kHealthy;
 }
@@ -186,7 +188,7 @@ int main(int argc, char **argv) try {
     login->add_option("--redirect-uri", options.redirectURI, "Another one that is registered at the provider");
 
     CLI::App *explain = app.add_subcommand("explain", "Explain an exception's text or a line of the log");
-    explain->add_option("TEXT", options.text, "The text")->required();
+    explain->add_option("TEXT", options.words, "The text")->required();
 
     try {
         app.parse(argc, argv);

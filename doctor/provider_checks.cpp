@@ -13,6 +13,7 @@
 #include "doctor/key_set.h"
 #include "doctor/settings_file.h"
 #include "doctor/watch.h"
+#include "frontend/cgi.h"
 #include "frontend/text.h"
 
 namespace Doctor {
@@ -23,6 +24,7 @@ constexpr long kDay = 24L * 60 * 60;
 constexpr long kSoon = 14 * kDay;  // time enough for getting another certificate
 constexpr long kWrongClock = 60;   // tokens may be valid for a few minutes only
 constexpr long kSuccess = 200;
+constexpr long kRefusals = 400;  // and above
 
 // No provider has given out this one.
 constexpr char kMadeUpCode[] = "tavosso-doctor-made-this-up";
@@ -73,6 +75,7 @@ class ProviderCheck {
 
     void Run() {
         CheckDiscovery();
+        CheckAuthorization();
         if (client_.Azure() != nullptr) {
             CheckKeys();
         }
@@ -239,6 +242,43 @@ class ProviderCheck {
                         "the provider offers " + Frontend::WriteCompact(offers) +
                             ", and none that is needed: " + boost::join(usable, ", "),
                         remedy);
+    }
+
+    /// The browser's first request, made without one: a provider that does not know the client, or not by this redirect
+    /// URI, mostly says so at once.
+    void CheckAuthorization() {
+        report_.Section("Authorization endpoint");
+        constexpr char kSubject[] = "authorization endpoint";
+        if (!boost::istarts_with(client_->GetAuthEndpoint(), "https://")) {
+            report_.NotChecked("authorization_endpoint.reachable", kSubject, "it has no https address");
+            return;
+        }
+        try {
+            std::string response;
+            TAVO::SSO::httpGet(client_.AuthorizationURI(Json::objectValue), response, true, Ignore);
+        } catch (const std::exception &) {
+            // The transfer tells.
+        }
+        Transfer transfer = LastTransfer(report_);
+        transfer.url = client_->GetAuthEndpoint();  // without a query of hundreds of characters
+        if (CheckTransfer("authorization_endpoint", kSubject, transfer)) {
+            ReportAuthorization(transfer);
+        }
+    }
+
+    void ReportAuthorization(const Transfer &transfer) {
+        constexpr char kID[] = "authorization_endpoint.request";
+        constexpr char kSubject[] = "first request of a login";
+        const auto error = Frontend::OnlyValue(Frontend::ParseQuery(SplitAddress(transfer.location).query), "error");
+        if (transfer.status < kRefusals && !error) {
+            report_.Good(kID, kSubject, "the provider does not refuse it: HTTP " + std::to_string(transfer.status));
+            return;
+        }
+        report_.Finding(
+            kID, kSubject,
+            "the provider refuses it: HTTP " + std::to_string(transfer.status) + (error ? ", " + Quoted(*error) : ""),
+            "are the client's id and the redirect URI registered there, letter by letter, host and port "
+            "too? tavosso-doctor login gives the address to open: the page there may tell more");
     }
 
     void CheckKeys() {

@@ -191,6 +191,15 @@ void Report::Print(const Check &check) const {
     std::cout.flush();
 }
 
+/// That nothing was found says little of them.
+void Report::PrintNotChecked() const {
+    for (const Check &check : checks_) {
+        if (check.mark == Mark::kNotChecked) {
+            std::cout << "Not checked: " << check.subject << " (" << check.found << ")\n";
+        }
+    }
+}
+
 void Report::Finish(const std::string &command, const Json::Value &more) {
     const auto findings =
         std::count_if(checks_.begin(), checks_.end(), [](const Check &check) { return check.mark == Mark::kFinding; });
@@ -199,6 +208,7 @@ void Report::Finish(const std::string &command, const Json::Value &more) {
                   << (findings == 0 ? "No findings."
                                     : std::to_string(findings) + (findings == 1 ? " finding." : " findings."))
                   << '\n';
+        PrintNotChecked();
         return;
     }
     Json::Value json = more;

@@ -75,6 +75,7 @@ class Report {
   private:
     std::string Redact(std::string text) const;
     void Print(const Check &check) const;
+    void PrintNotChecked() const;
 
     Presentation presentation_;
     std::vector<std::string> hidden_;

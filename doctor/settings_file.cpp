@@ -82,13 +82,14 @@ std::string ProblemOf(const std::string &text, Json::Value &content) {
 }  // namespace
 
 SettingsFile ReadSettingsFile(const std::string &path) {
-    SettingsFile file{path, Json::Value(), "", ""};
+    SettingsFile file{path, Json::Value(), "", "", false};
     errno = 0;
     const std::ifstream stream(path, std::ios::binary);
     std::ostringstream content;
     content << stream.rdbuf();  // which throws nothing where it is a directory
     if (errno != 0) {
         const bool isMissing = errno == ENOENT;
+        file.isRefused = errno == EACCES;
         file.problem = path + (isMissing ? " is missing" : std::string(" cannot be read: ") + std::strerror(errno));
         file.remedy =
             isMissing ? "write it; its manual page has an example: man 5 tavosso-" + path.substr(path.rfind('/') + 1)

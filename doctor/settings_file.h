@@ -21,6 +21,7 @@ struct SettingsFile {
     Json::Value content;  // an object; null where there is a problem
     std::string problem;  // why the library cannot use the file
     std::string remedy;
+    bool isRefused = false;  // it is there, and these ids may not read it
 };
 
 /// Reads as the library does, with its JSON reader and with the ids of this process.

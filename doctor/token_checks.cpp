@@ -159,7 +159,7 @@ class TokenCheck {
         const bool hasForm = dots == 2;
         Step("token.form", "form", hasForm,
              token_.empty() ? "there is no token"
-                            : std::to_string(dots + 1) + " parts, " + std::to_string(token_.size()) + " bytes",
+                            : "parts: " + std::to_string(dots + 1) + ", bytes: " + std::to_string(token_.size()),
              "an ID token has three parts with a dot between them (RFC 7515): is this the \"id_token\" of the "
              "provider's answer, and the whole of it?");
         return hasForm && ReadPart("token.header", "header", &TAVO::JWT::Jwt::GetHeader, header_) &&
@@ -177,7 +177,7 @@ class TokenCheck {
             return false;
         }
         isHeaderGood_ = true;
-        Step(id, subject, true, "JSON, " + std::to_string(part.isObject() ? part.size() : 0) + " members", remedy);
+        Step(id, subject, true, "JSON, members: " + std::to_string(part.isObject() ? part.size() : 0), remedy);
         return true;
     }
 
@@ -185,10 +185,9 @@ class TokenCheck {
         const std::time_t now = std::time(nullptr);
         const std::time_t expiry = std::strtol(TextOfMember(claims_, "exp").c_str(), nullptr, 10);
         const bool isGood = now <= expiry;
-        Step(
-            "token.expiry", "lifetime: \"exp\"", isGood,
-            Describe(claims_, "exp") + (isGood ? ", until " : ", expired ") + TimeOf(expiry) + "; it is " + TimeOf(now),
-            "is the clock of this machine right (timedatectl)? an old token is no sign of anything else");
+        const std::string end = expiry == 0 ? "" : (isGood ? ", until " : ", expired ") + TimeOf(expiry);
+        Step("token.expiry", "lifetime: \"exp\"", isGood, Describe(claims_, "exp") + end + "; it is " + TimeOf(now),
+             "is the clock of this machine right (timedatectl)? an old token is no sign of anything else");
     }
 
     void Compare(const std::string &id, const std::string &subject, const char *claim, const std::string &configured,

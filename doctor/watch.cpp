@@ -57,10 +57,10 @@ std::vector<Certificate> ReadCertificates(CURL *handle) {
     return certificates;
 }
 
-std::string URLOf(CURL *handle) {
-    char *url = nullptr;
-    curl_easy_getinfo(handle, CURLINFO_EFFECTIVE_URL, &url);
-    return url != nullptr ? url : "";
+std::string TextOf(CURL *handle, CURLINFO which) {
+    char *text = nullptr;
+    curl_easy_getinfo(handle, which, &text);
+    return text != nullptr ? text : "";
 }
 
 /// A line of its own on a terminal, and gone when the answer is there.
@@ -86,7 +86,7 @@ CURLcode Perform(CURL *handle) {
     curl_easy_setopt(handle, CURLOPT_CERTINFO, 1L);
     curl_easy_setopt(handle, CURLOPT_HEADERFUNCTION, ReadDate);
     curl_easy_setopt(handle, CURLOPT_HEADERDATA, &transfer.date);
-    transfer.url = URLOf(handle);
+    transfer.url = TextOf(handle, CURLINFO_EFFECTIVE_URL);
     if (refusals > 0) {
         transfer.result = CURLE_ABORTED_BY_CALLBACK;
     } else {
@@ -96,6 +96,7 @@ CURLcode Perform(CURL *handle) {
         transfer.result = perform(handle);
         transfer.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
         curl_easy_getinfo(handle, CURLINFO_RESPONSE_CODE, &transfer.status);
+        transfer.location = TextOf(handle, CURLINFO_REDIRECT_URL);
         transfer.certificates = ReadCertificates(handle);
     }
     transfers.push_back(transfer);

@@ -21,6 +21,7 @@ struct Transfer {
     std::string url;
     CURLcode result = CURLE_OK;
     long status = 0;
+    std::string location;  // where the answer sends a browser, whole; empty where it does not
     double seconds = 0;
     std::time_t date = -1;                  // by the server's clock, from its "Date"; -1 where it told none
     std::vector<Certificate> certificates;  // the server's own first; none where TLS was not established

@@ -85,6 +85,7 @@ Appliance::Appliance(Profile profile, const Credentials &credentials)
 
     answers_["/discovery"] = [this](const std::string & /*request*/) { return HTTPAnswer(Compact(discovery_)); };
     answers_["/keys"] = [](const std::string & /*request*/) { return HTTPAnswer(KeySet()); };
+    answers_["/authorization_endpoint"] = [](const std::string & /*request*/) { return HTTPAnswer("who are you?"); };
     answers_["/token_endpoint"] = [this](const std::string &request) { return AnswerCode(request); };
     server_.Play([this](Connection &connection) { Serve(connection); });
 }
@@ -154,7 +155,8 @@ void Appliance::Serve(Connection &connection) {
 std::string Appliance::AnswerTo(const std::string &request) {
     const Lock lock(mutex_);
     const std::string line = request.substr(0, request.find(" HTTP/1.1"));
-    const auto answer = answers_.find(line.substr(line.rfind('/')));
+    const std::string path = line.substr(0, line.find('?'));
+    const auto answer = answers_.find(path.substr(path.rfind('/')));
     return answer != answers_.end() ? answer->second(request) : HTTPAnswer("no such page", "404 Not Found");
 }
 

@@ -33,6 +33,7 @@ const Words &WordsOf(const std::string &head) {
           {"NAME", R"(CORP\alice)"},
           {"ID", "4711"},
           {"SOURCE", "webspheresso"},
+          {"DOMAIN", "CORP.EXAMPLE"},
           {"REASON", "no reason that anyone knows"}}},
         {"reason", {{"SYSTEM", "No such file or directory"}, {"ERROR", "access_denied"}, {"DESCRIPTION", "not today"}}},
         {"text", {{"ALG", "ES256"}}},
@@ -144,7 +145,8 @@ TEST(Explain, SaysSoWhereTheGuidesDoNotKnowAText) {
     for (const std::string text : {"systemd[1]: Started lighttpd.service", "", " ", "*", "[", "\\"}) {
         EXPECT_EQ(Explanations(text), Strings()) << text;
     }
-    EXPECT_EQ(RunDoctor({"explain", "a text of someone else"}).output, "The guides do not know this text.\n");
+    EXPECT_EQ(RunDoctor({"explain", "a text of someone else"}).output,
+              "The guides do not know this text. Try a whole line of the log, or an exception's text.\n");
 }
 
 }  // namespace

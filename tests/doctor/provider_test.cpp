@@ -174,6 +174,23 @@ TEST_F(AProvider, CodeThatIsRefusedIsTheAnswerToAGoodClient) {
     EXPECT_THAT(appliance.Requests(), Contains(HasSubstr("code=tavosso-doctor-made-this-up")));
 }
 
+TEST_F(AProvider, FirstRequestOfALoginThatIsRefusedIsAFinding) {
+    appliance.AnswerAt("/authorization_endpoint", "redirect_uri did not match", "400 Bad Request");
+    const Check finding = OnlyFinding();
+    EXPECT_EQ(finding.id, "authorization_endpoint.request");
+    EXPECT_THAT(finding.found, HasSubstr("HTTP 400"));
+}
+
+TEST_F(AProvider, FirstRequestOfALoginThatIsSentBackWithAnErrorIsAFinding) {
+    appliance.AnswerAt("/authorization_endpoint", [](const std::string & /*request*/) {
+        return "HTTP/1.1 302 Found\r\nLocation: " + std::string(kReturnURI) +
+               "?error=unauthorized_client\r\nContent-Length: 0\r\n\r\n";
+    });
+    const Check finding = OnlyFinding();
+    EXPECT_EQ(finding.id, "authorization_endpoint.request");
+    EXPECT_THAT(finding.found, HasSubstr("\"unauthorized_client\""));
+}
+
 TEST_F(AProvider, ClientThatIsRefusedIsAFinding) {
     for (const char *error : {"invalid_client", "unauthorized_client"}) {
         appliance.RefuseCodes(error);

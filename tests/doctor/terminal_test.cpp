@@ -47,7 +47,7 @@ TEST_F(Terminal, DoesNotShowTheAddressThatIsPasted) {
     Dialogue dialogue(kTerminal, {"login"});
     const unsigned int before = dialogue.FirstLocalModes();
     ASSERT_EQ(before & kShowsInput, kShowsInput);
-    EXPECT_THAT(dialogue.ReadUntil("It is not shown."), HasSubstr("paste it here"));
+    EXPECT_THAT(dialogue.ReadUntil("It is not shown."), HasSubstr("Paste the address here"));
     EXPECT_EQ(dialogue.LocalModes() & kShowsInput, 0U);
     dialogue.Write(kReturnURI + ("?state=not+this&code=pasted-" + std::string(20, 'x')) + "\n");
     EXPECT_THAT(dialogue.ReadUntil("finding"), Not(HasSubstr("pasted-")));

@@ -9,13 +9,13 @@ const sources = filesMatching('doctor/*.cpp').map(read).join('\n');
 
 /** The ids that stand in the sources, and those that are put together there. */
 function ids() {
-    const groups = 'profile|client|discovery|keys|token_endpoint|token|directory|state|login';
+    const groups = 'profile|client|discovery|authorization_endpoint|keys|token_endpoint|token|directory|state|login';
     const whole = [...sources.matchAll(new RegExp(`"((?:${groups})\\.[a-z_]+)"`, 'g'))].map(([, id]) => id);
     const keys = [...sources.matchAll(/^ +\{"([a-z_]+)", Kind::/gm)].map(([, key]) => `client.${key}`);
     const endpoints = [...sources.matchAll(/CheckEndpoint\("([a-z_]+)"/g)].map(([, member]) => `discovery.${member}`);
     const transfers = [...sources.matchAll(/CheckTransfer\("([a-z_]+)"/g)].flatMap(([, id]) =>
         [`${id}.reachable`, `${id}.certificate`]);
-    assert.ok(keys.length > 10 && endpoints.length === 3 && transfers.length === 6);
+    assert.ok(keys.length > 10 && endpoints.length === 3 && transfers.length === 8);
     return [...new Set([...whole, ...keys, ...endpoints, ...transfers, 'clock'])];
 }
 
