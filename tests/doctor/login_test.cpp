@@ -67,7 +67,8 @@ TEST_P(LoginOf, ARefusedUserIsAFindingInTheProvidersWords) {
 TEST_P(LoginOf, AnAddressWithoutACodeIsAFinding) {
     for (const char *query : {"", "?", "?state=s", "?code=", "?code=a&code=b"}) {
         LoginDialogue dialogue;
-        EXPECT_THAT(dialogue.Paste(kReturnURI + std::string(query)).FirstFinding().found, HasSubstr("no address with one code"))
+        EXPECT_THAT(dialogue.Paste(kReturnURI + std::string(query)).FirstFinding().found,
+                    HasSubstr("no address with one code"))
             << query;
     }
     LoginDialogue dialogue;
