@@ -9,7 +9,7 @@ import {chmodSync, mkdirSync, readFileSync, writeFileSync} from 'node:fs';
 import {fileURLToPath} from 'node:url';
 
 const GUIDE = fileURLToPath(new URL('../../docs/operations.md', import.meta.url));
-const TRANSCRIPT = /(?<=^```text\n)\nProfile\n[^]*?\d+ findings\.\n(?=```$)/m;
+const TRANSCRIPT = /(?<=^```text\n)\nProfile\n[^]*?(?=^```$)/m;
 const SETTINGS = '/usr/tavo/etc/ssoclient';
 
 // As they may be after an afternoon: a key with a capital, another page to return to, rights as an editor left them.
