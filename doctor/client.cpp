@@ -7,6 +7,11 @@ namespace Doctor {
 
 std::string NameOf(Profile profile) { return profile == Profile::kAzure ? "azure" : "websphere"; }
 
+std::vector<std::string> AlgorithmsOf(Profile profile) {
+    return profile == Profile::kAzure ? std::vector<std::string>{"RS256", "RS384", "RS512"}
+                                      : std::vector<std::string>{"HS256", "HS384", "HS512"};
+}
+
 void AzureClient::RequestWellknownInfo(Json::Value &out) {
     if (!mayFetch) {
         throw not_fetched();

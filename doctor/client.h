@@ -3,10 +3,12 @@
 
 #include <sso/sso.h>
 
+#include <cstddef>
 #include <exception>
 #include <optional>
 #include <string>
 #include <variant>
+#include <vector>
 
 // The library's own clients: whatever they can decide is decided by them.
 namespace Doctor {
@@ -14,6 +16,12 @@ namespace Doctor {
 enum class Profile { kAzure, kWebSphere };
 
 std::string NameOf(Profile profile);
+
+/// The signatures that the profile's client can verify.
+std::vector<std::string> AlgorithmsOf(Profile profile);
+
+/// In bytes: in base64 it becomes the key's text, for which there are 1024 bytes, its NUL and three more among them.
+constexpr std::size_t kLongestWebSphereSecret = 765;
 
 /// In the place of a request that was not asked for.
 class not_fetched : public std::exception {

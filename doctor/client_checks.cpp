@@ -59,9 +59,6 @@ std::vector<Key> KeysOf(Profile profile) {
                                       : std::vector<Key>(std::begin(kWebSphereKeys), std::end(kWebSphereKeys));
 }
 
-// In base64 it becomes the key's text, for which there are 1024 bytes, its NUL and three more among them.
-constexpr std::size_t kLongestWebSphereSecret = 765;
-
 class KeyCheck {
   public:
     KeyCheck(Report &report, Client &client, const SettingsFile &file, const std::string &returnProgram)

@@ -188,9 +188,7 @@ class ProviderCheck {
             CheckEndpoint("end_session_endpoint", client_->GetLogoutEndpoint(), Mark::kNote);
         }
         CheckOffer("id_token_signing_alg_values_supported", "discovery.algorithms", "signatures of tokens",
-                   client_.Azure() != nullptr ? std::vector<std::string>{"RS256", "RS384", "RS512"}
-                                              : std::vector<std::string>{"HS256", "HS384", "HS512"},
-                   "let the provider sign this client's tokens with one of them");
+                   AlgorithmsOf(client_.profile()), "let the provider sign this client's tokens with one of them");
         CheckOffer("token_endpoint_auth_methods_supported", "discovery.client_authentication", "client authentication",
                    {"client_secret_post"},
                    "let the provider take the client's secret from the form (client_secret_post) for this client");

@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <ctime>
 #include <iterator>
+#include <vector>
 
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
@@ -44,13 +45,6 @@ const Stop kStops[] = {
 };
 constexpr char kNoAlgorithm[] = " algorithm is not supported";  // behind the algorithm's name
 constexpr char kEmptyPart[] = "empty jwt part";                 // of header or claims
-
-struct Algorithm {
-    const char *name;
-    const EVP_MD *(*digest)();
-};
-constexpr Algorithm kRSA[] = {{"RS256", EVP_sha256}, {"RS384", EVP_sha384}, {"RS512", EVP_sha512}};
-constexpr Algorithm kHMAC[] = {{"HS256", EVP_sha256}, {"HS384", EVP_sha384}, {"HS512", EVP_sha512}};
 
 /// A member as the library compares it: a text, or what a number or boolean reads as.
 std::string TextOfMember(const Json::Value &object, const char *name) {
@@ -200,29 +194,29 @@ class TokenCheck {
         return object.isObject() && (object[name].isArray() || object[name].isObject());
     }
 
-    const EVP_MD *CheckAlgorithm(const Algorithm (&supported)[3]) {
+    /// Gives the digest, null where the client does not support the algorithm.
+    const EVP_MD *CheckAlgorithm() {
         const std::string name = TextOfMember(header_, "alg");
-        const auto *algorithm = std::find_if(std::begin(supported), std::end(supported),
-                                             [&](const Algorithm &other) { return name == other.name; });
-        const bool isSupported = algorithm != std::end(supported);
+        const std::vector<std::string> supported = AlgorithmsOf(client_.profile());
+        const bool isSupported = std::find(supported.begin(), supported.end(), name) != supported.end();
         Step("token.algorithm", "algorithm: \"alg\"", isSupported,
-             Describe(header_, "alg") + (isSupported ? ""
-                                                     : "; this profile takes " + std::string(supported[0].name) + ", " +
-                                                           supported[1].name + " and " + supported[2].name),
-             "let the provider sign this client's tokens with " + std::string(supported[0].name));
-        return isSupported ? algorithm->digest() : nullptr;
+             Describe(header_, "alg") +
+                 (isSupported ? ""
+                              : "; this profile takes " + supported[0] + ", " + supported[1] + " and " + supported[2]),
+             "let the provider sign this client's tokens with " + supported[0]);
+        return isSupported ? EVP_get_digestbyname(("SHA" + name.substr(2)).c_str()) : nullptr;  // RS256 uses SHA256
     }
 
     void CheckRSASignature() {
         if (!mayFetch_) {
-            CheckAlgorithm(kRSA);
+            CheckAlgorithm();
             report_.NotChecked("token.key", "key: \"kid\"", Describe(header_, "kid") + "; --fetch asks for the keys");
             report_.NotChecked("token.signature", "signature", "--fetch asks for the keys");
             return;
         }
         const Json::Value key = FindKey();
         if (key.isNull()) {
-            CheckAlgorithm(kRSA);
+            CheckAlgorithm();
             report_.NotChecked("token.signature", "signature", "there is no key for it");
             return;
         }
@@ -232,7 +226,7 @@ class TokenCheck {
         Step("token.key_numbers", "numbers of the key", hasNumbers,
              hasNumbers ? std::to_string(SizeOf(key)) + " bits" : R"(it lacks "n" or "e")",
              "the provider's key is no RSA key: let the provider sign with one");
-        const EVP_MD *digest = CheckAlgorithm(kRSA);
+        const EVP_MD *digest = CheckAlgorithm();
         CheckSignature(
             hasNumbers && digest != nullptr, [&](TAVO::JWT::Jwt &jwt) { jwt.JwtRSAVerify(n, e, digest); },
             "does azure_wellknown belong to the provider that made the token? or was the token changed?");
@@ -267,11 +261,11 @@ class TokenCheck {
     }
 
     void CheckHMACSignature() {
-        const EVP_MD *digest = CheckAlgorithm(kHMAC);
+        const EVP_MD *digest = CheckAlgorithm();
         const std::string secret = client_->GetClientSecret();
-        constexpr std::size_t kLongest = 765;
-        Step("token.secret", "client secret", !secret.empty() && secret.size() <= kLongest,
-             std::to_string(secret.size()) + " bytes", "set websphere_client_secret: 1 to 765 bytes");
+        Step("token.secret", "client secret", !secret.empty() && secret.size() <= kLongestWebSphereSecret,
+             std::to_string(secret.size()) + " bytes",
+             "set websphere_client_secret: 1 to " + std::to_string(kLongestWebSphereSecret) + " bytes");
         std::string key = EncodeBase64(secret);
         CheckSignature(
             digest != nullptr && !secret.empty(), [&](TAVO::JWT::Jwt &jwt) { jwt.JwtHMACVerify(key, digest); },
