@@ -7,7 +7,6 @@
 #include <boost/algorithm/string.hpp>
 #include <cctype>
 #include <cstring>
-#include <optional>
 #include <sstream>
 
 #include "doctor/built_in.h"

@@ -11,8 +11,9 @@ namespace Doctor {
 
 struct Explanation {
     std::string about;  // the text as the guide has it, with words in capitals for what differs
-    std::vector<std::pair<std::string, std::string>>
-        told;  // each other column of the table: its head, and what it says
+
+    /// Each other column of the table: its head, and what it says.
+    std::vector<std::pair<std::string, std::string>> told;
 
     /// What a column says, empty where the table has none of that name.
     std::string Told(const std::string &column) const;

@@ -104,7 +104,7 @@ class KeyCheck {
     void Finding(const std::string &found, const std::string &remedy) { report_.Finding(id_, name_, found, remedy); }
 
     void CheckSwitch() {
-        const Json::Value value = file_.content.get(name_, Json::Value());
+        const Json::Value &value = file_.content[name_];
         if (value.isNull() || value.isBool()) {
             report_.Good(id_, name_, "no login looks at it: the profile decides");
         } else {
@@ -114,7 +114,7 @@ class KeyCheck {
     }
 
     void CheckEmpty(const Key &key) {
-        const Json::Value value = file_.content.get(name_, Json::Value());
+        const Json::Value &value = file_.content[name_];
         const std::string found = !file_.content.isMember(name_) ? "is missing"
                                   : value.isString()             ? "is empty"
                                                                  : "is no text: the library takes it for empty";

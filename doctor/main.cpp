@@ -100,7 +100,7 @@ int CheckEverything(Report &report, const Options &options) {
 
 /// The client of the profile in force, for a command that can do nothing without one.
 Client RequireClient(Report &report) {
-    Report silent({true, false, false});
+    Report silent({true, false, false});  // a report for machines is printed when it is finished, as this one never is
     const std::optional<Profile> profile = Doctor::CheckProfile(silent);
     if (!profile) {
         throw cannot_run("no profile is in force; tavosso-doctor, without a command, tells why");

@@ -11,11 +11,6 @@ namespace {
 constexpr char kEnable[] = "sso_enable";
 constexpr char kName[] = "sso_profile";
 
-void ReportRefusal(Report &report, const std::string &id, const std::string &subject, const std::string &found,
-                   const std::string &remedy, const std::string &library) {
-    report.Add({id, subject, Mark::kFinding, found, remedy, library});
-}
-
 std::string Describe(const Json::Value &file, const char *key) {
     if (!file.isMember(key)) {
         return "is missing";
@@ -44,7 +39,7 @@ std::optional<Profile> CheckProfile(Report &report) {
     const std::optional<std::string> refusal = RefusalOfProfile();
     const std::string library = refusal.value_or("");
     if (!file.problem.empty()) {
-        ReportRefusal(report, "profile.file", "file", file.problem, file.remedy, library);
+        report.Add({"profile.file", "file", Mark::kFinding, file.problem, file.remedy, library});
         return std::nullopt;
     }
     report.Good("profile.file", "file",
@@ -54,14 +49,14 @@ std::optional<Profile> CheckProfile(Report &report) {
 
     const bool isOn = file.content[kEnable].isBool() && file.content[kEnable].asBool();
     if (!isOn) {
-        ReportRefusal(report, "profile.sso_enable", kEnable, Describe(file.content, kEnable),
-                      "set it to true, the boolean and not a text, to switch single sign-on on", library);
+        report.Add({"profile.sso_enable", kEnable, Mark::kFinding, Describe(file.content, kEnable),
+                    "set it to true, the boolean and not a text, to switch single sign-on on", library});
         return std::nullopt;
     }
     report.Good("profile.sso_enable", kEnable, Describe(file.content, kEnable));
     if (refusal) {
-        ReportRefusal(report, "profile.sso_profile", kName, Describe(file.content, kName),
-                      R"(set it to "azure" or "websphere"; capitals count)", library);
+        report.Add({"profile.sso_profile", kName, Mark::kFinding, Describe(file.content, kName),
+                    R"(set it to "azure" or "websphere"; capitals count)", library});
         return std::nullopt;
     }
     const std::string name = TAVO::SSO::SSOProfile().GetSSOProfile();
