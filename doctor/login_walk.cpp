@@ -10,7 +10,6 @@
 
 #include "doctor/address.h"
 #include "doctor/checks.h"
-#include "doctor/settings_file.h"
 #include "doctor/watch.h"
 #include "frontend/cgi.h"
 #include "frontend/id_token.h"
@@ -67,17 +66,10 @@ std::string ReadAddress() {
     return boost::trim_copy(address);
 }
 
-/// What the provider was told to hand back: the state of an address.
-std::string StateOf(const std::string &authorizationURI) {
-    const std::size_t query = authorizationURI.rfind('?');
-    const auto state = Frontend::OnlyValue(Frontend::ParseQuery(authorizationURI.substr(query + 1)), "state");
-    return state.value_or("");
-}
-
-std::string NonceOf(const std::string &authorizationURI) {
-    const std::size_t query = authorizationURI.rfind('?');
-    const auto nonce = Frontend::OnlyValue(Frontend::ParseQuery(authorizationURI.substr(query + 1)), "nonce");
-    return nonce.value_or("");
+/// What the provider is told by the address that the browser opens.
+std::string ParameterOf(const std::string &authorizationURI, const char *name) {
+    const std::string query = authorizationURI.substr(authorizationURI.rfind('?') + 1);
+    return Frontend::OnlyValue(Frontend::ParseQuery(query), name).value_or("");
 }
 
 class LoginWalk {
@@ -92,8 +84,8 @@ class LoginWalk {
             return false;
         }
         const Frontend::Parameters answer = Frontend::ParseQuery(SplitAddress(address).query);
-        if (CheckAnswer(answer, StateOf(uri))) {
-            Exchange(*Frontend::OnlyValue(answer, "code"), NonceOf(uri));
+        if (CheckAnswer(answer, ParameterOf(uri, "state"))) {
+            Exchange(*Frontend::OnlyValue(answer, "code"), ParameterOf(uri, "nonce"));
         }
         return true;
     }
@@ -143,15 +135,11 @@ class LoginWalk {
         client_->SetCode(code);
         std::string response;
         client_->RequestTokenEndpoint(response, client_->GetIDTokenReqParams());
-        std::string log;
-        for (const std::string &line : TakeLogLines()) {
-            log += "; " + MessageOf(line);
-        }
+        const std::string log = TakeMessages();
         try {
             client_->ProcessTokenResponse(response);
         } catch (const std::exception &failure) {
-            const std::string found = FoundIn(response);
-            report_.Add({"login.exchange", "exchange of the code", Mark::kFinding, found + log,
+            report_.Add({"login.exchange", "exchange of the code", Mark::kFinding, FoundIn(response) + log,
                          "run tavosso-doctor, which looks at the token endpoint and the client", TextOf(failure)});
             return;
         }

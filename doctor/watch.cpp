@@ -113,9 +113,18 @@ void AddLogLine(const char *format, std::va_list arguments) {
 }  // namespace
 
 std::vector<std::string> TakeLogLines() { return std::exchange(logLines, {}); }
+
 std::string MessageOf(const std::string &logLine) {
     const std::size_t blank = logLine.find(' ');
     return blank == std::string::npos ? logLine : logLine.substr(blank + 1);
+}
+
+std::string TakeMessages() {
+    std::string messages;
+    for (const std::string &line : TakeLogLines()) {
+        messages += "; " + MessageOf(line);
+    }
+    return messages;
 }
 
 std::vector<Transfer> TakeTransfers() { return std::exchange(transfers, {}); }

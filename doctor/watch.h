@@ -33,6 +33,9 @@ std::vector<std::string> TakeLogLines();
 /// A line without the source and its line, which tell an administrator nothing.
 std::string MessageOf(const std::string &logLine);
 
+/// The messages of these lines, each behind a semicolon: for the end of what is told as found.
+std::string TakeMessages();
+
 /// The transfers since they were last taken.
 std::vector<Transfer> TakeTransfers();
 
