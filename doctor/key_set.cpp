@@ -8,7 +8,6 @@
 #include <set>
 #include <vector>
 
-#include "doctor/settings_file.h"
 #include "frontend/text.h"
 
 namespace Doctor {

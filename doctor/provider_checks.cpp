@@ -2,8 +2,8 @@
 #include <algorithm>
 #include <boost/algorithm/string/join.hpp>
 #include <boost/algorithm/string/predicate.hpp>
-#include <cmath>
-#include <iterator>
+#include <cstdio>
+#include <cstdlib>
 #include <set>
 #include <vector>
 
@@ -11,7 +11,6 @@
 #include "doctor/book.h"
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
-#include "doctor/settings_file.h"
 #include "doctor/watch.h"
 #include "frontend/cgi.h"
 #include "frontend/text.h"
@@ -45,15 +44,8 @@ Transfer LastTransfer(Report &report) {
     return last;
 }
 
-std::string DayOf(std::time_t time) {
-    char text[sizeof "2026-01-01"];
-    std::tm utc{};
-    gmtime_r(&time, &utc);
-    return std::strftime(text, sizeof text, "%F", &utc) != 0 ? text : "";
-}
-
 std::string Describe(const Certificate &certificate) {
-    return certificate.subject + ", of " + certificate.issuer + ", until " + DayOf(certificate.expires);
+    return certificate.subject + ", of " + certificate.issuer + ", until " + TimeText(certificate.expires, "%F");
 }
 
 std::size_t Ignore(char * /*bytes*/, std::size_t size, std::size_t count, void * /*response*/) { return size * count; }
@@ -334,8 +326,7 @@ class ProviderCheck {
         } else if (error == "invalid_client" || error == "unauthorized_client") {
             check.remedy =
                 "compare the client's id and secret with the provider's; has the secret run out? does the provider "
-                "take "
-                "it from the form (client_secret_post)?";
+                "take it from the form (client_secret_post)?";
         } else if (error == "invalid_request") {
             // Some providers look at the code's form before they look at the client.
             check.mark = Mark::kNote;

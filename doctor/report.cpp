@@ -101,6 +101,15 @@ std::string Printable(const std::string &text) {
     return printable;
 }
 
+std::string Quoted(const std::string &text) { return '"' + text + '"'; }
+
+std::string TimeText(std::time_t time, const char *format) {
+    char text[sizeof "2026-01-01 00:00:00 UTC"];
+    std::tm utc{};
+    const bool isTime = gmtime_r(&time, &utc) != nullptr && std::strftime(text, sizeof text, format, &utc) != 0;
+    return isTime ? text : std::to_string(time);
+}
+
 void WriteJson(const Json::Value &json) {
     Json::StreamWriterBuilder writer;
     writer["indentation"] = "  ";

@@ -3,6 +3,7 @@
 
 #include <json/json.h>
 
+#include <ctime>
 #include <string>
 #include <vector>
 
@@ -14,6 +15,11 @@ constexpr int kJsonVersion = 1;
 
 /// On one line, and of characters alone that a terminal shows and does not obey. What is none in UTF-8 is replaced.
 std::string Printable(const std::string &text);
+
+std::string Quoted(const std::string &text);
+
+/// In UTC, as strftime's format has it; the bare number where the year takes more than four digits.
+std::string TimeText(std::time_t time, const char *format);
 
 /// On standard output.
 void WriteJson(const Json::Value &json);

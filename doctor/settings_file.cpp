@@ -142,6 +142,4 @@ void ReportRights(Report &report, const std::string &id, const SettingsFile &fil
     }
 }
 
-std::string Quoted(const std::string &text) { return '"' + text + '"'; }
-
 }  // namespace Doctor

@@ -34,8 +34,6 @@ void ReportUnknownKeys(Report &report, const std::string &id, const SettingsFile
 /// Whether others than its owner can read a secret in it, or anyone but root can change it.
 void ReportRights(Report &report, const std::string &id, const SettingsFile &file, bool holdsSecret);
 
-std::string Quoted(const std::string &text);
-
 }  // namespace Doctor
 
 #endif

@@ -11,7 +11,6 @@
 
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
-#include "doctor/settings_file.h"
 #include "doctor/watch.h"
 #include "frontend/text.h"
 
@@ -62,20 +61,8 @@ std::string Describe(const Json::Value &object, const char *name) {
     return Frontend::WriteCompact(object[name]);
 }
 
-std::string TimeOf(std::time_t time) {
-    char text[sizeof "2026-01-01 00:00:00 UTC"];
-    std::tm utc{};
-    const bool isTime = gmtime_r(&time, &utc) != nullptr && std::strftime(text, sizeof text, "%F %T UTC", &utc) != 0;
-    return isTime ? text : std::to_string(time);
-}
-
-/// The text of what the library's own verification throws, empty where it passes; and whether it got to the end.
-struct Verdict {
-    std::string text;
-    bool isWhole = true;
-};
-
-Verdict Ask(Client &client, const std::string &token, bool mayFetch, std::string &userName) {
+/// The text of what the library's own verification throws; empty where it passes, or may not fetch what it needs.
+std::string Ask(Client &client, const std::string &token, bool mayFetch) {
     if (client.Azure() != nullptr) {
         client.Azure()->mayFetch = mayFetch;
     }
@@ -84,12 +71,13 @@ Verdict Ask(Client &client, const std::string &token, bool mayFetch, std::string
     try {
         client->ProcessTokenResponse(Frontend::WriteCompact(response));
         client->VerifyIDToken();
+        std::string userName;
         client->GetUserName(userName);
         return {};
     } catch (const not_fetched &) {
-        return {"", false};
+        return {};
     } catch (const std::exception &failure) {
-        return {TextOf(failure), true};
+        return TextOf(failure);
     }
 }
 
@@ -99,7 +87,7 @@ class TokenCheck {
         : report_(report), client_(client), token_(token), mayFetch_(mayFetch) {}
 
     std::string Run() {
-        verdict_ = Ask(client_, token_, mayFetch_, userName_);
+        verdict_ = Ask(client_, token_, mayFetch_);
         for (const std::string &line : TakeLogLines()) {
             report_.Detail("log: " + line);
         }
@@ -128,9 +116,9 @@ class TokenCheck {
     void Step(const std::string &id, const std::string &subject, bool isGood, const std::string &found,
               const std::string &remedy) {
         Check check{id, subject, isGood ? Mark::kGood : Mark::kFinding, found, isGood ? "" : remedy, ""};
-        if (stop_.empty() && id == StopOf(verdict_.text)) {
+        if (stop_.empty() && id == StopOf(verdict_)) {
             stop_ = id;
-            check.library = verdict_.text;
+            check.library = verdict_;
             check.mark = Mark::kFinding;
         }
         report_.Add(check);
@@ -179,8 +167,10 @@ class TokenCheck {
         const std::time_t now = std::time(nullptr);
         const std::time_t expiry = std::strtol(TextOfMember(claims_, "exp").c_str(), nullptr, 10);
         const bool isGood = now <= expiry;
-        const std::string end = expiry == 0 ? "" : (isGood ? ", until " : ", expired ") + TimeOf(expiry);
-        Step("token.expiry", "lifetime: \"exp\"", isGood, Describe(claims_, "exp") + end + "; it is " + TimeOf(now),
+        constexpr char kFormat[] = "%F %T UTC";
+        const std::string end = expiry == 0 ? "" : (isGood ? ", until " : ", expired ") + TimeText(expiry, kFormat);
+        Step("token.expiry", "lifetime: \"exp\"", isGood,
+             Describe(claims_, "exp") + end + "; it is " + TimeText(now, kFormat),
              "is the clock of this machine right (timedatectl)? an old token is no sign of anything else");
     }
 
@@ -238,10 +228,7 @@ class TokenCheck {
         Json::Value keySet;
         client_->RequestWellknownInfo(discovery);
         client_.Azure()->RequestKeysInfo(TextOfMember(discovery, "jwks_uri"), keySet);
-        std::string found = Describe(header_, "kid");
-        for (const std::string &line : TakeLogLines()) {
-            found += "; " + MessageOf(line);
-        }
+        std::string found = Describe(header_, "kid") + TakeMessages();
         Json::Value named;
         const Json::Value keys = keySet.isObject() ? keySet["keys"] : Json::Value();
         if (keys.isArray() && !IsList(header_, "kid")) {
@@ -324,10 +311,7 @@ class TokenCheck {
             isGood = false;
             found = "is not known here";
         }
-        for (const std::string &line : TakeLogLines()) {
-            found += "; " + MessageOf(line);
-        }
-        Step("token.domain", isAzure ? "domain of the user" : "user", isGood, found,
+        Step("token.domain", isAzure ? "domain of the user" : "user", isGood, found + TakeMessages(),
              "join the domain, or write it into /usr/tavo/etc/domains.conf");
     }
 
@@ -335,8 +319,7 @@ class TokenCheck {
     Client &client_;
     const std::string &token_;
     bool mayFetch_;
-    Verdict verdict_;
-    std::string userName_;
+    std::string verdict_;
     std::string stop_;
     bool isHeaderGood_ = false;
     Json::Value header_;
