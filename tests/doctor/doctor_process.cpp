@@ -215,6 +215,12 @@ Report Ask(const Strings &arguments, const std::string &input) {
     return report;
 }
 
+Check OnlyFinding(const Strings &arguments) {
+    const Report report = Ask(arguments);
+    EXPECT_EQ(report.Findings().size(), 1U) << ::testing::PrintToString(report.Findings());
+    return report.FirstFinding();
+}
+
 Report AskMachine(const Strings &arguments, const std::string &input) {
     const DoctorRun run = RunDoctor(With(arguments, "--json"), input);
     EXPECT_EQ(run.errors, "");

@@ -55,6 +55,9 @@ struct Report {
 /// Runs the doctor for machines and for people: what the latter read is looked at as in `RunDoctor`.
 Report Ask(const Strings &arguments, const std::string &input = "");
 
+/// The one finding that there is.
+Check OnlyFinding(const Strings &arguments = {});
+
 /// For machines alone, where many are asked.
 Report AskMachine(const Strings &arguments, const std::string &input = "");
 

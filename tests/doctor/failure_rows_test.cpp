@@ -24,6 +24,11 @@ namespace {
 /// What an administrator would run, and what it is asked by here.
 enum class Command { kPass, kToken, kLogin };
 
+constexpr Profile kAzure = Profile::kAzure;
+constexpr Profile kWebSphere = Profile::kWebSphere;
+constexpr Command kPass = Command::kPass;
+constexpr Command kToken = Command::kToken;
+
 const char *Name(Command command) {
     return command == Command::kPass    ? "tavosso-doctor"
            : command == Command::kToken ? "tavosso-doctor token - --fetch"
@@ -59,6 +64,12 @@ std::string OtherServersURL() {
     return server.URL("/");
 }
 
+/// The provider takes it as well: it gives its token whatever it is sent.
+void SetSecretEverywhere(Appliance &appliance, const std::string &secret) {
+    appliance.AnswerAt("/token_endpoint", TokenResponse(appliance.Token()));
+    appliance.SetClient("client_secret", secret);
+}
+
 void AnswerKey(Appliance &appliance, const char *changes) { appliance.AnswerAt("/keys", KeySet(changes)); }
 
 std::string OtherKeySet() {
@@ -69,9 +80,6 @@ std::string OtherKeySet() {
 }
 
 std::vector<Row> RowsOfFiles() {
-    constexpr Profile kAzure = Profile::kAzure;
-    constexpr Profile kWebSphere = Profile::kWebSphere;
-    constexpr Command kPass = Command::kPass;
     return {
         {"SwitchedOff", kAzure, "sso does not enable.", kPass, "profile.sso_enable",
          [](Appliance &) { WriteProfile(R"({"sso_enable": false, "sso_profile": "azure"})"); }},
@@ -90,15 +98,9 @@ std::vector<Row> RowsOfFiles() {
         {"ProfileInCapitals", kAzure, "profile not support.", kPass, "profile.sso_profile",
          [](Appliance &) { WriteProfile(R"({"sso_enable": true, "sso_profile": "Azure"})"); }},
         {"SecretTooLong", kWebSphere, "encode base64 failed.", kPass, "client.client_secret",
-         [](Appliance &appliance) {
-             appliance.AnswerAt("/token_endpoint", TokenResponse(appliance.Token()));
-             appliance.SetClient("client_secret", std::string(766, 's'));
-         }},
-        {"SecretTooLongForAToken", kWebSphere, "encode base64 failed.", Command::kToken, "token.secret",
-         [](Appliance &appliance) {
-             appliance.AnswerAt("/token_endpoint", TokenResponse(appliance.Token()));
-             appliance.SetClient("client_secret", std::string(766, 's'));
-         }},
+         [](Appliance &appliance) { SetSecretEverywhere(appliance, std::string(766, 's')); }},
+        {"SecretTooLongForAToken", kWebSphere, "encode base64 failed.", kToken, "token.secret",
+         [](Appliance &appliance) { SetSecretEverywhere(appliance, std::string(766, 's')); }},
         {"ClientFileMissing", kAzure, "parse json falied", kPass, "client.file",
          [](Appliance &) { ASSERT_EQ(std::remove(kAzureFile), 0); }},
         {"ClientFileNoJSON", kWebSphere, "parse json falied", kPass, "client.file",
@@ -109,9 +111,6 @@ std::vector<Row> RowsOfFiles() {
 }
 
 std::vector<Row> RowsOfTokenEndpoints() {
-    constexpr Profile kAzure = Profile::kAzure;
-    constexpr Profile kWebSphere = Profile::kWebSphere;
-    constexpr Command kPass = Command::kPass;
     constexpr char kNoToken[] = "we cannot find key 'id_token' in response!";
     return {
         {"NobodyListens", kAzure, "parse json falied", kPass, "token_endpoint.reachable",
@@ -148,9 +147,6 @@ std::vector<Row> RowsOfTokenEndpoints() {
 }
 
 std::vector<Row> RowsOfKeys() {
-    constexpr Profile kAzure = Profile::kAzure;
-    constexpr Command kPass = Command::kPass;
-    constexpr Command kToken = Command::kToken;
     constexpr char kNoKey[] = "kid does not exist in Azure verified kyes";
     return {
         {"DiscoveryAddressEmpty", kAzure, kNoKey, kPass, "client.wellknown",
@@ -195,10 +191,6 @@ std::vector<Row> RowsOfKeys() {
 }
 
 std::vector<Row> RowsOfTokens() {
-    constexpr Profile kAzure = Profile::kAzure;
-    constexpr Profile kWebSphere = Profile::kWebSphere;
-    constexpr Command kPass = Command::kPass;
-    constexpr Command kToken = Command::kToken;
     return {
         {"TokenExpired", kAzure, "id_token expired.", kToken, "token.expiry",
          [](Appliance &appliance) { appliance.GiveToken("{}", R"({"exp": 1700000000})"); }},
@@ -234,15 +226,9 @@ std::vector<Row> RowsOfTokens() {
              appliance.GiveToken(SignedToken(TokenHeader(kWebSphere), GoodClaims(kWebSphere), "another secret"));
          }},
         {"SecretEmpty", kWebSphere, "verify hmac signature failed", kPass, "client.client_secret",
-         [](Appliance &appliance) {
-             appliance.AnswerAt("/token_endpoint", TokenResponse(appliance.Token()));
-             appliance.SetClient("client_secret", "");
-         }},
+         [](Appliance &appliance) { SetSecretEverywhere(appliance, ""); }},
         {"SecretEmptyForAToken", kWebSphere, "verify hmac signature failed", kToken, "token.signature",
-         [](Appliance &appliance) {
-             appliance.AnswerAt("/token_endpoint", TokenResponse(appliance.Token()));
-             appliance.SetClient("client_secret", "");
-         }},
+         [](Appliance &appliance) { SetSecretEverywhere(appliance, ""); }},
         {"NoToken", kAzure, "token cannot be empty", kToken, "token.form",
          [](Appliance &appliance) { appliance.GiveToken(""); }},
         {"TokenOfTwoParts", kWebSphere, "bad jwt format!", kToken, "token.form",
@@ -315,11 +301,10 @@ TEST_P(FailureRow, IsExplainedBeforeTheLoginEndsSo) {
         check = WalkLogin().FirstFinding();
         EXPECT_EQ(check.subject, row.check);
     } else {
-        const Report report =
-            row.command == Command::kToken ? Ask({"token", "-", "--fetch"}, appliance.Token()) : Ask({});
+        const Report report = row.command == kToken ? Ask({"token", "-", "--fetch"}, appliance.Token()) : Ask({});
         check = report.Find(row.check, "finding");
         EXPECT_EQ(check.id, row.check) << "findings: " << ::testing::PrintToString(report.Findings());
-        if (row.command == Command::kToken) {
+        if (row.command == kToken) {
             EXPECT_EQ(report.json["stops_at"], row.check);
             ExpectToStopAtTheFirstFinding(report);
         } else {
@@ -332,7 +317,7 @@ TEST_P(FailureRow, IsExplainedBeforeTheLoginEndsSo) {
 
     const Outcome outcome = appliance.LogIn();
     EXPECT_TRUE(IsText(outcome.text, row.text)) << outcome.text;
-    if (row.command != Command::kPass || !check.library.empty()) {
+    if (row.command != kPass || !check.library.empty()) {
         EXPECT_EQ(check.library, Shown(outcome.text));
     }
 }

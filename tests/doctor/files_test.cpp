@@ -15,7 +15,6 @@ namespace Test {
 
 namespace {
 
-using ::testing::AllOf;
 using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::EndsWith;
@@ -27,13 +26,6 @@ constexpr uid_t kNobody = 65534;
 
 class Files : public ::testing::Test {
   protected:
-    /// The one finding that there is.
-    static Check OnlyFinding(const Strings &arguments = {}) {
-        const Report report = Ask(arguments);
-        EXPECT_EQ(report.Findings().size(), 1U) << ::testing::PrintToString(report.Findings());
-        return report.FirstFinding();
-    }
-
     Check FirstFindingWith(const std::string &clientKey, const Json::Value &value) {
         appliance.SetClient(clientKey, value);
         const Check finding = Ask({}).FirstFinding();

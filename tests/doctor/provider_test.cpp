@@ -83,12 +83,6 @@ TEST(ProvidersCertificate, ThatIsRefusedGetsNoSecret) {
 
 class AProvider : public ::testing::Test {
   protected:
-    static Check OnlyFinding(const Strings &arguments = {}) {
-        const Report report = Ask(arguments);
-        EXPECT_EQ(report.Findings().size(), 1U) << ::testing::PrintToString(report.Findings());
-        return report.FirstFinding();
-    }
-
     void TellTime(std::time_t time) {
         std::string answer = HTTPAnswer(KeySet());
         answer.insert(answer.find("\r\n"), "\r\nDate: " + TimeText("%a, %d %b %Y %H:%M:%S GMT", time));
