@@ -129,7 +129,7 @@ export async function measure({build, quick = false, rounds = quick ? 3 : 21}) {
     configure();
     countRelocations(collection, programs);
     for (let round = 0; round < rounds; ++round) {
-        measureProcesses(collection, programs, quick ? 10 : 60);
+        measureProcesses(collection, programs, quick ? 8 : 40);
         measureGrowth(collection, programs, quick ? 2 : 16);
         await measureMemory(collection, programs);
     }
