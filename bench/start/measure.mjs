@@ -38,7 +38,7 @@ function configure() {
     }));
 }
 
-/** Runs programs by turns, and gives what each took. */
+/** Runs programs by turns, and gives what each took when the machine was not busy. */
 function run(programs, names, {turns, atOnce = 1}) {
     const files = names.map((name) => `${programs}/start_${name}`);
     const args = [String(turns), String(atOnce), ...files];
@@ -123,7 +123,7 @@ function countRelocations(collection, programs) {
  *   rounds  how many values a series has
  *   quick   for a look: in seconds
  */
-export async function measure({build, quick = false, rounds = quick ? 3 : 21}) {
+export async function measure({build, quick = false, rounds = quick ? 3 : 17}) {
     const programs = `${build}/bench/start`;
     const collection = new Collection();
     configure();
