@@ -123,13 +123,13 @@ function countRelocations(collection, programs) {
  *   rounds  how many values a series has
  *   quick   for a look: in seconds
  */
-export async function measure({build, quick = false, rounds = quick ? 3 : 17}) {
+export async function measure({build, quick = false, rounds = quick ? 3 : 11}) {
     const programs = `${build}/bench/start`;
     const collection = new Collection();
     configure();
     countRelocations(collection, programs);
     for (let round = 0; round < rounds; ++round) {
-        measureProcesses(collection, programs, quick ? 8 : 40);
+        measureProcesses(collection, programs, quick ? 8 : 120);
         measureGrowth(collection, programs, quick ? 2 : 16);
         await measureMemory(collection, programs);
     }
