@@ -4,7 +4,8 @@ import {once} from 'node:events';
 import {mkdirSync, readFileSync, writeFileSync} from 'node:fs';
 
 const SETTINGS = '/usr/tavo/etc/ssoclient';
-const SUBJECTS = ['empty', 'dependencies', 'library'];
+/** By the programs, of which the library's dependencies are what it cannot do without. */
+const SUBJECTS = {empty: 'empty', dependencies: 'floor', library: 'ours'};
 const UNITS = {wall: 'us wall', cpu: 'us CPU', faults: 'page faults'};
 const AT_ONCE = [1, 2, 4, 8, 16, 32, 64];
 
@@ -47,16 +48,16 @@ function run(programs, names, {turns, atOnce = 1}) {
 
 /** A round of processes one after another. */
 function measureProcesses(collection, programs, turns) {
-    const results = run(programs, [...SUBJECTS, 'first_request'], {turns});
+    const results = run(programs, [...Object.keys(SUBJECTS), 'first_request'], {turns});
     for (const [key, unit] of Object.entries(UNITS)) {
         const [empty, dependencies, library, firstRequest] = results.map((result) => result[key]);
         const about = {group: 'start', unit};
         collection.add(empty, {...about, case: 'process', subject: 'empty'});
-        collection.add(dependencies, {...about, case: 'process', subject: 'dependencies'});
-        collection.add(library, {...about, case: 'process', subject: 'library'});
+        collection.add(dependencies, {...about, case: 'process', subject: 'floor'});
+        collection.add(library, {...about, case: 'process', subject: 'ours'});
         // What has only been loaded is the floor of what serves a request, too.
-        collection.add(dependencies, {...about, case: 'a first request', subject: 'dependencies'});
-        collection.add(firstRequest, {...about, case: 'a first request', subject: 'library'});
+        collection.add(dependencies, {...about, case: 'a first request', subject: 'floor'});
+        collection.add(firstRequest, {...about, case: 'a first request', subject: 'ours'});
     }
 }
 
@@ -66,8 +67,8 @@ function measureGrowth(collection, programs, most) {
         const turns = Math.ceil(most / x);
         const results = run(programs, ['dependencies', 'first_request'], {turns, atOnce: x});
         const about = {group: 'growth', case: 'CGI processes at once', x, unit: 'ms wall'};
-        collection.add(results[0].wall / 1000, {...about, subject: 'dependencies'});
-        collection.add(results[1].wall / 1000, {...about, subject: 'library'});
+        collection.add(results[0].wall / 1000, {...about, subject: 'floor'});
+        collection.add(results[1].wall / 1000, {...about, subject: 'ours'});
     }
 }
 
@@ -92,12 +93,12 @@ async function startWaiting(program) {
 
 /** Alone, a process has for its own what of its files nobody else has mapped. Another of its kind shares them. */
 async function measureMemory(collection, programs) {
-    for (const subject of SUBJECTS) {
+    for (const [program, subject] of Object.entries(SUBJECTS)) {
         const about = {group: 'start', subject, unit: 'kB'};
-        const first = await startWaiting(`${programs}/start_${subject}`);
+        const first = await startWaiting(`${programs}/start_${program}`);
         const own = () => first.memory('Private_Clean', 'Private_Dirty');
         collection.add(own(), {...about, case: 'private memory, alone'});
-        const second = await startWaiting(`${programs}/start_${subject}`);
+        const second = await startWaiting(`${programs}/start_${program}`);
         collection.add(own(), {...about, case: 'private memory, one of two'});
         collection.add(first.memory('Private_Dirty'), {...about, case: 'private memory written to'});
         await second.end();
@@ -106,8 +107,8 @@ async function measureMemory(collection, programs) {
 }
 
 function countRelocations(collection, programs) {
-    for (const subject of SUBJECTS) {
-        const {stderr} = spawnSync(`${programs}/start_${subject}`, {encoding: 'utf8', env: {LD_DEBUG: 'statistics'}});
+    for (const [program, subject] of Object.entries(SUBJECTS)) {
+        const {stderr} = spawnSync(`${programs}/start_${program}`, {encoding: 'utf8', env: {LD_DEBUG: 'statistics'}});
         const [count, relative] = ['relocations', 'relative relocations']
             .map((name) => Number(new RegExp(`^ *\\d+:\\s+number of ${name}: (\\d+)$`, 'm').exec(stderr)[1]));
         const about = {group: 'start', subject, unit: 'relocations'};
