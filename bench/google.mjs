@@ -33,6 +33,9 @@ function run(program, {repetitions, seconds}) {
         }
         results.set(result.run_name, [...results.get(result.run_name) ?? [], result]);
     }
+    if (results.size === 0) {
+        throw new Error(`${program} has measured nothing`);
+    }
     return results;
 }
 

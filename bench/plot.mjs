@@ -3,10 +3,10 @@ const WIDTH = 640;
 const HEIGHT = 400;
 const AREA = {left: 76, right: 620, top: 62, bottom: 340};
 
-/** By the pictures' names. The floor is another one in each. */
+/** By the pictures' names. The floor is another one in each, if there is one. */
 const PLOTS = {
     'token-size': {
-        case: 'token',
+        case: 'token size',
         title: 'A verification, by the size of the token',
         x: 'bytes of claims',
         floor: 'the calls it cannot do without',
@@ -21,7 +21,6 @@ const PLOTS = {
         case: 'state',
         title: 'A redirection to the provider, by the size of the state',
         x: 'bytes of state',
-        floor: 'the calls it cannot do without',
     },
     processes: {
         case: 'CGI processes at once',
@@ -115,9 +114,9 @@ function describe(points, names) {
     return points.map(tell).join('; ');
 }
 
-/** `points` are `{x, times: {ours, floor}}` in microseconds, and `floor` says what the floor is. */
+/** `points` are `{x, times: {ours, floor}}` in microseconds, and `floor` says what the floor is. Ours is on top. */
 function draw({title, x, floor}, points) {
-    const names = {ours: 'the library', floor};
+    const names = {...(floor && {floor}), ours: 'the library'};
     const xAxis = makeAxis(points.map((point) => point.x), AREA.left, AREA.right);
     const yAxis = makeAxis(points.flatMap((point) => Object.values(point.times)), AREA.bottom, AREA.top);
     const middle = (AREA.left + AREA.right) / 2;
@@ -130,7 +129,7 @@ ${[
     write([AREA.left, 32], title, 'class="title"'),
     ...drawGrid(xAxis, yAxis),
     write([middle, AREA.bottom + 44], x, 'text-anchor="middle"'),
-    ...Object.entries(LINES).flatMap(([subject, line]) => drawLine(line,
+    ...Object.keys(names).flatMap((subject) => drawLine(LINES[subject],
         points.map((point) => [xAxis.place(point.x), yAxis.place(point.times[subject])]))),
     ...drawLegend(names),
 ].join('\n')}
@@ -141,8 +140,11 @@ ${[
 /** The pictures of a run by their names. */
 export function plotGrowth(collection) {
     return Object.fromEntries(Object.entries(PLOTS).map(([name, plot]) => {
-        const points = collection.grownRows('growth', plot.case).map(({x, unit, medians: {ours, floor}}) => (
-            {x, times: {ours: ours * MICROSECONDS[unit], floor: floor * MICROSECONDS[unit]}}));
+        const points = collection.grownRows('growth', plot.case).map(({x, unit, medians}) => ({
+            x,
+            times: Object.fromEntries(Object.entries(medians)
+                .map(([subject, time]) => [subject, time * MICROSECONDS[unit]])),
+        }));
         return [name, draw(plot, points)];
     }));
 }
