@@ -5,17 +5,15 @@
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
 #include <openssl/rsa.h>
+#include <string.h>  // explicit_bzero
 #include <syslog.h>
 
 #include <algorithm>
-#include <boost/algorithm/string/classification.hpp>
-#include <boost/algorithm/string/split.hpp>
 #include <climits>
 #include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <utility>
-#include <vector>
 
 #include "utils/cleanse.h"
 #include "utils/error_queue.h"
@@ -40,7 +38,7 @@ struct ReleaseWith {
 struct ReleaseBytes {
     std::size_t size = 0;
     void operator()(unsigned char *bytes) const {
-        OPENSSL_cleanse(bytes, size);
+        explicit_bzero(bytes, size);
         std::free(bytes);
     }
 };
@@ -75,21 +73,20 @@ BIOPointer PushBase64Filter(BIOPointer filter, BIOPointer end) {
     return filter;
 }
 
+/// The character of standard base64 that stands for one of base64url (RFC 4648, section 5).
+char StandardCharacter(char c) { return c == '-' ? '+' : c == '_' ? '/' : c; }
+
 /// Decodes one base64url part of a token (RFC 7515, section 2), or standard base64. Returns the bytes with a NUL behind
 /// them and writes their number, which is 0 or less where the text is not base64. Null, and no number, when the part is
 /// empty or memory runs out.
 Bytes Base64UrlDecode(const char *part, int *length) {
-    const Utils::KeepErrorQueue keepErrorQueue;
     const std::size_t partLength = std::strlen(part);
     const std::size_t padding = (4 - partLength % 4) % 4;
     if (partLength + padding > INT_MAX) {
         return nullptr;  // OpenSSL counts in int. GCOVR_EXCL_LINE: takes a text of 2 GB
     }
     ScratchText scratch(partLength + padding + 1);
-    char *end = scratch.get();
-    for (const char *c = part; *c != '\0'; ++c) {
-        *end++ = *c == '-' ? '+' : *c == '_' ? '/' : *c;
-    }
+    char *end = std::transform(part, part + partLength, scratch.get(), StandardCharacter);
     end = std::fill_n(end, padding, '=');
     *end = '\0';
 
@@ -126,15 +123,14 @@ struct DecodedPart {
 
 /// The JSON value that a part encodes. Throws std::invalid_argument with that message if it is not JSON.
 Json::Value ParsePart(const std::string &part, const char *notJson) {
+    const Utils::KeepErrorQueue keepErrorQueue;
     int length = 0;
     const Bytes decoded = Base64UrlDecode(part.c_str(), &length);
     if (!decoded) {
         throw std::logic_error("empty jwt part");
     }
-    std::string text(reinterpret_cast<const char *>(decoded.get()));
-    const Utils::CleanseTextOnExit cleanse(text);
     Json::Value value;
-    if (!Utils::ParseJson(text, value)) {
+    if (!Utils::ParseJson(reinterpret_cast<const char *>(decoded.get()), value)) {
         throw std::invalid_argument(notJson);
     }
     return value;
@@ -303,15 +299,15 @@ jwt_verify_failed::~jwt_verify_failed() = default;
 
 Jwt::Jwt(std::string token) {
     const Utils::CleanseTextOnExit cleanse(token);
-    // Counted before it is split: the pieces of a provider's 30 MB of dots would take more than a gigabyte.
-    if (std::count(token.begin(), token.end(), '.') != 2) {
+    // Not into a list of pieces: those of a provider's 30 MB of dots would take gigabytes.
+    const std::size_t headerEnd = token.find('.');
+    const std::size_t bodyEnd = token.find('.', headerEnd + 1);
+    if (bodyEnd == std::string::npos || token.find('.', bodyEnd + 1) != std::string::npos) {
         throw std::invalid_argument("bad jwt format!");
     }
-    std::vector<std::string> parts;
-    boost::split(parts, token, boost::is_any_of("."));
-    header = std::move(parts[0]);
-    body = std::move(parts[1]);
-    signature = std::move(parts[2]);
+    header = token.substr(0, headerEnd);
+    body = token.substr(headerEnd + 1, bodyEnd - headerEnd - 1);
+    signature = token.substr(bodyEnd + 1);
 }
 
 Jwt::~Jwt() {

@@ -1,7 +1,7 @@
 #ifndef TAVOSSO_UTILS_CLEANSE_H
 #define TAVOSSO_UTILS_CLEANSE_H
 
-#include <openssl/crypto.h>
+#include <string.h>  // explicit_bzero, which <cstring> need not declare
 
 #include <cstddef>
 #include <string>
@@ -13,7 +13,7 @@ namespace TAVO::Utils {
 class CleanseOnExit {
   public:
     CleanseOnExit(void *memory, std::size_t size) : memory_(memory), size_(size) {}
-    ~CleanseOnExit() { OPENSSL_cleanse(memory_, size_); }
+    ~CleanseOnExit() { explicit_bzero(memory_, size_); }
     CleanseOnExit(const CleanseOnExit &) = delete;
     CleanseOnExit &operator=(const CleanseOnExit &) = delete;
 
@@ -22,7 +22,7 @@ class CleanseOnExit {
     std::size_t size_;
 };
 
-inline void Cleanse(std::string &text) { OPENSSL_cleanse(text.data(), text.size()); }
+inline void Cleanse(std::string &text) { explicit_bzero(text.data(), text.size()); }
 
 /// The same for a text that may still grow in the scope, by AppendSecret or within what it has reserved: growing
 /// otherwise, it would leave its old memory behind as it is.

@@ -34,7 +34,7 @@ bool ReadFile(const char *path, std::string &content) {
 
 }  // namespace
 
-bool ParseJson(const std::string &text, Json::Value &document) {
+bool ParseJson(std::string_view text, Json::Value &document) {
     Json::Value parsed;  // of which nothing gets out unless all of it is there
     try {
         Json::Reader reader;

@@ -6,6 +6,7 @@
 #include <initializer_list>
 #include <optional>
 #include <string>
+#include <string_view>
 
 // How the library reads and writes JSON. No exception of the JSON library leaves these functions: a text that it
 // refuses has failed to parse, and a value that is not an object has no members.
@@ -13,7 +14,7 @@ namespace TAVO::Utils {
 
 /// Parses a text. On failure the document is null, and when memory runs out it is as it was: never the half that had
 /// been read.
-bool ParseJson(const std::string &text, Json::Value &document);
+bool ParseJson(std::string_view text, Json::Value &document);
 
 /// Reads and parses a whole file. On failure the document is null or as it was.
 bool LoadJsonFile(const char *path, Json::Value &document);

@@ -21,6 +21,7 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"__libc_single_threaded", kConstant},
     {"__stack_chk_fail", kRuntime},
     {"calloc", nullptr},
+    {"explicit_bzero", kNoResult},
     {"fclose", nullptr},
     {"ferror", nullptr},
     {"fopen", nullptr},
@@ -47,6 +48,7 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"time", nullptr},
 
     // libc, built with _FORTIFY_SOURCE
+    {"__explicit_bzero_chk", kNoResult},
     {"__fread_chk", "is counted, and made to fail, as fread"},
     {"__memcpy_chk", kOnlyMemory},
     {"__memmove_chk", kOnlyMemory},
@@ -97,7 +99,6 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"EVP_sha512", kConstant},
     {"HMAC", nullptr},
     {"MD5", nullptr},
-    {"OPENSSL_cleanse", kNoResult},
     {"RSA_free", kNoResult},
     {"RSA_new", nullptr},
     {"RSA_set0_key", nullptr},

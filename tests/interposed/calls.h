@@ -33,7 +33,7 @@ bool ShouldFail(const char *function, const void *caller);
 /// How often the library under test has called each function since FailNothing.
 std::map<std::string, int> CallCounts();
 
-/// Every text that OPENSSL_cleanse has overwritten for the library under test since the last call.
+/// Every text that explicit_bzero has overwritten for the library under test since the last call.
 std::vector<std::string> TakeCleansed();
 void NoteCleansed(const void *memory, std::size_t size);
 

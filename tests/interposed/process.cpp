@@ -127,6 +127,21 @@ size_t __fread_chk(void *bytes, size_t room, size_t size, size_t count, FILE *fi
     return Test::FailsToRead(file, CALLER) ? 0 : Test::Next(__fread_chk, "__fread_chk")(bytes, room, size, count, file);
 }
 
+void explicit_bzero(void *memory, size_t size) noexcept {
+    if (Test::FromLibrary(CALLER)) {
+        Test::NoteCleansed(memory, size);
+    }
+    Test::Next(explicit_bzero, "explicit_bzero")(memory, size);
+}
+
+/// The same, built with _FORTIFY_SOURCE.
+void __explicit_bzero_chk(void *memory, size_t size, size_t room) noexcept {
+    if (Test::FromLibrary(CALLER)) {
+        Test::NoteCleansed(memory, size);
+    }
+    Test::Next(__explicit_bzero_chk, "__explicit_bzero_chk")(memory, size, room);
+}
+
 int ferror(FILE *file) noexcept {
     if (Test::ShouldFail("ferror", CALLER) || file == Test::failedFile) {
         return 1;
