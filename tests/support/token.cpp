@@ -3,6 +3,7 @@
 #include <openssl/bn.h>
 #include <openssl/core_names.h>
 #include <openssl/hmac.h>
+#include <openssl/pem.h>
 #include <openssl/rsa.h>
 
 #include <sstream>
@@ -94,6 +95,14 @@ Json::Value RSAKey::JWK(const std::string &kid) const {
     key["n"] = Component(key_.get(), OSSL_PKEY_PARAM_RSA_N);
     key["e"] = Component(key_.get(), OSSL_PKEY_PARAM_RSA_E);
     return key;
+}
+
+std::string RSAKey::PublicPEM() const {
+    const std::shared_ptr<BIO> memory(BIO_new(BIO_s_mem()), BIO_free);
+    Require(memory && PEM_write_bio_PUBKEY(memory.get(), key_.get()) == 1, "PEM_write_bio_PUBKEY");
+    char *text = nullptr;
+    const long length = BIO_get_mem_data(memory.get(), &text);
+    return {text, static_cast<std::size_t>(length)};
 }
 
 const RSAKey &ProviderKey() {

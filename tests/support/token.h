@@ -34,6 +34,9 @@ class RSAKey {
     /// The public key as a JSON Web Key (RFC 7517).
     Json::Value JWK(const std::string &kid) const;
 
+    /// The public key in PEM (RFC 7468, section 13).
+    std::string PublicPEM() const;
+
   private:
     std::shared_ptr<EVP_PKEY> key_;
 };
