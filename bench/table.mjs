@@ -52,7 +52,7 @@ function layOutTargets(targets) {
 export function formatReport({machine, quick, rows, targets}) {
     return `On ${machine}${quick ? '. A quick run: its figures are coarse' : ''}.
 Each figure is the median of a run's rounds; so is the ratio of ours to the floor, of which the spread is the quartiles.
-Of Google Benchmark's repetitions a round takes the fastest.
+Of Google Benchmark's repetitions a round takes the median.
 
 ${layOutRows(rows)}
 
