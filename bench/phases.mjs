@@ -10,7 +10,7 @@ const SECONDS = 0.5;
 const MEASURED = /\bVerifyBy/;
 const OWN_OBJECT = /\/(libtavosso\.so[^/]*|bench_verification)$/;
 /** What they call leads to the measured functions. */
-const START = /^(main|_start|\(below main\))$/;
+const START = /^(main|_start|\(below main\)|Bench::RunBenchmarks\(.*)$/;
 
 /** The first that fits names the phase of a called function. The benchmark has a malloc of its own, which counts. */
 const PHASES = {

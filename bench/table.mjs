@@ -13,12 +13,13 @@ function formatRatio(ratio) {
     return Number.isFinite(ratio) ? ratio.toFixed(3) : '';
 }
 
-/** Texts to the left, numbers to the right. */
-function layOut(lines, texts) {
-    const widths = lines[0].map((_, column) => Math.max(...lines.map((line) => line[column].length)));
-    return lines.map((line) => line
+/** In Markdown, so that a document can have it as it is: texts to the left, numbers to the right. */
+function layOut([header, ...lines], texts) {
+    const widths = header.map((_, column) => Math.max(3, ...[header, ...lines].map((line) => line[column].length)));
+    const rule = widths.map((width, column) => column < texts ? '-'.repeat(width) : `${'-'.repeat(width - 1)}:`);
+    return [header, rule, ...lines].map((line) => line
         .map((cell, column) => column < texts ? cell.padEnd(widths[column]) : cell.padStart(widths[column]))
-        .join('  ').trimEnd()).join('\n');
+        .join(' | ')).map((line) => `| ${line} |`).join('\n');
 }
 
 function layOutRows(rows) {

@@ -2,6 +2,7 @@
 #define TAVOSSO_BENCH_VERIFICATION_ISSUER_H
 
 #include <string>
+#include <vector>
 
 #include "tests/support/server.h"
 
@@ -11,8 +12,8 @@ namespace Bench {
 /// them afterwards.
 class Issuer {
   public:
-    /// Publishes the RSA keys of these sizes, once.
-    explicit Issuer(std::initializer_list<unsigned int> sizesOfKeys);
+    /// Publishes the RSA keys of these sizes, once, and makes them when they are asked for: that takes seconds.
+    explicit Issuer(const std::vector<unsigned int> &sizesOfKeys);
 
     std::string name() const { return server_.URL(""); }
 

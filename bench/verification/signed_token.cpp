@@ -2,6 +2,7 @@
 
 #include <json/json.h>
 
+#include <iterator>
 #include <map>
 
 #include "tests/support/encoding.h"
@@ -28,8 +29,9 @@ Json::Value Claims(std::size_t size, const std::string &issuer) {
         "nbf": 1700000000, "exp": 4102444800, "name": "Alice Example", "unique_name": "alice@corp.example.net",
         "tid": "6a404290-634b-4458-b016-3eeac818f228"})");
     claims["iss"] = issuer;
-    while (Test::Compact(claims).size() < size) {
-        claims["groups"].append("5b1f3a60-7c9d-4e2b-a1f0-3c4d5e6f7a8b");
+    constexpr char kGroup[] = "5b1f3a60-7c9d-4e2b-a1f0-3c4d5e6f7a8b";
+    for (std::size_t length = Test::Compact(claims).size(); length < size; length += std::size(kGroup) + 2) {
+        claims["groups"].append(kGroup);
     }
     return claims;
 }
