@@ -69,10 +69,12 @@ function ticksBetween(least, most) {
         .filter((tick) => tick >= least && tick <= most);
 }
 
-/** From values to a side of the picture, with room for one that is a little beyond. */
+/** From values to a side of the picture, with room around them: where they hardly differ, for them to look so. */
 function makeAxis(values, from, to) {
-    const least = Math.min(...values) / 1.2;
-    const most = Math.max(...values) * 1.2;
+    const [first, last] = [Math.min(...values), Math.max(...values)];
+    const middle = Math.sqrt(first * last);
+    const least = Math.min(first / 1.2, middle / 4);
+    const most = Math.max(last * 1.2, middle * 4);
     return {
         place: (value) => round(from + (to - from) * Math.log(value / least) / Math.log(most / least)),
         ticks: ticksBetween(least, most),
