@@ -6,12 +6,13 @@ import {asPattern, blocks, codeSpans, documents, PROJECT, proseLines} from './do
 /** Commands of blocks that are not run here, and why. */
 const ELSEWHERE = new Map([
     ['./check', 'is what runs this'],
+    ['bench/run', 'takes a quarter of an hour; ./check bench runs it for a minute'],
     ['tests/package/machine --clone /home/ada/tavosso --user ada ./check style', 'is how these commands are run'],
 ]);
 
 // What a span of text begins with that is a command, or what follows a command's name: an option. A file's name alone
 // is none.
-const COMMAND = new RegExp('^(?:\\./|(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|lintian|ls|' +
+const COMMAND = new RegExp('^(?:\\./|bench/run |(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|lintian|ls|' +
     'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|tavosso-doctor|ulimit|xargs) |tests/\\w+/\\w+ |' +
     'tools/[\\w-]+ |[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
 
