@@ -5,7 +5,6 @@
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
 #include <openssl/rsa.h>
-#include <string.h>  // explicit_bzero
 #include <syslog.h>
 
 #include <algorithm>

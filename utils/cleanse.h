@@ -1,9 +1,8 @@
 #ifndef TAVOSSO_UTILS_CLEANSE_H
 #define TAVOSSO_UTILS_CLEANSE_H
 
-#include <string.h>  // explicit_bzero, which <cstring> need not declare
-
 #include <cstddef>
+#include <cstring>
 #include <string>
 
 namespace TAVO::Utils {
