@@ -121,8 +121,8 @@ std::vector<std::string> TakeCleansed() {
     return taken;
 }
 
-void NoteCleansed(const void *memory, std::size_t size) {
-    if (memory != nullptr) {
+void NoteCleansed(const void *memory, std::size_t size, const void *caller) {
+    if (memory != nullptr && FromLibrary(caller)) {
         Cleansed().emplace_back(static_cast<const char *>(memory), size);
     }
 }

@@ -35,7 +35,7 @@ std::map<std::string, int> CallCounts();
 
 /// Every text that explicit_bzero has overwritten for the library under test since the last call.
 std::vector<std::string> TakeCleansed();
-void NoteCleansed(const void *memory, std::size_t size);
+void NoteCleansed(const void *memory, std::size_t size, const void *caller);
 
 /// The function that would have been called.
 template <typename Function>

@@ -128,17 +128,13 @@ size_t __fread_chk(void *bytes, size_t room, size_t size, size_t count, FILE *fi
 }
 
 void explicit_bzero(void *memory, size_t size) noexcept {
-    if (Test::FromLibrary(CALLER)) {
-        Test::NoteCleansed(memory, size);
-    }
+    Test::NoteCleansed(memory, size, CALLER);
     Test::Next(explicit_bzero, "explicit_bzero")(memory, size);
 }
 
 /// The same, built with _FORTIFY_SOURCE.
 void __explicit_bzero_chk(void *memory, size_t size, size_t room) noexcept {
-    if (Test::FromLibrary(CALLER)) {
-        Test::NoteCleansed(memory, size);
-    }
+    Test::NoteCleansed(memory, size, CALLER);
     Test::Next(__explicit_bzero_chk, "__explicit_bzero_chk")(memory, size, room);
 }
 

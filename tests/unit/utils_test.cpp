@@ -204,10 +204,12 @@ TEST_F(Encoding, MD5DigestLeavesTheHostsErrorQueueAsItWas) {
 }
 
 TEST_F(Encoding, AFailedMD5GivesTheEmptyStringAndOneLine) {
+    ERR_clear_error();
     FailCall("MD5");
     errno = EPERM;
     EXPECT_EQ(MD5Digest("text"), "");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("utils:N MD5 digest failed Operation not permitted")));
+    EXPECT_EQ(TakeErrorQueue(), std::vector<std::string>());
 }
 
 TEST_F(Encoding, WithoutMemoryMD5DigestGivesTheEmptyStringAndOneLine) {
