@@ -56,6 +56,8 @@ export async function listen() {
     const socket = net.createServer();
     socket.listen(0, '127.0.0.1');
     await once(socket, 'listening');
+    // Or a run whose site fails to start behind this would hang, and not say why.
+    socket.unref();
     return socket;
 }
 
