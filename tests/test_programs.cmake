@@ -14,6 +14,24 @@ tavosso_options(test_support)
 target_compile_definitions(test_support PRIVATE TAVOSSO_WINBIND=$<BOOL:${TAVOSSO_WINBIND}>)
 target_link_libraries(test_support PUBLIC OpenSSL::Crypto PkgConfig::JSONCPP)
 
+# Sources that many programs are made with, each compiled once for all of them. Objects and no archive: what a program
+# names it has whole, and so takes the place of functions that the library calls.
+function(tavosso_objects name source)
+    add_library(${name} OBJECT ${source})
+    tavosso_options(${name})
+    target_link_libraries(${name} PUBLIC test_support)
+endfunction()
+
+foreach(interposed calls clock crypto_calls memory platform_calls process releases transport)
+    tavosso_objects(interposed_${interposed} interposed/${interposed}.cpp)
+endforeach()
+# A sanitizer's run time asks for memory before it is ready for code that it looks after.
+foreach(interposed calls memory releases)
+    target_compile_options(interposed_${interposed} PRIVATE -fno-sanitize=all)
+endforeach()
+tavosso_objects(refused_calls support/refused_calls.cpp)
+tavosso_objects(system_log support/system_log.cpp)
+
 # all_LABEL_tests builds the test programs of one label: all of them together take minutes.
 function(tavosso_label_program label name)
     if(NOT TARGET all_${label}_tests)
