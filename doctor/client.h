@@ -23,6 +23,9 @@ std::vector<std::string> AlgorithmsOf(Profile profile);
 /// In bytes: in base64 it becomes the key's text, for which there are 1024 bytes, its NUL and three more among them.
 constexpr std::size_t kLongestWebSphereSecret = 765;
 
+/// In bytes, of a key of HS256 (RFC 7518, section 3.2). The library takes any.
+constexpr std::size_t kShortestWebSphereKey = 32;
+
 /// In the place of a request that was not asked for.
 class not_fetched : public std::exception {
   public:

@@ -130,9 +130,13 @@ class KeyCheck {
 
     void CheckSecret() {
         const std::string found = "is set, " + std::to_string(value_.size()) + " bytes";
-        if (client_.profile() == Profile::kWebSphere && value_.size() > kLongestWebSphereSecret) {
+        const bool isKey = client_.profile() == Profile::kWebSphere;
+        if (isKey && value_.size() > kLongestWebSphereSecret) {
             Finding(found + ": too long", "get one of at most " + std::to_string(kLongestWebSphereSecret) +
                                               " bytes from the provider: with a longer one no token can be verified");
+        } else if (isKey && value_.size() < kShortestWebSphereKey) {
+            report_.Note(id_, name_, found + ": whoever has a token can find so short a key by trying, and sign tokens",
+                         "get one of at least " + std::to_string(kShortestWebSphereKey) + " bytes from the provider");
         } else {
             report_.Good(id_, name_, found);
         }

@@ -46,6 +46,20 @@ TEST_F(Files, SecretWithoutQuotationMarksIsNotPrinted) {
     EXPECT_EQ(Ask({}).FirstFinding().id, "client.file");
 }
 
+TEST(ClientSecret, ThatIsShorterThanAKeyOfHS256IsNoted) {
+    Appliance appliance(Profile::kWebSphere);
+    appliance.SetClient("client_secret", std::string(31, 'k'));
+    EXPECT_THAT(Ask({}).Find("client.client_secret", "note").found, HasSubstr("31 bytes: "));
+    appliance.SetClient("client_secret", std::string(32, 'k'));
+    EXPECT_EQ(Ask({}).Find("client.client_secret", "good").found, "is set, 32 bytes");
+}
+
+TEST(ClientSecret, ThatSignsNoTokenMayBeShort) {
+    Appliance appliance(Profile::kAzure);
+    appliance.SetClient("client_secret", "a short one");
+    EXPECT_EQ(Ask({}).Find("client.client_secret", "good").found, "is set, 11 bytes");
+}
+
 TEST_F(Files, TextInThePlaceOfABooleanIsNoted) {
     appliance.SetClient("sso_enable", "yes");
     EXPECT_THAT(Ask({}).Find("client.sso_enable", "note").found, HasSubstr("no boolean"));
