@@ -1,6 +1,6 @@
 # The API reference, from the public headers alone: cmake --build BUILD --target reference, then
 # BUILD/reference/html/index.html. A public name without documentation, or without that of a parameter, fails.
-find_package(Doxygen)
+find_package(Doxygen QUIET)
 if(NOT DOXYGEN_FOUND)
     return()
 endif()

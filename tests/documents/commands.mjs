@@ -63,7 +63,12 @@ export function isCommand(text) {
     return COMMAND.test(text);
 }
 
-const shellBlocks = documents.flatMap(blocks).filter(({language}) => language === 'sh');
+// An engineer begins with ./check, which installs what is missing, as ./demo does. Behind them it would not show that
+// another block needs a package that it does not name.
+const installsByItself = ({document, text}) =>
+    text.trim() === './demo' || ['CONTRIBUTING.md', 'docs/release.md'].includes(document);
+const shellBlocks = documents.flatMap(blocks).filter(({language}) => language === 'sh')
+    .sort((a, b) => installsByItself(a) - installsByItself(b));
 const isRun = ({text}) => !ELSEWHERE.has(text.trim());
 
 const partsOfCheck = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding: 'utf8'});
