@@ -1,0 +1,33 @@
+// The licences of all that the project's own commands install are told, and of nothing else.
+import assert from 'node:assert/strict';
+import {execFileSync} from 'node:child_process';
+import {readFileSync} from 'node:fs';
+import path from 'node:path';
+import {test} from 'node:test';
+
+import {codeSpans, PROJECT, proseLines} from './documents.mjs';
+
+const DOCUMENT = 'docs/licences.md';
+
+const read = (file) => readFileSync(path.join(PROJECT, file), 'utf8');
+
+/** Of Debian: what stands in a script's arrays of packages, and what its function for a part's packages prints. */
+function debianPackages(script) {
+    return [...read(script).matchAll(/(?:packages\+?=|^directory=)\(([^)]*)\)|^ +(?:\w[\w |]*\) )?echo ([a-z][^;\n]*?)(?: ;;)?$/gm)]
+        .flatMap(([, array, printed]) => (array ?? printed).split(/\s+/))
+        .filter((word) => /^[a-z][a-z0-9+.-]+$/.test(word));
+}
+
+/** Of npm: what the project asks for; what these need is told with them. */
+function npmPackages() {
+    const files = execFileSync('git', ['ls-files', '*package.json'], {cwd: PROJECT, encoding: 'utf8'}).trim().split('\n');
+    return files.flatMap((file) => Object.keys(JSON.parse(read(file)).dependencies ?? {}));
+}
+
+test('each package that is installed stands in the table with its licence, and no other', () => {
+    const installed = [...['check', 'demo', 'bench/run'].flatMap(debianPackages), ...npmPackages()];
+    const rows = proseLines(DOCUMENT).map(({text}) => text.split(' | ')).filter((cells) => cells.length === 3);
+    const told = rows.filter(([,, licence]) => licence.trim() !== '|').flatMap(([, names]) => codeSpans(names));
+    assert.ok(told.length > 40);
+    assert.deepEqual(told.sort(), [...new Set(installed)].sort());
+});
