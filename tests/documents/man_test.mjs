@@ -6,8 +6,8 @@ import {tmpdir} from 'node:os';
 import path from 'node:path';
 import {test} from 'node:test';
 
-import {differences, filesMatching, NO_DIFFERENCES, PROJECT, read} from './documents.mjs';
-import {configurationKeys, loggedBy, thrownTexts} from './sources.mjs';
+import {documents, filesMatching, PROJECT, read} from './documents.mjs';
+import {configurationKeys, level, loggedBy, thrownTexts} from './sources.mjs';
 
 const files = filesMatching('docs/man/*');
 const links = files.filter((file) => read(file).startsWith('.so '));
@@ -36,11 +36,13 @@ test(`mandoc has nothing to say of ${files.length} pages`, () => {
         read(file).replace(/^\.so man3\//, '').trim()))), []);
 });
 
-test('each page that another refers to is there', () => {
+test('each page that another or a document refers to is there', () => {
     const known = [...files.map((file) => path.basename(file).replace(/\.(\d)$/, ' $1')), ...ELSEWHERE];
-    const referred = pages.flatMap(({file, source}) =>
-        [...source.matchAll(/^\.Xr (\S+) (\d)/gm)].map(([, name, section]) => ({file, page: `${name} ${section}`})));
-    assert.ok(referred.length > 20);
+    const plain = [...documents, ...filesMatching('debian/*.README.Debian')].map((file) => ({file, source: read(file)}));
+    const named = (pattern, sources) => sources.flatMap(({file, source}) =>
+        [...source.matchAll(pattern)].map(([, name, section]) => ({file, page: `${name} ${section}`})));
+    const referred = [...named(/^\.Xr (\S+) (\d)/gm, pages), ...named(/([\w.:-]+)\((\d)\)/g, plain)];
+    assert.ok(referred.length > 20 && referred.some(({file}) => file.startsWith('debian/')));
     assert.deepEqual(referred.filter(({page}) => !known.includes(page)), []);
 });
 
@@ -52,12 +54,34 @@ test('a page that is a link leads to one that has its name', () => {
     assert.deepEqual(wrong, []);
 });
 
-test('each line of log that a page tells of can be logged', () => {
-    const told = pages.flatMap(({file, text}) => [...text.matchAll(/^ +(\w+:LINE \S.*)$/gm)].map(([, line]) =>
-        ({file, line: line.replace(':LINE', ':N').replace('SYSTEM TEXT', 'SYSTEM')})));
+/** The lines of log that a page tells of, each with the levels that its paragraph and its own text name. */
+function toldLines({file, text}) {
+    const lines = [];
+    let paragraph = '';
+    for (const line of text.split('\n').filter((each) => each.trim() !== '')) {
+        const [, logged] = /^ {5}(\w+:LINE \S.*)$/.exec(line) ?? [];
+        if (logged !== undefined) {
+            lines.push({file, line: logged, paragraph, own: ''});
+        } else if (/^ {5}\S/.test(line)) {
+            paragraph = line;
+        } else { // of each of the lines that stand above it
+            lines.forEach((each) => {
+                each.own ||= line;
+            });
+        }
+    }
+    return lines.map((each) => ({...each, names: (each.paragraph + each.own).match(/LOG_[A-Z]+/g) ?? []}));
+}
+
+test('each line of log that a page tells of can be logged, with the level that the page tells', () => {
+    const told = pages.flatMap(toldLines);
     assert.ok(told.length > 20);
-    assert.deepEqual(told.filter(({line}) => loggedBy(line).length === 0), []);
-    console.log(`${told.length} lines of log`);
+    const isLogged = ({line, names}) => loggedBy(line, 'LINE').some((format) =>
+        names.every((name) => format.level.split(', ').includes(level(name))));
+    assert.deepEqual(told.filter((each) => !isLogged(each)), []);
+    const levels = told.filter(({names}) => names.length > 0);
+    assert.ok(levels.length > 20);
+    console.log(`${told.length} lines of log, ${levels.length} with a level`);
 });
 
 test('each text that a page quotes among the errors is thrown as the class that it stands under', () => {
@@ -104,13 +128,14 @@ test('each text that is thrown stands in a page, and none stands among the error
     console.log(`${thrown.length} texts`);
 });
 
-test('each key of a configuration file stands in the page of that file', () => {
+test('each key of a configuration file stands in the page of that file, with its type and its default', () => {
     for (const [file, real] of Object.entries(configurationKeys())) {
         const {source} = pages.find((page) => page.file === `docs/man/tavosso-${file}.5`);
-        const told = [...source.matchAll(/^\.It (?:Li|Cm|Va|Ic) (\w+)/gm)].map(([, key]) => key);
-        assert.deepEqual(differences({told, real}), NO_DIFFERENCES);
+        const told = [...source.matchAll(/^\.It Cm (\w+) Pq (\w+), default (\w+)$/gm)].map(([, key, type, byDefault]) =>
+            ({key, type, byDefault}));
+        assert.deepEqual(told, real);
         const [, example] = /^\.Bd -literal.*\n(\{[^]*?)^\.Ed/m.exec(source);
-        assert.deepEqual(Object.keys(JSON.parse(example.replaceAll('\\-', '-'))), real);
+        assert.deepEqual(Object.keys(JSON.parse(example.replaceAll('\\-', '-'))), real.map(({key}) => key));
     }
 });
 

@@ -25,9 +25,27 @@ function statements(text, beginning) {
     return text.split(beginning).slice(1).map((rest) => rest.slice(0, rest.indexOf(';')));
 }
 
+/** The class of each exception that a source throws, and what its constructor is given. */
+function thrownBy({file, text}) {
+    return statements(text, /\bthrow\b/).filter((statement) => statement !== '').map((statement) => {
+        const [, type, argument] = /^ (?:\w+::)*?((?:std::)?\w+)\(([^]*)\)$/.exec(statement) ?? [];
+        if (type === undefined) { // an object that was made before, or in braces: its text would be in no list
+            throw new Error(`${file}: write "throw Type(text)" in the place of "throw${statement}"`);
+        }
+        return {file, type, argument, source: text};
+    });
+}
+
+/** What would log or throw without being found here. */
+export function unseenForms() {
+    const forms = /\b(?:syslog(?!\(|\.h>)|vsyslog|perror|stderr|cerr|clog|\w+_nested|rethrow_\w+|\w+_exception_ptr)\b/g;
+    return sources.flatMap(({file, text}) => [...text.matchAll(forms)].map(([form]) => ({file, form})));
+}
+
 const LEVELS = {LOG_ERR: 'err', LOG_WARNING: 'warning', LOG_INFO: 'info', LOG_AUTH: 'auth'};
 
-function level(priority) {
+/** The level of a priority, and behind it the facility where that is not the program's own. */
+export function level(priority) {
     const names = priority.match(/LOG_[A-Z]+/g).map((name) => LEVELS[name] ?? name);
     return names.sort((a, b) => (a === 'auth') - (b === 'auth')).join(', ');
 }
@@ -49,32 +67,29 @@ export function logFormats() {
             }
             // One class serves several sources, by whose names it logs.
             const source = call.includes('source_') ? 'SOURCE' : name;
-            return formats.map((each) => ({format: each, level: level(priority), source}));
+            return formats.map((each) => ({file, format: each, level: level(priority), source}));
         });
     });
 }
 
 /** Texts of exceptions that the sources throw, with their classes; "ALG" stands for the name of an algorithm. */
 export function thrownTexts() {
-    return sources.filter(({file}) => !file.startsWith('frontend/')).flatMap(({file, text}) =>
-        statements(text, /\bthrow\b/).filter((statement) => statement.includes('(')).flatMap((statement) => {
-            const [, type, argument] = /^\s*(?:\w+::)*?((?:std::)?\w+)\(([^]*)\)$/.exec(statement) ?? [];
-            return textsOf(argument, text).map((thrownText) => ({file, type, text: thrownText}));
-        }));
+    return sources.filter(({file}) => !file.startsWith('frontend/')).flatMap(thrownBy).flatMap((thrown) =>
+        textsOf(thrown).map((text) => ({file: thrown.file, type: thrown.type, text})));
 }
 
-function textsOf(argument, file) {
-    if (argument === '') {
+function textsOf({file, type, argument, source}) {
+    if (type === 'std::bad_alloc') {
         return [];
     }
-    const [literal] = literals(argument);
+    const [, algorithm, literal] = /^(name \+ )?"((?:[^"\\]|\\.)*)"$/.exec(argument) ?? [];
     if (literal !== undefined) {
-        return [argument.startsWith('"') ? literal : `ALG${literal}`];
+        return [algorithm === undefined ? literal : `ALG${literal}`];
     }
     if (/^\w+$/.test(argument)) { // a parameter: what the function is called with
-        const before = file.slice(0, file.search(new RegExp(`throw [\\w:]+\\(${argument}\\)`)));
+        const before = source.slice(0, source.search(new RegExp(`throw [\\w:]+\\(${argument}\\)`)));
         const name = [...before.matchAll(/^[\w:<>&* ]+?(\w+)\([^;]*?\) \{/gm)].at(-1)[1];
-        const texts = statements(file, new RegExp(`\\b${name}\\(`)).flatMap(literals);
+        const texts = statements(source, new RegExp(`\\b${name}\\(`)).flatMap(literals);
         if (texts.length > 0) {
             return texts;
         }
@@ -83,7 +98,7 @@ function textsOf(argument, file) {
     if (['Utils::WriteCompactJson(tokenResponse)', 'curl_easy_strerror(result)'].includes(argument)) {
         return [];
     }
-    throw new Error(`what does this throw: ${argument}`);
+    throw new Error(`${file}: what does this throw: ${type}(${argument})`);
 }
 
 /**
@@ -104,29 +119,68 @@ export function loggedBy(line, number = 'N', texts = []) {
 /** How the reasons begin that the front end gives of its own, without the library. */
 export function frontEndReasons() {
     const handedOn = /^(The front end's .*|The provider refused: |unexpected failure)$/;
-    const texts = sources.filter(({file}) => /^frontend\/.*\.cpp$/.test(file)).flatMap(({text}) => [
-        ...statements(text, /\bthrow\b|\bThrowSystemError\(/).flatMap((statement) => literals(statement).slice(0, 1)),
-        ...literals(text).filter((literal) => handedOn.test(literal)),
+    const texts = sources.filter(({file}) => /^frontend\/.*\.cpp$/.test(file)).flatMap((source) => [
+        ...[...thrownBy(source).map(({argument}) => argument), ...statements(source.text, /\bThrowSystemError\(/)]
+            .flatMap((statement) => literals(statement).slice(0, 1)),
+        ...literals(source.text).filter((literal) => handedOn.test(literal)),
     ]);
     // Sentences: what begins otherwise is a text of the library's, repeated.
     return unique(texts.filter((text) => /^[A-Z].* |^unexpected/.test(text)).map((text) => text.trim()));
 }
 
-/** The keys whose values are booleans; those of all others are strings. */
-export function booleanKeys() {
-    const constants = Object.fromEntries(sources.flatMap(({text}) =>
-        [...text.matchAll(/constexpr char (k\w+)\[\] = "([^"]*)"/g)].map(([, name, value]) => [name, `"${value}"`])));
-    return unique(sources.flatMap(({text}) => [...text.matchAll(/ReadMember\(\w+, ("\w+"|k\w+), enable\)/g)])
-        .map(([, key]) => (constants[key] ?? key).replaceAll('"', '')));
+/** The constants of a source that are texts. */
+function textConstants(text) {
+    return Object.fromEntries([...text.matchAll(/constexpr char (k\w+)\[\] = ("[^"]*")/g)]
+        .map(([, name, value]) => [name, value]));
 }
 
-/** The keys of the configuration files, by file. */
-export function configurationKeys() {
-    const named = (folder, pattern) => unique(sources.filter(({file}) => file.startsWith(folder))
-        .flatMap(({text}) => literals(text)).filter((literal) => pattern.test(literal)));
+const textOf = (name) => sources.find(({file}) => file === name).text;
+
+/** Where a source loads a document from, and the members that it reads of it, each with the field that receives it. */
+function membersRead({file, text}) {
+    const [, location, loaded] = /LoadJsonFile(?:AsRoot\(SOURCE_LINE, |\()(k\w+), (\w+)\)/.exec(text);
+    const single = [...text.matchAll(new RegExp(`ReadMember\\(${loaded}, ([^,]+), (\\w+)\\)`, 'g'))];
+    const lists = statements(text, `ReadMembers(${loaded}, `);
+    const uses = text.replace(LITERAL, '').match(new RegExp(`\\b${loaded}\\b`, 'g'));
+    if (uses.length !== 2 + single.length + lists.length) { // it is declared, loaded, and read in these two ways
+        throw new Error(`${file}: members of "${loaded}" are read in another way`);
+    }
+    const constants = {...textConstants(textOf('sso/names.h')), ...textConstants(text)};
+    const members = [...single, ...lists.flatMap((list) => [...list.matchAll(/\{([^,{}]+), (\w+)\}/g)])];
     return {
-        'profile.conf': named('sso/', /^sso_[a-z_]+$/),
-        'azure.conf': named('azure/', /^azure_[a-z_]+$/),
-        'websphere.conf': named('websphere/', /^websphere_[a-z_]+$/),
+        name: path.basename(JSON.parse(constants[location])),
+        members: members.map(([, name, field]) => ({key: JSON.parse(constants[name] ?? name), field})),
     };
+}
+
+const TYPES = {bool: 'boolean', string: 'string'};
+
+/** The keys of the configuration files, by file, with types and defaults: those of the fields that receive them. */
+export function configurationKeys() {
+    const keys = {};
+    const readers = sources.filter(({file, text}) => !file.startsWith('utils/') && text.includes('LoadJsonFile'));
+    for (const source of readers) {
+        const {name, members} = membersRead(source);
+        keys[name] ??= [];
+        for (const {key, field} of members.filter((member) => !keys[name].some((known) => known.key === member.key))) {
+            const declaration = new RegExp(`(?:std::)?(bool|string) ${field}(?: = (\\w+))?;`);
+            const [, type, byDefault] = declaration.exec(source.text + textOf('sso/sso.h'));
+            keys[name].push({key, type: TYPES[type], byDefault: byDefault ?? 'empty'});
+        }
+    }
+    return keys;
+}
+
+/** The comments of the headers that programs include, of which the reference is made: each as one line. */
+export const referenceComments = ['sso/sso.h', 'jwt/jwt.h'].flatMap((file) =>
+    [...read(file).matchAll(/\/\*\*([^]*?)\*\/|\/\/(?:\/<)?(.*)/g)].map(([, block, line]) =>
+        ({file, text: (block ?? line).replace(/^ *\*/gm, '').replace(/\s+/g, ' ').trim()})));
+
+/** The files and folders of the appliance that the sources name, and those that the front end makes in its own. */
+export function appliancePaths() {
+    const named = sources.flatMap(({text}) => literals(text)).filter((literal) => literal.startsWith('/usr/tavo/'));
+    const folder = JSON.parse(textConstants(textOf('frontend/private_folder.cpp')).kFrontEndFolder);
+    const made = sources.filter(({file}) => file.startsWith('frontend/')).map(({text}) => textConstants(text).kFolder)
+        .filter(Boolean).map((name) => `${folder}/${JSON.parse(name)}`);
+    return [...named, ...made];
 }

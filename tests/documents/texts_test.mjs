@@ -5,7 +5,7 @@ import {test} from 'node:test';
 
 import {isCommand} from './commands.mjs';
 import {blocks, codeSpans, differences, documents, NO_DIFFERENCES, proseLines, tableRows} from './documents.mjs';
-import {frontEndReasons, logFormats, loggedBy, thrownTexts} from './sources.mjs';
+import {frontEndReasons, level, logFormats, loggedBy, referenceComments, thrownTexts, unseenForms} from './sources.mjs';
 
 const formats = logFormats();
 const thrown = thrownTexts();
@@ -22,11 +22,15 @@ const OTHER = [
 const logRows = tableRows('docs/operations.md').filter(({header}) => header.join() === 'line,level,cause,remedy');
 const curlTexts = tableRows('docs/operations.md').filter(({header}) => header[0] === 'CURL').map(({cells}) => cells[0]);
 
+test('the sources log and throw in the forms that are looked at here', () => {
+    assert.deepEqual(unseenForms(), []);
+});
+
 test('each log line of the sources is told, once, with its level, and none that cannot be logged', () => {
     assert.ok(formats.length > 15 && logRows.length > 10, `${formats.length} formats, ${logRows.length} rows`);
-    const told = logRows.flatMap(({cells}) => codeSpans(cells[0]).map((line) => ({line, level: cells[1]})));
+    const told = logRows.flatMap(({cells}) => codeSpans(cells[0]).map((line) => ({line, byTable: cells[1]})));
     const by = told.flatMap(({line}) => loggedBy(line)).map(({format, source}) => source + format);
-    assert.deepEqual(told.filter(({line, level}) => !loggedBy(line).some((format) => format.level === level)), []);
+    assert.deepEqual(told.filter(({line, byTable}) => !loggedBy(line).some((format) => format.level === byTable)), []);
     assert.deepEqual(formats.filter(({format, source}) => !by.includes(source + format)), []);
     const lines = told.map(({line}) => line);
     assert.deepEqual(lines.filter((line, index) => lines.indexOf(line) !== index), []);
@@ -77,4 +81,42 @@ test('each reason of the front end is told, once, and none that it never gives',
         .map((text) => text.replace(/: SYSTEM$| ERROR .*| (state|code)\.$/, ''));
     assert.ok(told.length > 8);
     assert.deepEqual(differences({told: [...new Set(told)], real: frontEndReasons()}), NO_DIFFERENCES);
+});
+
+/** What a comment quotes that has a blank in it, with the comment's text before and behind it. */
+const quotations = referenceComments.flatMap(({file, text}) => [...text.matchAll(/"([^"]*)"/g)].map((found) =>
+    ({file, quoted: found[1], before: text.slice(0, found.index), behind: text.slice(found.index + found[0].length)})))
+    .filter(({quoted}) => quoted.includes(' '));
+
+test('each text that the reference quotes is thrown or logged, and it quotes each of the library\'s', () => {
+    const told = [...new Set(quotations.map(({quoted}) => quoted))];
+    const others = ['SOURCE:LINE ', 'Location: ', 'openid profile email'];
+    assert.deepEqual(told.filter((text) => !thrown.some((each) => each.text === text) &&
+        loggedBy(text, 'LINE').length === 0), others);
+    const logged = told.flatMap((text) => loggedBy(text, 'LINE')).map(({format, source}) => source + format);
+    // The stand-in is no part of the library, nor is the front end.
+    assert.deepEqual(formats.filter(({format, source, file}) => !/^(platform|frontend)\//.test(file) &&
+        !logged.includes(source + format)), []);
+    assert.deepEqual(thrown.filter(({text}) => !told.includes(text) && !told.some((line) => line.endsWith(`:LINE ${text}`))), []);
+    console.log(`${told.length} texts in the reference`);
+});
+
+test('each text that the reference says is thrown is thrown as that class', () => {
+    const told = quotations.flatMap(({file, quoted, before}) => {
+        const [, type] = /@throws (\S+)[^@]*$/.exec(before) ?? [];
+        return type === undefined || quoted.includes(':LINE ') ? [] : [{file, quoted, type}];
+    });
+    assert.ok(told.length > 40, `${told.length} texts`);
+    assert.deepEqual(told.filter(({quoted, type}) =>
+        !thrown.some((each) => each.text === quoted && type.endsWith(each.type))), []);
+});
+
+test('each log line in the reference has the level that stands before it, or else behind it', () => {
+    const names = /LOG_(?:ERR|WARNING|INFO)/g;
+    const told = quotations.filter(({quoted}) => /:LINE ./.test(quoted)).map(({file, quoted, before, behind}) => {
+        const name = before.match(names)?.at(-1) ?? behind.match(names)?.[0];
+        return {file, quoted, level: name && level(before.includes('LOG_AUTH') ? `${name} LOG_AUTH` : name)};
+    });
+    assert.ok(told.length > 15, `${told.length} lines`);
+    assert.deepEqual(told.filter((line) => !loggedBy(line.quoted, 'LINE').some((format) => format.level === line.level)), []);
 });
