@@ -27,6 +27,27 @@ test('each check is told, once, and none that is not made', () => {
     console.log(`${told.length} checks`);
 });
 
+test('each command is told in its chapter and in the manual page and can be completed, and none that is not one', () => {
+    const real = [...sources.matchAll(/\badd_subcommand\("([a-z-]+)"/g)].map(([, command]) => command);
+    assert.ok(real.length > 2, `${real.length} commands`);
+    const manual = read('docs/man/tavosso-doctor.8');
+    const [, list] = /^The commands are:\n([^]*?)^\.El$/m.exec(manual);
+    const completion = read('doctor/completion.bash');
+    const [, recognised] = /^ *(\w+(?: \| \w+)+)\) command=/m.exec(completion);
+    const [, offered] = /^ *''\) choices\+=' ([^']*)'/m.exec(completion);
+    const places = {
+        chapter: tableRows('docs/doctor.md').filter(({header}) => header[0] === 'command')
+            .flatMap(({cells}) => codeSpans(cells[0])[0].match(/(?<=^tavosso-doctor )[a-z-]+/) ?? []),
+        synopsis: manual.match(/(?<=^\.Op Ar options\n\.Cm )[a-z-]+/gm),
+        description: list.match(/(?<=^\.It Cm )[a-z-]+/gm),
+        recognised: recognised.split(' | '),
+        offered: offered.split(' '),
+    };
+    for (const [place, told] of Object.entries(places)) {
+        assert.deepEqual({place, ...differences({told, real})}, {place, ...NO_DIFFERENCES});
+    }
+});
+
 test('each option is told in the manual page and can be completed, and none that is not one', () => {
     const real = [...sources.matchAll(/(?:flag|option)\("(--[a-z-]+)"/g)].map(([, option]) => option).concat('--help');
     assert.ok(real.length > 8, `${real.length} options`);
