@@ -2,10 +2,10 @@
 import assert from 'node:assert/strict';
 import {readFileSync} from 'node:fs';
 import path from 'node:path';
-import {pathToFileURL} from 'node:url';
 
 import {useProfile, writeSettings} from '../site/appliance.mjs';
 import {makeUsers, startSite} from '../site/site.mjs';
+import {startChromium} from './chromium.mjs';
 import {Visitor} from './visitor.mjs';
 
 export const HTML_LOGIN = '<img src=x onerror=alert(1)>';
@@ -17,20 +17,6 @@ const USERS = {
     dora: 'dora@corp.example.net',
     [HTML_LOGIN]: `${HTML_LOGIN}@corp.example.net`,
 };
-
-const SWITCHES = [
-    '--disable-background-networking', '--disable-component-update', '--disable-gpu', '--disable-quic',
-    '--disable-sync', '--no-first-run',
-];
-
-function launch({chromium}, {chromiumTrust, folder}) {
-    return chromium.launch({
-        executablePath: '/usr/bin/chromium',
-        args: [...SWITCHES, chromiumTrust],
-        chromiumSandbox: false,
-        env: {...process.env, HOME: folder, XDG_CONFIG_HOME: folder, XDG_CACHE_HOME: folder},
-    });
-}
 
 class Stage {
     constructor(properties) {
@@ -93,7 +79,6 @@ class Stage {
 }
 
 export async function startStage({webroot, siteModules, browserModules, pictures}) {
-    const load = (file) => import(pathToFileURL(path.join(browserModules, file)));
     const asked = [];
     const logged = [];
     const users = makeUsers(USERS);
@@ -105,7 +90,7 @@ export async function startStage({webroot, siteModules, browserModules, pictures
         onRequest: (request) => asked.push(request),
         onLog: (line) => logged.push(line),
     });
-    const browser = await launch(await load('playwright-core/index.mjs'), site);
+    const browser = await startChromium({browserModules, folder: site.folder, switches: [site.chromiumTrust]});
     const axe = readFileSync(path.join(browserModules, 'axe-core/axe.min.js'), 'utf8');
     return new Stage({site, browser, axe, asked, logged, pictures});
 }

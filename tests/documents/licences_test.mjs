@@ -13,7 +13,8 @@ const read = (file) => readFileSync(path.join(PROJECT, file), 'utf8');
 
 /** Of Debian: what stands in a script's arrays of packages, and what its function for a part's packages prints. */
 function debianPackages(script) {
-    return [...read(script).matchAll(/(?:packages\+?=|^directory=)\(([^)]*)\)|^ +(?:\w[\w |]*\) )?echo ([a-z][^;\n]*?)(?: ;;)?$/gm)]
+    const lists = /(?:packages\+?=|^directory=)\(([^)]*)\)|^ +(?:\w[\w |]*\) )?echo ([a-z][^;\n]*?)(?: ;;)?$/gm;
+    return [...read(script).matchAll(lists)]
         .flatMap(([, array, printed]) => (array ?? printed).split(/\s+/))
         .filter((word) => /^[a-z][a-z0-9+.-]+$/.test(word));
 }
