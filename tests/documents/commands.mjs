@@ -1,7 +1,5 @@
 // The commands that the documents tell their readers to run, and how a test runs each.
-import {execFileSync} from 'node:child_process';
-
-import {asPattern, blocks, codeSpans, documents, PROJECT, proseLines} from './documents.mjs';
+import {asPattern, blocks, codeSpans, documents, filesMatching, proseLines, read} from './documents.mjs';
 
 /** Commands of blocks that are not run here, and why. */
 const ELSEWHERE = new Map([
@@ -10,11 +8,11 @@ const ELSEWHERE = new Map([
     ['tests/package/machine --clone /home/ada/tavosso --user ada ./check style', 'is how these commands are run'],
 ]);
 
-// What a span of text begins with that is a command, or what follows a command's name: an option. A file's name alone
-// is none.
-const COMMAND = new RegExp('^(?:\\./|bench/run |(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|lintian|ls|' +
-    'lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|tavosso-doctor|ulimit|xargs) |tests/\\w+/\\w+ |' +
-    'tools/[\\w-]+ |[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
+// What a span of text begins with that is a command: a prompt, the first line of a script, a name. Or what follows any
+// command's name: an option. Of other single words those with a hyphen: no key has one. A file's name alone is none.
+const COMMAND = new RegExp('^(?:[$#] |#!|\\./|bench/run |(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|' +
+    'lintian|ls|lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|tavosso-doctor|ulimit|xargs)(?: |$)|' +
+    'tests/\\w+/\\w+ |tools/[\\w-]+ |[a-z]+(?:-[a-z]+)+$|[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
 
 /** Commands within the text that cannot be run to the letter, and what is run for them. */
 const FILLED_IN = new Map([
@@ -33,25 +31,43 @@ const FILLED_IN = new Map([
         ' ./tavosso-frontend_*.deb'],
     ['sudo lighty-disable-mod tavosso-frontend',
         'lighty-enable-mod tavosso-frontend && lighty-disable-mod tavosso-frontend'],
+    ['sudo lighty-disable-mod ssl', 'lighty-enable-mod ssl && lighty-disable-mod ssl'],
+    ['update-ca-certificates', 'sudo update-ca-certificates'],
+    ['#!/bin/sh\nexec timeout 60 "$DOCUMENT_ROOT$SCRIPT_NAME"',
+        'export DOCUMENT_ROOT=/usr SCRIPT_NAME=/bin/true && exec timeout 60 "$DOCUMENT_ROOT$SCRIPT_NAME"'],
+    ['c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)',
+        'cd build/first && cp sso.cpp program.cpp && c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)'],
     ['clang-format -i FILE', 'clang-format -i sso/sso.cpp'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
     ['man tavosso-doctor', 'man ./docs/man/tavosso-doctor.8'],
-    ['tavosso-doctor explain TEXT', 'build/release/doctor/tavosso-doctor explain "profile not support."'],
-    ['sudo tavosso-doctor --domain corp.example.net',
-        'build/release/doctor/tavosso-doctor --domain corp.example.net || [ $? = 1 ]'], // no profile is set up there
+    ['tavosso-doctor', 'tavosso-doctor || [ $? = 1 ]'], // no profile is set up there
+    ['tavosso-doctor explain TEXT', 'tavosso-doctor explain "profile not support."'],
+    ['sudo tavosso-doctor --domain corp.example.net', 'sudo tavosso-doctor --domain corp.example.net || [ $? = 1 ]'],
+    ['sudo tavosso-doctor --user www-data', 'sudo tavosso-doctor --user www-data || [ $? = 1 ]'],
     ['ls -l FILE', 'ls -l build/first/profile.conf'],
     ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
 ]);
 
 /** Commands within the text that are not run here, and why. */
 const NOT_HERE = new Map([
+    ['./check bench', 'on request: it builds the benchmarks and what they compare with'],
+    ['./check coverage', 'on request: it takes long'],
+    ['./check fortify', 'the same'],
+    ['./check fuzz', 'the same'],
+    ['./check memcheck', 'the same'],
+    ['./check soak', 'the same'],
     ['cmake --install', 'names the command of the README'],
-    ['dpkg-buildpackage -us -uc -b', 'stands in a block, too'],
+    ['ctest', 'names a program'],
     ['git commit', 'by hand'],
     ['git grep', 'names a command'],
     ['git tag -a vVERSION', 'by hand'],
+    ['lintian', 'names a program: ./check package runs it'],
+    ['man', 'names a program'],
     ['node tests/mutation/run.mjs', 'by hand: an hour'],
     ['openssl s_server -www', 'tells how a figure was measured'],
+    ['pre-commit', 'names a program: ./check style runs it'],
+    ['sudo lighty-enable-mod ssl tavosso-frontend', 'needs the package: tests/package reads it there and runs it'],
+    ['sudo systemctl restart lighttpd', 'needs systemd to run: tests/package restarts it by its script'],
     ['sudo tavosso-doctor login', 'asks a person: tests/doctor answers it'],
     ['tavosso-doctor login', 'the same'],
     ['tavosso-doctor token FILE', 'needs a token: tests/doctor has them'],
@@ -71,22 +87,57 @@ const shellBlocks = documents.flatMap(blocks).filter(({language}) => language ==
     .sort((a, b) => installsByItself(a) - installsByItself(b));
 const isRun = ({text}) => !ELSEWHERE.has(text.trim());
 
-const partsOfCheck = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding: 'utf8'});
-
-// Commands with places to fill in do not stand in blocks of shell.
-const spans = documents.flatMap((document) => [
-    ...proseLines(document).flatMap(({line, text}) => codeSpans(text).map((span) => ({document, line, text: span}))),
-    ...blocks(document).filter(({language}) => language === 'text'),
-].sort((a, b) => a.line - b.line)).filter(({text}) => isCommand(text));
+// What ./check alone runs, and the kinds of tests among it: each can be named. What takes longer is in the table above.
+const partsOfCheck = [...read('check').matchAll(/^(?:whole|kinds)=\((.*)\)$/gm)].flatMap(([, parts]) => parts.split(' '));
 
 /** Is this `./check` with parts? Those commands are run by one of them, and the others take as long. */
 function isPartOfCheck({text}) {
     const parts = /^\.\/check ([a-z ]+)$/.exec(text)?.[1].split(' ');
-    return parts?.every((part) => new RegExp(`^ .*\\b${part}\\b`, 'm').test(partsOfCheck));
+    return parts?.every((part) => partsOfCheck.includes(part));
 }
 
+// Commands with places to fill in do not stand in blocks of shell.
+const quotedIn = (document) => [
+    ...proseLines(document).flatMap(({line, text}) => codeSpans(text).map((span) => ({document, line, text: span}))),
+    ...blocks(document).filter(({language}) => language === 'text'),
+].sort((a, b) => a.line - b.line);
+
+/** What a manual page displays or quotes: a line, some words, a literal block. */
+function displayedIn(page) {
+    const source = read(page);
+    return [...source.matchAll(/^\.(?:D[1l]|Ic|Li|Ql) (.*?)(?: [.,:;)])*$|^\.Bd .*\n([^]*?)\n\.Ed$/gm)]
+        .map(({index, 1: words, 2: block}) => ({
+            document: page,
+            line: source.slice(0, index).split('\n').length,
+            text: (words ?? block).replaceAll('\\-', '-').replaceAll('\\(dq', '"').replaceAll('\\(aq', '\'')
+                .replaceAll('\\e', '\\').replaceAll('\\&', ''),
+        }));
+}
+
+/** What stands by itself in the text of a package: whatever is indented as no list is, and commands among the rest. */
+function indentedIn(file) {
+    return read(file).split('\n').map((text, index) => ({document: file, line: index + 1, text}))
+        .filter(({text}) => /^ {8}/.test(text) || (text.startsWith('    ') && isCommand(text.trim())))
+        .map((line) => ({...line, text: line.text.trim()}));
+}
+
+// The table of what is installed has packages in backticks, many of which are called as their program.
+const namesPackage = ({document, text}) => document === 'docs/licences.md' && !text.includes(' ');
+const withoutPrompt = (text) => text.replace(/^# /gm, 'sudo ').replace(/^\$ /gm, '');
+
+// The guide for administrators removes what was installed, which the others use.
+const removes = ({document}) => document === 'docs/operations.md';
+const spans = [
+    ...[...documents.flatMap(quotedIn), ...filesMatching('docs/man/*').flatMap(displayedIn)]
+        .sort((a, b) => removes(a) - removes(b))
+        .filter((span) => isCommand(span.text) && !namesPackage(span))
+        .map((span) => ({...span, text: withoutPrompt(span.text)})),
+    ...filesMatching('debian/*.README.Debian').flatMap(indentedIn),
+];
+
+const standsInBlock = ({text}) => shellBlocks.some((block) => block.text.split('\n').includes(text));
 const withinText = spans.filter(({text}, index) => spans.findIndex((span) => span.text === text) === index)
-    .filter((span) => !ELSEWHERE.has(span.text) && !NOT_HERE.has(span.text) && !isPartOfCheck(span));
+    .filter((span) => !standsInBlock(span) && !NOT_HERE.has(span.text) && !isPartOfCheck(span));
 
 /** What stands in the tables above, and in no document any more. */
 export const needless = [
@@ -94,14 +145,16 @@ export const needless = [
     ...[...ELSEWHERE.keys()].filter((command) => !shellBlocks.some(({text}) => text.trim() === command)),
 ];
 
-/** Patterns of the lines that a command prints, where the document shows them behind it; "..." is anything. */
-function expectedOutput(block) {
+/** The block of text that shows what a block of commands prints: the next one, under the same heading. */
+function outputOf(block) {
     const inDocument = blocks(block.document);
     const next = inDocument[inDocument.findIndex(({line}) => line === block.line) + 1];
-    if (next?.language !== 'text' || isCommand(next.text) || headingBetween(block, next)) {
-        return '';
-    }
-    return asPattern(next.text).replaceAll('\\.\\.\\.', '.*');
+    return next?.language === 'text' && !isCommand(next.text) && !headingBetween(block, next) ? next : undefined;
+}
+
+/** Patterns of the lines that a command prints, where the document shows them; "..." is anything. */
+function expectedOutput(block) {
+    return asPattern(outputOf(block)?.text ?? '').replaceAll('\\.\\.\\.', '.*');
 }
 
 function headingBetween(block, next) {
@@ -109,21 +162,30 @@ function headingBetween(block, next) {
         line > block.line && line < next.line && text.startsWith('#'));
 }
 
+const place = ({document, line}) => `${document}:${line}`;
+
 /**
  * A script of one line for each, in the order of the documents: "run" or "administer", where it stands, the commands,
  * and what they have to print. Blocks come first: what stands within text may need what they make.
  */
 export function script() {
     const quoted = (text) => `'${text.replaceAll('\'', '\'\\\'\'')}'`;
-    const line = ({document, line: number, text}, output) => {
-        const how = document === 'docs/operations.md' ? 'administer' : 'run';
-        return `${[how, ...[`${document}:${number}`, FILLED_IN.get(text) ?? text, output].map(quoted)].join(' ')}\n`;
+    const line = (command, output) => {
+        const {document, text} = command;
+        const how = document === 'docs/operations.md' || document.startsWith('debian/') ? 'administer' : 'run';
+        return `${[how, ...[place(command), FILLED_IN.get(text) ?? text, output].map(quoted)].join(' ')}\n`;
     };
     return [
         ...shellBlocks.filter(isRun).map((block) => line(block, expectedOutput(block))),
         ...withinText.map((span) => line(span, '')),
     ].join('');
 }
+
+const outputs = shellBlocks.filter(isRun).map(outputOf).filter(Boolean).map(place);
+
+/** Blocks of text that are neither a command nor what one prints. */
+export const otherTexts = documents.flatMap(blocks).filter((block) =>
+    block.language === 'text' && !isCommand(block.text) && !outputs.includes(place(block)));
 
 /** How many commands have something to print. */
 export const countWithOutput = shellBlocks.filter(isRun).filter((block) => expectedOutput(block) !== '').length;

@@ -6,10 +6,26 @@ import {tmpdir} from 'node:os';
 import path from 'node:path';
 import {test} from 'node:test';
 
-import {count, countWithOutput, needless, script} from './commands.mjs';
-import {PROJECT} from './documents.mjs';
+import {count, countWithOutput, needless, otherTexts, script} from './commands.mjs';
+import {differences, NO_DIFFERENCES, PROJECT, read} from './documents.mjs';
 
 test('nothing is left out that no document names', () => assert.deepEqual(needless, []));
+
+test('the help of ./check tells each of its parts', () => {
+    const help = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding: 'utf8'});
+    const [, kinds] = /a part by itself: ([^]*?)\n {2}[a-z]/.exec(help);
+    const told = [...help.matchAll(/^ {2}([a-z]+) /gm)].map(([, part]) => part).concat(kinds.split(/,\s+|\s+and\s+/));
+    const real = [...read('check').matchAll(/^(?:whole|kinds|longer)=\((.*)\)$/gm)].flatMap(([, parts]) => parts.split(' '));
+    assert.ok(real.length > 15);
+    assert.deepEqual(differences({told, real}), NO_DIFFERENCES);
+});
+
+test('each block of text is a command, what one prints, or what another test reads', () => {
+    const isLog = ({text}) => text.split('\n').every((line) => /^\S+\[\d+\]: /.test(line)); // texts_test.mjs
+    const isTranscript = ({text}) => text.startsWith('\nProfile\n'); // transcript.mjs, which looks for one
+    assert.deepEqual(otherTexts.filter((block) => !isLog(block) && !isTranscript(block)), []);
+    assert.equal(otherTexts.filter(isTranscript).length, 1);
+});
 
 test(`each of ${count} commands and blocks of commands works`, () => {
     assert.ok(count > 20 && countWithOutput > 2);
