@@ -1,5 +1,5 @@
 // The commands that the documents tell their readers to run, and how a test runs each.
-import {asPattern, blocks, codeSpans, documents, filesMatching, proseLines, read} from './documents.mjs';
+import {asPattern, blocks, codeSpans, documents, filesMatching, proseLines, read, unescaped} from './documents.mjs';
 
 /** Commands of blocks that are not run here, and why. */
 const ELSEWHERE = new Map([
@@ -109,8 +109,7 @@ function displayedIn(page) {
         .map(({index, 1: words, 2: block}) => ({
             document: page,
             line: source.slice(0, index).split('\n').length,
-            text: (words ?? block).replaceAll('\\-', '-').replaceAll('\\(dq', '"').replaceAll('\\(aq', '\'')
-                .replaceAll('\\e', '\\').replaceAll('\\&', ''),
+            text: unescaped(words ?? block),
         }));
 }
 

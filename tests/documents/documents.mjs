@@ -15,6 +15,12 @@ export function asPattern(text) {
     return text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&');
 }
 
+/** A manual page's text as it is shown: what is written by a name or behind a backslash is the character itself. */
+export function unescaped(roff) {
+    return roff.replaceAll('\\(aq', '\'').replaceAll('\\(dq', '"').replaceAll('\\e', '\\').replaceAll('\\-', '-')
+        .replaceAll('\\&', '');
+}
+
 /** Files that are ours and match: of a clone those under version control, else those that lie there. */
 export function filesMatching(...patterns) {
     const files = execFileSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],

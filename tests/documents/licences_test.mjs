@@ -5,7 +5,7 @@ import {readFileSync} from 'node:fs';
 import path from 'node:path';
 import {test} from 'node:test';
 
-import {codeSpans, PROJECT, proseLines} from './documents.mjs';
+import {codeSpans, PROJECT, tableRows} from './documents.mjs';
 
 const DOCUMENT = 'docs/licences.md';
 
@@ -27,8 +27,8 @@ function npmPackages() {
 
 test('each package that is installed stands in the table with its licence, and no other', () => {
     const installed = [...['check', 'demo', 'bench/run'].flatMap(debianPackages), ...npmPackages()];
-    const rows = proseLines(DOCUMENT).map(({text}) => text.split(' | ')).filter((cells) => cells.length === 3);
-    const told = rows.filter(([,, licence]) => licence.trim() !== '|').flatMap(([, names]) => codeSpans(names));
+    const told = tableRows(DOCUMENT).filter(({header}) => header[1] === 'installed as')
+        .flatMap(({cells}) => codeSpans(cells[1]));
     assert.ok(told.length > 40);
     assert.deepEqual(told.sort(), [...new Set(installed)].sort());
 });

@@ -6,7 +6,7 @@ import {tmpdir} from 'node:os';
 import path from 'node:path';
 import {test} from 'node:test';
 
-import {documents, filesMatching, PROJECT, read} from './documents.mjs';
+import {documents, filesMatching, PROJECT, read, unescaped} from './documents.mjs';
 import {configurationKeys, level, loggedBy, thrownTexts} from './sources.mjs';
 
 const files = filesMatching('docs/man/*');
@@ -135,14 +135,13 @@ test('each key of a configuration file stands in the page of that file, with its
             ({key, type, byDefault}));
         assert.deepEqual(told, real);
         const [, example] = /^\.Bd -literal.*\n(\{[^]*?)^\.Ed/m.exec(source);
-        assert.deepEqual(Object.keys(JSON.parse(example.replaceAll('\\-', '-'))), real.map(({key}) => key));
+        assert.deepEqual(Object.keys(JSON.parse(unescaped(example))), real.map(({key}) => key));
     }
 });
 
 test('each example that is a program compiles', () => {
     const programs = pages.flatMap(({source}) => [...source.matchAll(/^\.Bd -literal.*\n([^]*?)^\.Ed/gm)])
-        .map(([, text]) => text.replaceAll('\\(aq', '\'').replaceAll('\\(dq', '"').replaceAll('\\e', '\\')
-            .replaceAll('\\-', '-').replaceAll('\\&', ''))
+        .map(([, text]) => unescaped(text))
         .filter((text) => text.includes('int main') || text.includes('main('));
     assert.ok(programs.length > 0);
     const folder = mkdtempSync(path.join(tmpdir(), 'examples-'));
