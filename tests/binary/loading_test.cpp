@@ -108,7 +108,7 @@ TEST(Loading, WouldHaveEndedHadItWrittenAnything) {
              +[] { std::filesystem::rename("/tmp/there is none", "/tmp/file"); },
              +[] { std::filesystem::remove("/tmp/there is none"); },
              +[] { syslog(LOG_ERR, "line"); },
-             +[] { static_cast<void>(::write(STDOUT_FILENO, "", 0)); },
+             +[] { [[maybe_unused]] const ssize_t count = ::write(STDOUT_FILENO, "", 0); },
          }) {
         const int status = StatusOfLoadingWithoutWriting(write);
         EXPECT_TRUE(WIFSIGNALED(status));
