@@ -1,5 +1,5 @@
 // The documents of the project, taken apart.
-import {execFileSync} from 'node:child_process';
+import {spawnSync} from 'node:child_process';
 import {readFileSync} from 'node:fs';
 import path from 'node:path';
 import {fileURLToPath} from 'node:url';
@@ -21,10 +21,14 @@ export function unescaped(roff) {
         .replaceAll('\\&', '');
 }
 
-/** Files that are ours and match: of a clone those under version control, else those that lie there. */
+/** Files that are ours and match: those under version control, and new ones that git does not ignore. */
 export function filesMatching(...patterns) {
-    const files = execFileSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],
-        {cwd: PROJECT, encoding: 'utf8'}).split('\n').filter(Boolean);
+    const listing = spawnSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],
+        {cwd: PROJECT, encoding: 'utf8', stdio: ['ignore', 'pipe', 'inherit']});
+    if (listing.status !== 0) {
+        throw new Error('this is no clone of the repository');
+    }
+    const files = listing.stdout.split('\n').filter(Boolean);
     if (files.length === 0) {
         throw new Error(`there is no ${patterns}`);
     }
@@ -32,6 +36,10 @@ export function filesMatching(...patterns) {
 }
 
 export const documents = filesMatching('*.md');
+
+/** Our files and their folders: what else lies here lies in no other clone. */
+export const filesAndFolders = new Set(filesMatching('*').flatMap((file) =>
+    file.split('/').map((_, end, parts) => parts.slice(0, end + 1).join('/'))));
 
 /** Fenced blocks of a document: language, text, and the line that the text begins in. */
 export function blocks(document) {

@@ -1,10 +1,9 @@
 // Links, anchors and pictures of the documents are there, and the index leads to every chapter.
 import assert from 'node:assert/strict';
-import {existsSync} from 'node:fs';
 import path from 'node:path';
 import {test} from 'node:test';
 
-import {documents, PROJECT, proseLines} from './documents.mjs';
+import {documents, filesAndFolders, proseLines, tableRows} from './documents.mjs';
 
 const links = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
     [...text.replace(/`[^`]*`/g, '``').matchAll(/\]\(([^)\s]+)\)/g)].map(([, target]) => ({document, line, target})))
@@ -21,7 +20,7 @@ function anchors(document) {
 
 test(`each of ${links.length} links leads to a file of ours`, () => {
     assert.ok(links.length > 30);
-    assert.deepEqual(links.filter(({file}) => !existsSync(path.join(PROJECT, file))), []);
+    assert.deepEqual(links.filter(({file}) => !filesAndFolders.has(file.replace(/\/$/, ''))), []);
 });
 
 test('each anchor is a heading there', () => {
@@ -43,4 +42,13 @@ test('the index leads to every chapter', () => {
     const chapters = documents.filter((document) => document.startsWith('docs/') && document !== 'docs/README.md');
     assert.ok(chapters.length > 5);
     assert.deepEqual(chapters.filter((chapter) => !led.includes(chapter)), []);
+});
+
+test('the table in README.md has the chapters of the index', () => {
+    const chapters = (document) => tableRows(document).filter(({header}) => header[0] === 'chapter')
+        .map(({cells}) => cells[0]);
+    // The index has one more, which lies beside the README.
+    const inFolder = chapters('docs/README.md').filter((chapter) => !chapter.includes('](../'));
+    assert.ok(inFolder.length > 5);
+    assert.deepEqual(chapters('README.md'), inFolder.map((chapter) => chapter.replace('](', '](docs/')));
 });

@@ -2,7 +2,9 @@
 import assert from 'node:assert/strict';
 import {test} from 'node:test';
 
-import {codeSpans, differences, documents, filesMatching, NO_DIFFERENCES, proseLines, read, tableRows} from './documents.mjs';
+import {
+    codeSpans, differences, documents, filesAndFolders, filesMatching, NO_DIFFERENCES, proseLines, read, tableRows,
+} from './documents.mjs';
 import {appliancePaths} from './sources.mjs';
 
 const spans = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
@@ -10,7 +12,8 @@ const spans = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
 
 test('each test that is named is one', () => {
     const tests = filesMatching('tests/**/*_test.cpp').flatMap((file) =>
-        [...read(file).matchAll(/^(?:TYPED_)?TEST(?:_[FP])?\((\w+), (\w+)\)/gm)].map(([, suite, name]) => `${suite}.${name}`));
+        [...read(file).matchAll(/^(?:TYPED_)?TEST(?:_[FP])?\((\w+), (\w+)\)/gm)].map(([, suite, name]) =>
+            `${suite}.${name}`));
     const named = spans.filter(({span}) => /^[A-Z]\w+\.[A-Z]\w+$/.test(span) && !/\.(Debian|Json)$/.test(span));
     assert.ok(named.length > 30);
     assert.deepEqual(named.filter(({span}) => !tests.includes(span)), []);
@@ -23,8 +26,8 @@ test('each test that is named is one', () => {
 });
 
 test('each identifier that is named stands in the sources', () => {
-    const sources = filesMatching('*.cpp', '*.h', '*.mjs', '*.js', '*.conf', '*CMakeLists.txt', '*.cmake', 'CMakePresets.json',
-        'debian/*').map(read).join('\n');
+    const sources = filesMatching('*.cpp', '*.h', '*.mjs', '*.js', '*.conf', '*CMakeLists.txt', '*.cmake',
+        'CMakePresets.json', 'debian/*').map(read).join('\n');
     const words = new Set(sources.match(/\w+/g));
     const named = spans.filter(({span}) => /^(?=.*[a-z])(?=.*[A-Z_])\w+(::\w+)*(\(\))?$/.test(span))
         .flatMap(({document, line, span}) => span.match(/\w+/g).map((word) => ({document, line, word})));
@@ -35,14 +38,11 @@ test('each identifier that is named stands in the sources', () => {
 });
 
 test('each of our files and folders that is named is there', () => {
-    const files = filesMatching('*');
-    const known = new Set(files.flatMap((file) => [file, ...file.split('/').map((_, end, parts) =>
-        parts.slice(0, end).join('/'))]));
     const folders = 'azure|cmake|debian|docs|doctor|frontend|jwt|platform|sso|tests|tools|utils|websphere';
     const named = spans.filter(({span}) => new RegExp(`^(${folders})/[\\w./-]*$`).test(span));
     assert.ok(named.length > 40);
-    assert.deepEqual(named.filter(({span}) => !known.has(span.replace(/\/$/, ''))), []);
-    const names = new Set(files.map((file) => file.split('/').at(-1)));
+    assert.deepEqual(named.filter(({span}) => !filesAndFolders.has(span.replace(/\/$/, ''))), []);
+    const names = new Set(filesMatching('*').map((file) => file.split('/').at(-1)));
     const bare = spans.filter(({span}) => /^\w+\.(cpp|h|mjs|js|html|css|abi|map)$/.test(span));
     assert.ok(bare.length > 20);
     // A program of the reader's own, and a script that Doxygen puts into the reference.
@@ -50,10 +50,12 @@ test('each of our files and folders that is named is there', () => {
 });
 
 test('each path of the appliance that is named is one of the sources or of the packages', () => {
-    const installed = filesMatching('debian/*.dirs').flatMap((file) => read(file).split('\n')).map((folder) => `/${folder}`);
+    const installed = filesMatching('debian/*.dirs').flatMap((file) => read(file).split('\n'))
+        .map((folder) => `/${folder}`);
     const known = new Set([...appliancePaths(), ...installed].flatMap((file) =>
         file.split('/').map((_, end, parts) => parts.slice(0, end + 1).join('/'))));
-    const files = [...documents, ...filesMatching('docs/man/*', 'debian/*.README.Debian', 'sso/sso.h', 'platform/platform.h')];
+    const files = [...documents, ...filesMatching('docs/man/*', 'debian/*.README.Debian'), 'sso/sso.h',
+        'platform/platform.h'];
     const named = files.flatMap((file) => [...read(file).matchAll(/\/usr\/tavo\b[\w./-]*/g)].map(([name]) =>
         ({file, name: name.replace(/[./]+$/, '')})));
     assert.ok(named.length > 60);
@@ -65,7 +67,8 @@ test('each list of packages has all of them, and none that is not built', () => 
     const real = [...read('debian/control').matchAll(/^Package: (.*)$/gm)].map(([, name]) => name);
     assert.ok(real.length > 5);
     for (const document of ['docs/quick-start.md', 'docs/operations.md']) {
-        const told = tableRows(document).filter(({header}) => header[0] === 'package').flatMap(({cells}) => cells[0].split(', '));
+        const told = tableRows(document).filter(({header}) => header[0] === 'package')
+            .flatMap(({cells}) => cells[0].split(', '));
         assert.deepEqual(differences({told, real}), NO_DIFFERENCES);
     }
 });
@@ -73,7 +76,8 @@ test('each list of packages has all of them, and none that is not built', () => 
 test('each option and each preset of CMake that is named is one', () => {
     const cmake = filesMatching('*CMakeLists.txt', '*.cmake').map(read).join('\n');
     const options = cmake.match(/(?<=^ *option\()\w+|(?<=^ *set\()\w+(?= \S* CACHE )/gm);
-    const presets = JSON.parse(read('CMakePresets.json')).configurePresets.filter(({hidden}) => !hidden).map(({name}) => name);
+    const presets = JSON.parse(read('CMakePresets.json')).configurePresets.filter(({hidden}) => !hidden)
+        .map(({name}) => name);
     const named = (pattern) => documents.flatMap((document) =>
         [...read(document).matchAll(pattern)].map(([name]) => ({document, name})));
     const namedOptions = named(/\bTAVOSSO_\w+/g);
@@ -83,5 +87,17 @@ test('each option and each preset of CMake that is named is one', () => {
     assert.deepEqual(namedPresets.filter(({name}) => !presets.includes(name)), []);
     const [, others] = /^other presets ([^]*?)^$/m.exec(read('README.md'));
     const told = codeSpans(others).filter((span) => /^[a-z]+$/.test(span));
-    assert.deepEqual(differences({told: [...new Set(told)], real: presets.filter((name) => name !== 'release')}), NO_DIFFERENCES);
+    const real = presets.filter((name) => name !== 'release');
+    assert.deepEqual(differences({told: [...new Set(told)], real}), NO_DIFFERENCES);
+});
+
+test('the version is the same wherever it is given', () => {
+    const [, version] = /^project\(tavosso VERSION (\S+)/m.exec(read('CMakeLists.txt'));
+    const [, packaged] = /^tavosso \((.*)-\d+\)/.exec(read('debian/changelog'));
+    assert.equal(packaged, version);
+    const chapters = documents.filter((document) => document.startsWith('docs/') && document !== 'docs/release.md');
+    const named = ['README.md', ...chapters, ...filesMatching('docs/man/*')].flatMap((file) =>
+        [...read(file).matchAll(/\blibtavosso\.so\.(\d+)/g)].map(([, major]) => ({file, major})));
+    assert.ok(named.length > 5);
+    assert.deepEqual(named.filter(({major}) => major !== version.split('.')[0]), []);
 });
