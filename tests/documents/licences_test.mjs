@@ -1,15 +1,10 @@
 // The licences of all that the project's own commands install are told, and of nothing else.
 import assert from 'node:assert/strict';
-import {execFileSync} from 'node:child_process';
-import {readFileSync} from 'node:fs';
-import path from 'node:path';
 import {test} from 'node:test';
 
-import {codeSpans, PROJECT, tableRows} from './documents.mjs';
+import {codeSpans, filesMatching, read, tableRows} from './documents.mjs';
 
 const DOCUMENT = 'docs/licences.md';
-
-const read = (file) => readFileSync(path.join(PROJECT, file), 'utf8');
 
 /** Of Debian: what stands in a script's arrays of packages, and what its function for a part's packages prints. */
 function debianPackages(script) {
@@ -21,8 +16,7 @@ function debianPackages(script) {
 
 /** Of npm: what the project asks for; what these need is told with them. */
 function npmPackages() {
-    const files = execFileSync('git', ['ls-files', '*package.json'], {cwd: PROJECT, encoding: 'utf8'}).trim().split('\n');
-    return files.flatMap((file) => Object.keys(JSON.parse(read(file)).dependencies ?? {}));
+    return filesMatching('*package.json').flatMap((file) => Object.keys(JSON.parse(read(file)).dependencies ?? {}));
 }
 
 test('each package that is installed stands in the table with its licence, and no other', () => {
