@@ -36,6 +36,11 @@ static_assert(
                           SSO::sso_exception, SSO::sso_err_resp, SSO::sso_not_implemented, SSO::sso_op_failed,
                           JWT::jwt_exception, JWT::jwt_not_support, JWT::jwt_verify_failed>);
 
+// Programs keep clients by value. A copy is made in their own code: no exported name would be lost with it.
+template <typename... Types>
+constexpr bool kAreCopied = ((std::is_copy_constructible_v<Types> && std::is_copy_assignable_v<Types>)&&...);
+static_assert(kAreCopied<SSO::SSOClient, SSO::AzureSSOClient, SSO::WebSphereSSOClient, SSO::SSOProfile, JWT::Jwt>);
+
 /// An exception with nothing of its own, caught as `Base` too, and made of a text that has to be named as one.
 template <typename Exception, typename Base>
 constexpr bool kIsCaughtAs =
