@@ -135,7 +135,8 @@ class KeyCheck {
             Finding(found + ": too long", "get one of at most " + std::to_string(kLongestWebSphereSecret) +
                                               " bytes from the provider: with a longer one no token can be verified");
         } else if (isKey && value_.size() < kShortestWebSphereKey) {
-            report_.Note(id_, name_, found + ": whoever has a token can find so short a key by trying, and sign tokens",
+            report_.Note(id_, name_,
+                         found + ": the shorter a key, the easier it is found by trying, for whoever has a token",
                          "get one of at least " + std::to_string(kShortestWebSphereKey) + " bytes from the provider");
         } else {
             report_.Good(id_, name_, found);
