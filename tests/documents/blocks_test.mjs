@@ -23,6 +23,7 @@ test('nothing is written in a form that no test reads', () => {
     const unread = {
         'a block that is indented, or fenced otherwise': (text) => /^(\t| {4})|```|~~~/.test(text),
         'a span in backticks that does not end in its line': (text) => text.split('`').length % 2 === 0,
+        'quotation marks of other forms': (text) => /[“”„«»]/.test(text),
         'HTML, but for line breaks in tables and marks for programs': (text) => !MARKS.includes(text) &&
             /<(?!br>)[!?/a-z]/i.test(codeSpans(text).reduce((rest, span) => rest.replace(`\`${span}\``, ''), text)),
     };

@@ -10,8 +10,9 @@ const ELSEWHERE = new Map([
 
 // What a span of text begins with that is a command: a prompt, the first line of a script, a name. Or what follows any
 // command's name: an option. Of other single words those with a hyphen: no key has one. A file's name alone is none.
-const COMMAND = new RegExp('^(?:[$#] |#!|\\./|bench/run |(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|git|journalctl|ldd|' +
-    'lintian|ls|lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|tavosso-doctor|ulimit|xargs)(?: |$)|' +
+const COMMAND = new RegExp('^(?:[$#] |#!|\\./|bench/run |(?:apt|apt-get|cmake|ctest|dpkg|dpkg-buildpackage|g\\+\\+|' +
+    'git|journalctl|ldd|lintian|ls|lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|' +
+    'tavosso-doctor|ulimit|xargs)(?: |$)|' +
     'tests/\\w+/\\w+ |tools/[\\w-]+ |[a-z]+(?:-[a-z]+)+$|[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
 
 /** Commands within the text that cannot be run to the letter, and what is run for them. */
@@ -19,16 +20,19 @@ const FILLED_IN = new Map([
     ['./demo serve', 'until_it_waits ./demo serve'],
     ['./demo serve websphere', 'until_it_waits ./demo serve websphere'],
     ['cmake --preset release -DTAVOSSO_PLATFORM_LIBRARIES="/path/to/one.so;/path/to/other.so"',
-        'cmake --preset release -B build/appliance -DTAVOSSO_PLATFORM_LIBRARIES=/usr/local/lib/libtavoplatform.so.0 &&' +
-        ' cmake --build build/appliance --target tavosso'],
+        'cmake --preset release -B build/appliance -DTAVOSSO_PLATFORM_LIBRARIES=/usr/local/lib/libtavoplatform.so.0' +
+        ' && cmake --build build/appliance --target tavosso'],
     ['g++ -std=c++17 sso.cpp -o sso.cgi $(pkg-config --cflags --libs tavosso)',
         'cd build/first && g++ -std=c++17 sso.cpp -o sso.cgi $(pkg-config --cflags --libs tavosso)'],
     ['g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)',
         'mkdir build/guide && tests/consumer/programs build/guide && cd build/guide/guide &&' +
         ' g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)'],
-    ['sudo apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb ./tavosso-frontend_*.deb',
+    [
+        'sudo apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb' +
+        ' ./tavosso-frontend_*.deb',
         'cd .. && apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb' +
-        ' ./tavosso-frontend_*.deb'],
+        ' ./tavosso-frontend_*.deb',
+    ],
     ['sudo lighty-disable-mod tavosso-frontend',
         'lighty-enable-mod tavosso-frontend && lighty-disable-mod tavosso-frontend'],
     ['sudo lighty-disable-mod ssl', 'lighty-enable-mod ssl && lighty-disable-mod ssl'],
@@ -36,7 +40,8 @@ const FILLED_IN = new Map([
     ['#!/bin/sh\nexec timeout 60 "$DOCUMENT_ROOT$SCRIPT_NAME"',
         'export DOCUMENT_ROOT=/usr SCRIPT_NAME=/bin/true && exec timeout 60 "$DOCUMENT_ROOT$SCRIPT_NAME"'],
     ['c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)',
-        'cd build/first && cp sso.cpp program.cpp && c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)'],
+        'cd build/first && cp sso.cpp program.cpp &&' +
+        ' c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)'],
     ['clang-format -i FILE', 'clang-format -i sso/sso.cpp'],
     ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
     ['man tavosso-doctor', 'man ./docs/man/tavosso-doctor.8'],
@@ -88,7 +93,8 @@ const shellBlocks = documents.flatMap(blocks).filter(({language}) => language ==
 const isRun = ({text}) => !ELSEWHERE.has(text.trim());
 
 // What ./check alone runs, and the kinds of tests among it: each can be named. What takes longer is in the table above.
-const partsOfCheck = [...read('check').matchAll(/^(?:whole|kinds)=\((.*)\)$/gm)].flatMap(([, parts]) => parts.split(' '));
+const partsOfCheck = [...read('check').matchAll(/^(?:whole|kinds)=\((.*)\)$/gm)]
+    .flatMap(([, parts]) => parts.split(' '));
 
 /** Is this `./check` with parts? Those commands are run by one of them, and the others take as long. */
 function isPartOfCheck({text}) {
@@ -102,37 +108,46 @@ const quotedIn = (document) => [
     ...blocks(document).filter(({language}) => language === 'text'),
 ].sort((a, b) => a.line - b.line);
 
-/** What a manual page displays or quotes: a line, some words, a literal block. */
-function displayedIn(page) {
-    const source = read(page);
-    return [...source.matchAll(/^\.(?:D[1l]|Ic|Li|Ql) (.*?)(?: [.,:;)])*$|^\.Bd .*\n([^]*?)\n\.Ed$/gm)]
-        .map(({index, 1: words, 2: block}) => ({
-            document: page,
-            line: source.slice(0, index).split('\n').length,
-            text: unescaped(words ?? block),
-        }));
+/** What a manual page displays or quotes in a line, in any place of it: up to the next macro, or closing signs. */
+function quotedInPage(page) {
+    const quoted = /(?<=^\.(?:.* )?)(?:D[1l]|Ic|Li|Ql) (.*?)(?= [A-Z][a-z] |(?: [.,:;)])*$)/g;
+    return read(page).split('\n').flatMap((macros, index) => [...macros.matchAll(quoted)].map(([, text]) =>
+        ({document: page, line: index + 1, text: unescaped(text.replaceAll('"', ''))})));
 }
 
-/** What stands by itself in the text of a package: whatever is indented as no list is, and commands among the rest. */
-function indentedIn(file) {
-    return read(file).split('\n').map((text, index) => ({document: file, line: index + 1, text}))
-        .filter(({text}) => /^ {8}/.test(text) || (text.startsWith('    ') && isCommand(text.trim())))
-        .map((line) => ({...line, text: line.text.trim()}));
+/** The literal blocks of a manual page. */
+function blocksOfPage(page) {
+    const source = read(page);
+    return [...source.matchAll(/^\.Bd .*\n([^]*?)\n\.Ed$/gm)].map(({index, 1: block}) =>
+        ({document: page, line: source.slice(0, index).split('\n').length, text: unescaped(block)}));
 }
+
+/** What stands by itself in the text of a package: whatever is indented, in a list more than its own text is. */
+function indentedIn(file) {
+    let inList = false;
+    return read(file).split('\n').flatMap((text, index) => {
+        inList = /^\S/.test(text) ? /^(\d+\.|[-*]) /.test(text) : inList;
+        const standsOut = inList ? /^ {5}/ : /^\s+\S/;
+        return standsOut.test(text) ? [{document: file, line: index + 1, text: text.trim()}] : [];
+    });
+}
+
+/** What manual pages and packages show as it is to be typed, or as it stands in a file or in a log. */
+export const displayed = [
+    ...filesMatching('docs/man/*').flatMap(quotedInPage),
+    ...filesMatching('debian/*.README.Debian').flatMap(indentedIn),
+];
 
 // The table of what is installed has packages in backticks, many of which are called as their program.
 const namesPackage = ({document, text}) => document === 'docs/licences.md' && !text.includes(' ');
 const withoutPrompt = (text) => text.replace(/^# /gm, 'sudo ').replace(/^\$ /gm, '');
 
-// The guide for administrators removes what was installed, which the others use.
-const removes = ({document}) => document === 'docs/operations.md';
+// What is for administrators runs as root, and last: it removes what was installed, which the others use.
+const administers = ({document}) => document === 'docs/operations.md' || document.startsWith('debian/');
 const spans = [
-    ...[...documents.flatMap(quotedIn), ...filesMatching('docs/man/*').flatMap(displayedIn)]
-        .sort((a, b) => removes(a) - removes(b))
-        .filter((span) => isCommand(span.text) && !namesPackage(span))
-        .map((span) => ({...span, text: withoutPrompt(span.text)})),
-    ...filesMatching('debian/*.README.Debian').flatMap(indentedIn),
-];
+    ...documents.flatMap(quotedIn), ...filesMatching('docs/man/*').flatMap(blocksOfPage), ...displayed,
+].sort((a, b) => administers(a) - administers(b)).filter((span) => isCommand(span.text) && !namesPackage(span))
+    .map((span) => ({...span, text: withoutPrompt(span.text)}));
 
 const standsInBlock = ({text}) => shellBlocks.some((block) => block.text.split('\n').includes(text));
 const withinText = spans.filter(({text}, index) => spans.findIndex((span) => span.text === text) === index)
@@ -170,9 +185,9 @@ const place = ({document, line}) => `${document}:${line}`;
 export function script() {
     const quoted = (text) => `'${text.replaceAll('\'', '\'\\\'\'')}'`;
     const line = (command, output) => {
-        const {document, text} = command;
-        const how = document === 'docs/operations.md' || document.startsWith('debian/') ? 'administer' : 'run';
-        return `${[how, ...[place(command), FILLED_IN.get(text) ?? text, output].map(quoted)].join(' ')}\n`;
+        const how = administers(command) ? 'administer' : 'run';
+        const text = FILLED_IN.get(command.text) ?? command.text;
+        return `${[how, ...[place(command), text, output].map(quoted)].join(' ')}\n`;
     };
     return [
         ...shellBlocks.filter(isRun).map((block) => line(block, expectedOutput(block))),

@@ -77,6 +77,13 @@ export function codeSpans(text) {
     return [...text.matchAll(/`([^`]+)`/g)].map(([, span]) => span);
 }
 
+/** What stands in double quotation marks in a document's prose: a line may end within them, a paragraph may not. */
+export function quotations(document) {
+    const prose = proseLines(document).map(({text}) => text.replace(/`[^`]*`/g, '``')).join('\n');
+    return [...prose.matchAll(/"((?:[^"\n]|\n(?!\n))*)"/g)].map(({index, 1: text}) =>
+        ({document, line: prose.slice(0, index).split('\n').length, text: text.replace(/\s+/g, ' ')}));
+}
+
 /** The rows of a document's tables, each with the heading that it stands under and its table's header. */
 export function tableRows(document) {
     const rows = [];
