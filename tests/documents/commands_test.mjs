@@ -15,7 +15,8 @@ test('the help of ./check tells each of its parts', () => {
     const help = execFileSync('./check', ['--help'], {cwd: PROJECT, encoding: 'utf8'});
     const [, kinds] = /a part by itself: ([^]*?)\n {2}[a-z]/.exec(help);
     const told = [...help.matchAll(/^ {2}([a-z]+) /gm)].map(([, part]) => part).concat(kinds.split(/,\s+|\s+and\s+/));
-    const real = [...read('check').matchAll(/^(?:whole|kinds|longer)=\((.*)\)$/gm)].flatMap(([, parts]) => parts.split(' '));
+    const real = [...read('check').matchAll(/^(?:whole|kinds|longer)=\((.*)\)$/gm)]
+        .flatMap(([, parts]) => parts.split(' '));
     assert.ok(real.length > 15);
     assert.deepEqual(differences({told, real}), NO_DIFFERENCES);
 });

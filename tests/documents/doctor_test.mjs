@@ -27,7 +27,7 @@ test('each check is told, once, and none that is not made', () => {
     console.log(`${told.length} checks`);
 });
 
-test('each command is told in its chapter and in the manual page and can be completed, and none that is not one', () => {
+test('each command is told in its chapter and in the manual page and is completed, and none that is not one', () => {
     const real = [...sources.matchAll(/\badd_subcommand\("([a-z-]+)"/g)].map(([, command]) => command);
     assert.ok(real.length > 2, `${real.length} commands`);
     const manual = read('docs/man/tavosso-doctor.8');
@@ -60,9 +60,10 @@ test('each option is told in the manual page and can be completed, and none that
 });
 
 test('bash completes commands, options and files', () => {
-    const script = 'source doctor/completion.bash; COMP_WORDS=(tavosso-doctor "$@"); COMP_CWORD=$#; _tavosso_doctor 2>/dev/null;' +
-        ' echo "${COMPREPLY[*]}"';
-    const complete = (...words) => execFileSync('bash', ['-c', script, 'bash', ...words], {cwd: PROJECT, encoding: 'utf8'}).trim();
+    const script = 'source doctor/completion.bash; COMP_WORDS=(tavosso-doctor "$@"); COMP_CWORD=$#;' +
+        ' _tavosso_doctor 2>/dev/null; echo "${COMPREPLY[*]}"';
+    const complete = (...words) =>
+        execFileSync('bash', ['-c', script, 'bash', ...words], {cwd: PROJECT, encoding: 'utf8'}).trim();
     assert.equal(complete('to'), 'token');
     assert.equal(complete('--js'), '--json');
     assert.equal(complete('token', '--f'), '--fetch');

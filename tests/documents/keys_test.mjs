@@ -2,12 +2,15 @@
 import assert from 'node:assert/strict';
 import {test} from 'node:test';
 
-import {blocks, codeSpans, differences, documents, filesMatching, NO_DIFFERENCES, read, tableRows} from './documents.mjs';
+import {
+    blocks, codeSpans, differences, documents, filesMatching, NO_DIFFERENCES, read, tableRows,
+} from './documents.mjs';
 import {configurationKeys, thrownTexts} from './sources.mjs';
 
 const keys = configurationKeys();
 const rows = tableRows('docs/configuration.md').filter(({header}) => header[0] === 'key');
-const troubles = tableRows('docs/configuration.md').filter(({header}) => ['where', 'what is wrong'].includes(header[0]));
+const troubles = tableRows('docs/configuration.md')
+    .filter(({header}) => ['where', 'what is wrong'].includes(header[0]));
 const examples = blocks('docs/configuration.md').filter(({language}) => language === 'json')
     .map(({text}) => Object.keys(JSON.parse(text)));
 
@@ -19,7 +22,8 @@ for (const [file, members] of Object.entries(keys)) {
         const told = rows.filter(({heading}) => heading === file).map(({cells: [key, type, byDefault]}) =>
             ({key: codeSpans(key)[0], type, byDefault: codeSpans(byDefault)[0] ?? byDefault}));
         assert.deepEqual(told, members);
-        assert.ok(examples.some((example) => example.join() === real.join()), 'no example holds all of them in this order');
+        assert.ok(examples.some((example) => example.join() === real.join()),
+            'no example holds all of them in this order');
     });
 
     test(`what happens when a key of ${file} is wrong is told of each`, () => {

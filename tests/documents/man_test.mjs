@@ -38,7 +38,8 @@ test(`mandoc has nothing to say of ${files.length} pages`, () => {
 
 test('each page that another or a document refers to is there', () => {
     const known = [...files.map((file) => path.basename(file).replace(/\.(\d)$/, ' $1')), ...ELSEWHERE];
-    const plain = [...documents, ...filesMatching('debian/*.README.Debian')].map((file) => ({file, source: read(file)}));
+    const plain = [...documents, ...filesMatching('debian/*.README.Debian')]
+        .map((file) => ({file, source: read(file)}));
     const named = (pattern, sources) => sources.flatMap(({file, source}) =>
         [...source.matchAll(pattern)].map(([, name, section]) => ({file, page: `${name} ${section}`})));
     const referred = [...named(/^\.Xr (\S+) (\d)/gm, pages), ...named(/([\w.:-]+)\((\d)\)/g, plain)];
@@ -150,11 +151,12 @@ test('each example that is a program compiles', () => {
         for (const header of ['sso/sso.h', 'jwt/jwt.h']) {
             symlinkSync(path.join(PROJECT, header), path.join(folder, 'tavosso', path.basename(header)));
         }
-        const flags = execFileSync('pkg-config', ['--cflags', 'jsoncpp'], {encoding: 'utf8'}).trim().split(/\s+/);
+        const jsoncpp = execFileSync('pkg-config', ['--cflags', 'jsoncpp'], {encoding: 'utf8'}).trim().split(/\s+/);
+        const flags = ['-std=c++17', '-Wall', '-Wextra', '-Werror', '-fsyntax-only', ...jsoncpp, `-I${folder}`];
         programs.forEach((program, index) => {
             const file = path.join(folder, `example${index}.cpp`);
             writeFileSync(file, program);
-            execFileSync('g++', ['-std=c++17', '-Wall', '-Wextra', '-Werror', '-fsyntax-only', ...flags, `-I${folder}`, file]);
+            execFileSync('g++', [...flags, file]);
         });
     } finally {
         rmSync(folder, {recursive: true});
