@@ -1,12 +1,6 @@
 // The commands that the documents tell their readers to run, and how a test runs each.
+import {ELSEWHERE, FILLED_IN, NOT_HERE} from './command_tables.mjs';
 import {asPattern, blocks, codeSpans, documents, filesMatching, proseLines, read, unescaped} from './documents.mjs';
-
-/** Commands of blocks that are not run here, and why. */
-const ELSEWHERE = new Map([
-    ['./check', 'is what runs this'],
-    ['bench/run', 'takes a quarter of an hour; ./check bench runs it for a minute'],
-    ['tests/package/machine --clone /home/ada/tavosso --user ada ./check style', 'is how these commands are run'],
-]);
 
 // What a span of text begins with that is a command: a prompt, the first line of a script, a name. Or what follows any
 // command's name: an option. Of other single words those with a hyphen: no key has one. A file's name alone is none.
@@ -14,71 +8,6 @@ const COMMAND = new RegExp('^(?:[$#] |#!|\\./|bench/run |(?:apt|apt-get|cmake|ct
     'git|journalctl|ldd|lintian|ls|lighty-enable-mod|man|node|openssl|pre-commit|python3|readelf|sudo|systemctl|' +
     'tavosso-doctor|ulimit|xargs)(?: |$)|' +
     'tests/\\w+/\\w+ |tools/[\\w-]+ |[a-z]+(?:-[a-z]+)+$|[a-z][\\w.+-]*(?: \\S+)* --?[a-z])');
-
-/** Commands within the text that cannot be run to the letter, and what is run for them. */
-const FILLED_IN = new Map([
-    ['./demo serve', 'until_it_waits ./demo serve'],
-    ['./demo serve websphere', 'until_it_waits ./demo serve websphere'],
-    ['cmake --preset release -DTAVOSSO_PLATFORM_LIBRARIES="/path/to/one.so;/path/to/other.so"',
-        'cmake --preset release -B build/appliance -DTAVOSSO_PLATFORM_LIBRARIES=/usr/local/lib/libtavoplatform.so.0' +
-        ' && cmake --build build/appliance --target tavosso'],
-    ['g++ -std=c++17 sso.cpp -o sso.cgi $(pkg-config --cflags --libs tavosso)',
-        'cd build/first && g++ -std=c++17 sso.cpp -o sso.cgi $(pkg-config --cflags --libs tavosso)'],
-    ['g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)',
-        'mkdir build/guide && tests/consumer/programs build/guide && cd build/guide/guide &&' +
-        ' g++ -std=c++17 login.cpp -o login.cgi $(pkg-config --cflags --libs tavosso)'],
-    [
-        'sudo apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb' +
-        ' ./tavosso-frontend_*.deb',
-        'cd .. && apt-get install ./libtavosso6_*.deb ./libtavoplatform0_*.deb ./libtavosso-common_*.deb' +
-        ' ./tavosso-frontend_*.deb',
-    ],
-    ['sudo lighty-disable-mod tavosso-frontend',
-        'lighty-enable-mod tavosso-frontend && lighty-disable-mod tavosso-frontend'],
-    ['sudo lighty-disable-mod ssl', 'lighty-enable-mod ssl && lighty-disable-mod ssl'],
-    ['update-ca-certificates', 'sudo update-ca-certificates'],
-    ['#!/bin/sh\nexec timeout 60 "$DOCUMENT_ROOT$SCRIPT_NAME"',
-        'export DOCUMENT_ROOT=/usr SCRIPT_NAME=/bin/true && exec timeout 60 "$DOCUMENT_ROOT$SCRIPT_NAME"'],
-    ['c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)',
-        'cd build/first && cp sso.cpp program.cpp &&' +
-        ' c++ -std=c++17 program.cpp $(pkg-config --cflags --libs tavosso)'],
-    ['clang-format -i FILE', 'clang-format -i sso/sso.cpp'],
-    ['git shortlog -se', 'git shortlog -se HEAD'], // it would read from what is no terminal
-    ['man tavosso-doctor', 'man ./docs/man/tavosso-doctor.8'],
-    ['tavosso-doctor', 'tavosso-doctor || [ $? = 1 ]'], // no profile is set up there
-    ['tavosso-doctor explain TEXT', 'tavosso-doctor explain "profile not support."'],
-    ['sudo tavosso-doctor --domain corp.example.net', 'sudo tavosso-doctor --domain corp.example.net || [ $? = 1 ]'],
-    ['sudo tavosso-doctor --user www-data', 'sudo tavosso-doctor --user www-data || [ $? = 1 ]'],
-    ['ls -l FILE', 'ls -l build/first/profile.conf'],
-    ['python3 -m json.tool FILE', 'python3 -m json.tool build/first/profile.conf'],
-]);
-
-/** Commands within the text that are not run here, and why. */
-const NOT_HERE = new Map([
-    ['./check bench', 'on request: it builds the benchmarks and what they compare with'],
-    ['./check coverage', 'on request: it takes long'],
-    ['./check fortify', 'the same'],
-    ['./check fuzz', 'the same'],
-    ['./check memcheck', 'the same'],
-    ['./check soak', 'the same'],
-    ['cmake --install', 'names the command of the README'],
-    ['ctest', 'names a program'],
-    ['git commit', 'by hand'],
-    ['git grep', 'names a command'],
-    ['git tag -a vVERSION', 'by hand'],
-    ['lintian', 'names a program: ./check package runs it'],
-    ['man', 'names a program'],
-    ['node tests/mutation/run.mjs', 'by hand: an hour'],
-    ['openssl s_server -www', 'tells how a figure was measured'],
-    ['pre-commit', 'names a program: ./check style runs it'],
-    ['sudo lighty-enable-mod ssl tavosso-frontend', 'needs the package: tests/package reads it there and runs it'],
-    ['sudo systemctl restart lighttpd', 'needs systemd to run: tests/package restarts it by its script'],
-    ['sudo tavosso-doctor login', 'asks a person: tests/doctor answers it'],
-    ['tavosso-doctor login', 'the same'],
-    ['tavosso-doctor token FILE', 'needs a token: tests/doctor has them'],
-    ['tests/fuzz/run --hours 1', 'by hand: an hour'],
-    ['tests/fuzz/run --report', 'by hand, after that'],
-]);
 
 export function isCommand(text) {
     return COMMAND.test(text);
@@ -92,7 +21,7 @@ const shellBlocks = documents.flatMap(blocks).filter(({language}) => language ==
     .sort((a, b) => installsByItself(a) - installsByItself(b));
 const isRun = ({text}) => !ELSEWHERE.has(text.trim());
 
-// What ./check alone runs, and the kinds of tests among it: each can be named. What takes longer is in the table above.
+// What ./check alone runs, and the kinds of tests among it: each can be named. What takes longer is in a table.
 const partsOfCheck = [...read('check').matchAll(/^(?:whole|kinds)=\((.*)\)$/gm)]
     .flatMap(([, parts]) => parts.split(' '));
 
@@ -153,7 +82,7 @@ const standsInBlock = ({text}) => shellBlocks.some((block) => block.text.split('
 const withinText = spans.filter(({text}, index) => spans.findIndex((span) => span.text === text) === index)
     .filter((span) => !standsInBlock(span) && !NOT_HERE.has(span.text) && !isPartOfCheck(span));
 
-/** What stands in the tables above, and in no document any more. */
+/** What stands in the tables, and in no document any more. */
 export const needless = [
     ...[...FILLED_IN.keys(), ...NOT_HERE.keys()].filter((command) => !spans.some(({text}) => text === command)),
     ...[...ELSEWHERE.keys()].filter((command) => !shellBlocks.some(({text}) => text.trim() === command)),
