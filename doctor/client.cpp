@@ -1,11 +1,24 @@
 #include "doctor/client.h"
 
+#include <sso/supported_profiles.h>
+
 #include "doctor/watch.h"
 #include "frontend/text.h"
 
 namespace Doctor {
 
-std::string NameOf(Profile profile) { return profile == Profile::kAzure ? "azure" : "websphere"; }
+std::string NameOf(Profile profile) {
+    return profile == Profile::kAzure ? TAVO::SSO::kAzureProfile : TAVO::SSO::kWebSphereProfile;
+}
+
+Profile ProfileNamed(const std::string &name) {
+    for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
+        if (name == NameOf(profile)) {
+            return profile;
+        }
+    }
+    throw TAVO::SSO::sso_exception("profile not support.");
+}
 
 std::vector<std::string> AlgorithmsOf(Profile profile) {
     return profile == Profile::kAzure ? std::vector<std::string>{"RS256", "RS384", "RS512"}

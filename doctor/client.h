@@ -17,6 +17,9 @@ enum class Profile { kAzure, kWebSphere };
 
 std::string NameOf(Profile profile);
 
+/// Throws sso_exception "profile not support." for a profile that the doctor cannot check.
+Profile ProfileNamed(const std::string &name);
+
 /// The signatures that the profile's client can verify.
 std::vector<std::string> AlgorithmsOf(Profile profile);
 

@@ -61,7 +61,7 @@ std::optional<Profile> CheckProfile(Report &report) {
     }
     const std::string name = TAVO::SSO::SSOProfile().GetSSOProfile();
     report.Good("profile.sso_profile", kName, "is the text " + Quoted(name));
-    return name == NameOf(Profile::kAzure) ? Profile::kAzure : Profile::kWebSphere;
+    return ProfileNamed(name);
 }
 
 }  // namespace Doctor

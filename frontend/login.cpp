@@ -1,4 +1,6 @@
 // Starts a login: sends the browser to the provider.
+#include <sso/supported_profiles.h>
+
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
 #include "frontend/pending_login.h"
@@ -16,7 +18,7 @@ void GoToProvider(Frontend::Answer &answer) {
     }
     // Not `RedirectAuthEndpoint`, which writes the address at once: the state in it is to be remembered.
     const auto makeAddress = [&](const Json::Value &state) {
-        return Frontend::WithClient(profile, [&](auto &client) { return client.GetAccessTokenReqURI(state); });
+        return TAVO::SSO::WithClient(profile, [&](auto &client) { return client.GetAccessTokenReqURI(state); });
     };
     answer.Redirect(Frontend::StartLogin(answer, makeAddress));
 }

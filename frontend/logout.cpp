@@ -1,5 +1,6 @@
 // Ends the session, here and, where the provider has a page for it, there.
 #include <sso/sso.h>
+#include <sso/supported_profiles.h>
 
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
@@ -19,7 +20,7 @@ std::string StartPageAddress(const std::string &redirectURI) {
 
 std::string ProviderLogout(const Frontend::Session &session) {
     TAVO::SSO::AzureSSOClient client;
-    if (session.profile != "azure" || client.GetLogoutEndpoint().empty()) {
+    if (session.profile != TAVO::SSO::kAzureProfile || client.GetLogoutEndpoint().empty()) {
         return "";
     }
     return TAVO::SSO::GetAzureSSOLogoutURL(StartPageAddress(client.GetRedirectURI()));

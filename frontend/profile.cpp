@@ -1,17 +1,17 @@
 #include "frontend/profile.h"
 
+#include <sso/supported_profiles.h>
+
 namespace Frontend {
 
 namespace {
-
-bool IsSupported(const std::string &profile) { return profile == "azure" || profile == "websphere"; }
 
 // Without any of these a login is certain to fail, some only after the user has typed a password. The tenant, of which
 // the same is true, is not told by the client.
 bool HasAllSettings(const std::string &profile, TAVO::SSO::SSOClient &client) {
     return !client.GetClientID().empty() && !client.GetClientSecret().empty() && !client.GetRedirectURI().empty() &&
            !client.GetAuthEndpoint().empty() && !client.GetTokenEndpoint().empty() &&
-           (profile != "azure" || !client.GetWellknownEndpoint().empty());
+           (profile != TAVO::SSO::kAzureProfile || !client.GetWellknownEndpoint().empty());
 }
 
 }  // namespace
@@ -21,9 +21,8 @@ SetUp HowFarSetUp() {
     if (!profile.SSOIsEnable()) {
         return SetUp::kOff;
     }
-    const std::string name = profile.GetSSOProfile();
-    const bool isComplete = IsSupported(name) && HasAllSettings(name, *profile.GetSSOClient());
-    return isComplete ? SetUp::kComplete : SetUp::kIncomplete;
+    // The client of an unsupported profile has no settings.
+    return HasAllSettings(profile.GetSSOProfile(), *profile.GetSSOClient()) ? SetUp::kComplete : SetUp::kIncomplete;
 }
 
 std::string ProfileInForce() {
@@ -32,7 +31,7 @@ std::string ProfileInForce() {
         throw TAVO::SSO::sso_op_failed("sso does not enable.");
     }
     std::string name = profile.GetSSOProfile();
-    if (!IsSupported(name)) {
+    if (!TAVO::SSO::IsSupported(name)) {
         throw TAVO::SSO::sso_exception("profile not support.");
     }
     return name;

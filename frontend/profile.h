@@ -17,17 +17,6 @@ SetUp HowFarSetUp();
 /// read, "profile not support." for one that is missing or unknown.
 std::string ProfileInForce();
 
-/// Runs `use` on a fresh client of the profile.
-template <typename Use>
-auto WithClient(const std::string &profile, Use use) {
-    if (profile == "azure") {
-        TAVO::SSO::AzureSSOClient client;
-        return use(client);
-    }
-    TAVO::SSO::WebSphereSSOClient client;
-    return use(client);
-}
-
 }  // namespace Frontend
 
 #endif

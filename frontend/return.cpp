@@ -1,5 +1,6 @@
 // The redirect URI: the browser is back from the provider, with a code or with an error.
 #include <sso/sso.h>
+#include <sso/supported_profiles.h>
 #include <syslog.h>
 
 #include "frontend/cgi.h"
@@ -49,7 +50,7 @@ void CompleteLogin(Frontend::Answer &answer) {
     const std::string code = RequireOnly(parameters, "code");
     const std::string profile = Frontend::ProfileInForce();
     const std::string user =
-        Frontend::WithClient(profile, [&](TAVO::SSO::SSOClient &client) { return SignIn(client, code, state); });
+        TAVO::SSO::WithClient(profile, [&](TAVO::SSO::SSOClient &client) { return SignIn(client, code, state); });
     Frontend::StartSession(answer, cookies, {user, profile});
     syslog(LOG_AUTH | LOG_INFO, "frontend: signed in: %s", Frontend::OneLine(user).c_str());
     answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, stateText, ""));

@@ -8,10 +8,6 @@ constexpr char kProfileFile[] = "/usr/tavo/etc/ssoclient/profile.conf";
 constexpr char kProfileEnable[] = "sso_enable";
 constexpr char kProfileName[] = "sso_profile";
 
-constexpr char kAzureProfile[] = "azure";
-constexpr char kWebSphereProfile[] = "websphere";
-constexpr const char *kSupportedProfiles[] = {kAzureProfile, kWebSphereProfile};
-
 // Request parameters: RFC 6749, appendix A; OpenID Connect Core 1.0, section 3.1.2.1.
 constexpr char kClientID[] = "client_id";
 constexpr char kClientSecret[] = "client_secret";
@@ -25,10 +21,10 @@ constexpr char kState[] = "state";
 
 constexpr char kAuthorizationCode[] = "authorization_code";
 
-/// The member of the caller's state object that says where the user came from.
+/// The member of the caller's state object with the page to return to.
 constexpr char kOrigin[] = "origin";
 
-// Token response: RFC 6749, section 5.1, and what Azure adds. Only the ID token is looked at.
+// Token response: RFC 6749, section 5.1, and what Azure adds. Only "id_token" is read.
 constexpr char kTokenType[] = "token_type";
 constexpr char kExpiresIn[] = "expires_in";
 constexpr char kExtExpiresIn[] = "ext_expires_in";
@@ -37,7 +33,7 @@ constexpr char kAccessToken[] = "access_token";
 constexpr char kRefreshToken[] = "refresh_token";
 constexpr char kIDToken[] = "id_token";
 
-// Error response: RFC 6749, section 5.2, and what Azure adds. Only the presence of "error" is looked at.
+// Error response: RFC 6749, section 5.2, and what Azure adds. Only the presence of "error" is checked.
 constexpr char kError[] = "error";
 constexpr char kErrorDescription[] = "error_description";
 constexpr char kErrorCodes[] = "error_codes";

@@ -1,7 +1,10 @@
 #include <syslog.h>
 
+#include <utility>
+
 #include "sso/names.h"
 #include "sso/sso.h"
+#include "sso/supported_profiles.h"
 #include "utils/json.h"
 #include "utils/root_privilege.h"
 #include "utils/source_line.h"
@@ -24,14 +27,12 @@ SSOProfile::SSOProfile() {
     if (!enable) {
         return;
     }
-    // Only the settings are kept: the client's own steps stay behind with the temporary.
-    if (profile == kAzureProfile) {
-        client = AzureSSOClient();
-    } else if (profile == kWebSphereProfile) {
-        client = WebSphereSSOClient();
-    } else {
+    if (!IsSupported(profile)) {
         syslog(LOG_ERR, "%s:%d Profile '%s' not support", SOURCE_LINE, profile.c_str());
+        return;
     }
+    // Slices: only the settings are kept.
+    WithClient(profile, [this](SSOClient &chosen) { client = std::move(chosen); });
 }
 
 SSOProfile::~SSOProfile() = default;

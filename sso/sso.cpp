@@ -2,14 +2,13 @@
 
 #include <syslog.h>
 
-#include <algorithm>
-#include <iterator>
 #include <new>
 #include <utility>
 
 #include "sso/base64.h"
 #include "sso/fetch.h"
 #include "sso/names.h"
+#include "sso/supported_profiles.h"
 #include "utils/cleanse.h"
 #include "utils/json.h"
 #include "utils/source_line.h"
@@ -20,15 +19,9 @@ namespace {
 
 constexpr char kSourceName[] = "sso";
 
-bool IsSupported(const std::string &profile) {
-    return std::find(std::begin(kSupportedProfiles), std::end(kSupportedProfiles), profile) !=
-           std::end(kSupportedProfiles);
-}
-
 }  // namespace
 
-// The destructors stand here so that each class has its type information in this library, once: that is how a program
-// catches by type what was thrown in here.
+// Out of line, so that the type information is in this library alone and programs can catch the exceptions by type.
 
 sso_exception::sso_exception(std::string message) : std::runtime_error(message) {}
 sso_exception::~sso_exception() = default;
@@ -118,14 +111,7 @@ void OIDCLogin(const std::string &code, std::string &userName) {
     if (!Utils::ReadMember(file, kProfileName, profile)) {
         throw sso_op_failed("not specify sso profile");
     }
-    if (!IsSupported(profile)) {
-        throw sso_exception("profile not support.");
-    }
-    if (profile == kAzureProfile) {
-        AzureSSOClient().OpenIDConnectLogin(code, userName);
-    } else {
-        WebSphereSSOClient().OpenIDConnectLogin(code, userName);
-    }
+    WithClient(profile, [&](SSOClient &client) { client.OpenIDConnectLogin(code, userName); });
 }
 
 std::string GetSSORelayURL(bool success, const std::string &state, const std::string &reason) {

@@ -1,6 +1,7 @@
 #include "frontend/profile.h"
 
 #include <gmock/gmock.h>
+#include <sso/supported_profiles.h>
 
 #include <filesystem>
 #include <fstream>
@@ -78,7 +79,7 @@ TEST_F(Profile, ChoosesTheClient) {
     for (const auto &[name, id] : {std::pair("azure", "given"), std::pair("websphere", "of websphere")}) {
         Write("profile.conf", std::string("{\"sso_enable\":true,\"sso_profile\":\"") + name + "\"}");
         EXPECT_EQ(ProfileInForce(), name);
-        EXPECT_EQ(WithClient(name, [](TAVO::SSO::SSOClient &client) { return client.GetClientID(); }), id);
+        EXPECT_EQ(TAVO::SSO::WithClient(name, [](TAVO::SSO::SSOClient &client) { return client.GetClientID(); }), id);
     }
 }
 
