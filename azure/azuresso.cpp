@@ -2,10 +2,8 @@
 #include <openssl/evp.h>
 #include <syslog.h>
 
-#include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>
-#include <boost/algorithm/string/classification.hpp>
-#include <boost/algorithm/string/split.hpp>
+#include <boost/algorithm/string/find.hpp>
 #include <cstring>
 #include <new>
 #include <optional>
@@ -24,6 +22,7 @@
 #include "utils/json.h"
 #include "utils/root_privilege.h"
 #include "utils/source_line.h"
+#include "utils/split.h"
 
 namespace TAVO::SSO {
 
@@ -162,15 +161,13 @@ void AzureSSOClient::GetUserInfo(Json::Value &info) { info = ReadClaims(token); 
 
 void AzureSSOClient::GetUserName(std::string &userName) {
     const std::string principalName = FindPrincipalName(ReadClaims(token));
-    userName = principalName.substr(0, principalName.find('@'));
-    // Counted before it is split: the pieces of a name of millions of at signs would take a gigabyte.
-    if (std::count(principalName.begin(), principalName.end(), '@') != 1) {
+    const std::vector<std::string> pieces = Utils::SplitInto(2, principalName, '@');
+    if (pieces.empty()) {
+        // The header promises callers the user piece after this failure too.
+        userName.assign(principalName.begin(), boost::find_first(principalName, "@").begin());
         throw std::invalid_argument("cannot get the user name!");
     }
-    std::vector<std::string> pieces;
-    boost::split(pieces, principalName, boost::is_any_of("@"));
-    const std::string domain = boost::to_upper_copy(pieces.back());
-    userName = domain + '\\' + userName;
+    userName = boost::to_upper_copy(pieces[1]) + '\\' + pieces[0];
 
     char buffer[1024] = {};
     if (TAVOWinsUserNameFqdn2Netbios(userName.c_str(), buffer, sizeof buffer - 1) < 0) {

@@ -13,11 +13,13 @@
 #include <cstring>
 #include <memory>
 #include <utility>
+#include <vector>
 
 #include "utils/cleanse.h"
 #include "utils/error_queue.h"
 #include "utils/json.h"
 #include "utils/source_line.h"
+#include "utils/split.h"
 
 namespace TAVO::JWT {
 
@@ -33,11 +35,11 @@ struct ReleaseWith {
     }
 };
 
-/// Decoded bytes, of a key or of a token: cleansed on release.
+/// Overwrites the bytes before it frees them: they may be a key or a token.
 struct ReleaseBytes {
-    std::size_t size = 0;
+    std::size_t room = 0;
     void operator()(unsigned char *bytes) const {
-        explicit_bzero(bytes, size);
+        explicit_bzero(bytes, room);
         std::free(bytes);
     }
 };
@@ -48,94 +50,82 @@ using BigNumber = std::unique_ptr<BIGNUM, ReleaseWith<BN_free>>;
 using DigestContext = std::unique_ptr<EVP_MD_CTX, ReleaseWith<EVP_MD_CTX_free>>;
 using PublicKey = std::unique_ptr<EVP_PKEY, ReleaseWith<EVP_PKEY_free>>;
 
-/// Room for a text: on the stack while it is small, as tokens are, and elsewhere when a provider sends a large one.
-/// Cleansed on release, as the text may be a key.
-class ScratchText {
-  public:
-    explicit ScratchText(std::size_t size)
-        : large_(size > sizeof small_ ? std::make_unique<char[]>(size) : nullptr),
-          text_(large_ ? large_.get() : small_),
-          cleanse_(text_, size) {}
-    char *get() { return text_; }
+struct DecodedPart {
+    /// False also for a part that decodes to nothing: with an empty key anyone could sign.
+    explicit operator bool() const { return bytes && size > 0; }
 
-  private:
-    char small_[4096];
-    std::unique_ptr<char[]> large_;
-    char *text_;
-    Utils::CleanseOnExit cleanse_;
+    Bytes bytes;   // followed by a NUL; null if the part is empty or memory runs out
+    int size = 0;  // 0 or less if the part is not base64
 };
 
-/// A base64 filter on top of a source or sink, which it takes over.
+/// Pushes a base64 filter onto a source or sink. The result owns both.
 BIOPointer PushBase64Filter(BIOPointer filter, BIOPointer end) {
     BIO_set_flags(filter.get(), BIO_FLAGS_BASE64_NO_NL);
     BIO_push(filter.get(), end.release());
     return filter;
 }
 
-/// The character of standard base64 that stands for one of base64url (RFC 4648, section 5).
-char StandardCharacter(char c) { return c == '-' ? '+' : c == '_' ? '/' : c; }
-
-/// Decodes one base64url part of a token (RFC 7515, section 2), or standard base64. Returns the bytes with a NUL behind
-/// them and writes their number, which is 0 or less where the text is not base64. Null, and no number, when the part is
-/// empty or memory runs out.
-Bytes Base64UrlDecode(const char *part, int *length) {
-    const std::size_t partLength = std::strlen(part);
-    const std::size_t padding = (4 - partLength % 4) % 4;
-    if (partLength + padding > INT_MAX) {
-        return nullptr;  // OpenSSL counts in int. GCOVR_EXCL_LINE: takes a text of 2 GB
-    }
-    ScratchText scratch(partLength + padding + 1);
-    char *end = std::transform(part, part + partLength, scratch.get(), StandardCharacter);
-    end = std::fill_n(end, padding, '=');
-    *end = '\0';
-
-    const int textLength = static_cast<int>(end - scratch.get());
+DecodedPart Base64Decode(const char *text, int length) {
     BIOPointer filter(BIO_new(BIO_f_base64()));
-    BIOPointer source(BIO_new_mem_buf(scratch.get(), textLength));
+    BIOPointer source(BIO_new_mem_buf(text, length));
     if (!filter || !source) {
-        return nullptr;
+        return {};
     }
     const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(source));
     const long pending = BIO_pending(chain.get());
     if (pending <= 0) {
-        return nullptr;
+        return {};
     }
-    const std::size_t size = static_cast<std::size_t>(pending) + 1;
-    Bytes decoded(static_cast<unsigned char *>(std::malloc(size)), ReleaseBytes{size});
-    if (!decoded) {
-        return nullptr;
+    const std::size_t room = static_cast<std::size_t>(pending) + 1;
+    Bytes bytes(static_cast<unsigned char *>(std::malloc(room)), ReleaseBytes{room});
+    if (!bytes) {
+        return {};
     }
-    *length = BIO_read(chain.get(), decoded.get(), static_cast<int>(pending));
-    decoded.get()[*length > 0 ? *length : 0] = '\0';
-    return decoded;
+    const int size = BIO_read(chain.get(), bytes.get(), static_cast<int>(pending));
+    bytes.get()[std::max(size, 0)] = '\0';
+    return {std::move(bytes), size};
 }
 
-/// A decoded part; empty when the part did not decode, which is also the case when it decodes to nothing: an empty key
-/// would let anyone sign.
-struct DecodedPart {
-    explicit DecodedPart(const std::string &part) : bytes(Base64UrlDecode(part.c_str(), &length)) {}
-    explicit operator bool() const { return bytes && length > 0; }
+/// The character of standard base64 for one of base64url (RFC 4648, section 5).
+char StandardCharacter(char c) { return c == '-' ? '+' : c == '_' ? '/' : c; }
 
-    int length = 0;
-    Bytes bytes;
-};
+/// Decodes one part of a token: base64url (RFC 7515, section 2) or standard base64.
+DecodedPart Base64UrlDecode(const char *part) {
+    const std::size_t partLength = std::strlen(part);
+    const std::size_t padding = (4 - partLength % 4) % 4;
+    const std::size_t length = partLength + padding;
+    if (length > INT_MAX) {
+        return {};  // OpenSSL counts in int. GCOVR_EXCL_LINE: takes a text of 2 GB
+    }
+    char small[4096];
+    std::unique_ptr<char[]> large;
+    char *text = small;
+    if (length >= sizeof small) {
+        large = std::make_unique<char[]>(length + 1);
+        text = large.get();
+    }
+    const Utils::CleanseOnExit cleanse(text, length + 1);  // the part may be a key
+    std::transform(part, part + partLength, text, StandardCharacter);
+    std::fill_n(text + partLength, padding, '=');
+    text[length] = '\0';
+    return Base64Decode(text, static_cast<int>(length));
+}
 
-/// The JSON value that a part encodes. Throws std::invalid_argument with that message if it is not JSON.
+/// The JSON value that a part encodes. Throws std::invalid_argument with the message `notJson`.
 Json::Value ParsePart(const std::string &part, const char *notJson) {
     const Utils::KeepErrorQueue keepErrorQueue;
-    int length = 0;
-    const Bytes decoded = Base64UrlDecode(part.c_str(), &length);
-    if (!decoded) {
+    const DecodedPart decoded = Base64UrlDecode(part.c_str());
+    if (!decoded.bytes) {
         throw std::logic_error("empty jwt part");
     }
     Json::Value value;
-    if (!Utils::ParseJson(reinterpret_cast<const char *>(decoded.get()), value)) {
+    if (!Utils::ParseJson(reinterpret_cast<const char *>(decoded.bytes.get()), value)) {
         throw std::invalid_argument(notJson);
     }
     return value;
 }
 
-// The low-level RSA calls are marked deprecated in OpenSSL 3; older generations have no others.
+// The low-level RSA calls are deprecated in OpenSSL 3, and the only ones before it.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 
@@ -144,9 +134,7 @@ struct ReleaseRSA {
 };
 using RSAPointer = std::unique_ptr<RSA, ReleaseRSA>;
 
-BigNumber MakeBigNumber(const DecodedPart &part) {
-    return BigNumber(BN_bin2bn(part.bytes.get(), part.length, nullptr));
-}
+BigNumber MakeBigNumber(const DecodedPart &part) { return BigNumber(BN_bin2bn(part.bytes.get(), part.size, nullptr)); }
 
 RSAPointer MakeRSA(const DecodedPart &n, const DecodedPart &e) {
     BigNumber modulus = MakeBigNumber(n);
@@ -163,7 +151,7 @@ RSAPointer MakeRSA(const DecodedPart &n, const DecodedPart &e) {
     return rsa;
 }
 
-/// The public key of modulus and exponent; null when it cannot be made.
+/// The public key of modulus and exponent; null on failure.
 PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
     RSAPointer rsa = MakeRSA(n, e);
     if (!rsa) {
@@ -190,7 +178,7 @@ PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
 /// What is signed (RFC 7515, section 5.2).
 std::string SigningInput(const std::string &header, const std::string &body) {
     std::string input;
-    input.reserve(header.size() + 1 + body.size());  // if it had to grow, it would leave pieces behind
+    input.reserve(header.size() + 1 + body.size());  // growth would leave copies of the token in released memory
     input += header;
     input += '.';
     input += body;
@@ -200,9 +188,9 @@ std::string SigningInput(const std::string &header, const std::string &body) {
 bool VerifyRSA(const std::string &signingInput, const std::string &n, const std::string &e,
                const std::string &signature, const EVP_MD *md) {
     const Utils::KeepErrorQueue keepErrorQueue;
-    const DecodedPart modulus(n);
-    const DecodedPart exponent(e);
-    const DecodedPart signatureBytes(signature);
+    const DecodedPart modulus = Base64UrlDecode(n.c_str());
+    const DecodedPart exponent = Base64UrlDecode(e.c_str());
+    const DecodedPart signatureBytes = Base64UrlDecode(signature.c_str());
     if (!modulus || !exponent || !signatureBytes) {
         return false;
     }
@@ -223,7 +211,7 @@ bool VerifyRSA(const std::string &signingInput, const std::string &n, const std:
         return false;
     }
     if (EVP_DigestVerifyFinal(context.get(), signatureBytes.bytes.get(),
-                              static_cast<std::size_t>(signatureBytes.length)) != 1) {
+                              static_cast<std::size_t>(signatureBytes.size)) != 1) {
         syslog(LOG_ERR, "%s:%d EVP_DigestVerifyFinal failed", SOURCE_LINE);
         return false;
     }
@@ -244,7 +232,7 @@ void MakeBase64Url(char *text) {
 bool VerifyHMAC(const std::string &signingInput, const std::string &key, const std::string &signature,
                 const EVP_MD *md) {
     const Utils::KeepErrorQueue keepErrorQueue;
-    const DecodedPart keyBytes(key);
+    const DecodedPart keyBytes = Base64UrlDecode(key.c_str());
     if (!keyBytes) {
         return false;
     }
@@ -260,13 +248,13 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
     const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(sink));
 
     unsigned char mac[EVP_MAX_MD_SIZE] = {};
-    const Utils::CleanseOnExit cleanseMAC(mac, sizeof mac);  // of a forged token, its true signature
+    const Utils::CleanseOnExit cleanseMAC(mac, sizeof mac);  // the valid signature of a forged token
     unsigned int macLength = 0;
-    if (HMAC(md, keyBytes.bytes.get(), keyBytes.length, reinterpret_cast<const unsigned char *>(signingInput.c_str()),
+    if (HMAC(md, keyBytes.bytes.get(), keyBytes.size, reinterpret_cast<const unsigned char *>(signingInput.c_str()),
              std::strlen(signingInput.c_str()), mac, &macLength) == nullptr) {
         return false;
     }
-    // A MAC of which nothing arrived would match an empty signature.
+    // An empty text would match an empty signature.
     if (BIO_write(chain.get(), mac, static_cast<int>(macLength)) != static_cast<int>(macLength) ||
         BIO_flush(chain.get()) != 1) {
         return false;
@@ -284,8 +272,7 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
 
 }  // namespace
 
-// The destructors stand here so that each class has its type information in this library, once: that is how a program
-// catches by type what was thrown in here.
+// Out of line, so that the type information is in this library alone and programs can catch the exceptions by type.
 
 jwt_exception::jwt_exception(std::string message) : std::runtime_error(message) {}
 jwt_exception::~jwt_exception() = default;
@@ -298,15 +285,13 @@ jwt_verify_failed::~jwt_verify_failed() = default;
 
 Jwt::Jwt(std::string token) {
     const Utils::CleanseTextOnExit cleanse(token);
-    // Not into a list of pieces: those of a provider's 30 MB of dots would take gigabytes.
-    const std::size_t headerEnd = token.find('.');
-    const std::size_t bodyEnd = token.find('.', headerEnd + 1);
-    if (bodyEnd == std::string::npos || token.find('.', bodyEnd + 1) != std::string::npos) {
+    std::vector<std::string> parts = Utils::SplitInto(3, token, '.');
+    if (parts.empty()) {
         throw std::invalid_argument("bad jwt format!");
     }
-    header = token.substr(0, headerEnd);
-    body = token.substr(headerEnd + 1, bodyEnd - headerEnd - 1);
-    signature = token.substr(bodyEnd + 1);
+    header = std::move(parts[0]);
+    body = std::move(parts[1]);
+    signature = std::move(parts[2]);
 }
 
 Jwt::~Jwt() {
