@@ -15,7 +15,8 @@
  * `std::bad_alloc` when memory runs out.
  *
  * One thread at a time: constructing a client or a profile changes the effective ids of the whole process while a file
- * is read, and every HTTP request initialises and cleans up libcurl globally.
+ * is read, and every HTTP request initialises and cleans up libcurl globally. A request over TLS also clears the calling
+ * thread's OpenSSL error queue, marks included, because libcurl does.
  *
  * The layout of the classes and the order of their virtual functions are fixed under soname `libtavosso.so.6`:
  * programs are linked against them, and a change would break them silently.
@@ -113,13 +114,15 @@ class SSOClient {
      * Fetches the discovery document (OpenID Connect Discovery 1.0, section 4), with the provider's certificate and
      * host name verified.
      *
-     * @param out  receives the document; null when the answer is not JSON, untouched when the transfer failed
+     * @param out  receives the document; null when the answer is not JSON, untouched when the transfer failed or memory
+     *             ran out
      *
      * Does not throw for a failed transfer or a malformed answer. Each is one line at `LOG_ERR`:
-     *  - "sso:LINE TEXT", where TEXT is libcurl's text or "bad wellknown json format.";
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out.
+     *  - "sso:LINE TEXT", where TEXT is libcurl's text, also when memory runs out during the transfer, or "bad wellknown
+     *    json format.";
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the transfer.
      *
-     * Initialises and cleans up libcurl globally.
+     * Side effects: those of `httpGet`.
      */
     virtual void RequestWellknownInfo(Json::Value &out);
 
@@ -132,10 +135,10 @@ class SSOClient {
      * @param body      the form-encoded body, as `GetIDTokenReqParams` gives it
      *
      * Does not throw for a failed transfer; the next step reports it. It is one line at `LOG_ERR`:
-     *  - "sso:LINE request token uri TEXT." with libcurl's text;
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out.
+     *  - "sso:LINE request token uri TEXT." with libcurl's text, also when memory runs out during the transfer;
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the transfer.
      *
-     * Initialises and cleans up libcurl globally.
+     * Side effects: those of `httpPost`.
      */
     virtual void RequestTokenEndpoint(std::string &response, const std::string &body);
 
@@ -287,14 +290,18 @@ class AzureSSOClient : public SSOClient {
      * Fetches the provider's key set (RFC 7517, section 5), certificate and host name verified.
      *
      * @param uri   where it is published ("jwks_uri" of the discovery document)
-     * @param keys  receives the document; null when the answer is not JSON, untouched when the transfer failed
+     * @param keys  receives the document; null when the answer is not JSON, untouched when the transfer failed or memory
+     *              ran out
      *
      * Does not throw for those failures, nor for a document without "keys". Each is one line at `LOG_ERR`:
-     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text or "bad wellknown json format.";
+     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text, also when memory runs out during the transfer,
+     *    or "bad wellknown json format.";
      *  - "azuresso:LINE no kyes information";
-     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made, or memory runs out.
+     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made, or memory runs out
+     *    outside the transfer.
      *
-     * Calls `curl_global_cleanup` once more than it initialises: a host that uses libcurl itself initialises it again.
+     * Side effects: those of `httpGet`. Calls `curl_global_cleanup` once more than it initialises: a host that uses
+     * libcurl itself initialises it again.
      */
     void RequestKeysInfo(std::string uri, Json::Value &keys);
 
@@ -481,7 +488,10 @@ std::string GetAzureSSOLogoutURL(const std::string &base);
 
 /**
  * Fetches a document over HTTP or HTTPS with a fresh libcurl handle. No time limit, no redirects followed; the HTTP
- * status is not looked at. Libcurl is initialised and cleaned up globally.
+ * status is not checked.
+ *
+ * Side effects: initialises and cleans up libcurl globally. Over TLS, libcurl clears the calling thread's OpenSSL error
+ * queue, marks included.
  *
  * @param url            where
  * @param response       handed to the callback as its user pointer, otherwise untouched
@@ -490,7 +500,7 @@ std::string GetAzureSSOLogoutURL(const std::string &base);
  * null
  *
  * @throws std::bad_alloc  when no handle can be made
- * @throws sso_err_resp  with libcurl's text, when the transfer fails or cannot be prepared
+ * @throws sso_err_resp  with libcurl's text, when the transfer fails or cannot be prepared, also for want of memory
  */
 void httpGet(const std::string &url, std::string &response, bool verifySSL,
              std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *));

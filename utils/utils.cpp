@@ -10,7 +10,6 @@
 #include "platform/platform.h"
 #include "sso/sso.h"
 #include "utils/cleanse.h"
-#include "utils/error_queue.h"
 #include "utils/source_line.h"
 
 namespace TAVO::SSO {
@@ -37,7 +36,6 @@ void Require(CURLcode result) {
 /// One request with a fresh handle: a POST of the form if there is one, else a GET.
 void Transfer(const std::string &url, const std::string *form, std::string &response, bool verifySSL,
               curl_write_callback writeCallback) {
-    const Utils::SaveErrorQueue saveErrorQueue;
     const CurlGlobalState global;
     const std::shared_ptr<CURL> handle(curl_easy_init(), curl_easy_cleanup);
     if (!handle) {
@@ -87,8 +85,6 @@ std::string URLEncode(const std::string &value) {
 }
 
 std::string MD5Digest(std::string data) {
-    // Without KeepErrorQueue, as MD5 leaves nothing in the queue: OpenSSL would load its error texts for it, a third of
-    // a millisecond in every program that starts a login.
     unsigned char digest[MD5_DIGEST_LENGTH];
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"

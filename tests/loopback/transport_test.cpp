@@ -1,5 +1,6 @@
 #include <curl/curl.h>
 #include <gmock/gmock.h>
+#include <openssl/err.h>
 #include <syslog.h>
 
 #include <ostream>
@@ -9,6 +10,7 @@
 #include "sso/sso.h"
 #include "tests/interposed/memory.h"
 #include "tests/support/authority.h"
+#include "tests/support/error_queue.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"
 
@@ -126,6 +128,14 @@ TEST_P(Transfer, TakesAnyCertificateWhenToldNotToVerify) {
         server.Answer(HTTPAnswer("the answer"));
         EXPECT_EQ(Perform(server.URL("/"), false), Arrived("the answer"));
     }
+}
+
+TEST_P(Transfer, OverTLSClearsTheErrorQueueOfTheThread) {
+    Server server(CertificateFor("IP:127.0.0.1"));
+    server.Answer(HTTPAnswer("the answer"));
+    ERR_raise(ERR_LIB_USER, 1);
+    EXPECT_EQ(Perform(server.URL("/")), Arrived("the answer"));
+    EXPECT_THAT(TakeErrorQueue(), IsEmpty());
 }
 
 TEST_P(Transfer, BringsTheBodyOfAnErrorPageWhateverItsStatus) {

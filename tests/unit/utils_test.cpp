@@ -107,29 +107,6 @@ TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
     EXPECT_EQ(response, "earlier answer");
 }
 
-TEST_F(Transfer, TheHostsErrorQueueSurvivesATransferThatClearsItAndLeavesItsOwn) {
-    CurrentTransport().answers[kURL] = Whole("answer");
-    CurrentTransport().duringPerform = [] {
-        ERR_clear_error();
-        ERR_raise(ERR_LIB_SSL, 17);
-    };
-    ERR_clear_error();
-    const auto hostFails = [] {
-        ERR_raise_data(ERR_LIB_USER, 1, "some %s", "data");
-        ERR_raise(ERR_LIB_USER, 2);
-    };
-    hostFails();
-    const std::vector<std::string> before = TakeErrorQueue();
-    ASSERT_EQ(before.size(), 2u);
-
-    hostFails();
-    std::string response;
-    httpGet(kURL, response, true, Append);
-    EXPECT_EQ(TakeErrorQueue(), before);
-    httpGet(kURL, response, true, Append);
-    EXPECT_EQ(TakeErrorQueue(), std::vector<std::string>());
-}
-
 class Encoding : public Library {};
 
 TEST_F(Encoding, URLEncodePercentEncodesWhatIsNotUnreserved) {
