@@ -4,11 +4,12 @@
 #include <cstring>
 #include <memory>
 #include <new>
+#include <utility>
 
 #include "utils/cleanse.h"
 
-// Json::Reader and Json::FastWriter are marked deprecated, but what they accept and how they write is what the
-// provider's documents, the configuration files and the relay page have always been read and written with.
+// Json::Reader and Json::FastWriter are deprecated, but existing files, providers and relay pages rely on what they
+// accept and write.
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 
 namespace TAVO::Utils {
@@ -25,29 +26,36 @@ bool ReadFile(const char *path, std::string &content) {
         return false;
     }
     char chunk[4096];
-    const CleanseOnExit cleanse(chunk, sizeof chunk);  // the client secret passes through
+    const CleanseOnExit cleanse(chunk, sizeof chunk);  // may contain the client secret
     while (const std::size_t length = std::fread(chunk, 1, sizeof chunk, file.get())) {
         AppendSecret(content, chunk, length);
     }
     return std::ferror(file.get()) == 0;
 }
 
+/// jsoncpp throws the same class if memory runs out; only the message differs.
+bool IsNestedTooDeeply(const Json::RuntimeError &error) { return std::strstr(error.what(), "stackLimit") != nullptr; }
+
+/// Parses a text. After a failure `document` has the members read so far.
+bool Parse(std::string_view text, Json::Value &document) {
+    try {
+        // Passed by its bounds: the reader would keep a copy of a std::string, which may contain the client secret.
+        return Json::Reader().parse(text.data(), text.data() + text.size(), document, true);
+    } catch (const Json::RuntimeError &error) {
+        if (IsNestedTooDeeply(error)) {
+            return false;
+        }
+        throw std::bad_alloc();
+    }
+}
+
 }  // namespace
 
 bool ParseJson(std::string_view text, Json::Value &document) {
-    Json::Value parsed;  // of which nothing gets out unless all of it is there
-    try {
-        Json::Reader reader;
-        // By its bounds: given the string, the reader would keep a copy, and the text may hold the client secret.
-        if (reader.parse(text.data(), text.data() + text.size(), parsed, true)) {
-            document.swap(parsed);
-            return true;
-        }
-    } catch (const Json::Exception &) {
-        // Too deeply nested: refused by throwing, and no better than any other malformed text.
-    }
-    document = Json::Value();
-    return false;
+    Json::Value parsed;
+    const bool isJson = Parse(text, parsed);
+    document = isJson ? std::move(parsed) : Json::Value();
+    return isJson;
 }
 
 bool LoadJsonFile(const char *path, Json::Value &document) {
@@ -62,7 +70,7 @@ Json::Value WithMember(const Json::Value &document, const char *name, const std:
         copy[name] = text;
         return copy;
     } catch (const Json::RuntimeError &) {
-        throw std::bad_alloc();  // the JSON library's own word for no memory
+        throw std::bad_alloc();  // a copy fails for no other reason
     }
 }
 

@@ -43,7 +43,7 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"strerror_r", "has a text for every number"},
     {"strlen", kOnlyMemory},
     {"strnlen", kOnlyMemory},
-    {"strtol", "reads as far as there are digits, and stops at the largest number"},
+    {"strstr", kOnlyMemory},
     {"syslog", kNoResult},
     {"time", nullptr},
 
