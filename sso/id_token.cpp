@@ -1,7 +1,8 @@
 #include "sso/id_token.h"
 
-#include <cstdlib>
 #include <ctime>
+#include <locale>
+#include <sstream>
 #include <stdexcept>
 
 #include "utils/json.h"
@@ -16,10 +17,12 @@ JWT::Jwt SplitIDToken(const std::string &token) {
 }
 
 void CheckExpiry(const Json::Value &claims) {
-    // Reads as far as there are digits: no number at all is 0, long past.
-    const long expiry = std::strtol(Utils::MemberText(claims, "exp").value_or("").c_str(), nullptr, 10);
+    std::istringstream text(Utils::MemberText(claims, "exp").value_or(""));
+    text.imbue(std::locale::classic());  // the host's locale may take a decimal point for a digit separator
+    long expiry = 0;
+    text >> expiry;
     const std::time_t now = std::time(nullptr);
-    // A clock that cannot be read tells -1, before which nothing has expired.
+    // time() returns -1 on failure, which is before every expiry.
     if (now == -1 || now > expiry) {
         throw std::invalid_argument("id_token expired.");
     }

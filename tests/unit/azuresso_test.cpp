@@ -220,6 +220,20 @@ TEST_F(AzureVerification, AnExpiryIsReadAsFarAsItsLeadingDigitsGo) {
     EXPECT_EQ(Verify(), kExpired);
 }
 
+/// Digits in groups of three behind points, as in Germany.
+struct Grouping : std::numpunct<char> {
+    char do_thousands_sep() const override { return '.'; }
+    std::string do_grouping() const override { return "\3"; }
+};
+
+TEST_F(AzureVerification, TheHostsLocaleDoesNotChangeTheExpiry) {
+    const std::locale former = std::locale::global(std::locale(std::locale(), new Grouping));
+    claims["exp"] = "1.700.000.000";
+    const Failure failure = Verify();
+    std::locale::global(former);
+    EXPECT_EQ(failure, kExpired);
+}
+
 TEST_F(AzureVerification, ExpiryComesBeforeTenantAndTenantBeforeAudience) {
     claims["aud"] = "another";
     claims["tid"] = "another";
