@@ -34,11 +34,11 @@ constexpr char kConfigurationFile[] = "/usr/tavo/etc/ssoclient/azure.conf";
 constexpr char kRequestedScope[] = "openid";
 constexpr Algorithm kAlgorithms[] = {{"RS256", EVP_sha256}, {"RS384", EVP_sha384}, {"RS512", EVP_sha512}};
 
-constexpr const char *kStrippedSuffixes[] = {"/index.cgi"};
+constexpr char kStartPage[] = "/index.cgi";
 constexpr char kRelayPage[] = "/webman/ssoclient/relay.html";
 constexpr char kPostLogoutRedirectURI[] = "post_logout_redirect_uri";
 
-/// The first key of the set with that "kid"; null when there is none. A "kid" without text is no key's.
+/// The first key of the set with that "kid"; null if there is none. A "kid" without text matches no key.
 const Json::Value *FindKey(const Json::Value &keySet, const std::optional<std::string> &kid) {
     const Json::Value *keys = Utils::FindMember(keySet, "keys");
     if (keys == nullptr || !keys->isArray() || !kid) {
@@ -52,7 +52,7 @@ const Json::Value *FindKey(const Json::Value &keySet, const std::optional<std::s
     return nullptr;
 }
 
-/// The principal name user@domain of the token's user.
+/// The user's principal name, user@domain.
 std::string FindPrincipalName(const Json::Value &claims) {
     std::string name;
     if (!Utils::ReadMember(claims, "unique_name", name) && !Utils::ReadMember(claims, "email", name)) {
@@ -152,8 +152,7 @@ void AzureSSOClient::RequestKeysInfo(std::string uri, Json::Value &keys) {
     } catch (const sso_err_resp &error) {
         syslog(LOG_ERR, "%s:%d request wellknown uri %s.", SOURCE_LINE, error.what());
     }
-    // Once more than it was initialised, as the interface tells: a host that has initialised libcurl for itself has to
-    // do so again.
+    // One more cleanup than initialisations, as the header documents.
     curl_global_cleanup();
 }
 
@@ -183,13 +182,10 @@ std::string GetAzureSSOLogoutURL(const std::string &base) {
         return url;
     }
     std::string relayPage = base;
-    for (const char *suffix : kStrippedSuffixes) {
-        // A base shorter than the suffix is a caller's error, which substr reports as std::out_of_range.
-        const std::size_t start = relayPage.size() - std::strlen(suffix);
-        if (relayPage.substr(start) == suffix) {
-            relayPage.resize(start);
-            break;
-        }
+    // A base shorter than the start page is the caller's error: substr throws std::out_of_range.
+    const std::size_t end = relayPage.size() - std::strlen(kStartPage);
+    if (relayPage.substr(end) == kStartPage) {
+        relayPage.resize(end);
     }
     if (!relayPage.empty() && relayPage.back() == '/') {
         relayPage.pop_back();

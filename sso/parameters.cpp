@@ -7,7 +7,7 @@ namespace TAVO::SSO {
 
 namespace {
 
-/// How long the text can get: every byte of a value may become "%XX".
+/// The length of the form if every byte of a value becomes "%XX".
 std::size_t LongestForm(const Parameters &parameters) {
     std::size_t length = 0;
     for (const auto &[name, value] : parameters) {
@@ -16,25 +16,20 @@ std::size_t LongestForm(const Parameters &parameters) {
     return length;
 }
 
-void AppendEncoded(std::string &form, std::string value) {
-    const Utils::CleanseTextOnExit cleanseValue(value);
-    std::string encoded = URLEncode(value);
-    const Utils::CleanseTextOnExit cleanseEncoded(encoded);
-    form += encoded;
-}
-
 }  // namespace
 
 std::string WriteForm(const Parameters &parameters) {
     std::string form;
-    form.reserve(LongestForm(parameters));  // if it had to grow, it would leave pieces of the client secret behind
+    form.reserve(LongestForm(parameters));  // growth would leave copies of the client secret in released memory
     for (const auto &[name, value] : parameters) {
         if (!form.empty()) {
             form += '&';
         }
+        std::string encoded = URLEncode(value);
+        const Utils::CleanseTextOnExit cleanse(encoded);
         form += name;
         form += '=';
-        AppendEncoded(form, std::string(value));
+        form += encoded;
     }
     return form;
 }

@@ -3,14 +3,11 @@
 
 #include <map>
 #include <string>
-#include <string_view>
 
 namespace TAVO::SSO {
 
-/// The parameters of a request, in the order in which they are written: by name, byte-wise. Names and values stay the
-/// caller's: a copy of the client secret would have to be cleansed. What the views look at has to outlive the map, so
-/// write it where it is used and give it no name.
-using Parameters = std::map<std::string_view, std::string_view>;
+/// The parameters of a request. They are written in the map's order: by name, byte-wise.
+using Parameters = std::map<std::string, std::string>;
 
 /// "name=value" pairs joined by "&", the values percent-encoded: the body of a form.
 std::string WriteForm(const Parameters &parameters);

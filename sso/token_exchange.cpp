@@ -5,19 +5,22 @@
 #include "sso/names.h"
 #include "sso/parameters.h"
 #include "sso/sso.h"
+#include "utils/cleanse.h"
 #include "utils/json.h"
 
 namespace TAVO::SSO {
 
 std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
                              const std::string &redirectURI) {
-    return WriteForm({
-        {kClientID, clientID},
-        {kClientSecret, clientSecret},
-        {kCode, code},
-        {kGrantType, kAuthorizationCode},
-        {kRedirectURI, redirectURI},
-    });
+    Parameters parameters;  // no initialiser list: it would keep copies of the secrets
+    parameters[kClientID] = clientID;
+    parameters[kClientSecret] = clientSecret;
+    const Utils::CleanseTextOnExit cleanseSecret(parameters[kClientSecret]);
+    parameters[kCode] = code;
+    const Utils::CleanseTextOnExit cleanseCode(parameters[kCode]);
+    parameters[kGrantType] = kAuthorizationCode;
+    parameters[kRedirectURI] = redirectURI;
+    return WriteForm(parameters);
 }
 
 Json::Value ParseTokenResponse(const std::string &response) {
