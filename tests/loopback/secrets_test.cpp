@@ -4,10 +4,12 @@
 #include <string>
 #include <vector>
 
+#include "jwt/jwt.h"
 #include "sso/sso.h"
 #include "tests/interposed/releases.h"
 #include "tests/loopback/provider.h"
 #include "tests/support/encoding.h"
+#include "tests/support/files.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
@@ -51,6 +53,16 @@ class Secrets : public ::testing::TestWithParam<Profile> {
         return {};
     }
 
+    /// Watched where the token comes back: also what is made of it, and each of its parts.
+    static std::vector<std::string> AllWith(const std::string &token) {
+        std::vector<std::string> secrets = All();
+        const std::size_t firstDot = token.find('.');
+        const std::size_t lastDot = token.rfind('.');
+        secrets.insert(secrets.end(),
+                       {token, token.substr(firstDot + 1, lastDot - firstDot - 1), token.substr(lastDot + 1)});
+        return secrets;
+    }
+
     static std::string Answer(const std::string &token) {
         return R"({"access_token": ")" + std::string(kAccessToken) + R"(", "id_token": ")" + token + "\"}";
     }
@@ -82,11 +94,7 @@ TEST_P(Secrets, AreOverwrittenBeforeTheirMemoryIsReleased) {
     const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
     provider.AnswerByteByByte(ChunkedHTTPAnswer(PiecesOf(Answer(token), 50)));
     provider.AnswerVerification();
-    std::vector<std::string> secrets = All();
-    const std::size_t firstDot = token.find('.');
-    const std::size_t lastDot = token.rfind('.');
-    const std::string claims = token.substr(firstDot + 1, lastDot - firstDot - 1);
-    secrets.insert(secrets.end(), {token, claims, token.substr(lastDot + 1)});
+    const std::vector<std::string> secrets = AllWith(token);
     std::string userName;
     const std::string code = kCode;
     const WatchReleases releases(secrets);
@@ -113,19 +121,94 @@ TEST_P(Secrets, AreOverwrittenWhenOthersTakeTheirPlace) {
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
+/// Tokens that end a login at each step of their verification and behind it.
+std::vector<std::string> RefusedTokens(Profile profile) {
+    const Json::Value header = TokenHeader(profile);
+    const Json::Value claims = TokenClaims(profile);
+    std::vector<std::string> tokens{
+        "no token",
+        "bm8gSlNPTi4gQnV0IGxvbmcgZW5vdWdoIGZvciBtZW1vcnkgb2YgaXRzIG93bg." + Base64Url(Compact(claims)) + ".c2ln",
+        Base64Url(Compact(header)) + ".bm8gSlNPTi4gQnV0IGxvbmcgZW5vdWdoIGZvciBtZW1vcnkgb2YgaXRzIG93bg.c2ln",
+        SignedToken(header, Change(claims, R"({"exp": 1})")),
+        SignedToken(header, Change(claims, R"({"aud": "another"})")),
+        SignedToken(Change(header, R"({"alg": "none"})"), claims),
+        SignedToken(header, Change(claims, R"({"unique_name": null, "email": null, "sub": null})")),
+    };
+    for (const char *bits : {"256", "384", "512"}) {
+        const std::string algorithm = (profile == Profile::kAzure ? "RS" : "HS") + std::string(bits);
+        tokens.push_back(SignedToken(Change(header, "{\"alg\": \"" + algorithm + "\"}"), claims) + "x");
+    }
+    return tokens;
+}
+
 /// Answers of the token endpoint that end a login at each of its steps.
 std::vector<std::string> Failures(Profile profile) {
-    const std::string token = SignedToken(TokenHeader(profile), TokenClaims(profile));
-    return {
+    std::vector<std::string> answers{
         "not JSON",
         R"({"error": "invalid_grant", "error_description": "the code is used up"})",
         R"({"access_token": "none for you"})",
-        TokenResponse("no token"),
-        TokenResponse(token + "x"),
-        TokenResponse(SignedToken(TokenHeader(profile), Change(TokenClaims(profile), R"({"exp": 1})"))),
-        TokenResponse(SignedToken(TokenHeader(profile), Change(TokenClaims(profile), R"({"aud": "another"})"))),
-        TokenResponse(SignedToken(Change(TokenHeader(profile), R"({"alg": "none"})"), TokenClaims(profile))),
     };
+    for (const std::string &token : RefusedTokens(profile)) {
+        answers.push_back(TokenResponse(token));
+    }
+    return answers;
+}
+
+TEST_P(Secrets, AreOverwrittenWhenALoginFails) {
+    for (const std::string &token : RefusedTokens(GetParam())) {
+        Provider provider(GetParam());
+        provider.AnswerByteByByte(HTTPAnswer(TokenResponse(token)));
+        provider.AnswerVerification();
+        const std::vector<std::string> secrets = token == "no token" ? All() : AllWith(token);
+        const WatchReleases releases(secrets);
+        EXPECT_NE(FailureOfLogin(), "");
+        EXPECT_GT(releases.Blocks(), 100U);
+        EXPECT_THAT(releases.Found(), IsEmpty()) << token;
+    }
+}
+
+TEST_P(Secrets, AreOverwrittenWhenTheAnswerIsNotJSON) {
+    Provider provider(GetParam());
+    const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
+    provider.AnswerByteByByte(HTTPAnswer("[" + Answer(token) + ", cut off"));
+    const std::vector<std::string> secrets = AllWith(token);
+    const WatchReleases releases(secrets);
+    EXPECT_EQ(FailureOfLogin(), "parse json falied");
+    EXPECT_GT(releases.Blocks(), 100U);
+    EXPECT_THAT(releases.Found(), IsEmpty());
+}
+
+TEST_P(Secrets, AreOverwrittenWhenTheFileIsNotJSON) {
+    WriteFile(GetParam() == Profile::kAzure ? kAzureFile : kWebSphereFile,
+              R"({"secret": ")" + std::string(kSecret) + R"(", "cut off": )" + std::string(5000, ' '));
+    const std::vector<std::string> secrets = All();
+    const WatchReleases releases(secrets);
+    EXPECT_EQ(MakeClient(GetParam())->GetClientSecret(), "");
+    EXPECT_GT(releases.Blocks(), 0U);
+    EXPECT_THAT(releases.Found(), IsEmpty());
+}
+
+TEST(LargeParts, AreOverwrittenToTheirEnds) {
+    const std::string filler(10000, 'x');
+    const std::string endOfClaims = R"(","sub":"the last of the claims"})";
+    const std::string endOfSecret = "the last of the secret";
+    const std::string body = Base64Url("{\"filler\":\"" + filler + endOfClaims);
+    const std::string secret = filler + endOfSecret;
+    const std::string input = "e30." + body;
+    const std::string token = input + "." + SignHMAC(input, secret, EVP_sha256());
+    std::string key = Base64(secret);
+    std::string otherKey = Base64("x" + secret);
+    const std::vector<std::string> secrets{endOfClaims, endOfSecret, body.substr(body.size() - 20),
+                                           key.substr(key.size() - 20), otherKey.substr(otherKey.size() - 20)};
+    const WatchReleases releases(secrets);
+    {
+        TAVO::JWT::Jwt jwt(token);
+        EXPECT_EQ(jwt.GetBody()["sub"], "the last of the claims");
+        jwt.JwtHMACVerify(key, EVP_sha256());
+        EXPECT_THROW(jwt.JwtHMACVerify(otherKey, EVP_sha256()), TAVO::JWT::jwt_verify_failed);
+    }
+    EXPECT_GT(releases.Blocks(), 10U);
+    EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
 TEST_P(Secrets, AreInNoLogLineAndInNoException) {

@@ -121,6 +121,12 @@ TEST_F(Parts, DecodedBytesBehindANULAreIgnored) {
     EXPECT_EQ(FailureOf([] { BodyOf(Base64Url(std::string("\0{}", 3))); }), kBadBody);
 }
 
+TEST_F(Parts, ANULInsideATextIsNotJSON) {
+    const std::string part = Base64Url(std::string("{\"a\": \"b\0c\"}", 12));
+    EXPECT_EQ(FailureOf([&] { HeaderOf(part); }), kBadHeader);
+    EXPECT_EQ(FailureOf([&] { BodyOf(part); }), kBadBody);
+}
+
 TEST_F(Parts, APartIsReadUpToItsNUL) {
     EXPECT_EQ(HeaderOf(std::string("e30\0rest", 8)), Json::Value(Json::objectValue));
 }

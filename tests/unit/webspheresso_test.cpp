@@ -1,9 +1,12 @@
+#include <tuple>
+
 #include "jwt/jwt.h"
 #include "tests/interposed/calls.h"
 #include "tests/interposed/clock.h"
 #include "tests/interposed/platform_calls.h"
 #include "tests/interposed/process.h"
 #include "tests/interposed/transport.h"
+#include "tests/support/encoding.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
@@ -248,10 +251,29 @@ TEST_F(WebSphereVerification, TheEncoderIsGivenAZeroedBufferOf1024BytesAndItsFla
     EXPECT_EQ(Verify(EVP_sha256(), std::string(768, '\0')), kVerified);
 }
 
-TEST_F(WebSphereVerification, TheSecretsBase64FormAndTheKeyAreOverwritten) {
+/// An algorithm, and whether the token is signed under the client's secret.
+using Signing = std::tuple<const char *, bool>;
+
+class WebSphereSecret : public WebSphereVerification, public testing::WithParamInterface<Signing> {
+  protected:
+    static const EVP_MD *Digest(const std::string &algorithm) {
+        return algorithm == "HS256" ? EVP_sha256() : algorithm == "HS384" ? EVP_sha384() : EVP_sha512();
+    }
+};
+
+INSTANTIATE_TEST_SUITE_P(, WebSphereSecret,
+                         testing::Combine(testing::Values("HS256", "HS384", "HS512"), testing::Bool()),
+                         [](const auto &row) {
+                             return std::string(std::get<0>(row.param)) +
+                                    (std::get<1>(row.param) ? "GoodSignature" : "BadSignature");
+                         });
+
+TEST_P(WebSphereSecret, IsOverwrittenInEachFormWhateverTheSignature) {
+    const auto &[algorithm, isGood] = GetParam();
     client.clientSecret = "a secret that is long enough";
+    header["alg"] = algorithm;
     TakeCleansed();
-    EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kVerified);
+    EXPECT_EQ(Verify(Digest(algorithm), isGood ? client.clientSecret : "another"), isGood ? kVerified : kBadSignature);
     const std::vector<std::string> cleansed = TakeCleansed();
     const std::string form = "YSBzZWNyZXQgdGhhdCBpcyBsb25nIGVub3VnaA==";
     EXPECT_THAT(cleansed, testing::Contains(testing::AllOf(testing::StartsWith(form), testing::SizeIs(1024))))
@@ -259,6 +281,13 @@ TEST_F(WebSphereVerification, TheSecretsBase64FormAndTheKeyAreOverwritten) {
     EXPECT_THAT(cleansed, testing::Contains(form)) << "the key text";
     EXPECT_THAT(cleansed, testing::Contains(form + std::string(1, '\0'))) << "the decoder's scratch space";
     EXPECT_THAT(cleansed, testing::Contains(testing::StartsWith(client.clientSecret))) << "the decoded key";
+    const std::string signature = SignHMAC(SigningInput(header, claims), client.clientSecret, Digest(algorithm));
+    const auto macSize = static_cast<std::size_t>(EVP_MD_get_size(Digest(algorithm)));
+    EXPECT_THAT(cleansed,
+                testing::Contains(testing::ResultOf(
+                    [&](const std::string &memory) { return Base64Url(memory.substr(0, macSize)); }, signature)))
+        << "the MAC";
+    EXPECT_THAT(cleansed, testing::Contains(testing::StartsWith(signature))) << "the text of the MAC";
 }
 
 TEST_F(WebSphereVerification, ATokenWithAKidNeedsNoKeySet) {
