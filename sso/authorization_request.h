@@ -7,7 +7,7 @@
 
 namespace TAVO::SSO {
 
-/// What of an authorization request is the client's own.
+/// The values of an authorization request that differ between clients.
 struct AuthorizationRequest {
     const std::string &endpoint;
     const std::string &clientID;
@@ -15,11 +15,11 @@ struct AuthorizationRequest {
     const char *scope;
 };
 
-/// The address that the browser is sent to for signing in, with a fresh nonce, and the caller's state with the digest
-/// of that nonce. Throws as the clients' GetAccessTokenReqURI tells.
+/// The URL of the authorization request, with a fresh nonce and the caller's state with the digest of that nonce. Throws
+/// as documented for AzureSSOClient::GetAccessTokenReqURI.
 std::string AuthorizationURI(const AuthorizationRequest &request, const Json::Value &stateInfo);
 
-/// Writes the CGI redirect to that address on standard output, unflushed.
+/// Writes the CGI redirect to that URL to standard output, unflushed.
 void WriteRedirect(const std::string &uri);
 
 }  // namespace TAVO::SSO

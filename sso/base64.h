@@ -3,13 +3,13 @@
 
 #include <string>
 
-// Base64 texts by the platform's coder, in its buffers of 1024 bytes.
+// Base64 with the platform's encoder and decoder, in buffers of 1024 bytes.
 namespace TAVO::SSO {
 
-/// Throws sso_op_failed "encode base64 failed." when the platform refuses, as it does for more than 765 bytes.
+/// Throws sso_op_failed "encode base64 failed." if the platform refuses, as it does above 765 bytes.
 std::string EncodeBase64(const std::string &bytes);
 
-/// The decoded text up to its first NUL. False when the platform refuses.
+/// Writes the decoded text up to its first NUL. Returns false if the platform refuses.
 bool DecodeBase64(const std::string &text, std::string &decoded);
 
 }  // namespace TAVO::SSO

@@ -88,9 +88,9 @@ void SSOClient::ProcessTokenResponse(std::string /*response*/) {
 void SSOClient::OpenIDConnectLogin(std::string authorizationCode, std::string &userName) {
     SetCode(std::move(authorizationCode));
     std::string body = GetIDTokenReqParams();
-    const Utils::CleanseTextOnExit cleanseBody(body);  // it holds the client secret
+    const Utils::CleanseTextOnExit cleanseBody(body);  // contains the client secret
     std::string response;
-    const Utils::CleanseTextOnExit cleanseResponse(response);  // it holds the user's tokens
+    const Utils::CleanseTextOnExit cleanseResponse(response);  // contains the user's tokens
     RequestTokenEndpoint(response, body);
     ProcessTokenResponse(response);
     VerifyIDToken();
@@ -98,7 +98,7 @@ void SSOClient::OpenIDConnectLogin(std::string authorizationCode, std::string &u
 }
 
 void OIDCLogin(const std::string &code, std::string &userName) {
-    // Read with the ids that the process has: a program that may not see the profile may not log anyone in.
+    // Without root's ids: a program that must not read the profile must not log anyone in.
     Json::Value file;
     if (!Utils::LoadJsonFile(kProfileFile, file)) {
         throw sso_op_failed("read profile file failed.");

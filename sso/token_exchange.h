@@ -11,10 +11,10 @@ namespace TAVO::SSO {
 std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
                              const std::string &redirectURI);
 
-/// Throws std::invalid_argument "parse json falied" for an answer that is not JSON.
+/// Throws std::invalid_argument "parse json falied" if the response is not JSON.
 Json::Value ParseTokenResponse(const std::string &response);
 
-/// Throws sso_err_resp "we cannot find key 'id_token' in response!" where there is none, or it is not a string.
+/// Throws sso_err_resp "we cannot find key 'id_token' in response!" if "id_token" is missing or not a string.
 std::string FindIDToken(const Json::Value &tokenResponse);
 
 }  // namespace TAVO::SSO

@@ -7,8 +7,8 @@
 
 namespace TAVO::Utils {
 
-/// Overwrites memory that holds a secret on every way out of a scope. Declared after the memory's owner, so that it
-/// runs before the memory is released.
+/// Overwrites a secret in memory at the end of a scope. Declare it after the memory's owner, so that it runs before the
+/// memory is released.
 class CleanseOnExit {
   public:
     CleanseOnExit(void *memory, std::size_t size) : memory_(memory), size_(size) {}
@@ -23,8 +23,8 @@ class CleanseOnExit {
 
 inline void Cleanse(std::string &text) { explicit_bzero(text.data(), text.size()); }
 
-/// The same for a text that may still grow in the scope, by AppendSecret or within what it has reserved: growing
-/// otherwise, it would leave its old memory behind as it is.
+/// The same for a text that may grow in the scope, but only by AppendSecret or within its capacity: any other
+/// reallocation would leave an uncleared copy.
 class CleanseTextOnExit {
   public:
     explicit CleanseTextOnExit(std::string &text) : text_(text) {}
@@ -36,7 +36,7 @@ class CleanseTextOnExit {
     std::string &text_;
 };
 
-/// Appends to a text that may hold a secret. Where it has to move for want of room, nothing of it stays behind.
+/// Appends to a text that may contain a secret. If the text must be reallocated, the old memory is overwritten.
 void AppendSecret(std::string &text, const char *bytes, std::size_t length);
 
 }  // namespace TAVO::Utils

@@ -13,13 +13,13 @@ namespace TAVO::Utils {
 
 namespace {
 
-// strerror_r comes in two forms, chosen by the compiler's macros: one returns the text, the other fills the buffer.
+// strerror_r has two forms: GNU's returns the text, POSIX's fills the buffer.
 [[maybe_unused]] const char *ErrorText(const char *text, const char * /*buffer*/) { return text; }
 // GCOVR_EXCL_START: the other form is that of glibc with g++ and clang's default macros
 [[maybe_unused]] const char *ErrorText(int /*result*/, const char *buffer) { return buffer; }
 // GCOVR_EXCL_STOP
 
-/// While it lives, the process's effective ids are root's, as far as the process may change them.
+/// Raises the process's effective ids to root's for its lifetime, as far as the process may.
 class RootPrivilege {
   public:
     RootPrivilege(const char *source, int line)
@@ -33,8 +33,7 @@ class RootPrivilege {
     RootPrivilege &operator=(const RootPrivilege &) = delete;
 
   private:
-    // The group goes first in both directions: a process whose effective uid is not 0 may not change its group, so
-    // leaving returns to uid 0 before it restores the group.
+    // Only effective uid 0 may change the group, so Leave returns to it before it restores the group.
     bool Enter() { return (savedGID_ == 0 || SetEffectiveGID(0)) && (savedUID_ == 0 || SetEffectiveUID(0)); }
 
     bool Leave() {
@@ -44,7 +43,7 @@ class RootPrivilege {
                (!changeUID || SetEffectiveUID(savedUID_));
     }
 
-    static constexpr unsigned int kUnchanged = static_cast<unsigned int>(-1);  // the real and the saved id stay
+    static constexpr unsigned int kUnchanged = static_cast<unsigned int>(-1);  // the real and the saved id
 
     bool SetEffectiveGID(gid_t gid) { return Logged("resgid", gid, setresgid(kUnchanged, gid, kUnchanged)); }
     bool SetEffectiveUID(uid_t uid) { return Logged("resuid", uid, setresuid(kUnchanged, uid, kUnchanged)); }
@@ -65,7 +64,7 @@ class RootPrivilege {
         errno = succeeded ? 0 : 1;
         if (!succeeded) {
             syslog(LOG_AUTH | LOG_ERR, failure, source_, line_);
-            errno = 1;  // syslog itself may have changed it
+            errno = 1;  // syslog may have changed it
         }
     }
 

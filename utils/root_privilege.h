@@ -5,9 +5,9 @@
 
 namespace TAVO::Utils {
 
-/// Loads a JSON file (LoadJsonFile) with root's effective ids, whatever ids the process has, and puts those back. An id
-/// that cannot be changed is logged under LOG_AUTH in the name of the caller's source and line, and does not stop the
-/// read; errno is left at 0 or 1.
+/// Loads a JSON file as LoadJsonFile does, with root's effective ids, and restores the ids. If an id cannot be changed,
+/// it logs that under LOG_AUTH with the caller's source and line, and reads the file all the same. errno is 0 or 1
+/// afterwards.
 bool LoadJsonFileAsRoot(const char *source, int line, const char *path, Json::Value &document);
 
 }  // namespace TAVO::Utils

@@ -18,7 +18,7 @@ namespace {
 
 constexpr char kSourceName[] = "utils";
 
-/// Libcurl's global state, for as long as one transfer. Declared before the handle, so that it is cleaned up after it.
+/// libcurl's global state during one transfer. Declare it before the handle, so that it is cleaned up after the handle.
 struct CurlGlobalState {
     CurlGlobalState() { curl_global_init(CURL_GLOBAL_ALL); }
     ~CurlGlobalState() { curl_global_cleanup(); }
@@ -26,7 +26,7 @@ struct CurlGlobalState {
     CurlGlobalState &operator=(const CurlGlobalState &) = delete;
 };
 
-/// Throws sso_err_resp with libcurl's text for a failure.
+/// Throws sso_err_resp with libcurl's text on failure.
 void Require(CURLcode result) {
     if (result != CURLE_OK) {
         throw sso_err_resp(curl_easy_strerror(result));
@@ -41,7 +41,7 @@ void Transfer(const std::string &url, const std::string *form, std::string &resp
     if (!handle) {
         throw std::bad_alloc();
     }
-    // An address that libcurl refuses is told by the transfer.
+    // The transfer reports a URL that libcurl rejects.
     curl_easy_setopt(handle.get(), CURLOPT_URL, url.c_str());
     if (form != nullptr) {
         Require(curl_easy_setopt(handle.get(), CURLOPT_POSTFIELDS, form->c_str()));
@@ -56,7 +56,7 @@ void Transfer(const std::string &url, const std::string *form, std::string &resp
     Require(curl_easy_perform(handle.get()));
 }
 
-/// Zeroed memory from calloc, released on every way out; null when there is none.
+/// Zeroed memory from calloc; null if memory runs out.
 std::shared_ptr<char> AllocateText(std::size_t size) { return {static_cast<char *>(std::calloc(size, 1)), std::free}; }
 
 }  // namespace
@@ -88,7 +88,7 @@ std::string MD5Digest(std::string data) {
     unsigned char digest[MD5_DIGEST_LENGTH];
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
-    // MD5 here is no protection: it only ties the state to the nonce without showing the nonce in it.
+    // MD5 protects nothing here: it ties the state to the nonce.
     if (MD5(reinterpret_cast<const unsigned char *>(data.data()), data.size(), digest) == nullptr) {
         syslog(LOG_ERR, "%s:%d MD5 digest failed %m", SOURCE_LINE);
         return {};

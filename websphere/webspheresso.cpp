@@ -30,7 +30,7 @@ WebSphereSSOClient::WebSphereSSOClient() {
     if (!Utils::LoadJsonFileAsRoot(SOURCE_LINE, kConfigurationFile, file)) {
         return;
     }
-    // No key for `enable`: for this provider the profile alone decides, and the flag stays false.
+    // The file has no key for `enable`: the profile alone decides.
     Utils::ReadMembers(file, {
                                  {"websphere_wellknown", wellknownEndpoint},
                                  {"websphere_client_id", clientID},
@@ -76,7 +76,7 @@ void WebSphereSSOClient::VerifyIDToken() {
     CheckAudience(claims, clientID);
     const EVP_MD *digest = ChooseDigest(header, kAlgorithms);
 
-    // JwtHMACVerify takes its key as base64 text; the key is the secret's own bytes.
+    // JwtHMACVerify takes its key as base64 text.
     std::string key = EncodeBase64(clientSecret);
     const Utils::CleanseTextOnExit cleanse(key);
     jwt.JwtHMACVerify(key, digest);
