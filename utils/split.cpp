@@ -1,16 +1,28 @@
 #include "utils/split.h"
 
-#include <algorithm>
 #include <boost/algorithm/string/classification.hpp>
 #include <boost/algorithm/string/split.hpp>
 
 namespace TAVO::Utils {
 
+namespace {
+
+/// Counts to `most` at the most.
+std::size_t Count(char separator, const std::string &text, std::size_t most) {
+    std::size_t count = 0;
+    for (std::size_t at = text.find(separator); at != std::string::npos && count < most;
+         at = text.find(separator, at + 1)) {
+        ++count;
+    }
+    return count;
+}
+
+}  // namespace
+
 std::vector<std::string> SplitInto(std::size_t pieces, const std::string &text, char separator) {
     std::vector<std::string> result;
     // Counted first: the pieces of 30 MB of separators would take gigabytes.
-    const auto separators = static_cast<std::size_t>(std::count(text.begin(), text.end(), separator));
-    if (separators + 1 == pieces) {
+    if (Count(separator, text, pieces) == pieces - 1) {
         boost::split(result, text, boost::is_any_of(std::string(1, separator)));
     }
     return result;

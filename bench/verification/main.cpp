@@ -23,8 +23,8 @@ struct Subject {
     bool (*verify)(const SignedToken &);
 };
 constexpr Subject kSubjects[] = {
-    {"ours", VerifyByLibrary},  {"floor", VerifyByFloor},         {"cjose", VerifyByCjose},
-    {"libjwt", VerifyByLibjwt}, {"scitokens", VerifyBySciTokens},
+    {"ours", VerifyByLibrary},  {"floor", VerifyByFloor},     {"cjose", VerifyByCjose},
+    {"libjwt", VerifyByLibjwt}, {"libjwt3", VerifyByLibjwt3}, {"scitokens", VerifyBySciTokens},
 };
 
 /// SciTokens knows, of these, RS256 alone.
