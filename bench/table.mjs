@@ -41,10 +41,10 @@ function layOutRows(rows) {
 function layOutTargets(targets) {
     return layOut([
         ['target', '', 'limit', 'this run'],
-        ...targets.map(({target, most, below, value, held}) => [
+        ...targets.map(({target, most, value, held}) => [
             target,
             held ? 'held' : 'missed',
-            most === undefined ? `< ${below}` : `≤ ${most}`,
+            `≤ ${most}`,
             format(value),
         ]),
     ], 2);

@@ -4,7 +4,6 @@
 #include <cstring>
 #include <memory>
 #include <new>
-#include <utility>
 
 #include "utils/cleanse.h"
 
@@ -54,7 +53,10 @@ bool Parse(std::string_view text, Json::Value &document) {
 bool ParseJson(std::string_view text, Json::Value &document) {
     Json::Value parsed;
     const bool isJson = Parse(text, parsed);
-    document = isJson ? std::move(parsed) : Json::Value();
+    if (!isJson) {
+        parsed = Json::Value();
+    }
+    document.swap(parsed);
     return isJson;
 }
 

@@ -13,8 +13,7 @@ bool VerifyByLibrary(const SignedToken &token) {
     const Json::Value claims = jwt.GetBody();
     try {
         if (token.algorithm.kind == Kind::kHMAC) {
-            std::string secret = token.secret;
-            jwt.JwtHMACVerify(secret, token.algorithm.digest());
+            jwt.JwtHMACVerify(token.secret, token.algorithm.digest());
             return true;
         }
         Json::Value jwk;

@@ -23,9 +23,9 @@ struct Algorithm {
 struct SignedToken {
     Algorithm algorithm;
     std::string compact;
-    std::string jwk;     // the public key, or the secret, as a JSON Web Key (RFC 7517)
-    std::string secret;  // in base64, as the library takes it
-    std::string key;     // the public key in PEM, or the secret's bytes, for those who know no JWK
+    std::string jwk;             // the public key, or the secret, as a JSON Web Key (RFC 7517)
+    mutable std::string secret;  // in base64; the library takes it by reference to a string that is not const
+    std::string key;             // the public key in PEM, or the secret's bytes, for those who know no JWK
 };
 
 /// A token whose claims have about that many bytes of JSON.
