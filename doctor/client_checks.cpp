@@ -76,7 +76,7 @@ class KeyCheck {
             CheckEmpty(key);
             return;
         }
-        if (boost::trim_copy(value_) != value_ || Frontend::HasControlCharacter(value_)) {
+        if (boost::trim_copy(value_) != value_ || !Frontend::IsPrintable(value_)) {
             Finding("has blanks around it or control characters in it",
                     "take them out: the text is used as it stands, letter by letter");
             return;

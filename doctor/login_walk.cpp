@@ -1,5 +1,6 @@
 #include "doctor/login_walk.h"
 
+#include <jwt/jwt.h>
 #include <termios.h>
 #include <unistd.h>
 
@@ -161,7 +162,7 @@ class LoginWalk {
         Json::Value sent;
         sent["nonce"] = TAVO::SSO::MD5Digest(nonce);
         try {
-            Frontend::RequireNonce(token, sent);
+            Frontend::RequireNonce(TAVO::JWT::Jwt(token).GetBody(), sent);
             report_.Good("login.nonce", "nonce", "the token is of this login");
         } catch (const std::exception &) {
             report_.Finding("login.nonce", "nonce", "the token is not of this login",

@@ -51,55 +51,9 @@ Json::Value ToJson(const Check &check) {
     return json;
 }
 
-struct Character {
-    std::size_t length = 0;  // in bytes; 0 where it is none
-    char32_t codePoint = 0;
-};
-
-/// The one that begins there (RFC 3629, section 3).
-Character CharacterAt(const std::string &text, std::size_t begin) {
-    constexpr char32_t kLeast[] = {0, 0, 0x80, 0x800, 0x10000};  // that needs so many bytes
-    const auto byteAt = [&](std::size_t i) {
-        return i < text.size() ? static_cast<unsigned char>(text[i]) : static_cast<unsigned char>(0);
-    };
-    const unsigned char first = byteAt(begin);
-    const std::size_t length = first < 0x80 ? 1 : first < 0xc0 ? 0 : first < 0xe0 ? 2 : first < 0xf0 ? 3 : 4;
-    if (length < 2) {
-        return {length, first};
-    }
-    char32_t codePoint = first & (0xffU >> (length + 1));
-    for (std::size_t i = 1; i < length; ++i) {
-        if ((byteAt(begin + i) & 0xc0) != 0x80) {
-            return {};
-        }
-        codePoint = codePoint << 6 | (byteAt(begin + i) & 0x3fU);
-    }
-    const bool isOne = codePoint >= kLeast[length] && codePoint <= 0x10ffff && (codePoint & 0x1ff800) != 0xd800;
-    return isOne ? Character{length, codePoint} : Character{};
-}
-
-/// Also those that break a line or turn its direction: what is behind them would be read as something else.
-bool IsObeyed(char32_t c) {
-    return c < 0x20 || (c >= 0x7f && c < 0xa0) || (c >= 0x2028 && c <= 0x202e) || (c >= 0x2066 && c <= 0x2069);
-}
-
 }  // namespace
 
-std::string Printable(const std::string &text) {
-    std::string printable;
-    for (std::size_t i = 0; i < text.size();) {
-        const Character character = CharacterAt(text, i);
-        if (character.length == 0) {
-            printable += "\xef\xbf\xbd";  // U+FFFD
-        } else if (IsObeyed(character.codePoint)) {
-            printable += ' ';
-        } else {
-            printable.append(text, i, character.length);
-        }
-        i += std::max<std::size_t>(character.length, 1);
-    }
-    return printable;
-}
+std::string Printable(const std::string &text) { return Frontend::OneLine(text, std::string::npos); }
 
 std::string Quoted(const std::string &text) { return '"' + text + '"'; }
 
@@ -130,7 +84,7 @@ std::string Report::Redact(std::string text) const {
         boost::replace_all(text, secret, kHidden);
     }
     // Cut last: what is left of a secret that was cut would not be found.
-    return Frontend::OneLine(Printable(text), kLongestText);
+    return Frontend::OneLine(text, kLongestText);
 }
 
 void Report::Section(const std::string &title) {

@@ -2,7 +2,7 @@
 #include <sso/sso.h>
 
 #include "frontend/cgi.h"
-#include "frontend/failure.h"
+#include "frontend/program.h"
 #include "frontend/session.h"
 #include "frontend/text.h"
 
@@ -13,19 +13,22 @@ void GoAndSignIn(Frontend::Answer &answer) {
     answer.Redirect("/index.cgi?origin=" + TAVO::SSO::URLEncode(origin));
 }
 
+std::string Entry(const std::string &term, const std::string &text) {
+    return text.empty() ? "" : "<dt>" + term + "</dt>\n<dd>" + Frontend::EscapeHtml(text) + "</dd>\n";
+}
+
 void ShowAccount(Frontend::Answer &answer) {
-    const auto session = Frontend::FindSession(Frontend::Variable("HTTP_COOKIE"));
+    const auto session = Frontend::FindSession(answer, Frontend::Variable("HTTP_COOKIE"));
     if (!session) {
         GoAndSignIn(answer);
         return;
     }
     answer.Page("200 OK", "Your account",
-                "<h1>Your account</h1>\n<dl>\n<dt>Name on this device</dt>\n<dd>" +
-                    Frontend::EscapeHtml(session->user) + "</dd>\n<dt>Signed in through</dt>\n<dd>" +
-                    Frontend::EscapeHtml(session->profile) +
-                    "</dd>\n</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
+                "<h1>Your account</h1>\n<dl>\n" + Entry("Name", session->displayName) +
+                    Entry("Name on this device", session->user) + Entry("Signed in through", session->profile) +
+                    "</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
 }
 
 }  // namespace
 
-int main() { return Frontend::Serve(ShowAccount); }
+int main() { return Frontend::Serve("GET, HEAD", ShowAccount); }

@@ -14,6 +14,7 @@ constexpr char kEveryAnswer[] =
     "Cache-Control: no-store\n"
     "Referrer-Policy: no-referrer\n"
     "X-Content-Type-Options: nosniff\n"
+    "Strict-Transport-Security: max-age=31536000\n"
     "Content-Security-Policy: default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; "
     "base-uri 'none'; form-action 'self'; frame-ancestors 'none'\n";
 
@@ -38,8 +39,8 @@ void Answer::SetCookie(const std::string &name, const std::string &value, const 
 void Answer::ExpireCookie(const std::string &name) { SetCookie(name, "", "; Max-Age=0"); }
 
 void Answer::AddHeader(const std::string &name, const std::string &value) {
-    if (HasControlCharacter(value)) {
-        throw std::invalid_argument("A header would not stay on one line.");
+    if (!IsPrintable(value)) {
+        throw std::invalid_argument("A header must be one printable line.");
     }
     head += name + ": " + value + "\n";
 }

@@ -19,7 +19,10 @@ Parameters ParseQuery(const std::string &query);
 /// The value of a parameter that is given exactly once: of two values, one would be checked and the other one used.
 std::optional<std::string> OnlyValue(const Parameters &parameters, const std::string &name);
 
-/// A cookie out of the request's Cookie header, where it is there exactly once.
+/// Whether the request's Cookie header has a cookie of that name.
+bool HasCookie(const std::string &header, const std::string &name);
+
+/// The value of a cookie that the request's Cookie header has exactly once.
 std::optional<std::string> FindCookie(const std::string &header, const std::string &name);
 
 }  // namespace Frontend

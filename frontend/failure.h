@@ -5,8 +5,6 @@
 #include <stdexcept>
 #include <string>
 
-#include "frontend/answer.h"
-
 namespace Frontend {
 
 /// The front end itself declines; the text is meant for the user.
@@ -21,10 +19,6 @@ std::string ReasonOf(const std::exception &failure);
 
 /// The error that a provider names, in its own words (RFC 6749, sections 4.1.2.1 and 5.2).
 std::string ProviderError(const std::string &error, const std::string &description);
-
-/// The main function of a CGI program: whatever fails in `serve` is one line of log and a relay page with a reason. The
-/// program ends by SIGALRM if it runs too long, as the library waits for the provider without a limit.
-int Serve(void (*serve)(Answer &));
 
 }  // namespace Frontend
 

@@ -2,16 +2,16 @@
 #include <sso/sso.h>
 
 #include "frontend/cgi.h"
-#include "frontend/failure.h"
 #include "frontend/profile.h"
+#include "frontend/program.h"
 #include "frontend/session.h"
 #include "frontend/text.h"
 
 namespace {
 
-void ShowUser(Frontend::Answer &answer, const std::string &user) {
+void ShowUser(Frontend::Answer &answer, const Frontend::Session &session) {
     answer.Page("200 OK", "Signed in",
-                "<h1>Welcome</h1>\n<p>You are signed in as <strong>" + Frontend::EscapeHtml(user) +
+                "<h1>Welcome</h1>\n<p>You are signed in as <strong>" + Frontend::EscapeHtml(session.user) +
                     "</strong>.</p>\n<p><a href=\"/account.cgi\">Your account</a></p>\n"
                     "<form method=\"post\" action=\"/webman/sso/logout.cgi\">\n"
                     "<button type=\"submit\">Sign out</button>\n</form>\n");
@@ -19,14 +19,13 @@ void ShowUser(Frontend::Answer &answer, const std::string &user) {
 
 void ShowSignIn(Frontend::Answer &answer, const std::string &origin) {
     answer.Page("200 OK", "Sign in",
-                "<h1>Sign in</h1>\n<p>Your organisation knows you already: sign in there, with the name and password "
-                "that you use every day.</p>\n<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=" +
-                    Frontend::EscapeHtml(TAVO::SSO::URLEncode(origin)) + "\">Sign in with single sign-on</a></p>\n");
+                "<h1>Sign in</h1>\n<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=" +
+                    Frontend::EscapeHtml(TAVO::SSO::URLEncode(origin)) +
+                    "\">Sign in with your organisation account</a></p>\n");
 }
 
-void ShowThatNobodyCanSignIn(Frontend::Answer &answer, const std::string &why) {
-    answer.Page("200 OK", "Sign in",
-                "<h1>Sign in</h1>\n<p>" + why + "</p>\n<p>Please ask your administrator for help.</p>\n");
+void ShowThatSignInIsUnavailable(Frontend::Answer &answer, const std::string &why) {
+    answer.Page("200 OK", "Sign in", "<h1>Sign in</h1>\n<p>" + why + "</p>\n<p>Contact your administrator.</p>\n");
 }
 
 void ShowWayToSignIn(Frontend::Answer &answer) {
@@ -36,17 +35,17 @@ void ShowWayToSignIn(Frontend::Answer &answer) {
             ShowSignIn(answer, Frontend::SafeOrigin(Frontend::OnlyValue(parameters, "origin").value_or("")));
             break;
         case Frontend::SetUp::kIncomplete:
-            ShowThatNobodyCanSignIn(answer, "Single sign-on is not completely set up on this device.");
+            ShowThatSignInIsUnavailable(answer, "Single sign-on is not completely set up on this device.");
             break;
         case Frontend::SetUp::kOff:
-            ShowThatNobodyCanSignIn(answer, "Single sign-on is switched off on this device.");
+            ShowThatSignInIsUnavailable(answer, "Single sign-on is switched off on this device.");
             break;
     }
 }
 
 void ShowStartPage(Frontend::Answer &answer) {
-    if (const auto session = Frontend::FindSession(Frontend::Variable("HTTP_COOKIE"))) {
-        ShowUser(answer, session->user);
+    if (const auto session = Frontend::FindSession(answer, Frontend::Variable("HTTP_COOKIE"))) {
+        ShowUser(answer, *session);
     } else {
         ShowWayToSignIn(answer);
     }
@@ -54,4 +53,4 @@ void ShowStartPage(Frontend::Answer &answer) {
 
 }  // namespace
 
-int main() { return Frontend::Serve(ShowStartPage); }
+int main() { return Frontend::Serve("GET, HEAD", ShowStartPage); }

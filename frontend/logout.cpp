@@ -3,7 +3,7 @@
 #include <sso/supported_profiles.h>
 
 #include "frontend/cgi.h"
-#include "frontend/failure.h"
+#include "frontend/program.h"
 #include "frontend/session.h"
 #include "frontend/text.h"
 
@@ -34,16 +34,22 @@ void LeaveForProvider(Frontend::Answer &answer, const std::string &address) {
                     Frontend::EscapeHtml(address) + "\">Sign out of your organisation too</a></p>\n");
 }
 
-void RefuseMethod(Frontend::Answer &answer) {
-    answer.AddHeader("Allow", "POST");
-    answer.Page("405 Method Not Allowed", "Sign out",
-                "<h1>Sign out</h1>\n<p>Please use the button on the <a href=\"/index.cgi\">start page</a>.</p>\n");
+// Every browser sends one of these headers with a form, and no other site can forge them.
+bool ComesFromThisSite() {
+    const std::string origin = Frontend::Variable("HTTP_ORIGIN");
+    return Frontend::Variable("HTTP_SEC_FETCH_SITE") == "same-origin" ||
+           (!origin.empty() && origin == "https://" + Frontend::Variable("HTTP_HOST"));
 }
 
-// No other site can end a session: the cookie is SameSite, and a foreign form is sent without it.
+void RefuseForeignRequest(Frontend::Answer &answer) {
+    answer.Page(
+        "403 Forbidden", "Sign out",
+        "<h1>Sign out</h1>\n<p>To sign out, use the button on the <a href=\"/index.cgi\">start page</a>.</p>\n");
+}
+
 void SignOut(Frontend::Answer &answer) {
-    if (Frontend::Variable("REQUEST_METHOD") != "POST") {
-        RefuseMethod(answer);
+    if (!ComesFromThisSite()) {
+        RefuseForeignRequest(answer);
         return;
     }
     const auto session = Frontend::EndSession(answer, Frontend::Variable("HTTP_COOKIE"));
@@ -57,4 +63,4 @@ void SignOut(Frontend::Answer &answer) {
 
 }  // namespace
 
-int main() { return Frontend::Serve(SignOut); }
+int main() { return Frontend::Serve("POST", SignOut); }

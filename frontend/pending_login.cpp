@@ -5,6 +5,7 @@
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
 #include "frontend/private_folder.h"
+#include "frontend/profile.h"
 #include "frontend/text.h"
 #include "platform/platform.h"
 
@@ -14,9 +15,41 @@ namespace {
 
 constexpr char kFolder[] = "logins";
 constexpr int kSeconds = 600;
+constexpr char kFormat[] = "login 1";
+constexpr std::size_t kMostPending = 1000;
 constexpr std::size_t kDecodedState = 1024;
+constexpr char kCookieSlots[] = "0123456789abcdef";
 
-std::string CookieName(const std::string &login) { return "__Host-login-" + login.substr(0, 8); }
+std::string CookieName(char slot) { return std::string("__Host-login-") + slot; }
+
+/// A cookie that the browser does not have, so that logins in other tabs go on. Chosen by the login's random name: tabs
+/// that start at once seldom choose the same. With all names in use, one of them is replaced.
+std::string FreeCookieName(const std::string &cookies, const std::string &login) {
+    const std::string slots = kCookieSlots;
+    const std::size_t first = slots.find(login.front());
+    for (std::size_t i = 0; i < slots.size(); ++i) {
+        const std::string name = CookieName(slots[(first + i) % slots.size()]);
+        if (!HasCookie(cookies, name)) {
+            return name;
+        }
+    }
+    return CookieName(login.front());
+}
+
+/// The cookie that has the login's value; empty if this browser did not start it.
+std::string CookieOf(const std::string &cookies, const std::string &login) {
+    for (const char slot : std::string(kCookieSlots)) {
+        if (FindCookie(cookies, CookieName(slot)) == login) {
+            return CookieName(slot);
+        }
+    }
+    return "";
+}
+
+std::size_t MostPending() {
+    const std::string configured = Variable("FRONTEND_PENDING_LOGINS");
+    return configured.empty() ? kMostPending : std::stoul(configured);
+}
 
 std::string StateIn(const std::string &address) {
     const Parameters parameters = ParseQuery(address.substr(address.find('?') + 1));
@@ -25,34 +58,46 @@ std::string StateIn(const std::string &address) {
 
 }  // namespace
 
-std::string StartLogin(Answer &answer, const std::function<std::string(const Json::Value &)> &makeAddress) {
+std::string StartLogin(Answer &answer, const std::string &cookies, const std::string &profile,
+                       const std::function<std::string(const Json::Value &)> &makeAddress) {
     const std::string login = PrivateFolder::NewName();
     Json::Value state;
     state["origin"] = SafeOrigin(answer.origin);
     state["csrf"] = login;
     std::string address = makeAddress(state);
-    PrivateFolder(kFolder, kSeconds).Keep(login, StateIn(address));
-    answer.SetCookie(CookieName(login), login, "; Max-Age=" + std::to_string(kSeconds));
+    Json::Value started;
+    started["format"] = kFormat;
+    started["state"] = StateIn(address);
+    started["profile"] = profile;
+    if (!PrivateFolder(kFolder, kSeconds, MostPending()).Keep(login, WriteCompact(started))) {
+        throw Refusal("Too many sign-ins are under way on this device.");
+    }
+    answer.SetCookie(FreeCookieName(cookies, login), login, "; Max-Age=" + std::to_string(kSeconds));
     return address;
 }
 
 Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state) {
     Json::Value returned = DecodeState(state);
     const std::string login = StringMember(returned, "csrf");
-    if (login.empty() || FindCookie(cookies, CookieName(login)) != login) {
+    const std::string cookie = CookieOf(cookies, login);
+    if (login.empty() || cookie.empty()) {
         throw Refusal("This sign-in was not started in this browser.");
     }
-    answer.ExpireCookie(CookieName(login));
-    const std::optional<std::string> started = PrivateFolder(kFolder, kSeconds).Take(login);
-    if (!started) {
+    answer.ExpireCookie(cookie);
+    const Json::Value started = ParseObject(PrivateFolder(kFolder, kSeconds).Take(login).value_or(""));
+    if (StringMember(started, "format") != kFormat) {
         throw Refusal("This sign-in took too long, or was already completed.");
     }
-    // The browser's owner can write a state around a value that is theirs: with the digest of another login's nonce,
-    // say.
-    if (state != *started) {
+    // The browser's owner can write another state around their own value: with the digest of another login's nonce, for
+    // example.
+    if (state != StringMember(started, "state")) {
         throw Refusal("This sign-in was changed on its way.");
     }
     answer.origin = StringMember(returned, "origin");
+    // The code must not go to another provider, with that provider's client secret.
+    if (StringMember(started, "profile") != ProfileInForce()) {
+        throw Refusal("The settings of this device were changed during this sign-in.");
+    }
     return returned;
 }
 

@@ -9,25 +9,27 @@
 #include "frontend/answer.h"
 
 /*
- * Ties a login to the browser that started it. Without that, anyone could send a victim's browser to the return page
- * with a code of their own, and the victim would work, unknowingly, in the attacker's account.
+ * Ties a login to the browser that started it. Otherwise anyone could send a victim's browser to the return page with a
+ * code of their own, and the victim would unknowingly work in the attacker's account.
  *
- * A random value goes to the provider in the state and to the browser in a cookie; the server remembers it too, so that
- * it serves once and not for long. Each login has a cookie of its own, since two tabs may be signing in at once.
+ * A random value goes to the provider in the state and to the browser in a cookie. The server remembers it for one use
+ * and for ten minutes. Each login has a cookie of its own, since several tabs may be signing in at once; there are 16
+ * names for these cookies, so that another site that starts logins cannot fill the browser's requests with them.
  */
 namespace Frontend {
 
-/// Starts a login, to come back to the answer's origin. `makeAddress` makes the provider's address from the state's
-/// object, as `GetAccessTokenReqURI` of the clients does; gives that address. The state in it is remembered as it
-/// stands.
-std::string StartLogin(Answer &answer, const std::function<std::string(const Json::Value &)> &makeAddress);
+/// Starts a login under a profile, to return to the answer's origin. `makeAddress` makes the provider's URL from the
+/// state's object, as `GetAccessTokenReqURI` of the clients does. Returns that URL. Throws `Refusal` if too many logins
+/// are pending: FRONTEND_PENDING_LOGINS of the environment, or 1,000.
+std::string StartLogin(Answer &answer, const std::string &cookies, const std::string &profile,
+                       const std::function<std::string(const Json::Value &)> &makeAddress);
 
-/// Throws `Refusal` unless this browser started the login that `state` (as it came back) belongs to, not long ago, has
-/// not come back from it before, and brings the state unchanged. Gives the state's object, and its origin to the
-/// answer.
+/// Throws `Refusal` unless this browser started the login that `state` belongs to, within the last ten minutes, has not
+/// completed it before, returns the state unchanged, and the login's profile is still in force. Returns the state's
+/// object, and sets the answer's origin.
 Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state);
 
-/// The JSON object that the state holds, null where it holds none.
+/// The JSON object in the state; null if there is none.
 Json::Value DecodeState(const std::string &state);
 
 }  // namespace Frontend

@@ -2,23 +2,32 @@
 
 #include <dirent.h>
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
+#include <cstring>
 #include <memory>
 #include <system_error>
+#include <utility>
 #include <vector>
+
+#include "frontend/text.h"
 
 namespace Frontend {
 
 namespace {
 
-constexpr char kFrontEndFolder[] = "/usr/tavo/var/frontend";
+constexpr char kSystemFolder[] = "/usr";
 constexpr std::size_t kRandomBytes = 16;
 constexpr char kHexDigits[] = "0123456789abcdef";
+constexpr char kUnfinished[] = ".new";
+constexpr char kCounter[] = "counter";
+constexpr std::time_t kSecondsBetweenSweeps = 60;
+constexpr std::size_t kLongestText = 16384;
 
 [[noreturn]] void ThrowSystemError(const char *what) { throw std::system_error(errno, std::generic_category(), what); }
 
@@ -26,27 +35,52 @@ bool IsName(const std::string &name) {
     return name.size() == 2 * kRandomBytes && name.find_first_not_of(kHexDigits) == std::string::npos;
 }
 
-void MakeFolder(const std::string &path) {
-    if (mkdir(path.c_str(), 0700) != 0 && errno != EEXIST) {
-        ThrowSystemError("The front end's folder cannot be made");
-    }
-}
-
-int OpenFolder(const std::string &path) {
-    MakeFolder(kFrontEndFolder);
-    MakeFolder(path);
-    return open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC);
-}
-
-void RefuseUnlessPrivate(const Descriptor &folder) {
-    struct stat status;
-    if (fstat(folder.Number(), &status) != 0) {
+struct stat StatusOf(const Descriptor &file) {
+    struct stat status {};
+    if (fstat(file.Number(), &status) != 0) {
         ThrowSystemError("The front end's folder cannot be examined");
     }
+    return status;
+}
+
+Descriptor OpenIn(const Descriptor &parent, const char *name) {
+    return {openat(parent.Number(), name, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC),
+            "The front end's folder cannot be opened"};
+}
+
+/// A folder on the way: only root or this user can put something else in its place.
+Descriptor OpenTrusted(const Descriptor &parent, const char *name) {
+    Descriptor folder = OpenIn(parent, name);
+    const struct stat status = StatusOf(folder);
+    if ((status.st_uid != 0 && status.st_uid != geteuid()) || (status.st_mode & 022) != 0) {
+        errno = EPERM;
+        ThrowSystemError("Another user can change the path to the front end's folder");
+    }
+    return folder;
+}
+
+Descriptor OpenPrivate(const Descriptor &parent, const char *name) {
+    if (mkdirat(parent.Number(), name, 0700) != 0 && errno != EEXIST) {
+        ThrowSystemError("The front end's folder cannot be made");
+    }
+    Descriptor folder = OpenIn(parent, name);
+    const struct stat status = StatusOf(folder);
     if (status.st_uid != geteuid() || (status.st_mode & 077) != 0) {
         errno = EPERM;
         ThrowSystemError("The front end's folder is not private");
     }
+    return folder;
+}
+
+/// The folder `name` in /usr/tavo/var/frontend.
+Descriptor OpenFolder(const char *name) {
+    const Descriptor system(open(kSystemFolder, O_RDONLY | O_DIRECTORY | O_CLOEXEC), "/usr cannot be opened");
+    return OpenPrivate(OpenPrivate(OpenTrusted(OpenTrusted(system, "tavo"), "var"), "frontend"), name);
+}
+
+/// Whether a file is one of ours: what another user has put or linked here is not.
+bool IsOwnFile(const struct stat &status) {
+    return S_ISREG(status.st_mode) && status.st_uid == geteuid() && (status.st_mode & 077) == 0;
 }
 
 void WriteAll(const Descriptor &file, const std::string &text) {
@@ -67,8 +101,18 @@ std::string ReadAll(const Descriptor &file) {
             ThrowSystemError("The front end's file cannot be read");
         }
         text.append(chunk, static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
+        if (text.size() > kLongestText) {
+            errno = EPERM;
+            ThrowSystemError("A file in the front end's folder is too long");
+        }
     }
     return text;
+}
+
+/// Whether a file has not expired. One dated in the future never would: it has.
+bool IsAlive(const struct stat &status, std::time_t lifetime) {
+    const std::time_t now = std::time(nullptr);
+    return status.st_mtime <= now && now - status.st_mtime <= lifetime;
 }
 
 struct CloseDirectory {
@@ -83,7 +127,7 @@ std::vector<std::string> NamesIn(const Descriptor &folder) {
     }
     std::vector<std::string> names;
     while (const dirent *entry = readdir(directory.get())) {
-        if (IsName(entry->d_name)) {
+        if (entry->d_type != DT_DIR && std::strcmp(entry->d_name, kCounter) != 0) {
             names.emplace_back(entry->d_name);
         }
     }
@@ -98,13 +142,16 @@ Descriptor::Descriptor(int opened, const char *what) : number(opened) {
     }
 }
 
-Descriptor::~Descriptor() { close(number); }
+Descriptor::Descriptor(Descriptor &&other) noexcept : number(std::exchange(other.number, -1)) {}
 
-PrivateFolder::PrivateFolder(const char *name, std::time_t seconds)
-    : folder(OpenFolder(std::string(kFrontEndFolder) + "/" + name), "The front end's folder cannot be opened"),
-      lifetime(seconds) {
-    RefuseUnlessPrivate(folder);
+Descriptor::~Descriptor() {
+    if (number >= 0) {
+        close(number);
+    }
 }
+
+PrivateFolder::PrivateFolder(const char *name, std::time_t seconds, std::size_t most)
+    : folder(OpenFolder(name)), lifetime(seconds), capacity(most) {}
 
 std::string PrivateFolder::NewName() {
     unsigned char bytes[kRandomBytes];
@@ -119,43 +166,85 @@ std::string PrivateFolder::NewName() {
     return name;
 }
 
-void PrivateFolder::Keep(const std::string &name, const std::string &text) {
-    Sweep();
+bool PrivateFolder::Keep(const std::string &name, const std::string &text) {
+    if (!CountOneMore()) {
+        return false;
+    }
+    const std::string unfinished = name + kUnfinished;
     const Descriptor file(
-        openat(folder.Number(), name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600),
+        openat(folder.Number(), unfinished.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600),
         "The front end's file cannot be made");
     WriteAll(file, text);
+    // A link does not replace a file, as renaming would.
+    const bool isKept =
+        fsync(file.Number()) == 0 && linkat(folder.Number(), unfinished.c_str(), folder.Number(), name.c_str(), 0) == 0;
+    const int error = errno;
+    unlinkat(folder.Number(), unfinished.c_str(), 0);
+    if (!isKept) {
+        errno = error;
+        ThrowSystemError("The front end's file cannot be kept");
+    }
+    return true;
 }
 
 std::optional<std::string> PrivateFolder::Read(const std::string &name) {
-    if (!IsName(name) || !IsAlive(name)) {
+    if (!IsName(name)) {
         return std::nullopt;
     }
-    const int opened = openat(folder.Number(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC);
+    const int opened = openat(folder.Number(), name.c_str(), O_RDONLY | O_NONBLOCK | O_NOFOLLOW | O_CLOEXEC);
     if (opened < 0 && errno == ENOENT) {
         return std::nullopt;
     }
-    return ReadAll(Descriptor(opened, "The front end's file cannot be opened"));
+    const Descriptor file(opened, "The front end's file cannot be opened");
+    const struct stat status = StatusOf(file);
+    if (!IsOwnFile(status)) {
+        errno = EPERM;
+        ThrowSystemError("A file in the front end's folder is not private");
+    }
+    return IsAlive(status, lifetime) ? std::optional(ReadAll(file)) : std::nullopt;
 }
 
 std::optional<std::string> PrivateFolder::Take(const std::string &name) {
-    const std::optional<std::string> text = Read(name);
+    std::optional<std::string> text = Read(name);
     return text && unlinkat(folder.Number(), name.c_str(), 0) == 0 ? text : std::nullopt;
 }
 
-bool PrivateFolder::IsAlive(const std::string &name) {
-    struct stat status;
-    return fstatat(folder.Number(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
-           std::time(nullptr) - status.st_mtime <= lifetime;
+/// Counts in a file, which says when the folder was last swept, and how many texts it has had since.
+bool PrivateFolder::CountOneMore() {
+    const Descriptor counter(openat(folder.Number(), kCounter, O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0600),
+                             "The front end's counter cannot be opened");
+    if (flock(counter.Number(), LOCK_EX) != 0) {
+        ThrowSystemError("The front end's counter cannot be locked");
+    }
+    const Json::Value known = ParseObject(ReadAll(counter));
+    const std::time_t now = std::time(nullptr);
+    const std::time_t swept = known["swept"].isInt64() ? known["swept"].asInt64() : 0;
+    const bool isRecent = swept <= now && now - swept < kSecondsBetweenSweeps && known["count"].isUInt64();
+    const std::size_t count = isRecent ? known["count"].asUInt64() : Sweep();
+    const bool hasRoom = count < capacity;
+
+    Json::Value counted;
+    counted["swept"] = Json::Int64{isRecent ? swept : now};
+    counted["count"] = Json::UInt64{hasRoom ? count + 1 : count};
+    if (ftruncate(counter.Number(), 0) != 0 || lseek(counter.Number(), 0, SEEK_SET) != 0) {
+        ThrowSystemError("The front end's counter cannot be written");
+    }
+    WriteAll(counter, WriteCompact(counted));
+    return hasRoom;
 }
 
-// There is no daemon that would do it: whoever keeps something clears away what is too old.
-void PrivateFolder::Sweep() {
+/// Removes what has expired, also of programs that ended while they wrote. Returns how many files remain.
+std::size_t PrivateFolder::Sweep() {
+    std::size_t remaining = 0;
     for (const std::string &name : NamesIn(folder)) {
-        if (!IsAlive(name)) {
+        struct stat status {};
+        if (fstatat(folder.Number(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 && IsAlive(status, lifetime)) {
+            ++remaining;
+        } else {
             unlinkat(folder.Number(), name.c_str(), 0);
         }
     }
+    return remaining;
 }
 
 }  // namespace Frontend

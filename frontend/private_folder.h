@@ -1,7 +1,9 @@
 #ifndef TAVOSSO_FRONTEND_PRIVATE_FOLDER_H
 #define TAVOSSO_FRONTEND_PRIVATE_FOLDER_H
 
+#include <cstddef>
 #include <ctime>
+#include <limits>
 #include <optional>
 #include <string>
 
@@ -13,6 +15,7 @@ class Descriptor {
     /// Throws std::system_error, with `what` in its text, for a negative number.
     Descriptor(int opened, const char *what);
     ~Descriptor();
+    Descriptor(Descriptor &&other) noexcept;
     Descriptor(const Descriptor &) = delete;
     Descriptor &operator=(const Descriptor &) = delete;
     int Number() const { return number; }
@@ -22,30 +25,36 @@ class Descriptor {
 };
 
 /**
- * Short texts under random names, each in a file that only this user can read, for as long as they live. The name is
- * the secret: 128 bits from the system, given to one browser.
+ * Short texts under random names, each in a file that only this user can read, for a limited time. The name is the
+ * secret: 128 bits from the system, given to one browser.
  *
- * A folder that another user owns or may look into is refused. Throws std::system_error when the system refuses.
+ * Refuses a folder that another user owns or can read, and a path to it that another user than root can change. Throws
+ * std::system_error if the system refuses.
  */
 class PrivateFolder {
   public:
-    /// The folder `name` in the front end's own, made when missing; texts are forgotten `seconds` after they were kept.
-    PrivateFolder(const char *name, std::time_t seconds);
+    static constexpr std::size_t kUnlimited = std::numeric_limits<std::size_t>::max();
 
-    /// A name that nobody can guess.
+    /// The folder `name` in the front end's own, made if missing. Texts expire `seconds` after they were kept; at most
+    /// about `most` are kept at a time.
+    PrivateFolder(const char *name, std::time_t seconds, std::size_t most = kUnlimited);
+
+    /// A name that cannot be guessed.
     static std::string NewName();
-    /// Keeps a text under a new name.
-    void Keep(const std::string &name, const std::string &text);
+    /// Keeps a text under a new name. Returns false, and keeps nothing, if the folder is full. Expired texts are
+    /// removed and counted once a minute, not at each call.
+    [[nodiscard]] bool Keep(const std::string &name, const std::string &text);
     std::optional<std::string> Read(const std::string &name);
-    /// Reads a text and removes it. Of two that take the same, one gets it.
+    /// Reads a text and removes it. Of two that take the same text, one gets it.
     std::optional<std::string> Take(const std::string &name);
 
   private:
-    bool IsAlive(const std::string &name);
-    void Sweep();
+    bool CountOneMore();
+    std::size_t Sweep();
 
     Descriptor folder;
     std::time_t lifetime;
+    std::size_t capacity;
 };
 
 }  // namespace Frontend

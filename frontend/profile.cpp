@@ -37,4 +37,9 @@ std::string ProfileInForce() {
     return name;
 }
 
+bool IsInForce(const std::string &profile) {
+    TAVO::SSO::SSOProfile inForce;
+    return inForce.SSOIsEnable() && inForce.GetSSOProfile() == profile;
+}
+
 }  // namespace Frontend

@@ -17,6 +17,9 @@ SetUp HowFarSetUp();
 /// read, "profile not support." for one that is missing or unknown.
 std::string ProfileInForce();
 
+/// Whether single sign-on is on and this is its profile.
+bool IsInForce(const std::string &profile);
+
 }  // namespace Frontend
 
 #endif

@@ -10,16 +10,18 @@ namespace Frontend {
 
 /// Who is signed in, and through which profile.
 struct Session {
-    std::string user;
+    std::string user;         // the appliance's name; printable, never empty
+    std::string displayName;  // the provider's name for the user; may be empty
     std::string profile;
 };
 
-std::optional<Session> FindSession(const std::string &cookies);
+/// The browser's session. One that was started under a profile that is no longer in force ends here.
+std::optional<Session> FindSession(Answer &answer, const std::string &cookies);
 
-/// Ends the browser's session, and gives what it was.
+/// Ends the browser's session and returns it.
 std::optional<Session> EndSession(Answer &answer, const std::string &cookies);
 
-/// Starts one under a new name: one that was planted in the browser beforehand is worth nothing.
+/// Starts a session under a new name: one that was planted in the browser beforehand is worth nothing.
 void StartSession(Answer &answer, const std::string &cookies, const Session &session);
 
 }  // namespace Frontend

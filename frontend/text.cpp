@@ -1,6 +1,7 @@
 #include "frontend/text.h"
 
 #include <algorithm>
+#include <boost/locale/utf.hpp>
 #include <memory>
 
 namespace Frontend {
@@ -8,16 +9,33 @@ namespace Frontend {
 namespace {
 
 constexpr char kStartPage[] = "/index.cgi";
+constexpr char kReplacementCharacter[] = "\xef\xbf\xbd";  // U+FFFD
 // With the random value beside it, the longest origin must fit into the state: 721 bytes of compact JSON.
 constexpr std::size_t kLongestOrigin = 512;
 
-bool IsControl(char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7f; }
+using UTF8 = boost::locale::utf::utf_traits<char>;
+using boost::locale::utf::code_point;
 
-/// Of UTF-8: a byte within a character, not its first.
-bool ContinuesCharacter(char c) { return (static_cast<unsigned char>(c) & 0xc0) == 0x80; }
+bool IsPrintable(code_point c) {
+    const bool isControl = c < 0x20 || (c >= 0x7f && c < 0xa0);
+    const bool isSeparator = c == 0x2028 || c == 0x2029;
+    const bool isFormat = c == 0xad || c == 0x61c || (c >= 0x200b && c <= 0x200f) || (c >= 0x202a && c <= 0x202e) ||
+                          (c >= 0x2060 && c <= 0x206f) || c == 0xfeff || (c >= 0xe0000 && c <= 0xe007f);
+    return boost::locale::utf::is_valid_codepoint(c) && !isControl && !isSeparator && !isFormat;
+}
 
 // What a browser leaves as it is in a path and its query, and JSON in a string. A backslash would be a slash to it.
 bool IsPathCharacter(char c) { return c > 0x20 && c < 0x7f && c != '\\' && c != '"'; }
+
+/// Decodes the character at `at` and moves behind it, or behind one byte that does not begin a character.
+code_point NextCharacter(std::string::const_iterator &at, std::string::const_iterator end) {
+    const auto begin = at;
+    const code_point character = UTF8::decode(at, end);
+    if (!boost::locale::utf::is_valid_codepoint(character)) {
+        at = begin + 1;
+    }
+    return character;
+}
 
 }  // namespace
 
@@ -47,20 +65,30 @@ std::string EscapeHtml(const std::string &text) {
     return escaped;
 }
 
-bool HasControlCharacter(const std::string &text) { return std::any_of(text.begin(), text.end(), IsControl); }
-
-std::string OneLine(std::string text, std::size_t longest) {
-    if (text.size() > longest) {
-        std::size_t end = longest;
-        // No character has more than three bytes after its first.
-        while (end > longest - 3 && ContinuesCharacter(text[end])) {
-            --end;
+bool IsPrintable(const std::string &text) {
+    for (auto at = text.begin(); at != text.end();) {
+        if (!IsPrintable(NextCharacter(at, text.end()))) {
+            return false;
         }
-        text.resize(end);
     }
-    std::replace_if(text.begin(), text.end(), IsControl, ' ');
-    text.erase(text.find_last_not_of(' ') + 1);
-    return text;
+    return true;
+}
+
+std::string OneLine(const std::string &text, std::size_t longest) {
+    std::string line;
+    for (auto at = text.begin(); at != text.end();) {
+        const auto begin = at;
+        const code_point c = NextCharacter(at, text.end());
+        const std::string character = IsPrintable(c)                              ? std::string(begin, at)
+                                      : boost::locale::utf::is_valid_codepoint(c) ? " "
+                                                                                  : kReplacementCharacter;
+        if (line.size() + character.size() > longest) {
+            break;
+        }
+        line += character;
+    }
+    line.erase(line.find_last_not_of(' ') + 1);
+    return line;
 }
 
 std::string SafeOrigin(const std::string &origin) {

@@ -12,12 +12,15 @@ namespace Frontend {
 /// For element content and quoted attribute values.
 std::string EscapeHtml(const std::string &text);
 
-bool HasControlCharacter(const std::string &text);
+/// Whether a text is UTF-8 without characters that are invisible, break the line or change the direction of the text:
+/// controls (C0, DEL and C1), line and paragraph separators, and format characters.
+bool IsPrintable(const std::string &text);
 
 constexpr std::size_t kLongestLine = 200;
 
-/// On one line and of a sane length.
-std::string OneLine(std::string text, std::size_t longest = kLongestLine);
+/// One printable line for logs and pages: each character that is not printable becomes a blank, a byte that is not
+/// UTF-8 becomes U+FFFD, and the text is cut between two characters.
+std::string OneLine(const std::string &text, std::size_t longest = kLongestLine);
 
 /// The page to come back to after a login: `origin` where that is a path on this very site, else the start page.
 std::string SafeOrigin(const std::string &origin);

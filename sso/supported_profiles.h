@@ -20,11 +20,11 @@ inline bool IsSupported(const std::string &profile) {
 }
 
 /// Calls `use` with a new client of the profile, and returns its result. Throws sso_exception "profile not support."
-/// for any other name.
-template <typename Use>
+/// for any other name. A caller with its own client of Azure, derived from the library's, names it as `Azure`.
+template <typename Azure = AzureSSOClient, typename Use>
 auto WithClient(const std::string &profile, Use use) {
     if (profile == kAzureProfile) {
-        AzureSSOClient client;
+        Azure client;
         return use(client);
     }
     if (profile == kWebSphereProfile) {

@@ -6,6 +6,8 @@ const START_PAGE = '/index.cgi';
 const SIGN_IN = '/webman/sso/login.cgi?origin=';
 const LONGEST_REASON = 200;
 const LONGEST_ORIGIN = 512;
+// Controls, format characters and line separators could break the text or change its direction.
+const UNPRINTABLE = /[\p{Cc}\p{Cf}\p{Zl}\p{Zp}]/gu;
 // A path, not a host ("//") and nothing that a browser would turn into one (backslashes, control characters).
 const OWN_PATH = /^\/(?!\/)[!#-[\]-~]*$/;
 
@@ -23,7 +25,7 @@ function describeSuccess(origin) {
 }
 
 function describeFailure(reason, origin) {
-    const shown = reason.slice(0, LONGEST_REASON);
+    const shown = reason.slice(0, LONGEST_REASON).replace(UNPRINTABLE, ' ');
     return {
         headline: 'You could not be signed in',
         explanation: explain(shown),
@@ -37,7 +39,7 @@ function describeFailure(reason, origin) {
 function describeLogout() {
     return {
         headline: 'You are signed out',
-        explanation: 'You can close this window now, or sign in again from the start page.',
+        explanation: 'You have been signed out.',
         reason: '',
         action: 'Continue',
         onward: START_PAGE,

@@ -40,7 +40,7 @@ export function defineSignIns(stage) {
         const {keyboard} = page;
         await page.goto(stage.origin);
         await keyboard.press('Tab');
-        assert.equal(await page.evaluate(() => document.activeElement.textContent), 'Sign in with single sign-on');
+        assert.equal(await page.evaluate(() => document.activeElement.textContent), 'Sign in with your organisation account');
         await keyboard.press('Enter');
         await page.getByRole('textbox', {name: 'Name', exact: true}).waitFor();
         await keyboard.type('alice');

@@ -107,7 +107,7 @@ export class Visitor {
     }
 
     async followSignIn() {
-        await this.page.getByRole('link', {name: 'Sign in with single sign-on', exact: true}).click();
+        await this.page.getByRole('link', {name: 'Sign in with your organisation account', exact: true}).click();
         await this.seesHeading('Sign in to Example organisation');
     }
 

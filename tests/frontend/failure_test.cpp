@@ -1,9 +1,6 @@
 #include "frontend/failure.h"
 
 #include <gmock/gmock.h>
-#include <unistd.h>
-
-#include <csignal>
 
 using namespace Frontend;
 
@@ -35,16 +32,6 @@ TEST(Reason, IsCutBetweenTwoCharacters) {
     EXPECT_EQ(Reason(most + "xü"), most + "x");
     EXPECT_EQ(Reason(most + "ü"), most + "ü");
     EXPECT_EQ(Reason(most + "€"), most);
-    EXPECT_EQ(Reason(std::string(5000, '\x80')).size(), 197U) << "no character is that long";
-}
-
-TEST(AProgram, IsEndedByAnAlarmIfItRunsTooLong) {
-    const auto runTooLong = [](Answer &) {
-        if (alarm(0) > 0) {
-            raise(SIGALRM);
-        }
-    };
-    EXPECT_EXIT(Serve(runTooLong), ::testing::KilledBySignal(SIGALRM), "");
 }
 
 }  // namespace

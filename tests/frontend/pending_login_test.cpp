@@ -2,12 +2,17 @@
 
 #include <gmock/gmock.h>
 #include <sso/sso.h>
+#include <sys/stat.h>
 #include <utime.h>
 
+#include <cstdlib>
 #include <filesystem>
+#include <fstream>
+#include <set>
 
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
+#include "frontend/session.h"
 #include "frontend/text.h"
 #include "platform/platform.h"
 
@@ -27,18 +32,49 @@ std::string MakeAddress(Json::Value state) {
     return "https://provider.example/auth?scope=openid&state=" + TAVO::SSO::URLEncode(Encode(WriteCompact(state)));
 }
 
+constexpr char kTookTooLong[] = "This sign-in took too long, or was already completed.";
+const std::string kFolder = "/usr/tavo/var/frontend/logins/";
+
 class PendingLogin : public testing::Test {
   protected:
     PendingLogin() {
         std::filesystem::create_directory("/usr/tavo/var");
+        UseProfile("azure");
         answer.origin = "/files";
-        const std::string address = StartLogin(answer, MakeAddress);
-        state = OnlyValue(ParseQuery(address.substr(address.find('?') + 1)), "state").value();
+        state = Start();
     }
-    ~PendingLogin() override { std::filesystem::remove_all("/usr/tavo/var"); }
+    ~PendingLogin() override {
+        std::filesystem::remove_all("/usr/tavo/var");
+        std::filesystem::remove_all("/usr/tavo/etc");
+        unsetenv("FRONTEND_PENDING_LOGINS");
+    }
 
-    std::string Name() { return DecodeState(state)["csrf"].asString(); }
-    std::string Cookie() { return "__Host-login-" + Name().substr(0, 8) + "=" + Name(); }
+    static void UseProfile(const std::string &name, bool enable = true) {
+        std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
+        std::ofstream("/usr/tavo/etc/ssoclient/profile.conf")
+            << "{\"sso_enable\": " << std::boolalpha << enable << ", \"sso_profile\": \"" << name << "\"}";
+    }
+
+    /// Starts a login in a browser with these cookies. Returns its state.
+    std::string Start(const std::string &cookies = "") {
+        const std::string address = StartLogin(answer, cookies, "azure", MakeAddress);
+        return OnlyValue(ParseQuery(address.substr(address.find('?') + 1)), "state").value();
+    }
+
+    /// The Set-Cookie header of a login that starts in a browser with these cookies.
+    static std::string CookieHeader(const std::string &cookies) {
+        testing::internal::CaptureStdout();
+        Answer other;
+        StartLogin(other, cookies, "azure", MakeAddress);
+        other.Redirect("/");
+        const std::string output = testing::internal::GetCapturedStdout();
+        const std::size_t begin = output.find("Set-Cookie: ");
+        return output.substr(begin, output.find('\n', begin) - begin);
+    }
+
+    static std::string NameOf(const std::string &started) { return DecodeState(started)["csrf"].asString(); }
+    std::string Name() { return NameOf(state); }
+    std::string Cookie() { return "__Host-login-" + Name().substr(0, 1) + "=" + Name(); }
 
     std::string Refusal(const std::string &cookies, const std::string &returned) {
         try {
@@ -55,7 +91,7 @@ class PendingLogin : public testing::Test {
 
 TEST_F(PendingLogin, IsConcludedOnceByTheBrowserThatStartedIt) {
     EXPECT_EQ(Refusal(Cookie(), state), "");
-    EXPECT_EQ(Refusal(Cookie(), state), "This sign-in took too long, or was already completed.");
+    EXPECT_EQ(Refusal(Cookie(), state), kTookTooLong);
 }
 
 TEST_F(PendingLogin, GivesWhatTheStateHolds) {
@@ -67,15 +103,86 @@ TEST_F(PendingLogin, GivesWhatTheStateHolds) {
 TEST_F(PendingLogin, IsRefusedToAnotherBrowserAndStaysPending) {
     const std::string reason = "This sign-in was not started in this browser.";
     EXPECT_EQ(Refusal("", state), reason);
-    EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 8) + "=" + std::string(32, '0'), state), reason);
+    EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 1) + "=" + std::string(32, '0'), state), reason);
     EXPECT_EQ(Refusal(Cookie() + "; " + Cookie(), state), reason);
     EXPECT_EQ(Refusal(Cookie(), state), "");
 }
 
-TEST_F(PendingLogin, IsRefusedWhenItTookTooLong) {
-    const utimbuf past{std::time(nullptr) - 601, std::time(nullptr) - 601};
-    ASSERT_EQ(utime(("/usr/tavo/var/frontend/logins/" + Name()).c_str(), &past), 0);
-    EXPECT_EQ(Refusal(Cookie(), state), "This sign-in took too long, or was already completed.");
+TEST_F(PendingLogin, IsRefusedAfterTenMinutes) {
+    for (const auto &[age, reason] : {std::pair(598, ""), std::pair(602, kTookTooLong), std::pair(-60, kTookTooLong)}) {
+        state = Start();
+        const utimbuf past{std::time(nullptr) - age, std::time(nullptr) - age};
+        ASSERT_EQ(utime((kFolder + Name()).c_str(), &past), 0);
+        EXPECT_EQ(Refusal(Cookie(), state), reason) << age;
+    }
+}
+
+TEST_F(PendingLogin, HasACookieThatEndsWithIt) {
+    EXPECT_THAT(CookieHeader(""), testing::MatchesRegex("Set-Cookie: __Host-login-[0-9a-f]=[0-9a-f]{32}; Path=/; "
+                                                        "Secure; HttpOnly; SameSite=Lax; Max-Age=600"));
+}
+
+TEST_F(PendingLogin, ExpiresItsCookieWhenItIsConcludedOrTooLate) {
+    const utimbuf past{std::time(nullptr) - 602, std::time(nullptr) - 602};
+    for (const bool isLate : {false, true}) {
+        state = Start();
+        if (isLate) {
+            ASSERT_EQ(utime((kFolder + Name()).c_str(), &past), 0);
+        }
+        answer = Answer();
+        EXPECT_EQ(Refusal(Cookie(), state), isLate ? kTookTooLong : "");
+        testing::internal::CaptureStdout();
+        answer.Redirect("/");
+        EXPECT_THAT(testing::internal::GetCapturedStdout(),
+                    testing::HasSubstr("Set-Cookie: __Host-login-" + Name().substr(0, 1) +
+                                       "=; Path=/; Secure; "
+                                       "HttpOnly; SameSite=Lax; Max-Age=0\n"));
+    }
+}
+
+TEST_F(PendingLogin, UsesSixteenCookieNamesAndAFreeOneFirst) {
+    std::string cookies;
+    std::set<std::string> names;
+    for (int i = 0; i < 16; ++i) {
+        const std::string header = CookieHeader(cookies);
+        const std::string cookie = header.substr(12, header.find(';') - 12);
+        EXPECT_TRUE(names.insert(cookie.substr(0, cookie.find('='))).second) << "a tab lost its cookie";
+        cookies += (cookies.empty() ? "" : "; ") + cookie;
+    }
+    for (int i = 0; i < 100; ++i) {
+        const std::string header = CookieHeader(cookies);
+        EXPECT_EQ(names.count(header.substr(12, header.find('=') - 12)), 1u);
+    }
+}
+
+TEST_F(PendingLogin, IsConcludedByACookieOfAnyName) {
+    EXPECT_EQ(Refusal("__Host-login-" + std::string(Name()[0] == '0' ? "1" : "0") + "=" + Name(), state), "");
+}
+
+TEST_F(PendingLogin, IsRefusedUnderAnotherProfileAndWhenSwitchedOff) {
+    UseProfile("websphere");
+    EXPECT_EQ(Refusal(Cookie(), state), "The settings of this device were changed during this sign-in.");
+    state = Start();
+    UseProfile("azure", false);
+    EXPECT_THROW(ConcludeLogin(answer, Cookie(), state), TAVO::SSO::sso_op_failed);
+}
+
+TEST_F(PendingLogin, IsNotASession) {
+    std::filesystem::create_directory("/usr/tavo/var/frontend/sessions");
+    ASSERT_EQ(chmod("/usr/tavo/var/frontend/sessions", 0700), 0);
+    std::filesystem::copy_file(kFolder + Name(), "/usr/tavo/var/frontend/sessions/" + Name());
+    EXPECT_FALSE(FindSession(answer, "__Host-session=" + Name()));
+}
+
+TEST_F(PendingLogin, IsRefusedBeyondTheConfiguredNumber) {
+    setenv("FRONTEND_PENDING_LOGINS", "3", 1);
+    Start();
+    Start();
+    EXPECT_THAT([this] { Start(); },
+                testing::ThrowsMessage<Frontend::Refusal>("Too many sign-ins are under way on this device."));
+    std::ofstream(kFolder + std::string("counter")) << "{}";  // swept a minute ago, or never
+    std::filesystem::remove(kFolder + Name());
+    Start();
 }
 
 TEST_F(PendingLogin, IsRefusedWithAnotherOriginThanItWasStartedWith) {

@@ -1,11 +1,16 @@
 #include "frontend/private_folder.h"
 
 #include <gmock/gmock.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <utime.h>
 
+#include <array>
+#include <csignal>
 #include <filesystem>
+#include <fstream>
 #include <system_error>
+#include <thread>
 
 using namespace Frontend;
 
@@ -21,7 +26,7 @@ class PrivateFolderTest : public testing::Test {
 
     static std::string Keep(PrivateFolder &folder, const std::string &text) {
         std::string name = PrivateFolder::NewName();
-        folder.Keep(name, text);
+        EXPECT_TRUE(folder.Keep(name, text));
         return name;
     }
 
@@ -43,7 +48,7 @@ TEST_F(PrivateFolderTest, KeepsATextUnderARandomNameForThisUserAlone) {
     EXPECT_THAT(name, testing::MatchesRegex("[0-9a-f]{32}"));
     EXPECT_NE(Keep(things, "text"), name);
     EXPECT_EQ(things.Read(name), "text");
-    EXPECT_THROW(things.Keep(name, "another text"), std::system_error);
+    EXPECT_THROW(static_cast<void>(things.Keep(name, "another text")), std::system_error);
     EXPECT_EQ(Mode(kFolder + name), 0600U);
     EXPECT_EQ(Mode(kFolder), 0700U);
 }
@@ -60,8 +65,60 @@ TEST_F(PrivateFolderTest, ForgetsATextThatIsTooOld) {
     const std::string name = Keep(things, "text");
     MakeOld(name);
     EXPECT_EQ(things.Read(name), std::nullopt);
+}
+
+TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
+    PrivateFolder things("things", kLifetime);
+    const std::string name = Keep(things, "text");
+    std::ofstream(kFolder + std::string(32, 'a') + ".new") << "half a te";
+    MakeOld(name);
+    MakeOld(std::string(32, 'a') + ".new");
     Keep(things, "another");
+    EXPECT_TRUE(std::filesystem::exists(kFolder + name));
+    for (const char *swept : {"1", "4102444800", "\"now\""}) {  // long ago, in the future, never
+        const std::string late = Keep(things, "text");
+        MakeOld(late);
+        std::ofstream(std::string(kFolder) + "counter") << "{\"count\": 1, \"swept\": " << swept << "}";
+        Keep(things, "another");
+        EXPECT_FALSE(std::filesystem::exists(kFolder + late)) << swept;
+    }
     EXPECT_FALSE(std::filesystem::exists(kFolder + name));
+    EXPECT_FALSE(std::filesystem::exists(kFolder + std::string(32, 'a') + ".new"));
+}
+
+TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
+    PrivateFolder things("things", kLifetime, 2);
+    Keep(things, "one");
+    Keep(things, "two");
+    const std::string name = PrivateFolder::NewName();
+    EXPECT_FALSE(things.Keep(name, "three"));
+    EXPECT_EQ(things.Read(name), std::nullopt);
+}
+
+TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
+    PrivateFolder things("things", kLifetime);
+    const std::string name = PrivateFolder::NewName();
+    const rlimit none{0, RLIM_INFINITY};
+    rlimit former{};
+    getrlimit(RLIMIT_FSIZE, &former);
+    signal(SIGXFSZ, SIG_IGN);
+    Keep(things, "makes the counter");
+    setrlimit(RLIMIT_FSIZE, &none);
+    EXPECT_THROW(static_cast<void>(things.Keep(name, "text")), std::system_error);
+    setrlimit(RLIMIT_FSIZE, &former);
+    EXPECT_EQ(things.Read(name), std::nullopt);
+}
+
+TEST_F(PrivateFolderTest, OfTwoTakersOneGetsTheText) {
+    PrivateFolder things("things", kLifetime);
+    for (int i = 0; i < 100; ++i) {
+        const std::string name = Keep(things, "text");
+        std::array<bool, 2> got{};
+        std::thread other([&] { got[0] = PrivateFolder("things", kLifetime).Take(name).has_value(); });
+        got[1] = PrivateFolder("things", kLifetime).Take(name).has_value();
+        other.join();
+        EXPECT_NE(got[0], got[1]);
+    }
 }
 
 TEST_F(PrivateFolderTest, ReadsNothingButItsOwnFiles) {
@@ -74,10 +131,49 @@ TEST_F(PrivateFolderTest, ReadsNothingButItsOwnFiles) {
     EXPECT_THROW(things.Read(link), std::system_error);
 }
 
-TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayLookInto) {
+TEST_F(PrivateFolderTest, RefusesAFileThatIsNotItsOwn) {
+    PrivateFolder things("things", kLifetime);
+    const std::string name = Keep(things, "text");
+    ASSERT_EQ(chmod((kFolder + name).c_str(), 0640), 0);
+    EXPECT_THROW(things.Read(name), std::system_error);
+    const std::string pipe(32, 'b');
+    ASSERT_EQ(mkfifo((kFolder + pipe).c_str(), 0600), 0);
+    EXPECT_THROW(things.Read(pipe), std::system_error);
+    const std::string large(32, 'c');
+    std::ofstream(kFolder + large) << std::string(20000, 'x');
+    ASSERT_EQ(chmod((kFolder + large).c_str(), 0600), 0);
+    EXPECT_THROW(things.Read(large), std::system_error);
+}
+
+TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
+    for (const char *folder : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend"}) {
+        for (const mode_t mode : {0750, 0770, 0701, 0755}) {
+            PrivateFolder("things", kLifetime);
+            ASSERT_EQ(chmod(folder, mode), 0);
+            EXPECT_THROW(PrivateFolder("things", kLifetime), std::system_error) << folder << std::oct << mode;
+            ASSERT_EQ(chmod(folder, 0700), 0);
+        }
+    }
+}
+
+TEST_F(PrivateFolderTest, RefusesAPathThatOthersCanChange) {
+    for (const mode_t mode : {0775, 0757, 01777}) {
+        ASSERT_EQ(chmod("/usr/tavo/var", mode), 0);
+        EXPECT_THROW(PrivateFolder("things", kLifetime), std::system_error) << std::oct << mode;
+    }
+    ASSERT_EQ(chmod("/usr/tavo/var", 0755), 0);
     PrivateFolder("things", kLifetime);
-    ASSERT_EQ(chmod(kFolder, 0755), 0);
-    EXPECT_THROW(PrivateFolder("things", kLifetime), std::system_error);
+}
+
+TEST_F(PrivateFolderTest, FollowsNoLinkOnItsPath) {
+    for (const char *name : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend", "/usr/tavo/var"}) {
+        PrivateFolder("things", kLifetime);
+        std::filesystem::rename(name, "/usr/tavo/elsewhere");
+        std::filesystem::create_directory_symlink("/usr/tavo/elsewhere", name);
+        EXPECT_THROW(PrivateFolder("things", kLifetime), std::system_error) << name;
+        std::filesystem::remove(name);
+        std::filesystem::rename("/usr/tavo/elsewhere", name);
+    }
 }
 
 }  // namespace

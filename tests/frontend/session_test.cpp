@@ -2,8 +2,10 @@
 
 #include <gmock/gmock.h>
 #include <sys/stat.h>
+#include <utime.h>
 
 #include <filesystem>
+#include <fstream>
 #include <iterator>
 
 using namespace Frontend;
@@ -14,14 +16,37 @@ constexpr char kFolder[] = "/usr/tavo/var/frontend/sessions";
 
 class SessionTest : public testing::Test {
   protected:
-    SessionTest() { std::filesystem::create_directory("/usr/tavo/var"); }
-    ~SessionTest() override { std::filesystem::remove_all("/usr/tavo/var"); }
+    SessionTest() {
+        std::filesystem::create_directory("/usr/tavo/var");
+        UseProfile(R"({"sso_enable": true, "sso_profile": "azure"})");
+    }
+    ~SessionTest() override {
+        std::filesystem::remove_all("/usr/tavo/var");
+        std::filesystem::remove_all("/usr/tavo/etc");
+    }
+
+    static void UseProfile(const char *profile) {
+        std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
+        std::ofstream("/usr/tavo/etc/ssoclient/profile.conf") << profile;
+    }
+
+    static std::optional<Session> Find(const std::string &cookies) {
+        Answer answer;
+        return FindSession(answer, cookies);
+    }
+
+    /// Replaces the text of the session of this cookie.
+    static void Overwrite(const std::string &cookie, const std::string &text) {
+        const std::string file = kFolder + std::string("/") + cookie.substr(cookie.find('=') + 1);
+        std::ofstream(file) << text;
+        ASSERT_EQ(chmod(file.c_str(), 0600), 0);
+    }
 
     /// The header line with which a session starts in a browser that has `cookies`.
     static std::string Start(const std::string &cookies, const std::string &user) {
         testing::internal::CaptureStdout();
         Answer answer;
-        StartSession(answer, cookies, {user, "azure"});
+        StartSession(answer, cookies, {user, "Alice Example", "azure"});
         answer.Redirect("/");
         const std::string output = testing::internal::GetCapturedStdout();
         const std::size_t begin = output.find("Set-Cookie: ");
@@ -36,13 +61,14 @@ class SessionTest : public testing::Test {
 
 TEST_F(SessionTest, IsFoundByItsCookieUntilItEnds) {
     const std::string cookie = CookieOf(Start("", "ACME\\alice"));
-    const auto session = FindSession("other=1; " + cookie);
+    const auto session = Find("other=1; " + cookie);
     ASSERT_TRUE(session);
     EXPECT_EQ(session->user, "ACME\\alice");
+    EXPECT_EQ(session->displayName, "Alice Example");
     EXPECT_EQ(session->profile, "azure");
     Answer answer;
     ASSERT_TRUE(EndSession(answer, cookie));
-    EXPECT_FALSE(FindSession(cookie));
+    EXPECT_FALSE(Find(cookie));
     EXPECT_FALSE(EndSession(answer, cookie));
 }
 
@@ -56,10 +82,49 @@ TEST_F(SessionTest, IsNeverTheOneThatWasPlantedBeforehand) {
     const std::string planted = CookieOf(Start("", "attacker"));
     const std::string victim = CookieOf(Start(planted, "victim"));
     EXPECT_NE(victim, planted);
-    EXPECT_FALSE(FindSession(planted));
+    EXPECT_FALSE(Find(planted));
     const std::string invented = "__Host-session=" + std::string(32, '0');
     EXPECT_NE(CookieOf(Start(invented, "victim")), invented);
-    EXPECT_FALSE(FindSession(invented));
+    EXPECT_FALSE(Find(invented));
+}
+
+TEST_F(SessionTest, IsNoneWhereItsFileIsNotExactlyASession) {
+    const std::string cookie = CookieOf(Start("", "alice"));
+    for (const char *text :
+         {"", "{}", R"({"user": "alice", "profile": "azure"})", R"({"format": "session 1", "profile": "azure"})",
+          R"({"format": "session 1", "user": "", "profile": "azure"})",
+          R"({"format": "session 1", "user": "a\u0000b", "profile": "azure"})",
+          R"({"format": "session 1", "user": 1, "profile": "azure"})", R"({"format": "session 1", "user": "alice"})",
+          R"({"format": "login 1", "user": "alice", "profile": "azure"})",
+          R"({"format": "session 1", "user": "alice", "profile": "azure")"}) {
+        Overwrite(cookie, text);
+        EXPECT_FALSE(Find(cookie)) << text;
+    }
+    Overwrite(cookie, R"({"format": "session 1", "user": "alice", "profile": "azure"})");
+    EXPECT_TRUE(Find(cookie));
+}
+
+TEST_F(SessionTest, EndsWhenItsProfileIsNoLongerInForce) {
+    for (const char *profile : {R"({"sso_enable": true, "sso_profile": "websphere"})",
+                                R"({"sso_enable": false, "sso_profile": "azure"})", "{}"}) {
+        UseProfile(R"({"sso_enable": true, "sso_profile": "azure"})");
+        const std::string cookie = CookieOf(Start("", "alice"));
+        EXPECT_TRUE(Find(cookie));
+        UseProfile(profile);
+        EXPECT_FALSE(Find(cookie)) << profile;
+        UseProfile(R"({"sso_enable": true, "sso_profile": "azure"})");
+        EXPECT_FALSE(Find(cookie)) << profile;
+    }
+}
+
+TEST_F(SessionTest, EndsAfterEightHours) {
+    const std::string cookie = CookieOf(Start("", "alice"));
+    const std::string file = kFolder + std::string("/") + cookie.substr(cookie.find('=') + 1);
+    for (const auto &[age, isAlive] : {std::pair(8 * 3600 - 2, true), {8 * 3600 + 2, false}, {-60, false}}) {
+        const utimbuf past{std::time(nullptr) - age, std::time(nullptr) - age};
+        ASSERT_EQ(utime(file.c_str(), &past), 0);
+        EXPECT_EQ(Find(cookie).has_value(), isAlive) << age;
+    }
 }
 
 TEST_F(SessionTest, CannotBeReadByAnotherUserOfTheMachine) {

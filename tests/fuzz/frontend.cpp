@@ -2,6 +2,7 @@
 // It is good when it concludes the login that was started, with a code.
 #include <algorithm>
 #include <filesystem>
+#include <fstream>
 #include <stdexcept>
 
 #include "frontend/cgi.h"
@@ -18,7 +19,7 @@ namespace Fuzz {
 namespace {
 
 constexpr char kLogin[] = "0123456789abcdef0123456789abcdef";
-constexpr char kLoginCookie[] = "__Host-login-01234567";
+constexpr char kLoginCookie[] = "__Host-login-";  // and a hexadecimal digit
 constexpr char kState[] = "eyJjc3JmIjoiMDEyMzQ1Njc4OWFiY2RlZjAxMjM0NTY3ODlhYmNkZWYiLCJvcmlnaW4iOiIvcGFnZSJ9";
 constexpr char kSession[] = "fedcba9876543210fedcba9876543210";
 constexpr char kSessionCookie[] = "__Host-session";
@@ -28,12 +29,17 @@ constexpr std::time_t kSeconds = 600;
 /// One login under way and one session open, whatever the last input made of them.
 void Prepare() {
     std::filesystem::create_directories("/usr/tavo/var");
+    std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
+    std::ofstream("/usr/tavo/etc/ssoclient/profile.conf") << R"({"sso_enable": true, "sso_profile": "azure"})";
     Frontend::PrivateFolder logins("logins", kSeconds);
     logins.Take(kLogin);
-    logins.Keep(kLogin, kState);
+    Require(
+        logins.Keep(kLogin, R"({"format": "login 1", "profile": "azure", "state": ")" + std::string(kState) + "\"}"),
+        "there is room for a login");
     Frontend::PrivateFolder sessions("sessions", kSeconds);
     sessions.Take(kSession);
-    sessions.Keep(kSession, R"({"user": "CORP\\alice", "profile": "azure"})");
+    Require(sessions.Keep(kSession, R"({"format": "session 1", "user": "CORP\\alice", "profile": "azure"})"),
+            "there is room for a session");
 }
 
 bool IsHexDigit(char c) { return c != '\0' && std::string("0123456789abcdefABCDEF").find(c) != std::string::npos; }
@@ -83,15 +89,23 @@ bool HasOnly(const std::string &cookies, const char *name, const char *value) {
     return CookieValues(cookies, name) == std::vector<std::string>{value};
 }
 
+bool HasLoginCookie(const std::string &cookies) {
+    const std::string digits = "0123456789abcdef";
+    return std::any_of(digits.begin(), digits.end(), [&](char digit) {
+        return HasOnly(cookies, (std::string(kLoginCookie) + digit).c_str(), kLogin);
+    });
+}
+
 void RequireSession(const std::string &cookies) {
+    Frontend::Answer answer;
     std::optional<Frontend::Session> session;
-    RequireSame(FailureOf([&] { session = Frontend::FindSession(cookies); }), Test::kNothingThrown);
+    RequireSame(FailureOf([&] { session = Frontend::FindSession(answer, cookies); }), Test::kNothingThrown);
     Require(session.has_value() == HasOnly(cookies, kSessionCookie, kSession), "a session is its cookie's");
     Require(!session || session->user == kUser, "a session is its user's");
 }
 
 void RequireOneLine(const std::string &line) {
-    Require(!Frontend::HasControlCharacter(line) && line.size() <= 200, "a line is one, and not a long one");
+    Require(Frontend::IsPrintable(line) && line.size() <= 200, "a line is one, and not a long one");
 }
 
 std::string UnescapeHtml(std::string text) {
@@ -113,7 +127,7 @@ void RequireHarmless(const std::string &text) {
     const std::string origin = Frontend::SafeOrigin(text);
     Require(origin == text || origin == "/index.cgi", "an origin is kept or replaced");
     Require(origin[0] == '/' && origin[1] != '/' && origin.find('\\') == std::string::npos && origin.size() <= 512 &&
-                origin.find_first_of(" \"") == std::string::npos && !Frontend::HasControlCharacter(origin),
+                origin.find_first_of(" \"") == std::string::npos && Frontend::IsPrintable(origin),
             "an origin is a path on this site");
 }
 
@@ -165,7 +179,7 @@ bool Accepts(const std::string &input) {
 
     const std::string state = Frontend::OnlyValue(parameters, "state").value_or("");
     const bool concluded = Concludes(cookies, state);
-    Require(concluded == (state == kState && HasOnly(cookies, kLoginCookie, kLogin)),
+    Require(concluded == (state == kState && HasLoginCookie(cookies)),
             "a login is concluded by its own state, in its own browser");
     Require(!concluded || !Concludes(cookies, state), "a login is concluded once");
     RequireLog({});

@@ -95,7 +95,7 @@ export class Browser {
     async request(method, url, form) {
         const body = form && new URLSearchParams(form).toString();
         const headers = {Cookie: this.cookies.for(url).map(({name, value}) => `${name}=${value}`).join('; ')};
-        if (body) {
+        if (form) {
             Object.assign(headers, {'Content-Type': 'application/x-www-form-urlencoded', Origin: url.origin});
         }
         const answer = await this.#exchange(method, url, headers, body);

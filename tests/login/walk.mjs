@@ -115,7 +115,7 @@ export class Walk {
 
     async #openSignInForm(browser) {
         const start = await browser.open(this.origin + START_PAGE);
-        const link = start.link('Sign in with single sign-on');
+        const link = start.link('Sign in with your organisation account');
         assert.ok(link, 'the start page has no link to sign in');
         const form = await browser.open(link);
         const request = browser.history.findLast(({url}) => url.origin === this.provider && url.pathname === '/auth');
