@@ -43,14 +43,14 @@ struct stat StatusOf(const Descriptor &file) {
     return status;
 }
 
-Descriptor OpenIn(const Descriptor &parent, const char *name) {
+Descriptor OpenFolderIn(const Descriptor &parent, const char *name) {
     return {openat(parent.Number(), name, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC),
             "The front end's folder cannot be opened"};
 }
 
 /// A folder on the way: only root or this user can put something else in its place.
 Descriptor OpenTrusted(const Descriptor &parent, const char *name) {
-    Descriptor folder = OpenIn(parent, name);
+    Descriptor folder = OpenFolderIn(parent, name);
     const struct stat status = StatusOf(folder);
     if ((status.st_uid != 0 && status.st_uid != geteuid()) || (status.st_mode & 022) != 0) {
         errno = EPERM;
@@ -63,7 +63,7 @@ Descriptor OpenPrivate(const Descriptor &parent, const char *name) {
     if (mkdirat(parent.Number(), name, 0700) != 0 && errno != EEXIST) {
         ThrowSystemError("The front end's folder cannot be made");
     }
-    Descriptor folder = OpenIn(parent, name);
+    Descriptor folder = OpenFolderIn(parent, name);
     const struct stat status = StatusOf(folder);
     if (status.st_uid != geteuid() || (status.st_mode & 077) != 0) {
         errno = EPERM;

@@ -38,8 +38,8 @@ std::string ProfileInForce() {
 }
 
 bool IsInForce(const std::string &profile) {
-    TAVO::SSO::SSOProfile inForce;
-    return inForce.SSOIsEnable() && inForce.GetSSOProfile() == profile;
+    TAVO::SSO::SSOProfile profileInForce;
+    return profileInForce.SSOIsEnable() && profileInForce.GetSSOProfile() == profile;
 }
 
 }  // namespace Frontend

@@ -15,8 +15,8 @@ struct AuthorizationRequest {
     const char *scope;
 };
 
-/// The URL of the authorization request, with a fresh nonce and the caller's state with the digest of that nonce. Throws
-/// as documented for AzureSSOClient::GetAccessTokenReqURI.
+/// The URL of the authorization request, with a fresh nonce and the caller's state with the digest of that nonce.
+/// Throws as documented for AzureSSOClient::GetAccessTokenReqURI.
 std::string AuthorizationURI(const AuthorizationRequest &request, const Json::Value &stateInfo);
 
 /// Writes the CGI redirect to that URL to standard output, unflushed.

@@ -8,8 +8,8 @@
 
 namespace TAVO::SSO {
 
-/// The libcurl write callback of every request to a provider: appends the chunk, up to its first NUL, to the std::string
-/// at `response`. If memory runs out, it takes nothing and the transfer fails.
+/// The libcurl write callback of every request to a provider: appends the chunk, up to its first NUL, to the
+/// std::string at `response`. If memory runs out, it takes nothing and the transfer fails.
 std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *response) noexcept;
 
 /// Fetches a JSON document. Throws as httpGet does, and sso_err_resp "bad wellknown json format." if it is not JSON.

@@ -15,8 +15,8 @@
  * `std::bad_alloc` when memory runs out.
  *
  * One thread at a time: constructing a client or a profile changes the effective ids of the whole process while a file
- * is read, and every HTTP request initialises and cleans up libcurl globally. A request over TLS also clears the calling
- * thread's OpenSSL error queue, marks included, because libcurl does.
+ * is read, and every HTTP request initialises and cleans up libcurl globally. A request over TLS also clears the
+ * calling thread's OpenSSL error queue, marks included, because libcurl does.
  *
  * The layout of the classes and the order of their virtual functions are fixed under soname `libtavosso.so.6`:
  * programs are linked against them, and a change would break them silently.
@@ -118,9 +118,10 @@ class SSOClient {
      *             ran out
      *
      * Does not throw for a failed transfer or a malformed answer. Each is one line at `LOG_ERR`:
-     *  - "sso:LINE TEXT", where TEXT is libcurl's text, also when memory runs out during the transfer, or "bad wellknown
-     *    json format.";
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the transfer.
+     *  - "sso:LINE TEXT", where TEXT is libcurl's text, also when memory runs out during the transfer, or "bad
+     * wellknown json format.";
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the
+     * transfer.
      *
      * Side effects: those of `httpGet`.
      */
@@ -136,7 +137,8 @@ class SSOClient {
      *
      * Does not throw for a failed transfer; the next step reports it. It is one line at `LOG_ERR`:
      *  - "sso:LINE request token uri TEXT." with libcurl's text, also when memory runs out during the transfer;
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the transfer.
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the
+     * transfer.
      *
      * Side effects: those of `httpPost`.
      */
@@ -290,12 +292,12 @@ class AzureSSOClient : public SSOClient {
      * Fetches the provider's key set (RFC 7517, section 5), certificate and host name verified.
      *
      * @param uri   where it is published ("jwks_uri" of the discovery document)
-     * @param keys  receives the document; null when the answer is not JSON, untouched when the transfer failed or memory
-     *              ran out
+     * @param keys  receives the document; null when the answer is not JSON, untouched when the transfer failed or
+     * memory ran out
      *
      * Does not throw for those failures, nor for a document without "keys". Each is one line at `LOG_ERR`:
-     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text, also when memory runs out during the transfer,
-     *    or "bad wellknown json format.";
+     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text, also when memory runs out during the
+     * transfer, or "bad wellknown json format.";
      *  - "azuresso:LINE no kyes information";
      *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made, or memory runs out
      *    outside the transfer.

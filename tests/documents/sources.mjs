@@ -179,8 +179,8 @@ export const referenceComments = ['sso/sso.h', 'jwt/jwt.h'].flatMap((file) =>
 /** The files and folders of the appliance that the sources name, and those that the front end makes in its own. */
 export function appliancePaths() {
     const named = sources.flatMap(({text}) => literals(text)).filter((literal) => literal.startsWith('/usr/tavo/'));
-    const path = /OpenTrusted\(system, "(\w+)"\), "(\w+)"\), "(\w+)"\)/.exec(textOf('frontend/private_folder.cpp'));
-    const folder = ['/usr', ...path.slice(1)].join('/');
+    const parts = /OpenTrusted\(system, "(\w+)"\), "(\w+)"\), "(\w+)"\)/.exec(textOf('frontend/private_folder.cpp'));
+    const folder = ['/usr', ...parts.slice(1)].join('/');
     const made = sources.filter(({file}) => file.startsWith('frontend/')).map(({text}) => textConstants(text).kFolder)
         .filter(Boolean).map((name) => `${folder}/${JSON.parse(name)}`);
     return [...named, ...made];

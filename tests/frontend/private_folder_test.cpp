@@ -70,7 +70,7 @@ TEST_F(PrivateFolderTest, ForgetsATextThatIsTooOld) {
 TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
     PrivateFolder things("things", kLifetime);
     const std::string name = Keep(things, "text");
-    std::ofstream(kFolder + std::string(32, 'a') + ".new") << "half a te";
+    std::ofstream(kFolder + std::string(32, 'a') + ".new") << "half of it";
     MakeOld(name);
     MakeOld(std::string(32, 'a') + ".new");
     Keep(things, "another");
