@@ -34,7 +34,11 @@ function configuration({MemoryAdapter, clients, users, tenant, lifetimes}) {
         clients: clients.map(registration),
         enabledJWA: {idTokenSigningAlgValues: ['RS256', 'HS256']},
         pkce: {required: () => false},
-        claims: {openid: ['sub', 'tid', 'unique_name'], profile: [], email: []},
+        claims: {
+            openid: ['sub', 'tid', 'unique_name', 'name', 'email', 'email_verified'],
+            profile: [],
+            email: [],
+        },
         cookies: {keys: [randomBytes(32).toString('hex')]},
         features: {
             devInteractions: {enabled: false},
@@ -52,7 +56,9 @@ function configuration({MemoryAdapter, clients, users, tenant, lifetimes}) {
         },
         findAccount: (context, login) => ({
             accountId: login,
-            claims: () => ({sub: login, tid: tenant, unique_name: users.get(login).uniqueName}),
+            claims: () => ({
+                sub: login, tid: tenant, unique_name: users.get(login).uniqueName, ...users.get(login).claims,
+            }),
         }),
         loadExistingGrant: (context) => findGrant(context.oidc, users),
     };
@@ -184,7 +190,8 @@ function reporting(report) {
 /**
  * Starts the provider on a port of the kernel's choice.
  *
- * `users` is a map from login to {password, uniqueName} and, for one who is asked for consent, `decidesAlone`; `report`
+ * `users` is a map from login to {password, uniqueName} and, for one who is asked for consent, `decidesAlone`, for one
+ * with other claims in the ID token, `claims`; `report`
  * is called for each request of an appliance. What it gives holds the lifetimes of codes and ID tokens in seconds, to
  * be changed at will: with a negative one they have expired when they are issued.
  */
