@@ -147,7 +147,7 @@ TEST_F(PrivateFolderTest, RefusesAFileThatIsNotItsOwn) {
 
 TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
     for (const char *folder : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend"}) {
-        for (const mode_t mode : {0750, 0770, 0701, 0755}) {
+        for (const mode_t mode : {0750U, 0770U, 0701U, 0755U}) {
             PrivateFolder("things", kLifetime);
             ASSERT_EQ(chmod(folder, mode), 0);
             EXPECT_THROW(PrivateFolder("things", kLifetime), std::system_error) << folder << std::oct << mode;
@@ -157,7 +157,7 @@ TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
 }
 
 TEST_F(PrivateFolderTest, RefusesAPathThatOthersCanChange) {
-    for (const mode_t mode : {0775, 0757, 01777}) {
+    for (const mode_t mode : {0775U, 0757U, 01777U}) {
         ASSERT_EQ(chmod("/usr/tavo/var", mode), 0);
         EXPECT_THROW(PrivateFolder("things", kLifetime), std::system_error) << std::oct << mode;
     }

@@ -132,7 +132,7 @@ describe('An attacker', () => {
         });
     }
 
-    test('is told from a user whose e-mail address the provider has verified', async () => {
+    test('does not hinder a user whose e-mail address the provider has verified', async () => {
         const browser = newBrowser();
         assert.equal((await signIn(browser, 'verified')).success, 'true');
         assert.match((await browser.open(at('/account.cgi'))).text, /<dd>ACME\\alice<\/dd>/);
@@ -188,7 +188,7 @@ describe('An attacker', () => {
         assert.ok(logged.includes(`return.cgi: frontend: sign-in failed: ${reason}`));
     });
 
-    test('has its error believed only with the state of a login of this browser', async () => {
+    test('has an error believed only with the state of a login of this browser', async () => {
         const browser = newBrowser();
         const own = (await browser.request('GET', at('/webman/sso/login.cgi'))).next.searchParams.get('state');
         const foreign = (await newBrowser().request('GET', at('/webman/sso/login.cgi'))).next.searchParams.get('state');
