@@ -28,7 +28,7 @@ std::string FreeCookieName(const std::string &cookies, const std::string &login)
     const std::string slots = kCookieSlots;
     const std::size_t first = slots.find(login.front());
     for (std::size_t i = 0; i < slots.size(); ++i) {
-        const std::string name = CookieName(slots[(first + i) % slots.size()]);
+        std::string name = CookieName(slots[(first + i) % slots.size()]);
         if (!HasCookie(cookies, name)) {
             return name;
         }
