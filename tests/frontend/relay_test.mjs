@@ -58,6 +58,36 @@ test('explains the reasons that it knows and cuts those that are too long', () =
     assert.equal(after({success: 'false'}).reason, '');
 });
 
+test('explains nothing by a known text within a description of the provider', () => {
+    for (const known of ['id_token expired.', 'This sign-in took too long', 'The provider refused: access_denied']) {
+        const {explanation} = after({success: 'false', reason: `The provider refused: other (${known})`});
+        assert.match(explanation, /^Something went wrong/, known);
+    }
+});
+
+test('shows printable text only', () => {
+    const {reason} = after({success: 'false', reason: 'a\u009bb\u202ec\u2028d\u200be\nf'});
+    assert.equal(reason, 'a b c d e f');
+});
+
+test('shows each outcome with its links', () => {
+    const shown = ({headline, explanation, action, onward, atOnce}) =>
+        ({headline, explanation, action, onward, atOnce});
+    assert.deepEqual(shown(after({success: 'true', origin: '/a'})), {
+        headline: 'You are signed in', explanation: 'One moment: the page that you asked for is opening.',
+        action: 'Continue', onward: '/a', atOnce: true,
+    });
+    assert.deepEqual(shown(after({success: 'false', reason: 'This sign-in was changed on its way.', origin: '/a'})), {
+        headline: 'You could not be signed in',
+        explanation: 'For your safety this sign-in was stopped: it was changed on its way.',
+        action: 'Try again', onward: '/webman/sso/login.cgi?origin=%2Fa', atOnce: false,
+    });
+    assert.deepEqual(shown(after({})), {
+        headline: 'You are signed out', explanation: 'You have been signed out.', action: 'Continue', onward: START_PAGE,
+        atOnce: false,
+    });
+});
+
 test('explains an unknown algorithm whatever the token calls it', () => {
     for (const name of ['none', 'HS256', '', 'an odd one']) {
         const {explanation} = after({success: 'false', reason: `${name} algorithm is not supported`});

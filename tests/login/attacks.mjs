@@ -13,6 +13,8 @@ import {Browser} from './browser.mjs';
 const FRONT_END = '/usr/tavo/var/frontend';
 const SESSION_COOKIE = '__Host-session';
 const PROGRAMS = ['/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi'];
+// Of syslog: facility and levels.
+const [AUTH, ERR, WARNING, INFO] = [32, 3, 4, 6];
 const LOGOUT = '/webman/sso/logout.cgi';
 const RETURN = '/webman/sso/return.cgi';
 const USERS = {
@@ -50,7 +52,7 @@ describe('An attacker', () => {
             onRequest({path}) {
                 tokenRequests += path === '/token' ? 1 : 0;
             },
-            onLog: (line) => logged.push(line),
+            onLog: (line, priority) => logged.push({line, priority}),
         });
     });
     after(() => site.stop());
@@ -62,6 +64,8 @@ describe('An attacker', () => {
         logged.length = 0;
     });
 
+    const wasLogged = (priority, line) =>
+        assert.deepEqual(logged.filter((each) => each.line === line), [{line, priority}]);
     const newBrowser = () => new Browser(readFileSync(site.authority), () => {});
     const at = (path) => new URL(path, site.origin);
     const cookiesOf = (browser) => browser.cookies.for(at('/')).map(({name}) => name);
@@ -135,6 +139,7 @@ describe('An attacker', () => {
     test('does not hinder a user whose e-mail address the provider has verified', async () => {
         const browser = newBrowser();
         assert.equal((await signIn(browser, 'verified')).success, 'true');
+        wasLogged(AUTH | INFO, 'return.cgi: frontend: signed in: ACME\\alice');
         assert.match((await browser.open(at('/account.cgi'))).text, /<dd>ACME\\alice<\/dd>/);
     });
 
@@ -185,7 +190,7 @@ describe('An attacker', () => {
         });
         const {reason} = await comeBack(browser, returned);
         assert.equal(reason, 'The provider refused: a 31mb c d (e f g)');
-        assert.ok(logged.includes(`return.cgi: frontend: sign-in failed: ${reason}`));
+        wasLogged(AUTH | WARNING, `return.cgi: frontend: sign-in failed: ${reason}`);
     });
 
     test('has an error believed only with the state of a login of this browser', async () => {
@@ -217,7 +222,7 @@ describe('An attacker', () => {
                 const {reason} = await signIn(newBrowser(), 'alice');
                 assert.equal(reason, 'kid does not exist in Azure verified kyes');
                 assert.equal(connections, 0);
-                assert.ok(logged.includes('return.cgi: frontend: jwks_uri of the discovery document is not an https:// URL'));
+                wasLogged(AUTH | ERR, 'return.cgi: frontend: jwks_uri of the discovery document is not an https:// URL');
             } finally {
                 internal.close();
                 discovery.close();

@@ -4,23 +4,24 @@ import net from 'node:net';
 
 const PATIENCE = 20_000;
 
-/** Collects the log; `report` gets each line, without priority and date. */
+/** Collects the log; `report` gets each line without date, and its priority as a number (RFC 3164, section 4.1.1). */
 export async function collectSystemLog(report) {
     let unread = [];
     let lookForAwaited = () => {};
     const add = (record) => {
-        const line = record.toString().replace(/^<\d+>\w+ +\d+ [\d:]+ /, '').trimEnd();
-        report(line);
+        const [, priority, rest] = /^<(\d+)>\w+ +\d+ [\d:]+ (.*)$/s.exec(record.toString());
+        const line = rest.trimEnd();
+        report(line, Number(priority));
         unread.push(line);
         lookForAwaited();
     };
     // A stream, on which the C library ends each record with a NUL; Node has no datagrams between processes.
     const server = net.createServer((connection) => {
-        let rest = Buffer.alloc(0);
+        let unparsed = Buffer.alloc(0);
         connection.on('data', (chunk) => {
-            rest = Buffer.concat([rest, chunk]);
-            for (let end; (end = rest.indexOf(0)) >= 0; rest = rest.subarray(end + 1)) {
-                add(rest.subarray(0, end));
+            unparsed = Buffer.concat([unparsed, chunk]);
+            for (let end; (end = unparsed.indexOf(0)) >= 0; unparsed = unparsed.subarray(end + 1)) {
+                add(unparsed.subarray(0, end));
             }
         });
         connection.on('error', () => {});
