@@ -125,7 +125,7 @@ Json::Value ParsePart(const std::string &part, const char *notJson) {
     return value;
 }
 
-// The low-level RSA calls are deprecated in OpenSSL 3, and the only ones before it.
+// The low-level RSA calls are deprecated in OpenSSL 3; older versions have no others.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 

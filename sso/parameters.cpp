@@ -21,15 +21,20 @@ std::size_t LongestForm(const Parameters &parameters) {
 std::string WriteForm(const Parameters &parameters) {
     std::string form;
     form.reserve(LongestForm(parameters));  // growth would leave copies of the client secret in released memory
-    for (const auto &[name, value] : parameters) {
-        if (!form.empty()) {
-            form += '&';
+    try {
+        for (const auto &[name, value] : parameters) {
+            if (!form.empty()) {
+                form += '&';
+            }
+            std::string encoded = URLEncode(value);
+            const Utils::CleanseTextOnExit cleanse(encoded);
+            form += name;
+            form += '=';
+            form += encoded;
         }
-        std::string encoded = URLEncode(value);
-        const Utils::CleanseTextOnExit cleanse(encoded);
-        form += name;
-        form += '=';
-        form += encoded;
+    } catch (...) {
+        Utils::Cleanse(form);
+        throw;
     }
     return form;
 }

@@ -118,10 +118,10 @@ class SSOClient {
      *             ran out
      *
      * Does not throw for a failed transfer or a malformed answer. Each is one line at `LOG_ERR`:
-     *  - "sso:LINE TEXT", where TEXT is libcurl's text, also when memory runs out during the transfer, or "bad
-     * wellknown json format.";
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the
-     * transfer.
+     *  - "sso:LINE TEXT" with libcurl's text or "bad wellknown json format.";
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made.
+     *
+     * Memory that runs out during the transfer fails it with libcurl's text; otherwise it is the second line.
      *
      * Side effects: those of `httpGet`.
      */
@@ -136,9 +136,10 @@ class SSOClient {
      * @param body      the form-encoded body, as `GetIDTokenReqParams` gives it
      *
      * Does not throw for a failed transfer; the next step reports it. It is one line at `LOG_ERR`:
-     *  - "sso:LINE request token uri TEXT." with libcurl's text, also when memory runs out during the transfer;
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made, or memory runs out outside the
-     * transfer.
+     *  - "sso:LINE request token uri TEXT." with libcurl's text;
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made.
+     *
+     * Memory that runs out during the transfer fails it with libcurl's text; otherwise it is the second line.
      *
      * Side effects: those of `httpPost`.
      */
@@ -293,14 +294,14 @@ class AzureSSOClient : public SSOClient {
      *
      * @param uri   where it is published ("jwks_uri" of the discovery document)
      * @param keys  receives the document; null when the answer is not JSON, untouched when the transfer failed or
-     * memory ran out
+     *              memory ran out
      *
      * Does not throw for those failures, nor for a document without "keys". Each is one line at `LOG_ERR`:
-     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text, also when memory runs out during the
-     * transfer, or "bad wellknown json format.";
+     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text or "bad wellknown json format.";
      *  - "azuresso:LINE no kyes information";
-     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made, or memory runs out
-     *    outside the transfer.
+     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made.
+     *
+     * Memory that runs out during the transfer fails it with libcurl's text; otherwise it is the third line.
      *
      * Side effects: those of `httpGet`. Calls `curl_global_cleanup` once more than it initialises: a host that uses
      * libcurl itself initialises it again.
