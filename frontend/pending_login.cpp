@@ -1,6 +1,6 @@
 #include "frontend/pending_login.h"
 
-#include <optional>
+#include <charconv>
 
 #include "frontend/cgi.h"
 #include "frontend/failure.h"
@@ -48,7 +48,15 @@ std::string CookieOf(const std::string &cookies, const std::string &login) {
 
 std::size_t MostPending() {
     const std::string configured = Variable("FRONTEND_PENDING_LOGINS");
-    return configured.empty() ? kMostPending : std::stoul(configured);
+    if (configured.empty()) {
+        return kMostPending;
+    }
+    std::size_t most = 0;
+    const char *end = configured.data() + configured.size();
+    if (std::from_chars(configured.data(), end, most).ptr != end || most == 0) {
+        throw Refusal("FRONTEND_PENDING_LOGINS must be a number above 0.");
+    }
+    return most;
 }
 
 std::string StateIn(const std::string &address) {
@@ -76,8 +84,8 @@ std::string StartLogin(Answer &answer, const std::string &cookies, const std::st
     return address;
 }
 
-Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state) {
-    Json::Value returned = DecodeState(state);
+ConcludedLogin ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state) {
+    const Json::Value returned = DecodeState(state);
     const std::string login = StringMember(returned, "csrf");
     const std::string cookie = CookieOf(cookies, login);
     if (login.empty() || cookie.empty()) {
@@ -95,10 +103,11 @@ Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std:
     }
     answer.origin = StringMember(returned, "origin");
     // The code must not go to another provider, with that provider's client secret.
-    if (StringMember(started, "profile") != ProfileInForce()) {
+    const std::string profile = StringMember(started, "profile");
+    if (profile != ProfileInForce()) {
         throw Refusal("The settings of this device were changed during this sign-in.");
     }
-    return returned;
+    return {returned, profile};
 }
 
 Json::Value DecodeState(const std::string &state) {

@@ -24,10 +24,15 @@ namespace Frontend {
 std::string StartLogin(Answer &answer, const std::string &cookies, const std::string &profile,
                        const std::function<std::string(const Json::Value &)> &makeAddress);
 
+struct ConcludedLogin {
+    Json::Value state;  // the state's object
+    std::string profile;
+};
+
 /// Throws `Refusal` unless this browser started the login that `state` belongs to, within the last ten minutes, has not
-/// completed it before, returns the state unchanged, and the login's profile is still in force. Returns the state's
-/// object, and sets the answer's origin.
-Json::Value ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state);
+/// completed it before, returns the state unchanged, and the login's profile is still in force. Sets the answer's
+/// origin.
+ConcludedLogin ConcludeLogin(Answer &answer, const std::string &cookies, const std::string &state);
 
 /// The JSON object in the state; null if there is none.
 Json::Value DecodeState(const std::string &state);

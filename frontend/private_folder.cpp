@@ -121,7 +121,7 @@ struct CloseDirectory {
 
 std::vector<std::string> NamesIn(const Descriptor &folder) {
     const int reopened = openat(folder.Number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    const std::unique_ptr<DIR, CloseDirectory> directory(fdopendir(reopened));
+    const std::unique_ptr<DIR, CloseDirectory> directory(reopened < 0 ? nullptr : fdopendir(reopened));
     if (!directory) {
         ThrowSystemError("The front end's folder cannot be read");
     }
@@ -167,6 +167,10 @@ std::string PrivateFolder::NewName() {
 }
 
 bool PrivateFolder::Keep(const std::string &name, const std::string &text) {
+    if (text.size() > kLongestText) {
+        errno = EFBIG;
+        ThrowSystemError("The front end's file cannot be kept");
+    }
     if (!CountOneMore()) {
         return false;
     }
@@ -206,7 +210,13 @@ std::optional<std::string> PrivateFolder::Read(const std::string &name) {
 
 std::optional<std::string> PrivateFolder::Take(const std::string &name) {
     std::optional<std::string> text = Read(name);
-    return text && unlinkat(folder.Number(), name.c_str(), 0) == 0 ? text : std::nullopt;
+    if (!text || unlinkat(folder.Number(), name.c_str(), 0) == 0) {
+        return text;
+    }
+    if (errno != ENOENT) {
+        ThrowSystemError("The front end's file cannot be removed");
+    }
+    return std::nullopt;
 }
 
 /// Counts in a file, which says when the folder was last swept, and how many texts it has had since.
@@ -219,7 +229,8 @@ bool PrivateFolder::CountOneMore() {
     const Json::Value known = ParseObject(ReadAll(counter));
     const std::time_t now = std::time(nullptr);
     const std::time_t swept = known["swept"].isInt64() ? known["swept"].asInt64() : 0;
-    const bool isRecent = swept <= now && now - swept < kSecondsBetweenSweeps && known["count"].isUInt64();
+    const bool isRecent = swept <= now && now - swept < kSecondsBetweenSweeps && known["count"].isUInt64() &&
+                          known["count"].asUInt64() < capacity;
     const std::size_t count = isRecent ? known["count"].asUInt64() : Sweep();
     const bool hasRoom = count < capacity;
 

@@ -41,8 +41,8 @@ class PrivateFolder {
 
     /// A name that cannot be guessed.
     static std::string NewName();
-    /// Keeps a text under a new name. Returns false, and keeps nothing, if the folder is full. Expired texts are
-    /// removed and counted once a minute, not at each call.
+    /// Keeps a text under a new name. Returns false, and keeps nothing, if the folder is full. Removes and counts
+    /// expired texts once a minute, and at each call only while the folder is full.
     [[nodiscard]] bool Keep(const std::string &name, const std::string &text);
     std::optional<std::string> Read(const std::string &name);
     /// Reads a text and removes it. Of two that take the same text, one gets it.

@@ -5,7 +5,7 @@
 
 #include <string>
 
-// The profile in force, as the library's own `OIDCLogin` chooses it, for logins that need the client itself.
+// The profile in force, for logins that need the client itself.
 namespace Frontend {
 
 enum class SetUp { kOff, kIncomplete, kComplete };

@@ -50,8 +50,10 @@ void RemoveUntrustedVariables() {
 }
 
 void Limit(decltype(RLIMIT_CORE) resource, rlim_t most) {
-    const rlimit limit{most, most};
-    if (setrlimit(resource, &limit) != 0) {
+    rlimit limit{};
+    const bool isKnown = getrlimit(resource, &limit) == 0;
+    limit.rlim_cur = limit.rlim_max = std::min(most, limit.rlim_max);  // the web server may have set a smaller one
+    if (!isKnown || setrlimit(resource, &limit) != 0) {
         throw std::system_error(errno, std::generic_category(), "A limit cannot be set");
     }
 }

@@ -56,10 +56,10 @@ void CompleteLogin(Frontend::Answer &answer) {
     const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
     const std::string stateText = RequireOnly(parameters, "state");
     // Before anything of the answer is believed, and above all before the code is used.
-    const Json::Value state = Frontend::ConcludeLogin(answer, cookies, stateText);
+    const Frontend::ConcludedLogin login = Frontend::ConcludeLogin(answer, cookies, stateText);
     RefuseProviderError(parameters);
     const std::string code = RequireOnly(parameters, "code");
-    const Frontend::Session session = SignIn(Frontend::ProfileInForce(), code, state);
+    const Frontend::Session session = SignIn(login.profile, code, login.state);
     Frontend::StartSession(answer, cookies, session);
     syslog(LOG_AUTH | LOG_INFO, "frontend: signed in: %s", Frontend::OneLine(session.user).c_str());
     answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, stateText, ""));

@@ -14,8 +14,9 @@ constexpr char kCookie[] = "__Host-session";
 constexpr char kFolder[] = "sessions";
 constexpr std::time_t kSeconds = std::time_t{8} * 60 * 60;
 constexpr char kFormat[] = "session 1";
+constexpr std::size_t kMostSessions = 10000;
 
-PrivateFolder OpenSessions() { return {kFolder, kSeconds}; }
+PrivateFolder OpenSessions() { return {kFolder, kSeconds, kMostSessions}; }
 
 /// A text that is not exactly a session signs nobody in.
 std::optional<Session> ParseSession(const std::optional<std::string> &text) {

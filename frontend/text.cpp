@@ -19,8 +19,9 @@ using boost::locale::utf::code_point;
 bool IsPrintable(code_point c) {
     const bool isControl = c < 0x20 || (c >= 0x7f && c < 0xa0);
     const bool isSeparator = c == 0x2028 || c == 0x2029;
-    const bool isFormat = c == 0xad || c == 0x61c || (c >= 0x200b && c <= 0x200f) || (c >= 0x202a && c <= 0x202e) ||
-                          (c >= 0x2060 && c <= 0x206f) || c == 0xfeff || (c >= 0xe0000 && c <= 0xe007f);
+    const bool isFormat = c == 0xad || c == 0x61c || c == 0x180e || (c >= 0x200b && c <= 0x200f) ||
+                          (c >= 0x202a && c <= 0x202e) || (c >= 0x2060 && c <= 0x206f) || c == 0xfeff ||
+                          (c >= 0xfff9 && c <= 0xfffb) || (c >= 0xe0000 && c <= 0xe007f);
     return boost::locale::utf::is_valid_codepoint(c) && !isControl && !isSeparator && !isFormat;
 }
 

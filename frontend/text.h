@@ -12,8 +12,8 @@ namespace Frontend {
 /// For element content and quoted attribute values.
 std::string EscapeHtml(const std::string &text);
 
-/// Whether a text is UTF-8 without characters that are invisible, break the line or change the direction of the text:
-/// controls (C0, DEL and C1), line and paragraph separators, and format characters.
+/// Whether a text is UTF-8 without controls (C0, DEL and C1), line and paragraph separators, and the format characters
+/// that are invisible or change the direction of the text.
 bool IsPrintable(const std::string &text);
 
 constexpr std::size_t kLongestLine = 200;

@@ -95,7 +95,7 @@ TEST_F(PendingLogin, IsConcludedOnceByTheBrowserThatStartedIt) {
 }
 
 TEST_F(PendingLogin, GivesWhatTheStateHolds) {
-    const Json::Value object = ConcludeLogin(answer, Cookie(), state);
+    const Json::Value object = ConcludeLogin(answer, Cookie(), state).state;
     EXPECT_EQ(object["origin"].asString(), "/files");
     EXPECT_EQ(object["nonce"].asString(), "digest");
 }
@@ -180,9 +180,14 @@ TEST_F(PendingLogin, IsRefusedBeyondTheConfiguredNumber) {
     Start();
     EXPECT_THAT([this] { Start(); },
                 testing::ThrowsMessage<Frontend::Refusal>("Too many sign-ins are under way on this device."));
-    std::ofstream(kFolder + std::string("counter")) << "{}";  // swept a minute ago, or never
     std::filesystem::remove(kFolder + Name());
     Start();
+    for (const char *number : {"0", "-1", " 3", "3x", "many", "99999999999999999999999"}) {
+        setenv("FRONTEND_PENDING_LOGINS", number, 1);
+        EXPECT_THAT([this] { Start(); },
+                    testing::ThrowsMessage<Frontend::Refusal>("FRONTEND_PENDING_LOGINS must be a number above 0."))
+            << number;
+    }
 }
 
 TEST_F(PendingLogin, IsRefusedWithAnotherOriginThanItWasStartedWith) {

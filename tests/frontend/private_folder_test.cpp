@@ -95,6 +95,12 @@ TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
     EXPECT_EQ(things.Read(name), std::nullopt);
 }
 
+TEST_F(PrivateFolderTest, KeepsNoTextThatItWouldNotRead) {
+    PrivateFolder things("things", kLifetime);
+    EXPECT_EQ(things.Read(Keep(things, std::string(16384, 'x'))), std::string(16384, 'x'));
+    EXPECT_THROW(static_cast<void>(things.Keep(PrivateFolder::NewName(), std::string(16385, 'x'))), std::system_error);
+}
+
 TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
     PrivateFolder things("things", kLifetime);
     const std::string name = PrivateFolder::NewName();
