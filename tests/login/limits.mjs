@@ -2,10 +2,8 @@
 // private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
-import {copyFileSync, mkdtempSync, readdirSync, readFileSync, writeFileSync} from 'node:fs';
+import {copyFileSync, mkdtempSync, readdirSync, readFileSync} from 'node:fs';
 import https from 'node:https';
-import path from 'node:path';
-import tls from 'node:tls';
 import {after, before, beforeEach, describe, test} from 'node:test';
 
 import {
@@ -14,10 +12,10 @@ import {
 import {makeAuthority} from '../site/authority.mjs';
 import {collectSystemLog} from '../site/system_log.mjs';
 import {Browser} from './browser.mjs';
+import {connect, LIMIT, processStatus, until, withLimitOf} from './connection.mjs';
 
 const SYSTEM_BUNDLE = '/etc/ssl/certs/ca-certificates.crt';
 const PROGRAM = 'return.cgi';
-const LIMIT = /"read-timeout" => (\d+)/;
 const SECOND = 1000;
 
 const [webroot] = process.argv.slice(2);
@@ -63,31 +61,9 @@ class SlowProvider {
     }
 }
 
-/** What the system says of a process; nothing once it has ended. */
-function status(pid) {
-    try {
-        return readFileSync(`/proc/${pid}/status`, 'utf8');
-    } catch {
-        return '';
-    }
-}
-
 function runningPrograms() {
     const runs = (text) => text.startsWith(`Name:\t${PROGRAM}\n`) && !/^State:\t[ZX]/m.test(text);
-    return readdirSync('/proc').filter((name) => /^\d+$/.test(name) && runs(status(name)));
-}
-
-async function until(condition) {
-    while (!condition()) {
-        await new Promise(setImmediate);
-    }
-}
-
-/** The front end's settings, with a limit that a test can wait for. */
-function withLimitOf(seconds, folder) {
-    const file = path.join(folder, 'front_end.conf');
-    writeFileSync(file, readFileSync(FRONT_END_SETTINGS, 'utf8').replace(LIMIT, `"read-timeout" => ${seconds}`));
-    return file;
+    return readdirSync('/proc').filter((name) => /^\d+$/.test(name) && runs(processStatus(name)));
 }
 
 async function startEverything() {
@@ -129,21 +105,6 @@ async function comeBack({newBrowser}, {origin}) {
     const state = start.next.searchParams.get('state');
     const address = new URL(`${origin}/webman/sso/${PROGRAM}?${new URLSearchParams({code: 'a code', state})}`);
     return {address, cookies: browser.cookies.for(address).map(({name, value}) => `${name}=${value}`).join('; ')};
-}
-
-/**
- * An open connection on which the web server waits. One that brings its request so fast that the server never waits for
- * it is not held to the limit by lighttpd 1.4.69.
- */
-async function connect(authority, {origin, pid}) {
-    const {port} = new URL(origin);
-    // In TLS 1.2 the handshake's last word is the server's. In 1.3 it is the browser's: the server may still have that
-    // before it, and read the request together with it.
-    const maxVersion = 'TLSv1.2';
-    const socket = tls.connect({host: '127.0.0.1', servername: 'localhost', port, ca: authority, maxVersion});
-    await once(socket, 'secureConnect');
-    await until(() => /^State:\tS/m.test(status(pid)));
-    return socket;
 }
 
 async function open({authority, ...stage}, server) {
