@@ -65,6 +65,8 @@ export async function listen() {
 export function startWebServer({socket, webroot, certificate, folder, frontEndSettings = FRONT_END_SETTINGS}) {
     const settings = path.join(folder, 'lighttpd.conf');
     const log = path.join(folder, 'lighttpd.log');
+    const uploads = path.join(folder, 'uploads');
+    mkdirSync(uploads);
     const served = INSTALLED_SETTINGS
         ? `include "${INSTALLED_SETTINGS}"`
         : `server.document-root = "${webroot}"\ninclude "${frontEndSettings}"`;
@@ -75,6 +77,7 @@ server.bind := "127.0.0.1"
 server.port := ${socket.address().port}
 server.errorlog := "${log}"
 server.breakagelog := "${log}"
+server.upload-dirs := ( "${uploads}" )
 server.modules += ( "mod_openssl" )
 ssl.engine := "enable"
 ssl.pemfile := "${certificate.certFile}"
@@ -88,6 +91,7 @@ ssl.privkey := "${certificate.keyFile}"
     socket.close();
     return {
         pid: server.pid,
+        uploads,
         log: () => readFileSync(log, 'utf8'),
         async stop() {
             if (server.exitCode === null && server.kill()) {

@@ -1,0 +1,125 @@
+// Attacks on the web server of the running site: request bodies. Runs as root of private namespaces.
+import assert from 'node:assert/strict';
+import {once} from 'node:events';
+import {cpSync, mkdtempSync, readdirSync, readFileSync, watch} from 'node:fs';
+import http2 from 'node:http2';
+import path from 'node:path';
+import {after, before, describe, test} from 'node:test';
+
+import {listen, startWebServer, useProfile, writeDomains, writeSettings} from '../site/appliance.mjs';
+import {makeAuthority} from '../site/authority.mjs';
+import {connect, withLimitOf} from './connection.mjs';
+
+const PATIENCE = 20_000;
+const RETURN_PAGE = '/webman/sso/return.cgi';
+const [webroot] = process.argv.slice(2);
+
+async function startSite() {
+    const folder = mkdtempSync('/tmp/web-server-');
+    const authority = makeAuthority(folder);
+    const served = path.join(folder, 'webroot');
+    cpSync(webroot, served, {recursive: true});
+    const socket = await listen();
+    const origin = `https://localhost:${socket.address().port}`;
+    const server = startWebServer({
+        socket,
+        webroot: served,
+        certificate: authority.issue('appliance', 'DNS:localhost'),
+        folder,
+        frontEndSettings: withLimitOf(1, folder),
+    });
+    const endpoint = 'https://provider.invalid/';
+    const endpoints = {discovery: endpoint, authorization: endpoint, token: endpoint, logout: endpoint};
+    const client = {id: 'the client', secret: 'a secret', redirectURI: origin + RETURN_PAGE};
+    writeDomains({});
+    writeSettings({provider: {endpoints}, clients: [{...client, tenant: 'the tenant'}, client]});
+    useProfile('websphere');
+    return {origin, authority: readFileSync(authority.file), ...server};
+}
+
+/** Every line end counts, also one that only some clients accept. */
+function parseAnswer(text) {
+    const [head, ...body] = text.split('\r\n\r\n');
+    const [statusLine, ...lines] = head.split(/\r\n|\r|\n/);
+    const headers = lines.map((line) => /^([^:]*): ?(.*)$/.exec(line)?.slice(1) ?? [line, '']);
+    return {
+        status: Number(/^HTTP\/1\.[01] (\d{3}) /.exec(statusLine)?.[1]),
+        headers: headers.map(([name, value]) => [name.toLowerCase(), value]),
+        body: body.join('\r\n\r\n'),
+    };
+}
+
+function request(target, {method = 'GET', headers = {}, body = ''} = {}) {
+    const all = Object.entries({Host: 'localhost', Connection: 'close', ...headers});
+    return `${method} ${target} HTTP/1.1\r\n${all.map(([name, value]) => `${name}: ${value}\r\n`).join('')}\r\n${body}`;
+}
+
+describe('The web server', () => {
+    let site;
+    before(async () => {
+        site = await startSite();
+    });
+    after(() => site.stop());
+
+    /** The answer to a request that is sent byte for byte, up to where the server ends the connection. */
+    async function send(bytes) {
+        const socket = await connect(site.authority, site);
+        socket.setTimeout(PATIENCE, () => socket.destroy(new Error('the server does not answer')));
+        socket.write(bytes, 'latin1');
+        let text = '';
+        for await (const chunk of socket.setEncoding('latin1')) {
+            text += chunk;
+        }
+        return parseAnswer(text);
+    }
+
+    /** The status of an answer over HTTP/2 to a request whose body does not end. */
+    async function statusOverHttp2(headers, body) {
+        const address = `https://127.0.0.1:${new URL(site.origin).port}`;
+        const session = http2.connect(address, {ca: site.authority, servername: 'localhost'});
+        try {
+            const stream = session.request(headers, {endStream: false});
+            stream.on('error', () => {}); // The server may reset it after its answer.
+            stream.write(body);
+            const [{':status': status}] = await once(stream, 'response');
+            return status;
+        } finally {
+            session.destroy();
+        }
+    }
+
+    describe('stores no request body', () => {
+        const part = 'x'.repeat(100_000);
+        const bodies = {
+            'of a huge length': {headers: {'Content-Length': '1000000000000'}, body: part},
+            'in a huge chunk': {headers: {'Transfer-Encoding': 'chunked'}, body: `10000000\r\n${part}`},
+            'in many chunks': {
+                headers: {'Transfer-Encoding': 'chunked'},
+                body: `400\r\n${'x'.repeat(1024)}\r\n`.repeat(100),
+            },
+        };
+
+        async function expectNothingStored(expected, sendAndReadStatus) {
+            const watcher = watch(site.uploads);
+            const stored = once(watcher, 'change').then(([, name]) => assert.fail(`the server stores ${name}`));
+            try {
+                assert.equal(await Promise.race([sendAndReadStatus(), stored]), expected);
+                assert.deepEqual(readdirSync(site.uploads), []);
+            } finally {
+                watcher.close();
+            }
+        }
+
+        for (const [kind, {headers, body}] of Object.entries(bodies)) {
+            for (const target of ['/index.cgi', '/webman/sso/logout.cgi']) {
+                test(`${kind}, at ${target}`, () => expectNothingStored(413, async () =>
+                    (await send(request(target, {method: 'POST', headers, body}))).status));
+            }
+        }
+
+        test('of a huge length, over HTTP/2', () => expectNothingStored(413, () =>
+            statusOverHttp2({':method': 'POST', ':path': '/index.cgi', 'content-length': '1000000000000'}, part)));
+        test('of no length, over HTTP/2', () => expectNothingStored(411, () =>
+            statusOverHttp2({':method': 'POST', ':path': '/index.cgi'}, part)));
+    });
+});
