@@ -1,7 +1,7 @@
-// Attacks on the web server of the running site: request bodies. Runs as root of private namespaces.
+// Attacks on the web server of the running site: request bodies and other paths. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
-import {cpSync, mkdtempSync, readdirSync, readFileSync, watch} from 'node:fs';
+import {cpSync, mkdtempSync, readdirSync, readFileSync, watch, writeFileSync} from 'node:fs';
 import http2 from 'node:http2';
 import path from 'node:path';
 import {after, before, describe, test} from 'node:test';
@@ -11,14 +11,36 @@ import {makeAuthority} from '../site/authority.mjs';
 import {connect, withLimitOf} from './connection.mjs';
 
 const PATIENCE = 20_000;
+const SECRET = 'a secret of the web root';
 const RETURN_PAGE = '/webman/sso/return.cgi';
+const SERVED = [
+    '/', '/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi', '/webman/sso/logout.cgi',
+    ...['mark.svg', 'reasons.js', 'relay.html', 'relay.js', 'style.css']
+        .map((name) => `/webman/ssoclient/${name}`),
+];
+// Files that a crash, an editor or an administrator may leave in the web root.
+const PLANTED = [
+    'core', 'index.html', '.profile', 'index.cgi~', 'webman/core', 'webman/sso/core', 'webman/sso/core.4711',
+    'webman/sso/x', 'webman/sso/.hidden', 'webman/sso/login.cgi.orig', 'webman/ssoclient/core',
+    'webman/ssoclient/relay.html.orig', 'webman/ssoclient/.hidden.js',
+];
+const PLANTED_PROGRAMS = ['other.cgi', 'webman/other.cgi', 'webman/sso/.cgi', 'webman/sso/Core.cgi',
+    'webman/sso/copy.of.login.cgi', 'webman/ssoclient/other.cgi'];
+
 const [webroot] = process.argv.slice(2);
+
+function plant(root) {
+    const write = (name, text) => writeFileSync(path.join(root, name), text, {mode: 0o755});
+    PLANTED.forEach((name) => write(name, SECRET));
+    PLANTED_PROGRAMS.forEach((name) => write(name, `#!/bin/sh\nprintf 'Content-Type: text/plain\\n\\n${SECRET}'\n`));
+}
 
 async function startSite() {
     const folder = mkdtempSync('/tmp/web-server-');
     const authority = makeAuthority(folder);
     const served = path.join(folder, 'webroot');
     cpSync(webroot, served, {recursive: true});
+    plant(served);
     const socket = await listen();
     const origin = `https://localhost:${socket.address().port}`;
     const server = startWebServer({
@@ -121,5 +143,36 @@ describe('The web server', () => {
             statusOverHttp2({':method': 'POST', ':path': '/index.cgi', 'content-length': '1000000000000'}, part)));
         test('of no length, over HTTP/2', () => expectNothingStored(411, () =>
             statusOverHttp2({':method': 'POST', ':path': '/index.cgi'}, part)));
+    });
+
+    describe('serves', () => {
+        for (const target of SERVED) {
+            test(`${target}`, async () => {
+                const {status} = await send(request(target));
+                assert.ok([200, 302, 405].includes(status), `status ${status}`);
+            });
+        }
+    });
+
+    describe('refuses', () => {
+        const encode = (name) => encodeURIComponent(name).replaceAll('%2F', '/');
+        const others = [
+            // Path info.
+            '/index.cgi/extra', '/index.cgi/', '/account.cgi/extra', '/webman/sso/login.cgi/extra',
+            '/webman/sso/return.cgi/relay.html',
+            // Other spellings.
+            '/webman/sso/%63ore', '/webman//sso/core', '/webman/./sso/core', '/webman/ssoclient/../sso/core',
+            '/webman/sso%2fcore', '/webman/sso/login.cgi/../core', '/webman/ssoclient/%2e%2e/sso/core',
+            '/webman/sso/core?/index.cgi', '/core%23/index.cgi',
+            // Folders and other names.
+            '/webman', '/webman/', '/webman/sso/', '/webman/ssoclient/', '/INDEX.CGI', '/favicon.ico',
+        ];
+        for (const target of [...[...PLANTED, ...PLANTED_PROGRAMS].map((name) => `/${encode(name)}`), ...others]) {
+            test(`${target}`, async () => {
+                const {status, body} = await send(request(target));
+                assert.ok(!body.includes(SECRET), 'the file is served');
+                assert.ok(status === 403 || status === 404, `status ${status}`);
+            });
+        }
     });
 });
