@@ -1,4 +1,5 @@
-// Attacks on the web server of the running site: request bodies and other paths. Runs as root of private namespaces.
+// Attacks on the web server of the running site: request bodies, other paths and missing headers. Runs as root of
+// private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {cpSync, mkdtempSync, readdirSync, readFileSync, watch, writeFileSync} from 'node:fs';
@@ -12,10 +13,19 @@ import {connect, withLimitOf} from './connection.mjs';
 
 const PATIENCE = 20_000;
 const SECRET = 'a secret of the web root';
+const LOGIN_PAGE = '/webman/sso/login.cgi';
 const RETURN_PAGE = '/webman/sso/return.cgi';
+const PROTECTION = {
+    'cache-control': 'no-store',
+    'content-security-policy': "default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; " +
+        "base-uri 'none'; form-action 'self'; frame-ancestors 'none'",
+    'referrer-policy': 'no-referrer',
+    'strict-transport-security': 'max-age=31536000',
+    'x-content-type-options': 'nosniff',
+};
 const SERVED = [
     '/', '/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi', '/webman/sso/logout.cgi',
-    ...['mark.svg', 'reasons.js', 'relay.html', 'relay.js', 'style.css']
+    ...['error.html', 'mark.svg', 'reasons.js', 'relay.html', 'relay.js', 'style.css']
         .map((name) => `/webman/ssoclient/${name}`),
 ];
 // Files that a crash, an editor or an administrator may leave in the web root.
@@ -33,6 +43,7 @@ function plant(root) {
     const write = (name, text) => writeFileSync(path.join(root, name), text, {mode: 0o755});
     PLANTED.forEach((name) => write(name, SECRET));
     PLANTED_PROGRAMS.forEach((name) => write(name, `#!/bin/sh\nprintf 'Content-Type: text/plain\\n\\n${SECRET}'\n`));
+    write('webman/sso/stuck.cgi', '#!/bin/sh\nexec tail -f /dev/null\n');
 }
 
 async function startSite() {
@@ -172,6 +183,43 @@ describe('The web server', () => {
                 const {status, body} = await send(request(target));
                 assert.ok(!body.includes(SECRET), 'the file is served');
                 assert.ok(status === 403 || status === 404, `status ${status}`);
+            });
+        }
+    });
+
+    describe('protects its answer by headers', () => {
+        const huge = {'Content-Length': '1000000000000'};
+        const post = (headers, body) => request('/index.cgi', {method: 'POST', headers, body});
+        const answers = [
+            [200, 'a page', request('/index.cgi')],
+            [200, 'a file', request('/webman/ssoclient/relay.html')],
+            [200, 'a range that the file does not have',
+                request('/webman/ssoclient/relay.html', {headers: {Range: 'bytes=1000000-'}})],
+            [302, 'a sign-in', request(LOGIN_PAGE)],
+            [400, 'no request', 'nonsense\r\n\r\n'],
+            [400, 'no host', 'GET / HTTP/1.1\r\n\r\n'],
+            [400, 'a host that is none', request('/', {headers: {Host: 'local<host'}})],
+            [400, 'a control character in a header', request('/', {headers: {Cookie: 'a\x01b'}})],
+            [400, 'a chunk that is none', post({'Transfer-Encoding': 'chunked'}, 'nonsense\r\n')],
+            [403, 'a path that is not served', request('/webman/sso/core')],
+            [403, 'such a path, not modified', request('/webman/sso/core', {headers: {'If-None-Match': '*'}})],
+            [404, 'a program that is not there', request('/webman/sso/nowhere.cgi')],
+            [405, 'a method that the program refuses', request('/webman/sso/logout.cgi')],
+            [411, 'a body without a length', post({})],
+            [413, 'a large body', post(huge)],
+            [413, 'a large body that waits', post({...huge, Expect: '100-continue'})],
+            [431, 'a long address', request(`/index.cgi?${'x'.repeat(10_000)}`)],
+            [431, 'a long header', request('/index.cgi', {headers: {Cookie: 'x'.repeat(10_000)}})],
+            [501, 'an unknown method', request('/index.cgi', {method: 'NONSENSE'})],
+            [504, 'a program that does not answer', request('/webman/sso/stuck.cgi')],
+            [505, 'an unknown version', 'GET / HTTP/4.2\r\nHost: localhost\r\n\r\n'],
+        ];
+        for (const [status, kind, bytes] of answers) {
+            test(`${status}: ${kind}`, async () => {
+                const answer = await send(bytes);
+                assert.equal(answer.status, status);
+                const found = answer.headers.filter(([name]) => name in PROTECTION).sort();
+                assert.deepEqual(found, Object.entries(PROTECTION));
             });
         }
     });
