@@ -1,5 +1,5 @@
-// Attacks on the web server of the running site: request bodies, other paths and missing headers. Runs as root of
-// private namespaces.
+// Attacks on the web server of the running site: request bodies, other paths, missing headers and header injection.
+// Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {cpSync, mkdtempSync, readdirSync, readFileSync, watch, writeFileSync} from 'node:fs';
@@ -9,6 +9,7 @@ import {after, before, describe, test} from 'node:test';
 
 import {listen, startWebServer, useProfile, writeDomains, writeSettings} from '../site/appliance.mjs';
 import {makeAuthority} from '../site/authority.mjs';
+import {Browser} from './browser.mjs';
 import {connect, withLimitOf} from './connection.mjs';
 
 const PATIENCE = 20_000;
@@ -81,6 +82,8 @@ function parseAnswer(text) {
         body: body.join('\r\n\r\n'),
     };
 }
+
+const valuesOf = ({headers}, wanted) => headers.filter(([name]) => name === wanted).map(([, value]) => value);
 
 function request(target, {method = 'GET', headers = {}, body = ''} = {}) {
     const all = Object.entries({Host: 'localhost', Connection: 'close', ...headers});
@@ -174,9 +177,9 @@ describe('The web server', () => {
             // Other spellings.
             '/webman/sso/%63ore', '/webman//sso/core', '/webman/./sso/core', '/webman/ssoclient/../sso/core',
             '/webman/sso%2fcore', '/webman/sso/login.cgi/../core', '/webman/ssoclient/%2e%2e/sso/core',
-            '/webman/sso/core?/index.cgi', '/core%23/index.cgi',
+            '/webman/sso/core?/index.cgi', '/webman/sso/core%00.cgi', '/webman/sso/core%0a.cgi', '/core%23/index.cgi',
             // Folders and other names.
-            '/webman', '/webman/', '/webman/sso/', '/webman/ssoclient/', '/INDEX.CGI', '/favicon.ico',
+            '/webman', '/webman/', '/webman/sso/', '/webman/ssoclient/', '/INDEX.CGI', '/index.cgi%00', '/favicon.ico',
         ];
         for (const target of [...[...PLANTED, ...PLANTED_PROGRAMS].map((name) => `/${encode(name)}`), ...others]) {
             test(`${target}`, async () => {
@@ -222,5 +225,62 @@ describe('The web server', () => {
                 assert.deepEqual(found, Object.entries(PROTECTION));
             });
         }
+    });
+
+    describe('lets no line break become a header', () => {
+        const injected = 'Injected: yes';
+        const breaks = {
+            '%0D%0A': 'CR LF',
+            '%0A': 'LF',
+            '%0D': 'CR',
+            '%250D%250A': 'CR LF, encoded twice',
+            '\r': 'a raw CR',
+        };
+        const targets = SERVED.flatMap((target) =>
+            ['code', 'error', 'error_description', 'origin', 'state'].map((name) => `${target}?${name}=`));
+
+        for (const [lineBreak, kind] of Object.entries(breaks)) {
+            test(`${kind} in the query of each path`, async () => {
+                for (const target of targets) {
+                    const answer = await send(request(`${target}/x${lineBreak}${injected.replace(' ', '%20')}`));
+                    assert.deepEqual(valuesOf(answer, 'injected'), [], target);
+                    assert.ok([200, 302, 405].includes(answer.status), `${target}: status ${answer.status}`);
+                }
+            });
+        }
+
+        for (const [lineBreak, kind] of [['\r\n', 'a raw CR LF'], ['\n', 'a raw LF']]) {
+            test(`${kind} in the query`, async () => {
+                const answer = await send(request(`${RETURN_PAGE}?state=x${lineBreak}${injected}`));
+                assert.equal(answer.status, 400);
+                assert.deepEqual(valuesOf(answer, 'injected'), []);
+            });
+        }
+
+        test('CR LF in the path', async () => {
+            const answer = await send(request(`${RETURN_PAGE}%0D%0A${injected.replace(' ', '%20')}`));
+            assert.equal(answer.status, 403);
+            assert.deepEqual(valuesOf(answer, 'injected'), []);
+        });
+
+        test("CR LF in the provider's error: the relay page shows it", async () => {
+            const browser = new Browser(site.authority, () => {});
+            const {next} = await browser.request('GET', new URL(site.origin + LOGIN_PAGE));
+            const query = new URLSearchParams({
+                error: 'access_denied',
+                error_description: `first line\r\n${injected}\r\n\r\n<script>alert(1)</script>`,
+                state: next.searchParams.get('state'),
+            });
+            const cookies = browser.cookies.for(new URL(site.origin)).map(({name, value}) => `${name}=${value}`);
+            const answer = await send(request(`${RETURN_PAGE}?${query}`, {headers: {Cookie: cookies.join('; ')}}));
+            assert.equal(answer.status, 302);
+            assert.deepEqual(valuesOf(answer, 'injected'), []);
+            const [location] = valuesOf(answer, 'location');
+            const {pathname, hash} = new URL(location, site.origin);
+            assert.equal(pathname, '/webman/ssoclient/relay.html');
+            const reason = new URLSearchParams(hash.slice(1)).get('reason');
+            assert.match(reason, /access_denied.*first line {2}Injected: yes/);
+            assert.doesNotMatch(reason, /\p{Cc}/u);
+        });
     });
 });
