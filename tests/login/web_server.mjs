@@ -1,5 +1,5 @@
-// Attacks on the web server of the running site: request bodies, other paths, missing headers and header injection.
-// Runs as root of private namespaces.
+// Attacks on the web server of the running site: request bodies, other paths, missing headers, header injection and
+// variables of the programs. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {cpSync, mkdtempSync, readdirSync, readFileSync, watch, writeFileSync} from 'node:fs';
@@ -44,6 +44,7 @@ function plant(root) {
     const write = (name, text) => writeFileSync(path.join(root, name), text, {mode: 0o755});
     PLANTED.forEach((name) => write(name, SECRET));
     PLANTED_PROGRAMS.forEach((name) => write(name, `#!/bin/sh\nprintf 'Content-Type: text/plain\\n\\n${SECRET}'\n`));
+    write('webman/sso/environment.cgi', "#!/bin/sh\nprintf 'Content-Type: text/plain\\n\\n'\nenv\n");
     write('webman/sso/stuck.cgi', '#!/bin/sh\nexec tail -f /dev/null\n');
 }
 
@@ -282,5 +283,27 @@ describe('The web server', () => {
             assert.match(reason, /access_denied.*first line {2}Injected: yes/);
             assert.doesNotMatch(reason, /\p{Cc}/u);
         });
+    });
+
+    test("sets no variable but HTTP_* from a client's headers", async () => {
+        const variables = async (headers) => {
+            const {status, body} = await send(request('/webman/sso/environment.cgi', {headers}));
+            assert.equal(status, 200);
+            const found = Object.fromEntries(body.trim().split('\n').map((line) => /^(\w+)=(.*)$/.exec(line).slice(1)));
+            delete found.REMOTE_PORT; // differs with each connection
+            return found;
+        };
+        const names = [
+            'Proxy', 'HTTP_PROXY', 'http_proxy', 'https_proxy', 'all_proxy', 'no_proxy', 'All-Proxy', 'ALL_PROXY',
+            'LD_PRELOAD', 'LD_LIBRARY_PATH', 'PATH', 'HOME', 'CURL_HOME', 'SSL_CERT_FILE', 'Ssl-Cert-File',
+            'SSLKEYLOGFILE', 'OPENSSL_CONF', 'MALLOC_PERTURB_', 'REMOTE_USER', 'REMOTE_ADDR', 'REQUEST_METHOD',
+            'QUERY_STRING', 'HTTPS', 'SCRIPT_FILENAME', 'DOCUMENT_ROOT', 'REDIRECT_STATUS', 'Redirect-Status',
+        ];
+        const plain = await variables({});
+        const attacked = await variables(Object.fromEntries(names.map((name) => [name, 'attack'])));
+        const others = Object.entries(attacked).filter(([name]) => !name.startsWith('HTTP_') || name in plain);
+        assert.deepEqual(Object.fromEntries(others), plain);
+        assert.ok(!('HTTP_PROXY' in attacked), 'the header Proxy is passed');
+        assert.ok('HTTP_LD_PRELOAD' in attacked, 'the headers do not reach the program');
     });
 });
