@@ -76,6 +76,7 @@ server.systemd-socket-activation := "enable"
 server.bind := "127.0.0.1"
 server.port := ${socket.address().port}
 server.errorlog := "${log}"
+server.errorlog-use-syslog := "disable"
 server.breakagelog := "${log}"
 server.upload-dirs := ( "${uploads}" )
 server.modules += ( "mod_openssl" )
