@@ -9,12 +9,12 @@ namespace Frontend {
 
 namespace {
 
-// Nothing here is for a cache, for a frame, or for another site to learn where the user came from.
+// Pages must not be cached or framed, and another site must not learn where the user came from. The policy is not
+// "no-referrer", under which browsers send no Origin with a form.
 constexpr char kEveryAnswer[] =
     "Cache-Control: no-store\n"
-    "Referrer-Policy: no-referrer\n"
+    "Referrer-Policy: same-origin\n"
     "X-Content-Type-Options: nosniff\n"
-    "Strict-Transport-Security: max-age=31536000\n"
     "Content-Security-Policy: default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; "
     "base-uri 'none'; form-action 'self'; frame-ancestors 'none'\n";
 

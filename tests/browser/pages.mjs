@@ -13,7 +13,7 @@ const FAILURE = `${RELAY_PAGE}#${new URLSearchParams({reason: 'TAVOWinsUserNameF
 
 const PROTECTION = {
     'cache-control': 'no-store',
-    'referrer-policy': 'no-referrer',
+    'referrer-policy': 'same-origin',
     'x-content-type-options': 'nosniff',
     'content-security-policy': "default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; " +
         "base-uri 'none'; form-action 'self'; frame-ancestors 'none'",

@@ -19,7 +19,7 @@ const OTHER = [
     '/* */', '--user NAME', '0 tests', '== passed', '[ -- ]', '[ ok ]', '[VERSION] - YYYY-MM-DD',
     'Cache-Control: no-store', 'Conflicts: libtavoplatform-abi-0', 'ERROR: LEAVECriticalSection', 'Keep a Changelog',
     'Location: ', 'OIDCLogin(code, user)', 'On request', 'Provides: libtavoplatform-abi-0',
-    'Referrer-Policy: no-referrer', 'Refuse a token whose clock cannot be read', 'Replaces: libtavoplatform-abi-0',
+    'Referrer-Policy: same-origin', 'Refuse a token whose clock cannot be read', 'Replaces: libtavoplatform-abi-0',
     'TimeOut 60', 'a id_token', 'find_package(tavosso REQUIRED)', 'frame-ancestors \'none\'',
     'libgtest-dev libgmock-dev', 'libtavoplatform0 | libtavoplatform-abi-0', 'not support', 'openid profile email',
     'project(tavosso VERSION ...)', 'target_link_libraries(sso.cgi PRIVATE tavosso::tavosso)', 'typeinfo name',

@@ -23,9 +23,8 @@ std::string Output(Write write) {
 void ExpectProtection(const std::string &output) {
     const std::string head = output.substr(0, output.find("\n\n") + 1);
     EXPECT_THAT(head, HasSubstr("Cache-Control: no-store\n"));
-    EXPECT_THAT(head, HasSubstr("Referrer-Policy: no-referrer\n"));
+    EXPECT_THAT(head, HasSubstr("Referrer-Policy: same-origin\n"));
     EXPECT_THAT(head, HasSubstr("X-Content-Type-Options: nosniff\n"));
-    EXPECT_THAT(head, HasSubstr("Strict-Transport-Security: max-age=31536000\n"));
     EXPECT_THAT(head, HasSubstr("Content-Security-Policy: default-src 'none'; "));
     EXPECT_THAT(head, HasSubstr("; frame-ancestors 'none'\n"));
     EXPECT_THAT(head, Not(HasSubstr("unsafe-inline")));

@@ -175,7 +175,7 @@ export class Walk {
     #checkApplianceAnswer({status, headers}) {
         assert.ok(status === 200 || status === 302, `the appliance answers ${status}`);
         assert.equal(headers['cache-control'], 'no-store');
-        assert.equal(headers['referrer-policy'], 'no-referrer');
+        assert.equal(headers['referrer-policy'], 'same-origin');
         assert.equal(headers['x-content-type-options'], 'nosniff');
         assert.match(headers['content-security-policy'], /^default-src 'none';.* frame-ancestors 'none'$/);
         for (const cookie of headers['set-cookie'] ?? []) {

@@ -20,7 +20,7 @@ const PROTECTION = {
     'cache-control': 'no-store',
     'content-security-policy': "default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; " +
         "base-uri 'none'; form-action 'self'; frame-ancestors 'none'",
-    'referrer-policy': 'no-referrer',
+    'referrer-policy': 'same-origin',
     'strict-transport-security': 'max-age=31536000',
     'x-content-type-options': 'nosniff',
 };
