@@ -69,6 +69,19 @@ const PAGES = {
     },
 };
 
+const TITLES = {
+    'the start page': 'Sign in',
+    'the start page, single sign-on off': 'Sign in',
+    'the start page, single sign-on incomplete': 'Sign in',
+    "the provider's form": 'Example organisation',
+    'the start page, signed in': 'Signed in',
+    'the account page': 'Your account',
+    'the page on the way out': 'Signing out',
+    'the relay page after a success': 'You are signed in',
+    'the relay page after a failure': 'You could not be signed in',
+    'the relay page after a sign-out': 'You are signed out',
+};
+
 // An answer without content leaves the browser where it is.
 function stayOn(visitor, elsewhere) {
     return visitor.page.route(elsewhere, (route) => route.fulfill({status: 204}));
@@ -84,6 +97,7 @@ function defineAccessibility(stage) {
         it(`has no barriers, on a phone and a desktop, in light and dark: ${name}`, () => stage.visit(async (visitor) => {
             const {page} = visitor;
             await open(visitor, stage);
+            assert.equal(await page.title(), TITLES[name]);
             await page.evaluate(stage.axe);
             for (const {width, colorScheme} of SCREENS) {
                 await page.setViewportSize({width, height: 800});
