@@ -3,9 +3,12 @@
 #include <gmock/gmock.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 #include <utime.h>
 
 #include <array>
+#include <cerrno>
 #include <csignal>
 #include <filesystem>
 #include <fstream>
@@ -13,6 +16,20 @@
 #include <thread>
 
 using namespace Frontend;
+
+namespace {
+
+int unlinkError = 0;  // what the next calls of unlinkat fail with
+
+}  // namespace
+
+extern "C" int unlinkat(int folder, const char *name, int flags) noexcept {
+    if (unlinkError != 0) {
+        errno = unlinkError;
+        return -1;
+    }
+    return static_cast<int>(syscall(SYS_unlinkat, folder, name, flags));
+}
 
 namespace {
 
@@ -113,6 +130,17 @@ TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
     EXPECT_THROW(static_cast<void>(things.Keep(name, "text")), std::system_error);
     setrlimit(RLIMIT_FSIZE, &former);
     EXPECT_EQ(things.Read(name), std::nullopt);
+}
+
+TEST_F(PrivateFolderTest, TakesNoTextThatItCannotRemove) {
+    PrivateFolder things("things", kLifetime);
+    const std::string name = Keep(things, "text");
+    unlinkError = EROFS;
+    EXPECT_THROW(things.Take(name), std::system_error);
+    unlinkError = ENOENT;  // another taker was faster
+    EXPECT_EQ(things.Take(name), std::nullopt);
+    unlinkError = 0;
+    EXPECT_EQ(things.Take(name), "text");
 }
 
 TEST_F(PrivateFolderTest, OfTwoTakersOneGetsTheText) {
