@@ -1,11 +1,13 @@
 #include <gmock/gmock.h>
 
 #include <memory>
+#include <new>
 #include <string>
 #include <vector>
 
 #include "jwt/jwt.h"
 #include "sso/sso.h"
+#include "tests/interposed/memory.h"
 #include "tests/interposed/releases.h"
 #include "tests/loopback/provider.h"
 #include "tests/support/encoding.h"
@@ -186,6 +188,26 @@ TEST_P(Secrets, AreOverwrittenWhenTheFileIsNotJSON) {
     EXPECT_EQ(MakeClient(GetParam())->GetClientSecret(), "");
     EXPECT_GT(releases.Blocks(), 0U);
     EXPECT_THAT(releases.Found(), IsEmpty());
+}
+
+TEST_P(Secrets, AreOverwrittenWhenMemoryRunsOutOverTheTokenRequest) {
+    const Provider provider(GetParam());
+    const auto client = MakeClient(GetParam());
+    client->SetCode(kCode);
+    const std::vector<std::string> secrets = All();
+    int n = 0;
+    for (bool ranOut = true; ranOut;) {
+        const WatchReleases releases(secrets);
+        FailingAllocation failing(++n, FailingAllocation::Of::kCxx);
+        try {
+            client->GetIDTokenReqParams();
+        } catch (const std::bad_alloc &) {
+        }
+        failing.Stop();
+        ranOut = failing.Happened();
+        EXPECT_THAT(releases.Found(), IsEmpty()) << n;
+    }
+    EXPECT_GT(n, 10);
 }
 
 TEST(LargeParts, AreOverwrittenToTheirEnds) {
