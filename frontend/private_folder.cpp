@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <chrono>
 #include <cstring>
 #include <memory>
 #include <system_error>
@@ -109,9 +110,12 @@ std::string ReadAll(const Descriptor &file) {
     return text;
 }
 
+/// Not time(), which may lag behind the clock of files: a new file would be dated in the future.
+std::time_t Now() { return std::chrono::system_clock::to_time_t(std::chrono::system_clock::now()); }
+
 /// Whether a file has not expired. One dated in the future never would: it has.
 bool IsAlive(const struct stat &status, std::time_t lifetime) {
-    const std::time_t now = std::time(nullptr);
+    const std::time_t now = Now();
     return status.st_mtime <= now && now - status.st_mtime <= lifetime;
 }
 
@@ -227,7 +231,7 @@ bool PrivateFolder::CountOneMore() {
         ThrowSystemError("The front end's counter cannot be locked");
     }
     const Json::Value known = ParseObject(ReadAll(counter));
-    const std::time_t now = std::time(nullptr);
+    const std::time_t now = Now();
     const std::time_t swept = known["swept"].isInt64() ? known["swept"].asInt64() : 0;
     const bool isRecent = swept <= now && now - swept < kSecondsBetweenSweeps && known["count"].isUInt64() &&
                           known["count"].asUInt64() < capacity;
