@@ -33,6 +33,7 @@ constexpr CalledFunction kCalledFunctions[] = {
     // from its seed() after `new self_contained_impl()`.
     {"getrandom", nullptr},
     {"malloc", nullptr},
+    {"memchr", kOnlyMemory},
     {"memcmp", kOnlyMemory},
     {"memcpy", kOnlyMemory},
     {"memmove", kOnlyMemory},
