@@ -9,12 +9,12 @@
 #include "frontend/answer.h"
 
 /*
- * Ties a login to the browser that started it. Otherwise anyone could send a victim's browser to the return page with a
- * code of their own, and the victim would unknowingly work in the attacker's account.
+ * Ties a login to the browser that started it. Otherwise anyone could send a victim's browser to the return page with
+ * the attacker's code, and the victim would unknowingly work in the attacker's account.
  *
  * A random value goes to the provider in the state and to the browser in a cookie. The server remembers it for one use
- * and for ten minutes. Each login has a cookie of its own, since several tabs may be signing in at once; there are 16
- * names for these cookies, so that another site that starts logins cannot fill the browser's requests with them.
+ * and for ten minutes. Each login has its own cookie, since several tabs may be signing in at once. There are 16 names
+ * for these cookies, so that another site that starts logins cannot fill the browser's requests with them.
  */
 namespace Frontend {
 

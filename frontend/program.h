@@ -8,8 +8,8 @@
 namespace Frontend {
 
 /**
- * The main function of a CGI program. Whatever `serve` throws becomes one line in the log and a relay page with a
- * reason. A request with a method that is not in `methods`, as in an Allow header, is answered with status 405.
+ * The main function of a CGI program. What `serve` throws becomes one line in the log and a relay page with a reason. A
+ * request with a method that is not in `methods`, as in an Allow header, is answered with status 405.
  *
  * Side effects on the process: it writes no core file and cannot be traced; its address space is limited; variables
  * of the environment that change what the libraries below trust are removed, unless FRONTEND_KEEP_ENVIRONMENT names

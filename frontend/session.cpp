@@ -18,7 +18,7 @@ constexpr std::size_t kMostSessions = 10000;
 
 PrivateFolder OpenSessions() { return {kFolder, kSeconds, kMostSessions}; }
 
-/// A text that is not exactly a session signs nobody in.
+/// Accepts a session in exactly the format that StartSession writes.
 std::optional<Session> ParseSession(const std::optional<std::string> &text) {
     const Json::Value session = ParseObject(text.value_or(""));
     const std::string user = StringMember(session, "user");

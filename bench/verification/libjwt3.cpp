@@ -1,4 +1,4 @@
-// libjwt 3. In a library of its own, since its functions have the names of libjwt 1's.
+// libjwt 3. In a separate library, since its functions have the names of libjwt 1's.
 #include <jwt.h>
 
 #include "bench/verification/subjects.h"

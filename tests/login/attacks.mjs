@@ -77,7 +77,7 @@ describe('An attacker', () => {
         return (await browser.submit(form, {login, password: site.users.get(login).password}, isReturn)).next;
     }
 
-    /** What the relay page is told. */
+    /** The parameters of the relay page. */
     async function comeBack(browser, address) {
         const relay = await browser.open(address);
         return Object.fromEntries(new URLSearchParams(relay.url.hash.slice(1)));
@@ -91,7 +91,7 @@ describe('An attacker', () => {
     const sessionFile = (browser) =>
         `${FRONT_END}/sessions/${browser.cookies.for(at('/')).find(({name}) => name === SESSION_COOKIE).value}`;
 
-    test('who starts logins from another site cannot fill the requests of a browser', async () => {
+    test('cannot fill the requests of a browser by starting logins from another site', async () => {
         const browser = newBrowser();
         for (let i = 0; i < 150; ++i) {
             assert.equal((await browser.request('GET', at('/webman/sso/login.cgi'))).status, 302);
@@ -143,7 +143,7 @@ describe('An attacker', () => {
         assert.match((await browser.open(at('/account.cgi'))).text, /<dd>ACME\\alice<\/dd>/);
     });
 
-    test('who truncates a session signs nobody in', async () => {
+    test('gains no session by truncating its file', async () => {
         const browser = newBrowser();
         await signIn(browser, 'alice');
         assert.match((await browser.open(at('/account.cgi'))).text, /<dt>Name<\/dt>\n<dd>Alice Example<\/dd>/);
@@ -231,7 +231,7 @@ describe('An attacker', () => {
         });
     }
 
-    test('signs nobody out from another site', async () => {
+    test('cannot sign a user out from another site', async () => {
         const browser = newBrowser();
         await signIn(browser, 'alice');
         const cookie = browser.cookies.for(at('/')).map(({name, value}) => `${name}=${value}`).join('; ');
