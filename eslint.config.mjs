@@ -37,5 +37,5 @@ export default [
     },
     {files: ['**/*.mjs'], languageOptions: {globals: globals.node}},
     // The browser tests hand functions to the page, where they run.
-    {files: ['frontend/static/*.js', 'tests/browser/*.mjs'], languageOptions: {globals: globals.browser}},
+    {files: ['frontend/static/*.js', 'tests/e2e/browser/*.mjs'], languageOptions: {globals: globals.browser}},
 ];

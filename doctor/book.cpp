@@ -10,7 +10,7 @@
 #include <sstream>
 
 #include "doctor/built_in.h"
-#include "frontend/text.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -144,7 +144,7 @@ const std::vector<Row> &Rows() {
 }
 
 bool IsErrorAnswer(const std::string &text) {
-    const Json::Value answer = Frontend::ParseObject(text);
+    const Json::Value answer = TAVO::Web::ParseObject(text);
     return answer.isObject() && answer.isMember("error");
 }
 

@@ -3,7 +3,7 @@
 #include <sso/supported_profiles.h>
 
 #include "doctor/watch.h"
-#include "frontend/text.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -61,15 +61,15 @@ std::optional<std::string> RefusalOfProfile() {
 }
 
 std::string ErrorText(const Json::Value &answer) {
-    const std::string error = Frontend::StringMember(answer, "error");
-    const std::string description = Frontend::StringMember(answer, "error_description");
+    const std::string error = TAVO::Web::StringMember(answer, "error");
+    const std::string description = TAVO::Web::StringMember(answer, "error_description");
     return "The provider refused: " + (error.empty() ? "unknown error" : error) +
            (description.empty() ? "" : " (" + description + ")");
 }
 
 std::string TextOf(const std::exception &failure) {
     const std::string text = failure.what();
-    return text.empty() || text.front() != '{' ? text : ErrorText(Frontend::ParseObject(text));
+    return text.empty() || text.front() != '{' ? text : ErrorText(TAVO::Web::ParseObject(text));
 }
 
 }  // namespace Doctor

@@ -10,7 +10,7 @@
 #include "doctor/checks.h"
 #include "doctor/settings_file.h"
 #include "doctor/watch.h"
-#include "frontend/text.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -76,7 +76,7 @@ class KeyCheck {
             CheckEmpty(key);
             return;
         }
-        if (boost::trim_copy(value_) != value_ || !Frontend::IsPrintable(value_)) {
+        if (boost::trim_copy(value_) != value_ || !TAVO::Web::IsPrintable(value_)) {
             Finding("has blanks around it or control characters in it",
                     "take them out: the text is used as it stands, letter by letter");
             return;

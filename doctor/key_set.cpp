@@ -8,7 +8,7 @@
 #include <set>
 #include <vector>
 
-#include "frontend/text.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -34,18 +34,18 @@ std::vector<unsigned char> DecodeBase64Url(std::string text) {
 
 std::string Describe(const Json::Value &key) {
     std::string text =
-        "\"kid\" " + Quoted(Frontend::StringMember(key, "kid")) + ", " + Frontend::StringMember(key, "kty");
+        "\"kid\" " + Quoted(TAVO::Web::StringMember(key, "kid")) + ", " + TAVO::Web::StringMember(key, "kty");
     if (const int bits = SizeOf(key); bits > 0) {
         text += ", " + std::to_string(bits) + " bits";
     }
-    const std::string algorithm = Frontend::StringMember(key, "alg");
+    const std::string algorithm = TAVO::Web::StringMember(key, "alg");
     return algorithm.empty() ? text : text + ", " + algorithm;
 }
 
 }  // namespace
 
 int SizeOf(const Json::Value &key) {
-    const std::vector<unsigned char> bytes = DecodeBase64Url(Frontend::StringMember(key, "n"));
+    const std::vector<unsigned char> bytes = DecodeBase64Url(TAVO::Web::StringMember(key, "n"));
     const std::unique_ptr<BIGNUM, FreeNumber> modulus(BN_bin2bn(bytes.data(), static_cast<int>(bytes.size()), nullptr));
     return modulus ? BN_num_bits(modulus.get()) : 0;
 }

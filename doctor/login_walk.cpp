@@ -12,9 +12,9 @@
 #include "doctor/address.h"
 #include "doctor/checks.h"
 #include "doctor/watch.h"
-#include "frontend/cgi.h"
-#include "frontend/id_token.h"
-#include "frontend/text.h"
+#include "web/claims.h"
+#include "web/request.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -70,7 +70,7 @@ std::string ReadAddress() {
 /// What the provider is told by the address that the browser opens.
 std::string ParameterOf(const std::string &authorizationURI, const char *name) {
     const std::string query = authorizationURI.substr(authorizationURI.rfind('?') + 1);
-    return Frontend::OnlyValue(Frontend::ParseQuery(query), name).value_or("");
+    return TAVO::Web::OnlyValue(TAVO::Web::ParseQuery(query), name).value_or("");
 }
 
 class LoginWalk {
@@ -84,9 +84,9 @@ class LoginWalk {
         if (address.empty()) {
             return false;
         }
-        const Frontend::Parameters answer = Frontend::ParseQuery(SplitAddress(address).query);
+        const TAVO::Web::Parameters answer = TAVO::Web::ParseQuery(SplitAddress(address).query);
         if (CheckAnswer(answer, ParameterOf(uri, "state"))) {
-            Exchange(*Frontend::OnlyValue(answer, "code"), ParameterOf(uri, "nonce"));
+            Exchange(*TAVO::Web::OnlyValue(answer, "code"), ParameterOf(uri, "nonce"));
         }
         return true;
     }
@@ -104,14 +104,14 @@ class LoginWalk {
         return ReadAddress();
     }
 
-    bool CheckAnswer(const Frontend::Parameters &answer, const std::string &state) {
-        const std::string error = Frontend::OnlyValue(answer, "error").value_or("");
-        const auto code = Frontend::OnlyValue(answer, "code");
+    bool CheckAnswer(const TAVO::Web::Parameters &answer, const std::string &state) {
+        const std::string error = TAVO::Web::OnlyValue(answer, "error").value_or("");
+        const auto code = TAVO::Web::OnlyValue(answer, "code");
         report_.Hide(code.value_or(""));
         if (!error.empty()) {
             Json::Value told;
             told["error"] = error;
-            told["error_description"] = Frontend::OnlyValue(answer, "error_description").value_or("");
+            told["error_description"] = TAVO::Web::OnlyValue(answer, "error_description").value_or("");
             report_.Finding("login.answer", "answer of the provider", ErrorText(told),
                             "look for this error in the provider's documentation");
             return false;
@@ -122,7 +122,7 @@ class LoginWalk {
             return false;
         }
         report_.Good("login.answer", "answer of the provider", "a code");
-        if (Frontend::OnlyValue(answer, "state") != state) {
+        if (TAVO::Web::OnlyValue(answer, "state") != state) {
             report_.Finding("login.state", "state", "is not the one that was sent",
                             "take the address of this very login; a provider has to give the state back unchanged");
             return false;
@@ -151,7 +151,7 @@ class LoginWalk {
     }
 
     static std::string FoundIn(const std::string &response) {
-        const Json::Value answer = Frontend::ParseObject(response);
+        const Json::Value answer = TAVO::Web::ParseObject(response);
         return response.empty()            ? "no answer"
                : !answer.isObject()        ? "the answer is no JSON"
                : !answer.isMember("error") ? "the answer has no \"id_token\", and tells of no error"
@@ -162,7 +162,7 @@ class LoginWalk {
         Json::Value sent;
         sent["nonce"] = TAVO::SSO::MD5Digest(nonce);
         try {
-            Frontend::RequireNonce(TAVO::JWT::Jwt(token).GetBody(), sent);
+            TAVO::Web::RequireNonce(TAVO::JWT::Jwt(token).GetBody(), sent);
             report_.Good("login.nonce", "nonce", "the token is of this login");
         } catch (const std::exception &) {
             report_.Finding("login.nonce", "nonce", "the token is not of this login",

@@ -12,8 +12,8 @@
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
 #include "doctor/watch.h"
-#include "frontend/cgi.h"
-#include "frontend/text.h"
+#include "web/request.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -187,7 +187,7 @@ class ProviderCheck {
     }
 
     void CheckIssuer() {
-        const std::string issuer = Frontend::StringMember(discovery_, "issuer");
+        const std::string issuer = TAVO::Web::StringMember(discovery_, "issuer");
         constexpr char kSubject[] = "issuer";
         if (issuer.empty()) {
             report_.Note("discovery.issuer", kSubject, "the document names none", "is this the provider's address?");
@@ -201,7 +201,7 @@ class ProviderCheck {
     }
 
     void CheckEndpoint(const std::string &member, const std::string &configured, Mark mark = Mark::kFinding) {
-        const std::string published = Frontend::StringMember(discovery_, member.c_str());
+        const std::string published = TAVO::Web::StringMember(discovery_, member.c_str());
         const std::string id = "discovery." + member;
         if (published.empty()) {
             report_.Note(id, member, "the provider publishes none");
@@ -229,7 +229,7 @@ class ProviderCheck {
             }
         }
         report_.Finding(id, subject,
-                        "the provider offers " + Frontend::WriteCompact(offers) +
+                        "the provider offers " + TAVO::Web::WriteCompact(offers) +
                             ", and none that is needed: " + boost::join(usable, ", "),
                         remedy);
     }
@@ -259,7 +259,7 @@ class ProviderCheck {
     void ReportAuthorization(const Transfer &transfer) {
         constexpr char kID[] = "authorization_endpoint.request";
         constexpr char kSubject[] = "first request of a login";
-        const auto error = Frontend::OnlyValue(Frontend::ParseQuery(SplitAddress(transfer.location).query), "error");
+        const auto error = TAVO::Web::OnlyValue(TAVO::Web::ParseQuery(SplitAddress(transfer.location).query), "error");
         if (transfer.status < kRefusals && !error) {
             report_.Good(kID, kSubject, "the provider does not refuse it: HTTP " + std::to_string(transfer.status));
             return;
@@ -274,7 +274,7 @@ class ProviderCheck {
     void CheckKeys() {
         report_.Section("Keys of the provider");
         constexpr char kSubject[] = "key set";
-        const std::string address = Frontend::StringMember(discovery_, "jwks_uri");
+        const std::string address = TAVO::Web::StringMember(discovery_, "jwks_uri");
         if (address.empty()) {
             if (discovery_.isObject()) {
                 report_.Finding("keys.reachable", kSubject, "the discovery document has no \"jwks_uri\"",
@@ -310,8 +310,8 @@ class ProviderCheck {
     void ReportAnswer(const Transfer &transfer, const std::string &response) {
         Check check{"token_endpoint.client", "client at the token endpoint", Mark::kFinding, "", "",
                     LibraryOn(response)};
-        const Json::Value answer = Frontend::ParseObject(response);
-        const std::string error = Frontend::StringMember(answer, "error");
+        const Json::Value answer = TAVO::Web::ParseObject(response);
+        const std::string error = TAVO::Web::StringMember(answer, "error");
         check.found = ErrorText(answer);
         if (!answer.isObject()) {
             check.found = "the answer is no JSON: HTTP " + std::to_string(transfer.status);

@@ -8,7 +8,7 @@
 #include <iostream>
 #include <utility>
 
-#include "frontend/text.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -53,7 +53,7 @@ Json::Value ToJson(const Check &check) {
 
 }  // namespace
 
-std::string Printable(const std::string &text) { return Frontend::OneLine(text, std::string::npos); }
+std::string Printable(const std::string &text) { return TAVO::Web::OneLine(text, std::string::npos); }
 
 std::string Quoted(const std::string &text) { return '"' + text + '"'; }
 
@@ -84,7 +84,7 @@ std::string Report::Redact(std::string text) const {
         boost::replace_all(text, secret, kHidden);
     }
     // Cut last: what is left of a secret that was cut would not be found.
-    return Frontend::OneLine(text, kLongestText);
+    return TAVO::Web::OneLine(text, kLongestText);
 }
 
 void Report::Section(const std::string &title) {

@@ -12,7 +12,7 @@
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
 #include "doctor/watch.h"
-#include "frontend/text.h"
+#include "web/text.h"
 
 namespace Doctor {
 
@@ -58,7 +58,7 @@ std::string Describe(const Json::Value &object, const char *name) {
     if (!object.isObject() || !object.isMember(name)) {
         return "missing";
     }
-    return Frontend::WriteCompact(object[name]);
+    return TAVO::Web::WriteCompact(object[name]);
 }
 
 /// The text of what the library's own verification throws; empty where it passes, or may not fetch what it needs.
@@ -69,7 +69,7 @@ std::string Ask(Client &client, const std::string &token, bool mayFetch) {
     Json::Value response;
     response["id_token"] = token;
     try {
-        client->ProcessTokenResponse(Frontend::WriteCompact(response));
+        client->ProcessTokenResponse(TAVO::Web::WriteCompact(response));
         client->VerifyIDToken();
         std::string userName;
         client->GetUserName(userName);
@@ -210,8 +210,8 @@ class TokenCheck {
             report_.NotChecked("token.signature", "signature", "there is no key for it");
             return;
         }
-        std::string n = Frontend::StringMember(key, "n");
-        std::string e = Frontend::StringMember(key, "e");
+        std::string n = TAVO::Web::StringMember(key, "n");
+        std::string e = TAVO::Web::StringMember(key, "e");
         const bool hasNumbers = key["n"].isString() && key["e"].isString();
         Step("token.key_numbers", "numbers of the key", hasNumbers,
              hasNumbers ? std::to_string(SizeOf(key)) + " bits" : R"(it lacks "n" or "e")",
@@ -289,7 +289,7 @@ class TokenCheck {
         const char *claim = !isAzure                                                ? "sub"
                             : claims.isObject() && claims["unique_name"].isString() ? "unique_name"
                                                                                     : "email";
-        const std::string name = Frontend::StringMember(claims, claim);
+        const std::string name = TAVO::Web::StringMember(claims, claim);
         const bool isText = claims.isObject() && claims[claim].isString();
         const bool hasForm = isText && (!isAzure || std::count(name.begin(), name.end(), '@') == 1);
         Step("token.user_name", "user name: \"" + std::string(claim) + "\"", hasForm, Describe(claims_, claim),

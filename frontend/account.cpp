@@ -1,32 +1,35 @@
 // A page for users who are signed in, and an example of one: whoever is not signs in first and comes back to it.
 #include <sso/sso.h>
 
-#include "frontend/cgi.h"
-#include "frontend/program.h"
+#include "frontend/cgi_program.h"
+#include "frontend/environment.h"
+#include "frontend/page.h"
 #include "frontend/session.h"
-#include "frontend/text.h"
+#include "web/text.h"
+
+namespace Web = TAVO::Web;
 
 namespace {
 
-void GoAndSignIn(Frontend::Answer &answer) {
-    const std::string origin = Frontend::SafeOrigin(Frontend::Variable("REQUEST_URI"));
-    answer.Redirect("/index.cgi?origin=" + TAVO::SSO::URLEncode(origin));
+void GoAndSignIn(Web::Response &response) {
+    const std::string origin = Web::SafeOrigin(Frontend::Variable("REQUEST_URI"));
+    response.Redirect("/index.cgi?origin=" + TAVO::SSO::URLEncode(origin));
 }
 
 std::string Entry(const std::string &term, const std::string &text) {
-    return text.empty() ? "" : "<dt>" + term + "</dt>\n<dd>" + Frontend::EscapeHtml(text) + "</dd>\n";
+    return text.empty() ? "" : "<dt>" + term + "</dt>\n<dd>" + Web::EscapeHtml(text) + "</dd>\n";
 }
 
-void ShowAccount(Frontend::Answer &answer) {
-    const auto session = Frontend::FindSession(answer, Frontend::Variable("HTTP_COOKIE"));
+void ShowAccount(Web::Response &response) {
+    const auto session = Frontend::FindSession(response, Frontend::Variable("HTTP_COOKIE"));
     if (!session) {
-        GoAndSignIn(answer);
+        GoAndSignIn(response);
         return;
     }
-    answer.Page("200 OK", "Your account",
-                "<h1>Your account</h1>\n<dl>\n" + Entry("Name", session->displayName) +
-                    Entry("Name on this device", session->user) + Entry("Signed in through", session->profile) +
-                    "</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
+    Frontend::ShowPage(response, "200 OK", "Your account",
+                       "<h1>Your account</h1>\n<dl>\n" + Entry("Name", session->displayName) +
+                           Entry("Name on this device", session->user) + Entry("Signed in through", session->profile) +
+                           "</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
 }
 
 }  // namespace

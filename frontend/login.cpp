@@ -1,31 +1,35 @@
 // Starts a login: sends the browser to the provider.
 #include <sso/supported_profiles.h>
 
-#include "frontend/cgi.h"
-#include "frontend/failure.h"
-#include "frontend/pending_login.h"
-#include "frontend/profile.h"
-#include "frontend/program.h"
-#include "frontend/text.h"
+#include "frontend/cgi_program.h"
+#include "frontend/environment.h"
+#include "web/configured_profile.h"
+#include "web/pending_login.h"
+#include "web/refusal.h"
+#include "web/request.h"
+#include "web/text.h"
+
+namespace Web = TAVO::Web;
 
 namespace {
 
-void GoToProvider(Frontend::Answer &answer) {
+void GoToProvider(Web::Response &response) {
     if (Frontend::IsHeadRequest()) {
-        answer.Redirect("/index.cgi");
+        response.Redirect("/index.cgi");
         return;
     }
-    const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
-    answer.origin = Frontend::SafeOrigin(Frontend::OnlyValue(parameters, "origin").value_or(""));
-    const std::string profile = Frontend::ProfileInForce();
-    if (Frontend::HowFarSetUp() != Frontend::SetUp::kComplete) {
-        throw Frontend::Refusal("Single sign-on is not completely set up on this device.");
+    const Web::Parameters parameters = Web::ParseQuery(Frontend::Variable("QUERY_STRING"));
+    response.origin = Web::SafeOrigin(Web::OnlyValue(parameters, "origin").value_or(""));
+    const std::string profile = Web::ProfileInForce();
+    if (Web::HowFarSetUp() != Web::SetUp::kComplete) {
+        throw Web::Refusal("Single sign-on is not completely set up on this device.");
     }
     // Not `RedirectAuthEndpoint`, which writes the URL at once: its state must be remembered first.
     const auto makeAddress = [&](const Json::Value &state) {
         return TAVO::SSO::WithClient(profile, [&](auto &client) { return client.GetAccessTokenReqURI(state); });
     };
-    answer.Redirect(Frontend::StartLogin(answer, Frontend::Variable("HTTP_COOKIE"), profile, makeAddress));
+    response.Redirect(Web::StartLogin(response, Frontend::Variable("HTTP_COOKIE"), profile,
+                                      Frontend::MostPendingLogins(), makeAddress));
 }
 
 }  // namespace

@@ -2,10 +2,13 @@
 #include <sso/sso.h>
 #include <sso/supported_profiles.h>
 
-#include "frontend/cgi.h"
-#include "frontend/program.h"
+#include "frontend/cgi_program.h"
+#include "frontend/environment.h"
+#include "frontend/page.h"
 #include "frontend/session.h"
-#include "frontend/text.h"
+#include "web/text.h"
+
+namespace Web = TAVO::Web;
 
 namespace {
 
@@ -26,12 +29,12 @@ std::string ProviderLogout(const Frontend::Session &session) {
     return TAVO::SSO::GetAzureSSOLogoutURL(StartPageAddress(client.GetRedirectURI()));
 }
 
-void LeaveForProvider(Frontend::Answer &answer, const std::string &address) {
+void LeaveForProvider(Web::Response &response, const std::string &address) {
     // A page and no redirect: browsers hold the redirects that follow a form against "form-action 'self'".
-    answer.AddHeader("Refresh", "0; url=" + address);
-    answer.Page("200 OK", "Signing out",
-                "<h1>Signing out</h1>\n<p>You are signed out of this device. <a href=\"" +
-                    Frontend::EscapeHtml(address) + "\">Sign out of your organisation too</a></p>\n");
+    response.AddHeader("Refresh", "0; url=" + address);
+    Frontend::ShowPage(response, "200 OK", "Signing out",
+                       "<h1>Signing out</h1>\n<p>You are signed out of this device. <a href=\"" +
+                           Web::EscapeHtml(address) + "\">Sign out of your organisation too</a></p>\n");
 }
 
 // Every browser sends one of these headers with a form, and no other site can forge them.
@@ -41,23 +44,23 @@ bool ComesFromThisSite() {
            (!origin.empty() && origin == "https://" + Frontend::Variable("HTTP_HOST"));
 }
 
-void RefuseForeignRequest(Frontend::Answer &answer) {
-    answer.Page(
-        "403 Forbidden", "Sign out",
+void RefuseForeignRequest(Web::Response &response) {
+    Frontend::ShowPage(
+        response, "403 Forbidden", "Sign out",
         "<h1>Sign out</h1>\n<p>To sign out, use the button on the <a href=\"/index.cgi\">start page</a>.</p>\n");
 }
 
-void SignOut(Frontend::Answer &answer) {
+void SignOut(Web::Response &response) {
     if (!ComesFromThisSite()) {
-        RefuseForeignRequest(answer);
+        RefuseForeignRequest(response);
         return;
     }
-    const auto session = Frontend::EndSession(answer, Frontend::Variable("HTTP_COOKIE"));
+    const auto session = Frontend::EndSession(response, Frontend::Variable("HTTP_COOKIE"));
     const std::string address = session ? ProviderLogout(*session) : "";
     if (address.empty()) {
-        answer.Redirect("/index.cgi");
+        response.Redirect("/index.cgi");
     } else {
-        LeaveForProvider(answer, address);
+        LeaveForProvider(response, address);
     }
 }
 

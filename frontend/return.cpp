@@ -4,65 +4,66 @@
 #include <sso/supported_profiles.h>
 #include <syslog.h>
 
-#include "frontend/azure_client.h"
-#include "frontend/cgi.h"
-#include "frontend/failure.h"
-#include "frontend/id_token.h"
-#include "frontend/pending_login.h"
-#include "frontend/profile.h"
-#include "frontend/program.h"
+#include "frontend/cgi_program.h"
+#include "frontend/environment.h"
 #include "frontend/session.h"
-#include "frontend/text.h"
+#include "web/azure_client.h"
+#include "web/claims.h"
+#include "web/pending_login.h"
+#include "web/refusal.h"
+#include "web/request.h"
+#include "web/text.h"
+
+namespace Web = TAVO::Web;
 
 namespace {
 
-std::string RequireOnly(const Frontend::Parameters &parameters, const char *name) {
-    const std::optional<std::string> value = Frontend::OnlyValue(parameters, name);
+std::string RequireOnly(const Web::Parameters &parameters, const char *name) {
+    const std::optional<std::string> value = Web::OnlyValue(parameters, name);
     if (!value || value->empty()) {
-        throw Frontend::Refusal(std::string("The provider's answer has no single ") + name + ".");
+        throw Web::Refusal(std::string("The provider's answer has no single ") + name + ".");
     }
     return *value;
 }
 
-void RefuseProviderError(const Frontend::Parameters &parameters) {
+void RefuseProviderError(const Web::Parameters &parameters) {
     if (parameters.count("error") != 0) {
-        throw Frontend::Refusal(
-            Frontend::ProviderError(Frontend::OnlyValue(parameters, "error").value_or(""),
-                                    Frontend::OnlyValue(parameters, "error_description").value_or("")));
+        throw Web::Refusal(Web::ProviderError(Web::OnlyValue(parameters, "error").value_or(""),
+                                              Web::OnlyValue(parameters, "error_description").value_or("")));
     }
 }
 
 // What `OIDCLogin` does, and then the checks of the claims that the library leaves to its callers.
 Frontend::Session SignIn(const std::string &profile, const std::string &code, const Json::Value &state) {
-    return TAVO::SSO::WithClient<Frontend::AzureClient>(profile, [&](TAVO::SSO::SSOClient &client) {
+    return TAVO::SSO::WithClient<Web::AzureClient>(profile, [&](TAVO::SSO::SSOClient &client) {
         std::string user;
         client.OpenIDConnectLogin(code, user);
         const Json::Value claims = TAVO::JWT::Jwt(client.GetToken()).GetBody();
-        Frontend::RequireNonce(claims, state);
-        Frontend::RequireTrustworthyName(claims, profile);
-        if (user.empty() || !Frontend::IsPrintable(user)) {
-            throw Frontend::Refusal("The provider's name for this user cannot be used.");
+        Web::RequireNonce(claims, state);
+        Web::RequireTrustworthyName(claims, profile, Frontend::AcceptsUnverifiedEmail());
+        if (user.empty() || !Web::IsPrintable(user)) {
+            throw Web::Refusal("The provider's name for this user cannot be used.");
         }
-        return Frontend::Session{user, Frontend::DisplayName(claims), profile};
+        return Frontend::Session{user, Web::DisplayName(claims), profile};
     });
 }
 
-void CompleteLogin(Frontend::Answer &answer) {
+void CompleteLogin(Web::Response &response) {
     if (Frontend::IsHeadRequest()) {
-        answer.Redirect("/index.cgi");
+        response.Redirect("/index.cgi");
         return;
     }
     const std::string cookies = Frontend::Variable("HTTP_COOKIE");
-    const Frontend::Parameters parameters = Frontend::ParseQuery(Frontend::Variable("QUERY_STRING"));
+    const Web::Parameters parameters = Web::ParseQuery(Frontend::Variable("QUERY_STRING"));
     const std::string stateText = RequireOnly(parameters, "state");
     // Before anything of the answer is believed, and above all before the code is used.
-    const Frontend::ConcludedLogin login = Frontend::ConcludeLogin(answer, cookies, stateText);
+    const Web::ConcludedLogin login = Web::ConcludeLogin(response, cookies, stateText);
     RefuseProviderError(parameters);
     const std::string code = RequireOnly(parameters, "code");
     const Frontend::Session session = SignIn(login.profile, code, login.state);
-    Frontend::StartSession(answer, cookies, session);
-    syslog(LOG_AUTH | LOG_INFO, "frontend: signed in: %s", Frontend::OneLine(session.user).c_str());
-    answer.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, stateText, ""));
+    Frontend::StartSession(response, cookies, session);
+    syslog(LOG_AUTH | LOG_INFO, "frontend: signed in: %s", Web::OneLine(session.user).c_str());
+    response.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(true, stateText, ""));
 }
 
 }  // namespace

@@ -1,10 +1,10 @@
 #include "frontend/session.h"
 
-#include "frontend/cgi.h"
-#include "frontend/failure.h"
-#include "frontend/private_folder.h"
-#include "frontend/profile.h"
-#include "frontend/text.h"
+#include "web/configured_profile.h"
+#include "web/private_folder.h"
+#include "web/refusal.h"
+#include "web/request.h"
+#include "web/text.h"
 
 namespace Frontend {
 
@@ -16,45 +16,45 @@ constexpr std::time_t kSeconds = std::time_t{8} * 60 * 60;
 constexpr char kFormat[] = "session 1";
 constexpr std::size_t kMostSessions = 10000;
 
-PrivateFolder OpenSessions() { return {kFolder, kSeconds, kMostSessions}; }
+Web::PrivateFolder OpenSessions() { return {kFolder, kSeconds, kMostSessions}; }
 
 /// Accepts a session in exactly the format that StartSession writes.
 std::optional<Session> ParseSession(const std::optional<std::string> &text) {
-    const Json::Value session = ParseObject(text.value_or(""));
-    const std::string user = StringMember(session, "user");
-    if (StringMember(session, "format") != kFormat || user.empty() || !IsPrintable(user)) {
+    const Json::Value session = Web::ParseObject(text.value_or(""));
+    const std::string user = Web::StringMember(session, "user");
+    if (Web::StringMember(session, "format") != kFormat || user.empty() || !Web::IsPrintable(user)) {
         return std::nullopt;
     }
-    return Session{user, StringMember(session, "display_name"), StringMember(session, "profile")};
+    return Session{user, Web::StringMember(session, "display_name"), Web::StringMember(session, "profile")};
 }
 
 }  // namespace
 
-std::optional<Session> FindSession(Answer &answer, const std::string &cookies) {
-    const std::optional<std::string> name = FindCookie(cookies, kCookie);
+std::optional<Session> FindSession(Web::Response &response, const std::string &cookies) {
+    const std::optional<std::string> name = Web::FindCookie(cookies, kCookie);
     if (!name) {
         return std::nullopt;
     }
     std::optional<Session> session = ParseSession(OpenSessions().Read(*name));
-    if (session && !IsInForce(session->profile)) {
-        EndSession(answer, cookies);
+    if (session && !Web::IsInForce(session->profile)) {
+        EndSession(response, cookies);
         return std::nullopt;
     }
     return session;
 }
 
-std::optional<Session> EndSession(Answer &answer, const std::string &cookies) {
-    const std::optional<std::string> name = FindCookie(cookies, kCookie);
+std::optional<Session> EndSession(Web::Response &response, const std::string &cookies) {
+    const std::optional<std::string> name = Web::FindCookie(cookies, kCookie);
     if (!name) {
         return std::nullopt;
     }
-    answer.ExpireCookie(kCookie);
+    response.ExpireCookie(kCookie);
     return ParseSession(OpenSessions().Take(*name));
 }
 
-void StartSession(Answer &answer, const std::string &cookies, const Session &session) {
-    PrivateFolder sessions = OpenSessions();
-    if (const std::optional<std::string> earlier = FindCookie(cookies, kCookie)) {
+void StartSession(Web::Response &response, const std::string &cookies, const Session &session) {
+    Web::PrivateFolder sessions = OpenSessions();
+    if (const std::optional<std::string> earlier = Web::FindCookie(cookies, kCookie)) {
         sessions.Take(*earlier);
     }
     Json::Value text;
@@ -62,11 +62,11 @@ void StartSession(Answer &answer, const std::string &cookies, const Session &ses
     text["user"] = session.user;
     text["display_name"] = session.displayName;
     text["profile"] = session.profile;
-    const std::string name = PrivateFolder::NewName();
-    if (!sessions.Keep(name, WriteCompact(text))) {
-        throw Refusal("Too many users are signed in.");
+    const std::string name = Web::PrivateFolder::NewName();
+    if (!sessions.Keep(name, Web::WriteCompact(text))) {
+        throw Web::Refusal("Too many users are signed in.");
     }
-    answer.SetCookie(kCookie, name);
+    response.SetCookie(kCookie, name);
 }
 
 }  // namespace Frontend

@@ -4,9 +4,11 @@
 #include <optional>
 #include <string>
 
-#include "frontend/answer.h"
+#include "web/response.h"
 
 namespace Frontend {
+
+namespace Web = TAVO::Web;
 
 /// Who is signed in, and through which profile.
 struct Session {
@@ -16,13 +18,13 @@ struct Session {
 };
 
 /// The browser's session. One that was started under a profile that is no longer in force ends here.
-std::optional<Session> FindSession(Answer &answer, const std::string &cookies);
+std::optional<Session> FindSession(Web::Response &response, const std::string &cookies);
 
 /// Ends the browser's session and returns it.
-std::optional<Session> EndSession(Answer &answer, const std::string &cookies);
+std::optional<Session> EndSession(Web::Response &response, const std::string &cookies);
 
 /// Starts a session under a new name: one that was planted in the browser beforehand is worth nothing.
-void StartSession(Answer &answer, const std::string &cookies, const Session &session);
+void StartSession(Web::Response &response, const std::string &cookies, const Session &session);
 
 }  // namespace Frontend
 

@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/server.h"
 
 // A machine that is completely set up, and its provider, by which everyone who looks finds the same: as often as it is

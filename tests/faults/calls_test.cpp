@@ -1,4 +1,4 @@
-#include "tests/interposed/calls.h"
+#include "tests/support/interposed/calls.h"
 
 #include <dirent.h>
 #include <dlfcn.h>
@@ -20,7 +20,7 @@
 #include "sso/sso.h"
 #include "tests/faults/call_table.h"
 #include "tests/faults/scenario.h"
-#include "tests/interposed/process.h"
+#include "tests/support/interposed/process.h"
 #include "tests/support/system_log.h"
 
 // Lets each call that the library makes fail, one at a time, and compares what comes of it with a table.

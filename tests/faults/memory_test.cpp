@@ -1,4 +1,4 @@
-#include "tests/interposed/memory.h"
+#include "tests/support/interposed/memory.h"
 
 #include <curl/curl.h>
 #include <gtest/gtest.h>

@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 
 // What a front end has the library do, each as a whole: against real servers, with files of their own, in a process
 // whose effective ids are not root's.

@@ -4,10 +4,10 @@
 #include <fstream>
 #include <sstream>
 
-#include "frontend/cgi.h"
-#include "frontend/text.h"
+#include "web/request.h"
+#include "web/text.h"
 
-using namespace Frontend;
+using namespace TAVO::Web;
 
 namespace {
 

@@ -1,4 +1,4 @@
-#include "frontend/private_folder.h"
+#include "web/private_folder.h"
 
 #include <gmock/gmock.h>
 #include <sys/resource.h>
@@ -15,7 +15,7 @@
 #include <system_error>
 #include <thread>
 
-using namespace Frontend;
+using namespace TAVO::Web;
 
 namespace {
 

@@ -1,9 +1,10 @@
+#include "web/request.h"
+
 #include <gmock/gmock.h>
 
-#include "frontend/cgi.h"
-#include "frontend/text.h"
+#include "web/text.h"
 
-using namespace Frontend;
+using namespace TAVO::Web;
 
 namespace {
 

@@ -8,7 +8,10 @@
 #include <fstream>
 #include <iterator>
 
+#include "tests/frontend/set_cookie.h"
+
 using namespace Frontend;
+using namespace TAVO::Web;
 
 namespace {
 
@@ -31,8 +34,8 @@ class SessionTest : public testing::Test {
     }
 
     static std::optional<Session> Find(const std::string &cookies) {
-        Answer answer;
-        return FindSession(answer, cookies);
+        Response response;
+        return FindSession(response, cookies);
     }
 
     /// Replaces the text of the session of this cookie.
@@ -42,21 +45,14 @@ class SessionTest : public testing::Test {
         ASSERT_EQ(chmod(file.c_str(), 0600), 0);
     }
 
-    /// The header line with which a session starts in a browser that has `cookies`.
+    /// The cookie with which a session starts in a browser that has `cookies`.
     static std::string Start(const std::string &cookies, const std::string &user) {
-        testing::internal::CaptureStdout();
-        Answer answer;
-        StartSession(answer, cookies, {user, "Alice Example", "azure"});
-        answer.Redirect("/");
-        const std::string output = testing::internal::GetCapturedStdout();
-        const std::size_t begin = output.find("Set-Cookie: ");
-        return output.substr(begin, output.find('\n', begin) - begin);
+        Response response;
+        StartSession(response, cookies, {user, "Alice Example", "azure"});
+        return LastSetCookie(response);
     }
 
-    static std::string CookieOf(const std::string &header) {
-        const std::size_t begin = header.find(' ') + 1;
-        return header.substr(begin, header.find(';') - begin);
-    }
+    static std::string CookieOf(const std::string &header) { return header.substr(0, header.find(';')); }
 };
 
 TEST_F(SessionTest, IsFoundByItsCookieUntilItEnds) {
@@ -66,16 +62,15 @@ TEST_F(SessionTest, IsFoundByItsCookieUntilItEnds) {
     EXPECT_EQ(session->user, "ACME\\alice");
     EXPECT_EQ(session->displayName, "Alice Example");
     EXPECT_EQ(session->profile, "azure");
-    Answer answer;
-    ASSERT_TRUE(EndSession(answer, cookie));
+    Response response;
+    ASSERT_TRUE(EndSession(response, cookie));
     EXPECT_FALSE(Find(cookie));
-    EXPECT_FALSE(EndSession(answer, cookie));
+    EXPECT_FALSE(EndSession(response, cookie));
 }
 
 TEST_F(SessionTest, HasACookieThatOnlyThisSiteGetsOnlyOverTls) {
-    EXPECT_THAT(
-        Start("", "alice"),
-        testing::MatchesRegex("Set-Cookie: __Host-session=[0-9a-f]{32}; Path=/; Secure; HttpOnly; SameSite=Lax"));
+    EXPECT_THAT(Start("", "alice"),
+                testing::MatchesRegex("__Host-session=[0-9a-f]{32}; Path=/; Secure; HttpOnly; SameSite=Lax"));
 }
 
 TEST_F(SessionTest, IsNeverTheOneThatWasPlantedBeforehand) {

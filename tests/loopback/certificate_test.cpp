@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/authority.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"

@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "jwt/jwt.h"
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/encoding.h"
 #include "tests/support/files.h"
 #include "tests/support/server.h"

@@ -7,7 +7,7 @@
 
 #include "jwt/jwt.h"
 #include "sso/sso.h"
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/conversion.h"
 #include "tests/support/encoding.h"
 #include "tests/support/server.h"

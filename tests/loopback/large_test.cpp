@@ -6,7 +6,7 @@
 #include <tuple>
 
 #include "jwt/jwt.h"
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/server.h"
 
 // Tokens of all sizes through whole logins. OpenSSL's base64 filter works in blocks of 1024 characters, and scratch

@@ -7,11 +7,11 @@
 
 #include "jwt/jwt.h"
 #include "sso/sso.h"
-#include "tests/interposed/memory.h"
-#include "tests/interposed/releases.h"
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/encoding.h"
 #include "tests/support/files.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/interposed/releases.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 

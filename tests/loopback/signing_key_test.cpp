@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "jwt/jwt.h"
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/encoding.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"

@@ -12,7 +12,7 @@
 #include <string>
 #include <vector>
 
-#include "tests/loopback/provider.h"
+#include "tests/loopback/loopback_provider.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"

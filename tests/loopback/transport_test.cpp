@@ -8,9 +8,9 @@
 #include <typeinfo>
 
 #include "sso/sso.h"
-#include "tests/interposed/memory.h"
 #include "tests/support/authority.h"
-#include "tests/support/error_queue.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/openssl_errors.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"
 

@@ -3,10 +3,10 @@
 #include <regex>
 #include <sstream>
 
-#include "tests/interposed/calls.h"
-#include "tests/interposed/platform_calls.h"
-#include "tests/interposed/process.h"
 #include "tests/support/encoding.h"
+#include "tests/support/interposed/calls.h"
+#include "tests/support/interposed/platform_calls.h"
+#include "tests/support/interposed/process.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"

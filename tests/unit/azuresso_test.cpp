@@ -1,13 +1,13 @@
 #include <locale>
 
 #include "jwt/jwt.h"
-#include "tests/interposed/clock.h"
-#include "tests/interposed/memory.h"
-#include "tests/interposed/platform_calls.h"
-#include "tests/interposed/process.h"
-#include "tests/interposed/transport.h"
 #include "tests/support/conversion.h"
 #include "tests/support/encoding.h"
+#include "tests/support/interposed/clock.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/interposed/platform_calls.h"
+#include "tests/support/interposed/process.h"
+#include "tests/support/interposed/transport.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"

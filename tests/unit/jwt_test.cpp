@@ -7,10 +7,10 @@
 #include <fstream>
 #include <sstream>
 
-#include "tests/interposed/calls.h"
-#include "tests/interposed/memory.h"
 #include "tests/support/encoding.h"
-#include "tests/support/error_queue.h"
+#include "tests/support/interposed/calls.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/openssl_errors.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
 
@@ -399,7 +399,7 @@ TEST_F(RSASignature, LeavesTheHostsErrorQueueAsItWas) {
 class PublishedVectors : public Library, public testing::WithParamInterface<Json::Value> {
   public:
     static std::vector<Json::Value> All() {
-        std::ifstream file(TAVOSSO_VECTORS "/published.json");
+        std::ifstream file(TAVOSSO_VECTORS);
         Json::Value vectors;
         file >> vectors;
         return {vectors.begin(), vectors.end()};

@@ -1,10 +1,10 @@
 // OIDCLogin up to the client's own steps, and GetSSORelayURL.
 
 #include "sso/sso.h"
-#include "tests/interposed/platform_calls.h"
-#include "tests/interposed/process.h"
-#include "tests/interposed/transport.h"
 #include "tests/support/encoding.h"
+#include "tests/support/interposed/platform_calls.h"
+#include "tests/support/interposed/process.h"
+#include "tests/support/interposed/transport.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
 

@@ -8,9 +8,9 @@
 #include <string>
 #include <vector>
 
-#include "tests/interposed/memory.h"
 #include "tests/support/conversion.h"
 #include "tests/support/files.h"
+#include "tests/support/interposed/memory.h"
 #include "tests/support/system_log.h"
 
 namespace Test {

@@ -1,8 +1,8 @@
 #include <new>
 
 #include "sso/sso.h"
-#include "tests/interposed/memory.h"
-#include "tests/interposed/process.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/interposed/process.h"
 #include "tests/unit/fixture.h"
 
 namespace Test {

@@ -4,9 +4,9 @@
 #include <new>
 
 #include "sso/sso.h"
-#include "tests/interposed/calls.h"
-#include "tests/interposed/memory.h"
-#include "tests/interposed/process.h"
+#include "tests/support/interposed/calls.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/interposed/process.h"
 #include "tests/unit/fixture.h"
 
 namespace Test {

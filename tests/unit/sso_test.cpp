@@ -3,9 +3,9 @@
 
 #include <new>
 
-#include "tests/interposed/calls.h"
-#include "tests/interposed/memory.h"
-#include "tests/interposed/transport.h"
+#include "tests/support/interposed/calls.h"
+#include "tests/support/interposed/memory.h"
+#include "tests/support/interposed/transport.h"
 #include "tests/support/token.h"
 #include "tests/unit/fixture.h"
 

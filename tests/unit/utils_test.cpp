@@ -5,11 +5,11 @@
 #include <new>
 
 #include "sso/sso.h"
-#include "tests/interposed/calls.h"
-#include "tests/interposed/platform_calls.h"
-#include "tests/interposed/process.h"
-#include "tests/interposed/transport.h"
-#include "tests/support/error_queue.h"
+#include "tests/support/interposed/calls.h"
+#include "tests/support/interposed/platform_calls.h"
+#include "tests/support/interposed/process.h"
+#include "tests/support/interposed/transport.h"
+#include "tests/support/openssl_errors.h"
 #include "tests/unit/fixture.h"
 
 namespace Test {

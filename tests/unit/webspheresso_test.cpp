@@ -1,12 +1,12 @@
 #include <tuple>
 
 #include "jwt/jwt.h"
-#include "tests/interposed/calls.h"
-#include "tests/interposed/clock.h"
-#include "tests/interposed/platform_calls.h"
-#include "tests/interposed/process.h"
-#include "tests/interposed/transport.h"
 #include "tests/support/encoding.h"
+#include "tests/support/interposed/calls.h"
+#include "tests/support/interposed/clock.h"
+#include "tests/support/interposed/platform_calls.h"
+#include "tests/support/interposed/process.h"
+#include "tests/support/interposed/transport.h"
 #include "tests/support/token.h"
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"

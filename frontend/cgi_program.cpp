@@ -1,0 +1,122 @@
+#include "frontend/cgi_program.h"
+
+#include <sso/sso.h>
+#include <sys/prctl.h>
+#include <sys/resource.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <iostream>
+#include <iterator>
+#include <sstream>
+#include <system_error>
+
+#include "frontend/environment.h"
+#include "frontend/page.h"
+#include "web/refusal.h"
+#include "web/text.h"
+
+namespace Frontend {
+
+namespace {
+
+// In seconds. The web server's own limit of 60 s (lighttpd.conf) is shorter and answers the browser, but lighttpd
+// 1.4.69 does not apply it to a request that arrives together with its connection.
+constexpr unsigned int kLongestRun = 70;
+
+// An endless answer of the provider ends the program, not the machine.
+constexpr rlim_t kAddressSpace = rlim_t{1} << 30;
+
+// What OpenSSL and libcurl obey: keys that are written to a file, modules that are loaded, authorities and proxies.
+constexpr const char *kUntrustedVariables[] = {
+    "ALL_PROXY",    "CURL_CA_BUNDLE",  "CURL_HOME",       "HTTPS_PROXY",   "HTTP_PROXY",   "NO_PROXY",
+    "OPENSSL_CONF", "OPENSSL_ENGINES", "OPENSSL_MODULES", "SSLKEYLOGFILE", "SSL_CERT_DIR", "SSL_CERT_FILE",
+    "all_proxy",    "http_proxy",      "https_proxy",     "no_proxy",
+};
+
+bool NamesWord(const std::string &words, const std::string &word) {
+    std::istringstream list(words);
+    return std::find(std::istream_iterator<std::string>(list), {}, word) != std::istream_iterator<std::string>();
+}
+
+void RemoveUntrustedVariables() {
+    const std::string kept = Variable("FRONTEND_KEEP_ENVIRONMENT");
+    for (const char *name : kUntrustedVariables) {
+        if (!NamesWord(kept, name)) {
+            unsetenv(name);
+        }
+    }
+}
+
+void Limit(decltype(RLIMIT_CORE) resource, rlim_t most) {
+    rlimit limit{};
+    const bool isKnown = getrlimit(resource, &limit) == 0;
+    limit.rlim_cur = limit.rlim_max = std::min(most, limit.rlim_max);  // the web server may have set a smaller one
+    if (!isKnown || setrlimit(resource, &limit) != 0) {
+        throw std::system_error(errno, std::generic_category(), "A limit cannot be set");
+    }
+}
+
+void LimitProcess() {
+    alarm(kLongestRun);
+    Limit(RLIMIT_CORE, 0);
+    prctl(PR_SET_DUMPABLE, 0);
+#ifndef __SANITIZE_ADDRESS__  // reserves terabytes
+    Limit(RLIMIT_AS, kAddressSpace);
+#endif
+}
+
+void RefuseMethod(Web::Response &response, const std::string &methods) {
+    response.AddHeader("Allow", methods);
+    ShowPage(response, "405 Method Not Allowed", "This page cannot be used like this",
+             "<h1>This page cannot be used like this</h1>\n"
+             "<p><a href=\"/index.cgi\">Go to the start page</a></p>\n");
+}
+
+void Fail(Web::Response &response, const std::string &reason) {
+    syslog(LOG_AUTH | LOG_WARNING, "frontend: sign-in failed: %s", reason.c_str());
+    // The relay URL takes the reason unencoded, so another parameter can follow it.
+    std::string encoded = TAVO::SSO::URLEncode(reason);
+    if (!response.origin.empty()) {
+        encoded += "&origin=" + TAVO::SSO::URLEncode(response.origin);
+    }
+    response.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(false, "", encoded));
+}
+
+bool Write(const Web::Response &response) {
+    std::cout << "Status: " << response.status << "\n";
+    for (const auto &[name, value] : response.headers) {
+        std::cout << name << ": " << value << "\n";
+    }
+    std::cout << "\n" << response.body << std::flush;
+    return std::cout.good();
+}
+
+bool IsAllowed(std::string methods) {
+    std::replace(methods.begin(), methods.end(), ',', ' ');
+    return NamesWord(methods, Variable("REQUEST_METHOD"));
+}
+
+}  // namespace
+
+int Serve(const std::string &methods, void (*serve)(Web::Response &)) {
+    RemoveUntrustedVariables();
+    Web::Response response;
+    try {
+        LimitProcess();
+        if (IsAllowed(methods)) {
+            serve(response);
+        } else {
+            RefuseMethod(response, methods);
+        }
+    } catch (const std::exception &failure) {
+        Fail(response, Web::ReasonOf(failure));
+    } catch (...) {
+        Fail(response, "unexpected failure");
+    }
+    return Write(response) ? 0 : 1;
+}
+
+}  // namespace Frontend

@@ -1,0 +1,16 @@
+#ifndef TAVOSSO_FRONTEND_PAGE_H
+#define TAVOSSO_FRONTEND_PAGE_H
+
+#include <string>
+
+#include "web/response.h"
+
+namespace Frontend {
+
+/// Answers with a page of the front end. `content` is HTML; `title` is text.
+void ShowPage(TAVO::Web::Response &response, const std::string &status, const std::string &title,
+              const std::string &content);
+
+}  // namespace Frontend
+
+#endif

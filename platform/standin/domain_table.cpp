@@ -1,0 +1,57 @@
+#include "platform/standin/domain_table.h"
+
+#include <json/json.h>
+
+#include <boost/algorithm/string/predicate.hpp>
+#include <cerrno>
+#include <fstream>
+#include <iterator>
+#include <locale>
+#include <memory>
+#include <new>
+
+namespace TAVO::Platform {
+
+namespace {
+
+/// DNS domain names and their NetBIOS names: a JSON object of strings.
+constexpr char kDomainTable[] = "/usr/tavo/etc/domains.conf";
+
+/// Null where the file is no JSON. Memory that runs out is not taken for a file without the domain: the directory would
+/// be asked about one that the administrator has spoken of.
+Json::Value ReadTable() {
+    Json::Value table;
+    try {
+        std::ifstream file(kDomainTable);
+        if (!file && errno == ENOMEM) {
+            throw std::bad_alloc();
+        }
+        const std::string text{std::istreambuf_iterator<char>(file), {}};
+        const std::unique_ptr<Json::CharReader> reader(Json::CharReaderBuilder().newCharReader());
+        if (reader->parse(text.data(), text.data() + text.size(), &table, nullptr)) {
+            return table;
+        }
+    } catch (const std::ios_base::failure &) {
+        // A directory.
+    }
+    return {};
+}
+
+}  // namespace
+
+std::optional<std::string> FindInDomainTable(const std::string &domain) {
+    const Json::Value table = ReadTable();
+    if (!table.isObject()) {
+        return std::nullopt;
+    }
+    for (const std::string &name : table.getMemberNames()) {
+        const Json::Value &netBIOSName = table[name];
+        if (boost::iequals(name, domain, std::locale::classic()) && netBIOSName.isString() &&
+            !netBIOSName.asString().empty()) {
+            return netBIOSName.asString();
+        }
+    }
+    return std::nullopt;
+}
+
+}  // namespace TAVO::Platform

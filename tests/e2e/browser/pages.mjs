@@ -1,0 +1,177 @@
+import assert from 'node:assert/strict';
+import path from 'node:path';
+import {it} from 'node:test';
+
+import {useProfile} from '../site/front_end.mjs';
+import {RELAY_PAGE} from './visitor.mjs';
+
+const SCREENS = [360, 1280].flatMap((width) => ['light', 'dark'].map((colorScheme) => ({width, colorScheme})));
+const PICTURE = {viewport: {width: 720, height: 560}, colorScheme: 'light'};
+const DEEP_LINK = '/account.cgi?opened=after';
+const SUCCESS = `${RELAY_PAGE}#${new URLSearchParams({origin: DEEP_LINK, success: 'true'})}`;
+const FAILURE = `${RELAY_PAGE}#${new URLSearchParams({reason: 'TAVOWinsUserNameFqdn2Netbios failed.', success: 'false'})}`;
+
+const PROTECTION = {
+    'cache-control': 'no-store',
+    'referrer-policy': 'same-origin',
+    'x-content-type-options': 'nosniff',
+    'content-security-policy': "default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; " +
+        "base-uri 'none'; form-action 'self'; frame-ancestors 'none'",
+};
+
+// Each opens a page, and leaves the visitor there.
+const PAGES = {
+    'the start page': async (visitor) => {
+        await visitor.isSignedOut();
+    },
+    'the start page, single sign-on off': async (visitor) => {
+        useProfile('azure', false);
+        await visitor.isSignedOut();
+        await visitor.seesText('Single sign-on is switched off on this device.');
+        assert.equal(await visitor.page.getByRole('link').count(), 0);
+    },
+    'the start page, single sign-on incomplete': async (visitor, stage) => {
+        stage.misconfigure({changes: {secret: ''}});
+        await visitor.isSignedOut();
+        await visitor.seesText('Single sign-on is not completely set up on this device.');
+        assert.equal(await visitor.page.getByRole('link').count(), 0);
+    },
+    "the provider's form": async (visitor) => {
+        await visitor.goToProvider();
+    },
+    'the start page, signed in': async (visitor) => {
+        await visitor.signIn('alice');
+    },
+    'the account page': async (visitor) => {
+        await visitor.signIn('alice');
+        await visitor.page.getByRole('link', {name: 'Your account', exact: true}).click();
+        await visitor.seesHeading('Your account');
+    },
+    'the page on the way out': async (visitor, stage) => {
+        await visitor.signIn('alice');
+        await stayOn(visitor, `${stage.site.provider.address}/**`);
+        await visitor.press('Sign out');
+        await visitor.seesHeading('Signing out');
+    },
+    'the relay page after a success': async (visitor, stage) => {
+        await stayOn(visitor, stage.origin + DEEP_LINK);
+        // It goes on before it has loaded.
+        await visitor.open(SUCCESS, {waitUntil: 'commit'});
+        await visitor.seesHeading('You are signed in');
+    },
+    'the relay page after a failure': async (visitor) => {
+        await visitor.open(FAILURE);
+        await visitor.seesFailure(/Your account's domain is not known to this device\./);
+    },
+    'the relay page after a sign-out': async (visitor) => {
+        await visitor.open(RELAY_PAGE);
+        await visitor.seesHeading('You are signed out');
+    },
+};
+
+const TITLES = {
+    'the start page': 'Sign in',
+    'the start page, single sign-on off': 'Sign in',
+    'the start page, single sign-on incomplete': 'Sign in',
+    "the provider's form": 'Example organisation',
+    'the start page, signed in': 'Signed in',
+    'the account page': 'Your account',
+    'the page on the way out': 'Signing out',
+    'the relay page after a success': 'You are signed in',
+    'the relay page after a failure': 'You could not be signed in',
+    'the relay page after a sign-out': 'You are signed out',
+};
+
+// An answer without content leaves the browser where it is.
+function stayOn(visitor, elsewhere) {
+    return visitor.page.route(elsewhere, (route) => route.fulfill({status: 204}));
+}
+
+async function findBarriers(page) {
+    const {violations} = await page.evaluate(() => globalThis.axe.run());
+    return violations.map(({id, nodes}) => `${id}: ${nodes.map(({html}) => html).join(' ')}`);
+}
+
+function defineAccessibility(stage) {
+    for (const [name, open] of Object.entries(PAGES)) {
+        it(`has no barriers, on a phone and a desktop, in light and dark: ${name}`, () => stage.visit(async (visitor) => {
+            const {page} = visitor;
+            await open(visitor, stage);
+            assert.equal(await page.title(), TITLES[name]);
+            await page.evaluate(stage.axe);
+            for (const {width, colorScheme} of SCREENS) {
+                await page.setViewportSize({width, height: 800});
+                await page.emulateMedia({colorScheme});
+                assert.deepEqual(await findBarriers(page), [], `${width} pixels wide, ${colorScheme}`);
+                const overhang = await page.evaluate(() => document.documentElement.scrollWidth - innerWidth);
+                assert.ok(overhang <= 0, `${overhang} pixels beyond the right edge of ${width}`);
+            }
+        }));
+    }
+}
+
+function defineHeaders(stage) {
+    const addresses = [
+        '/', '/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi', '/webman/sso/logout.cgi',
+        ...['relay.html', 'relay.js', 'reasons.js', 'style.css', 'mark.svg'].map((file) => `/webman/ssoclient/${file}`),
+        '/webman/ssoclient/', '/nowhere', '/nowhere.cgi',
+    ];
+    it('is protected by its headers', () => stage.visit(async (visitor) => {
+        const seen = [];
+        visitor.page.on('response', (response) => {
+            if (response.url().startsWith(stage.origin)) {
+                seen.push(response);
+            }
+        });
+        for (const address of addresses) {
+            await visitor.open(address);
+        }
+        assert.ok(seen.length > addresses.length);
+        for (const response of seen) {
+            const headers = await response.headersArray();
+            for (const [name, value] of Object.entries(PROTECTION)) {
+                const told = headers.filter((header) => header.name.toLowerCase() === name);
+                assert.deepEqual(told.map((header) => header.value), [value], `${name} of ${response.url()}`);
+            }
+        }
+    }, {expects: /status of 40[345]/}));
+
+    it('cannot be put into a frame', () => stage.visit(async (visitor) => {
+        await visitor.goToProvider();
+        const frame = await visitor.page.evaluate(async (address) => {
+            const element = document.createElement('iframe');
+            const loaded = new Promise((resolve) => {
+                element.onload = resolve;
+            });
+            element.src = address;
+            document.body.append(element);
+            await loaded;
+            return element.name;
+        }, `${stage.origin}/index.cgi`);
+        assert.equal(frame, '');
+        const shown = visitor.page.frames().map((each) => each.url());
+        assert.ok(!shown.includes(`${stage.origin}/index.cgi`), 'the start page was shown in a frame');
+    }, {expects: /frame-ancestors|Refused to frame|Framing/}));
+}
+
+function definePictures(stage) {
+    const pictures = {
+        start: 'the start page',
+        provider: "the provider's form",
+        success: 'the relay page after a success',
+        failure: 'the relay page after a failure',
+    };
+    for (const [file, name] of Object.entries(pictures)) {
+        it(`has its picture taken: ${name}`, () => stage.visit(async (visitor) => {
+            await PAGES[name](visitor, stage);
+            const picture = await visitor.page.screenshot({path: path.join(stage.pictures, `${file}.png`)});
+            assert.ok(picture.length > 0);
+        }, PICTURE));
+    }
+}
+
+export function definePages(stage) {
+    defineAccessibility(stage);
+    defineHeaders(stage);
+    definePictures(stage);
+}

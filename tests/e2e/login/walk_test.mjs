@@ -1,0 +1,130 @@
+// Signs users in at a real OpenID provider through the front end, or serves both until it is ended. Runs as root of
+// private namespaces; see `run`.
+import assert from 'node:assert/strict';
+import {copyFileSync, rmSync} from 'node:fs';
+
+import {Controller} from '../directory/controller.mjs';
+import {useProfile, writeDomains, writeSettings} from '../site/front_end.mjs';
+import {makeWalk, startEverything} from './login_stage.mjs';
+
+async function walkAzure(walk, report) {
+    useProfile('azure');
+    report.title('Profile azure: alice signs in');
+    const browser = walk.newBrowser();
+    await walk.openSite(browser);
+    const user = await walk.signIn(browser, 'alice');
+    assert.equal(user, 'ACME\\alice');
+
+    report.title('The same answer of the provider a second time: refused before the code is used, alice stays signed in');
+    const again = walk.goAgain(browser, walk.lastReturnAddress(browser));
+    assert.equal(await walk.refusedBeforeTheTokenRequest(again), 'This sign-in was not started in this browser.');
+    assert.equal(await walk.userOf(browser), user);
+
+    report.title('Profile azure: alice signs out, here and at the provider');
+    assert.equal(await walk.signOut(browser), '/webman/ssoclient/relay.html');
+
+    report.title('Profile azure: carol, whose domain the appliance does not know, is told why she cannot sign in');
+    assert.equal(await walk.failToSignIn(walk.newBrowser(), 'carol'), 'TAVOWinsUserNameFqdn2Netbios failed.');
+
+    report.title('Profile azure: a user cancels at the provider');
+    assert.equal(
+        await walk.refusedBeforeTheTokenRequest(walk.cancel(walk.newBrowser())),
+        'The provider refused: access_denied (The user cancelled.)');
+
+    report.title("Login CSRF: a victim's browser is sent to the return address of someone else's sign-in");
+    const foreign = await walk.startSignIn(walk.newBrowser(), 'alice');
+    const victim = walk.newBrowser();
+    assert.equal(
+        await walk.refusedBeforeTheTokenRequest(walk.goAgain(victim, foreign)),
+        'This sign-in was not started in this browser.');
+    assert.equal(await walk.userOf(victim), undefined);
+
+    report.title('Forged relay addresses: the page stays on its own site');
+    for (const origin of ['//evil.example', '/\\evil.example', 'https://evil.example/', 'javascript:alert(1)', '/\t/evil']) {
+        report.fact(`origin ${JSON.stringify(origin)}:`);
+        const fragment = new URLSearchParams({origin, success: 'true'}).toString();
+        assert.equal(await walk.followForgedFragment(victim, fragment), '/index.cgi');
+    }
+    return user;
+}
+
+async function walkWebsphere(walk, report) {
+    useProfile('websphere');
+    report.title('Profile websphere: bob signs in');
+    const browser = walk.newBrowser();
+    const user = await walk.signIn(browser, 'bob');
+    assert.equal(user, 'bob');
+
+    report.title('Profile websphere: bob signs out');
+    assert.equal(await walk.signOut(browser), '/index.cgi');
+    return user;
+}
+
+async function walkReadmeProgram(walk, report, {provider, clients}) {
+    writeSettings({provider, clients: clients.map((client) => ({...client, redirectURI: client.otherRedirectURI}))});
+    for (const [profile, login, name] of [['azure', 'alice', 'ACME\\alice'], ['websphere', 'bob', 'bob']]) {
+        useProfile(profile);
+        report.title(`Profile ${profile}: ${login} signs in through the program of the README`);
+        assert.equal(await walk.signInThroughReadmeProgram(walk.newBrowser(), login), name);
+    }
+}
+
+async function walkEverything(running) {
+    const {report} = running;
+    const walk = makeWalk(running);
+    const azureUser = await walkAzure(walk, report);
+    const websphereUser = await walkWebsphere(walk, report);
+    await walkReadmeProgram(walk, report, running);
+    report.title('Every step was as it should be. Signed in through a real OpenID provider:');
+    report.fact(`azure      ${azureUser}`);
+    report.fact(`websphere  ${websphereUser}`);
+}
+
+async function serve(running, profile, authorityFile) {
+    useProfile(profile);
+    copyFileSync(running.authority, authorityFile);
+    console.log(`\nServing with profile ${profile}, until Ctrl-C:\n\n  ${running.origin}/\n`);
+    console.log(`The browser has to trust this authority, made for this run:\n\n  ${authorityFile}\n`);
+    console.log(`or else, with Chromium or Chrome, in a profile of its own:\n`);
+    console.log(`  chromium --user-data-dir="$(mktemp -d)" ${running.chromiumTrust} ${running.origin}/\n\nUsers:\n`);
+    for (const [login, {password, uniqueName}] of running.users) {
+        console.log(`  ${login.padEnd(6)} password ${password}  (${uniqueName})`);
+    }
+    console.log();
+    await new Promise((resolve) => {
+        process.once('SIGINT', resolve);
+        process.once('SIGTERM', resolve);
+    });
+    rmSync(authorityFile);
+}
+
+/** The same walk, on a machine whose domain is known to its directory and to no file. */
+async function walkWithDirectory(running) {
+    const controller = await Controller.start();
+    try {
+        running.report.title(`A domain controller of CORP.EXAMPLE.NET, NetBIOS name ACME, runs after ${controller.seconds} s`);
+        writeDomains({});
+        running.report.fact('domains.conf names no domain: winbindd is asked');
+        await walkEverything(running);
+        running.report.fact('directory  CORP.EXAMPLE.NET is ACME, as winbindd told; domains.conf is empty');
+    } finally {
+        await controller.stop();
+    }
+}
+
+const [webroot, nodeModules, mode, authorityFile] = process.argv.slice(2);
+const running = await startEverything(webroot, nodeModules);
+try {
+    if (mode === 'directory') {
+        await walkWithDirectory(running);
+    } else if (mode) {
+        await serve(running, mode, authorityFile);
+    } else {
+        await walkEverything(running);
+    }
+} catch (failure) {
+    console.error(`\nFAILED: ${failure.message}\n\nThe web server's own log:\n${running.webServer.log()}`);
+    process.exitCode = 1;
+} finally {
+    await running.stop();
+}

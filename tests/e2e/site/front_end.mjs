@@ -1,0 +1,103 @@
+// The appliance: its configuration files and a web server with the front end.
+import {spawn} from 'node:child_process';
+import {once} from 'node:events';
+import {mkdirSync, readFileSync, writeFileSync} from 'node:fs';
+import net from 'node:net';
+import path from 'node:path';
+import {fileURLToPath} from 'node:url';
+
+const SETTINGS = '/usr/tavo/etc/ssoclient';
+// Where the front end is installed and enabled, the web server's own settings say what is served.
+const INSTALLED_SETTINGS = process.env.INSTALLED_LIGHTTPD_CONF;
+export const FRONT_END_SETTINGS = fileURLToPath(new URL('../../../frontend/lighttpd.conf', import.meta.url));
+
+function writePrivately(file, settings) {
+    writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode: 0o600});
+}
+
+/** The platform's domains: DNS name to NetBIOS name. */
+export function writeDomains(domains) {
+    mkdirSync(SETTINGS, {recursive: true, mode: 0o755});
+    mkdirSync('/usr/tavo/var', {recursive: true});
+    writeFileSync('/usr/tavo/etc/domains.conf', JSON.stringify(domains));
+}
+
+/** The settings of both profiles' clients. */
+export function writeSettings({provider, clients}) {
+    const [azure, websphere] = clients;
+    writePrivately(`${SETTINGS}/azure.conf`, {
+        azure_sso_enable: true,
+        azure_wellknown: provider.endpoints.discovery,
+        azure_client_id: azure.id,
+        azure_client_secret: azure.secret,
+        azure_tenant_id: azure.tenant,
+        azure_authorization_endpoint: provider.endpoints.authorization,
+        azure_token_endpoint: provider.endpoints.token,
+        azure_redirect_uri: azure.redirectURI,
+        azure_logout_endpoint: provider.endpoints.logout,
+    });
+    writePrivately(`${SETTINGS}/websphere.conf`, {
+        websphere_wellknown: provider.endpoints.discovery,
+        websphere_client_id: websphere.id,
+        websphere_client_secret: websphere.secret,
+        websphere_authorization_endpoint: provider.endpoints.authorization,
+        websphere_token_endpoint: provider.endpoints.token,
+        websphere_redirect_uri: websphere.redirectURI,
+        websphere_logout_endpoint: provider.endpoints.logout,
+    });
+}
+
+export function useProfile(name, enable = true) {
+    writePrivately(`${SETTINGS}/profile.conf`, {sso_enable: enable, sso_profile: name});
+}
+
+/** A listening socket on a port of the kernel's choice, for `startWebServer`: its port is known before the server. */
+export async function listen() {
+    const socket = net.createServer();
+    socket.listen(0, '127.0.0.1');
+    await once(socket, 'listening');
+    // Or a run whose site fails to start behind this would hang, and not say why.
+    socket.unref();
+    return socket;
+}
+
+/** `frontEndSettings` is the file of the front end's own settings. */
+export function startWebServer({socket, webroot, certificate, folder, frontEndSettings = FRONT_END_SETTINGS}) {
+    const settings = path.join(folder, 'lighttpd.conf');
+    const log = path.join(folder, 'lighttpd.log');
+    const uploads = path.join(folder, 'uploads');
+    mkdirSync(uploads);
+    const served = INSTALLED_SETTINGS
+        ? `include "${INSTALLED_SETTINGS}"`
+        : `server.document-root = "${webroot}"\ninclude "${frontEndSettings}"`;
+    writeFileSync(settings, `
+${served}
+server.systemd-socket-activation := "enable"
+server.bind := "127.0.0.1"
+server.port := ${socket.address().port}
+server.errorlog := "${log}"
+server.errorlog-use-syslog := "disable"
+server.breakagelog := "${log}"
+server.upload-dirs := ( "${uploads}" )
+server.modules += ( "mod_openssl" )
+ssl.engine := "enable"
+ssl.pemfile := "${certificate.certFile}"
+ssl.privkey := "${certificate.keyFile}"
+`);
+    // The server takes the socket over when it is told its own process id, which the shell knows before it becomes it.
+    // Node has no other name for a listening socket's descriptor.
+    const server = spawn('sh', ['-c', 'LISTEN_FDS=1 LISTEN_PID=$$ exec /usr/sbin/lighttpd -D -f "$0"', settings], {
+        stdio: ['ignore', 'inherit', 'inherit', socket._handle.fd],
+    });
+    socket.close();
+    return {
+        pid: server.pid,
+        uploads,
+        log: () => readFileSync(log, 'utf8'),
+        async stop() {
+            if (server.exitCode === null && server.kill()) {
+                await once(server, 'exit');
+            }
+        },
+    };
+}

@@ -1,0 +1,84 @@
+// A whole site for a run: the appliance with the front end, a real OpenID provider, users, and an authority that both
+// trust. Runs as root of private namespaces.
+import {randomBytes, randomUUID} from 'node:crypto';
+import {appendFileSync, copyFileSync, mkdtempSync} from 'node:fs';
+import {join} from 'node:path';
+
+import {listen, startWebServer, writeDomains, writeSettings} from './front_end.mjs';
+import {makeAuthority} from './certificate_authority.mjs';
+import {startProvider} from './provider.mjs';
+import {collectSystemLog} from './syslog_collector.mjs';
+
+const SYSTEM_BUNDLE = '/etc/ssl/certs/ca-certificates.crt';
+const DOMAINS = {'corp.example.net': 'ACME'};
+
+const randomSecret = () => randomBytes(24).toString('base64url');
+const randomPassword = () => randomBytes(9).toString('base64url');
+
+/** Users by login, each with a password of this run; `named` tells their names at the provider. */
+export function makeUsers(named) {
+    return new Map(Object.entries(named).map(
+        ([login, uniqueName]) => [login, {uniqueName, password: randomPassword()}]));
+}
+
+function makeClients(origin, tenant) {
+    const common = {
+        redirectURI: `${origin}/webman/sso/return.cgi`,
+        otherRedirectURI: `${origin}/webman/sso/sso.cgi`, // the program of the README
+        logoutURI: `${origin}/webman/ssoclient/relay.html`,
+    };
+    return [
+        {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant, ...common},
+        {id: 'appliance-websphere', secret: randomSecret(), algorithm: 'HS256', ...common},
+    ];
+}
+
+/** For tests/secrets/search, which looks for them in all that the tests of this build print. */
+function recordSecrets(webroot, clients) {
+    appendFileSync(join(webroot, '../../secrets'), clients.map(({secret}) => `${secret}\n`).join(''), {mode: 0o600});
+}
+
+/**
+ * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it
+ * gives, `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
+ */
+export async function startSite({webroot, nodeModules, users, onRequest, onLog}) {
+    const folder = mkdtempSync('/tmp/site-');
+    const authority = makeAuthority(folder);
+    copyFileSync(authority.file, SYSTEM_BUNDLE);
+
+    const socket = await listen();
+    const origin = `https://localhost:${socket.address().port}`;
+    const tenant = randomUUID();
+    const clients = makeClients(origin, tenant);
+    recordSecrets(webroot, clients);
+    const providerCertificate = authority.issue('provider', 'IP:127.0.0.1');
+    const applianceCertificate = authority.issue('appliance', 'DNS:localhost');
+    const fingerprints = [providerCertificate, applianceCertificate].map(({fingerprint}) => fingerprint);
+    const startAnotherProvider = () =>
+        startProvider({nodeModules, tenant, clients, users, certificate: providerCertificate, report: onRequest});
+
+    const provider = await startAnotherProvider();
+    const log = await collectSystemLog(onLog);
+    writeDomains(DOMAINS);
+    writeSettings({provider, clients});
+    const webServer = startWebServer({socket, webroot, certificate: applianceCertificate, folder});
+    return {
+        origin,
+        users,
+        clients,
+        provider,
+        providerCertificate,
+        chromiumTrust: `--ignore-certificate-errors-spki-list=${fingerprints}`,
+        authority: authority.file,
+        folder,
+        log,
+        webServer,
+        startAnotherProvider,
+        async stop() {
+            await webServer.stop();
+            provider.stop();
+            log.stop();
+        },
+    };
+}

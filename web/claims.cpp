@@ -1,0 +1,47 @@
+#include "web/claims.h"
+
+#include <sso/sso.h>
+#include <sso/supported_profiles.h>
+
+#include "web/refusal.h"
+#include "web/text.h"
+
+namespace TAVO::Web {
+
+namespace {
+
+/// The claim that the library makes the user's name of.
+const char *NameClaim(const Json::Value &claims, const std::string &profile) {
+    if (profile != TAVO::SSO::kAzureProfile) {
+        return "sub";
+    }
+    return claims["unique_name"].isString() ? "unique_name" : "email";
+}
+
+}  // namespace
+
+void RequireNonce(const Json::Value &claims, const Json::Value &state) {
+    const std::string nonce = StringMember(claims, "nonce");
+    const std::string digest = StringMember(state, "nonce");
+    if (nonce.empty() || digest.empty() || TAVO::SSO::MD5Digest(nonce) != digest) {
+        throw Refusal("The provider's answer belongs to another sign-in.");
+    }
+}
+
+void RequireTrustworthyName(const Json::Value &claims, const std::string &profile, bool acceptsUnverifiedEmail) {
+    const std::string claim = NameClaim(claims, profile);
+    const std::string name = StringMember(claims, claim.c_str());
+    if (name.empty() || !IsPrintable(name)) {
+        throw Refusal("The provider's name for this user cannot be used.");
+    }
+    if (claim == "email" && !acceptsUnverifiedEmail && claims["email_verified"] != Json::Value(true)) {
+        throw Refusal("The provider has not verified this user's e-mail address.");
+    }
+}
+
+std::string DisplayName(const Json::Value &claims) {
+    const std::string name = StringMember(claims, "name");
+    return IsPrintable(name) ? OneLine(name) : "";
+}
+
+}  // namespace TAVO::Web

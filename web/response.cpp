@@ -1,0 +1,37 @@
+#include "web/response.h"
+
+#include <stdexcept>
+
+#include "web/text.h"
+
+namespace TAVO::Web {
+
+// The referrer policy is not "no-referrer", under which browsers send no Origin with a form.
+Response::Response()
+    : headers{{"Cache-Control", "no-store"},
+              {"Referrer-Policy", "same-origin"},
+              {"X-Content-Type-Options", "nosniff"},
+              {"Content-Security-Policy",
+               "default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; base-uri 'none'; "
+               "form-action 'self'; frame-ancestors 'none'"}} {}
+
+void Response::AddHeader(const std::string &name, const std::string &value) {
+    if (!IsPrintable(value)) {
+        throw std::invalid_argument("A header must be one printable line.");
+    }
+    headers.emplace_back(name, value);
+}
+
+void Response::SetCookie(const std::string &name, const std::string &value, const std::string &attributes) {
+    // Lax, not Strict: the browser comes back from the provider's site, and brings the cookie only then.
+    AddHeader("Set-Cookie", name + "=" + value + "; Path=/; Secure; HttpOnly; SameSite=Lax" + attributes);
+}
+
+void Response::ExpireCookie(const std::string &name) { SetCookie(name, "", "; Max-Age=0"); }
+
+void Response::Redirect(const std::string &address) {
+    AddHeader("Location", address);
+    status = "302 Found";
+}
+
+}  // namespace TAVO::Web
