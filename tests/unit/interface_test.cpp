@@ -55,54 +55,6 @@ static_assert(kIsCaughtAs<JWT::jwt_exception, std::runtime_error>);
 static_assert(kIsCaughtAs<JWT::jwt_not_support, JWT::jwt_exception>);
 static_assert(kIsCaughtAs<JWT::jwt_verify_failed, JWT::jwt_exception>);
 
-// Results, arguments and the lack of const and noexcept, function by function.
-template <auto function, typename Type>
-constexpr bool kIs = std::is_same_v<decltype(function), Type>;
-using Callback = std::size_t (*)(char *, std::size_t, std::size_t, void *);
-static_assert(kIs<&SSO::SSOClient::isEnable, bool (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetClientID, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetClientSecret, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetRedirectURI, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetToken, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetAuthEndpoint, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetTokenEndpoint, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetWellknownEndpoint, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetLogoutEndpoint, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::SetRedirectURI, void (SSO::SSOClient::*)(std::string)>);
-static_assert(kIs<&SSO::SSOClient::SetCode, void (SSO::SSOClient::*)(std::string)>);
-static_assert(kIs<&SSO::SSOClient::RequestWellknownInfo, void (SSO::SSOClient::*)(Json::Value &)>);
-static_assert(kIs<&SSO::SSOClient::RequestTokenEndpoint, void (SSO::SSOClient::*)(std::string &, const std::string &)>);
-static_assert(kIs<&SSO::SSOClient::VerifyIDToken, void (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetIDTokenReqParams, std::string (SSO::SSOClient::*)()>);
-static_assert(kIs<&SSO::SSOClient::GetUserName, void (SSO::SSOClient::*)(std::string &)>);
-static_assert(kIs<&SSO::SSOClient::ProcessTokenResponse, void (SSO::SSOClient::*)(std::string)>);
-static_assert(kIs<&SSO::SSOClient::OpenIDConnectLogin, void (SSO::SSOClient::*)(std::string, std::string &)>);
-static_assert(kIs<&SSO::AzureSSOClient::GetUserInfo, void (SSO::AzureSSOClient::*)(Json::Value &)>);
-static_assert(kIs<&SSO::AzureSSOClient::RequestKeysInfo, void (SSO::AzureSSOClient::*)(std::string, Json::Value &)>);
-static_assert(
-    kIs<&SSO::AzureSSOClient::GetAccessTokenReqURI, std::string (SSO::AzureSSOClient::*)(const Json::Value &)>);
-static_assert(kIs<&SSO::AzureSSOClient::RedirectAuthEndpoint, void (SSO::AzureSSOClient::*)(const Json::Value &)>);
-static_assert(kIs<&SSO::WebSphereSSOClient::GetUserInfo, void (SSO::WebSphereSSOClient::*)(Json::Value &)>);
-static_assert(
-    kIs<&SSO::WebSphereSSOClient::GetAccessTokenReqURI, std::string (SSO::WebSphereSSOClient::*)(const Json::Value &)>);
-static_assert(
-    kIs<&SSO::WebSphereSSOClient::RedirectAuthEndpoint, void (SSO::WebSphereSSOClient::*)(const Json::Value &)>);
-static_assert(kIs<&SSO::SSOProfile::SSOIsEnable, bool (SSO::SSOProfile::*)()>);
-static_assert(kIs<&SSO::SSOProfile::GetSSOProfile, std::string (SSO::SSOProfile::*)()>);
-static_assert(kIs<&SSO::SSOProfile::GetSSOClient, SSO::SSOClient *(SSO::SSOProfile::*)()>);
-static_assert(kIs<&SSO::OIDCLogin, void (*)(const std::string &, std::string &)>);
-static_assert(kIs<&SSO::GetSSORelayURL, std::string (*)(bool, const std::string &, const std::string &)>);
-static_assert(kIs<&SSO::GetAzureSSOLogoutURL, std::string (*)(const std::string &)>);
-static_assert(kIs<&SSO::httpGet, void (*)(const std::string &, std::string &, bool, Callback)>);
-static_assert(kIs<&SSO::httpPost, void (*)(const std::string &, const std::string &, std::string &, bool, Callback)>);
-static_assert(kIs<&SSO::URLEncode, std::string (*)(const std::string &)>);
-static_assert(kIs<&SSO::MD5Digest, std::string (*)(std::string)>);
-static_assert(kIs<&JWT::Jwt::GetHeader, Json::Value (JWT::Jwt::*)()>);
-static_assert(kIs<&JWT::Jwt::GetBody, Json::Value (JWT::Jwt::*)()>);
-static_assert(kIs<&JWT::Jwt::GetSignature, std::string (JWT::Jwt::*)()>);
-static_assert(kIs<&JWT::Jwt::JwtRSAVerify, void (JWT::Jwt::*)(std::string &, std::string &, const EVP_MD *)>);
-static_assert(kIs<&JWT::Jwt::JwtHMACVerify, void (JWT::Jwt::*)(std::string &, const EVP_MD *)>);
-
 using Slots = std::vector<std::string>;
 
 /// The slots of a class's virtual table in the built library, by the names of the functions in them.
