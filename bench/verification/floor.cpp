@@ -16,7 +16,7 @@
 #include <string_view>
 #include <vector>
 
-#include "bench/verification/subjects.h"
+#include "bench/verification/verifiers.h"
 
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 
@@ -70,7 +70,7 @@ std::string_view Text(const Json::Value &object, const char *name) {
     return {begin, static_cast<std::size_t>(end - begin)};
 }
 
-bool VerifyRSA(std::string_view input, std::string_view signature, const Json::Value &jwk, const EVP_MD *digest) {
+bool VerifyRSA(std::string_view input, std::string_view signature, const Json::Value &jwk) {
     const Bytes n = Decode(Text(jwk, "n"));
     const Bytes e = Decode(Text(jwk, "e"));
     const Bytes signatureBytes = Decode(signature);
@@ -79,7 +79,7 @@ bool VerifyRSA(std::string_view input, std::string_view signature, const Json::V
     EVP_PKEY *key = EVP_PKEY_new();
     EVP_PKEY_assign(key, EVP_PKEY_RSA, rsa);
     EVP_MD_CTX *context = EVP_MD_CTX_new();
-    EVP_DigestVerifyInit(context, nullptr, digest, nullptr, key);
+    EVP_DigestVerifyInit(context, nullptr, EVP_sha256(), nullptr, key);
     EVP_DigestUpdate(context, input.data(), input.size());
     const bool verified =
         EVP_DigestVerifyFinal(context, signatureBytes.data, static_cast<std::size_t>(signatureBytes.length)) == 1;
@@ -91,13 +91,13 @@ bool VerifyRSA(std::string_view input, std::string_view signature, const Json::V
     return verified;
 }
 
-bool VerifyHMAC(std::string_view input, std::string_view signature, std::string_view secret, const EVP_MD *digest) {
+bool VerifyHMAC(std::string_view input, std::string_view signature, std::string_view secret) {
     const Bytes key = Decode(secret);
     BIO *sink = BIO_new(BIO_s_mem());
     BIO *chain = Base64Filter(sink);
     unsigned char mac[EVP_MAX_MD_SIZE];
     unsigned int macLength = 0;
-    HMAC(digest, key.data, key.length, reinterpret_cast<const unsigned char *>(input.data()), input.size(), mac,
+    HMAC(EVP_sha256(), key.data, key.length, reinterpret_cast<const unsigned char *>(input.data()), input.size(), mac,
          &macLength);
     BIO_write(chain, mac, static_cast<int>(macLength));
     BIO_flush(chain);
@@ -122,9 +122,8 @@ bool VerifyByFloor(const SignedToken &token) {
     const std::string_view input(token.compact.data(), parts[0].size() + 1 + parts[1].size());
     const Json::Value header = ParsePart(parts[0]);
     const Json::Value claims = ParsePart(parts[1]);
-    return token.algorithm.kind == Kind::kRSA
-               ? VerifyRSA(input, parts[2], Parse(token.jwk.data(), token.jwk.size()), token.algorithm.digest())
-               : VerifyHMAC(input, parts[2], token.secret, token.algorithm.digest());
+    return token.algorithm == Algorithm::kRS256 ? VerifyRSA(input, parts[2], Parse(token.jwk.data(), token.jwk.size()))
+                                                : VerifyHMAC(input, parts[2], token.secret);
 }
 
 }  // namespace Bench

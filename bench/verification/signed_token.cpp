@@ -1,9 +1,6 @@
 #include "bench/verification/signed_token.h"
 
-#include <json/json.h>
-
 #include <iterator>
-#include <map>
 
 #include "tests/support/encoding.h"
 #include "tests/support/token.h"
@@ -13,16 +10,9 @@ namespace Bench {
 namespace {
 
 constexpr char kSecret[] = "0123456789abcdef0123456789abcdef0123456789abcdef0123456789abcdef";
+constexpr char kKeyID[] = "the provider's key of 2048 bits";
 
-/// Made once for each size: a key of 4096 bits takes seconds.
-const Test::RSAKey &RSAKeyOf(unsigned int bits) {
-    static std::map<unsigned int, Test::RSAKey> keys;
-    return keys.try_emplace(bits, bits).first->second;
-}
-
-std::string KeyID(unsigned int bits) { return "the provider's key of " + std::to_string(bits) + " bits"; }
-
-/// What a provider tells of a user. It grows as tokens do in practice: by the groups that the user is in.
+/// Grows as tokens do in practice: by the groups that the user belongs to.
 Json::Value Claims(std::size_t size, const std::string &issuer) {
     Json::Value claims = Test::Parse(R"({
         "aud": "9f1c2c2e-1d0e-4a3f-8b0e-5d6f7a8b9c0d", "iat": 1700000000,
@@ -38,27 +28,27 @@ Json::Value Claims(std::size_t size, const std::string &issuer) {
 
 }  // namespace
 
-SignedToken MakeToken(const Algorithm &algorithm, std::size_t claimsSize, const std::string &issuer) {
+SignedToken MakeToken(Algorithm algorithm, std::size_t claimsSize, const std::string &issuer) {
+    const bool isRSA = algorithm == Algorithm::kRS256;
     Json::Value header;
     header["typ"] = "JWT";
-    header["alg"] = algorithm.name;
-    header["kid"] = KeyID(algorithm.bits);
+    header["alg"] = isRSA ? "RS256" : "HS256";
+    header["kid"] = kKeyID;
     const std::string input = Test::SigningInput(header, Claims(claimsSize, issuer));
 
     SignedToken token{algorithm, input + ".", "", "", ""};
-    if (algorithm.kind == Kind::kRSA) {
-        token.compact += RSAKeyOf(algorithm.bits).Sign(input, algorithm.digest());
-        token.jwk = Test::Compact(PublicKey(algorithm.bits));
-        token.key = RSAKeyOf(algorithm.bits).PublicPEM();
+    if (isRSA) {
+        token.compact += Test::ProviderKey().Sign(input, EVP_sha256());
+        token.jwk = Test::Compact(PublicKey());
+        token.key = Test::ProviderKey().PublicPEM();
     } else {
-        token.compact += Test::SignHMAC(input, kSecret, algorithm.digest());
-        token.jwk = R"({"kty": "oct", "k": ")" + Test::Base64Url(kSecret) + R"("})";
-        token.secret = Test::Base64(kSecret);
+        token.compact += Test::SignHMAC(input, kSecret, EVP_sha256());
         token.key = kSecret;
+        token.secret = Test::Base64(kSecret);
     }
     return token;
 }
 
-Json::Value PublicKey(unsigned int bits) { return RSAKeyOf(bits).JWK(KeyID(bits)); }
+Json::Value PublicKey() { return Test::ProviderKey().JWK(kKeyID); }
 
 }  // namespace Bench

@@ -1,0 +1,29 @@
+#ifndef TAVOSSO_BENCH_COMPARISON_H
+#define TAVOSSO_BENCH_COMPARISON_H
+
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace Bench {
+
+/// Does once what is measured, and returns whether it succeeded.
+using Task = std::function<bool()>;
+
+/// A row of the table: what the library does, and what that is compared with.
+struct Comparison {
+    std::string measured;
+    Task ours;
+    std::string comparedWith;
+    Task other;
+    double limit = 0;                       // for the ratio of ours to the other; 0: none
+    std::function<void()> prepare = [] {};  // runs before either task is measured
+};
+
+/// Measures the CPU time of each task, in this thread and in the processes that it waits for, and prints the table.
+/// The only argument is --quick. Returns the exit code for main.
+int RunComparisons(const std::vector<Comparison> &comparisons, int argc, char **argv);
+
+}  // namespace Bench
+
+#endif
