@@ -7,11 +7,10 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cstdlib>
+#include <boost/algorithm/string.hpp>
 #include <iostream>
-#include <iterator>
-#include <sstream>
 #include <system_error>
+#include <vector>
 
 #include "frontend/environment.h"
 #include "frontend/page.h"
@@ -28,27 +27,6 @@ constexpr unsigned int kLongestRun = 70;
 
 // An endless answer of the provider ends the program, not the machine.
 constexpr rlim_t kAddressSpace = rlim_t{1} << 30;
-
-// What OpenSSL and libcurl obey: keys that are written to a file, modules that are loaded, authorities and proxies.
-constexpr const char *kUntrustedVariables[] = {
-    "ALL_PROXY",    "CURL_CA_BUNDLE",  "CURL_HOME",       "HTTPS_PROXY",   "HTTP_PROXY",   "NO_PROXY",
-    "OPENSSL_CONF", "OPENSSL_ENGINES", "OPENSSL_MODULES", "SSLKEYLOGFILE", "SSL_CERT_DIR", "SSL_CERT_FILE",
-    "all_proxy",    "http_proxy",      "https_proxy",     "no_proxy",
-};
-
-bool NamesWord(const std::string &words, const std::string &word) {
-    std::istringstream list(words);
-    return std::find(std::istream_iterator<std::string>(list), {}, word) != std::istream_iterator<std::string>();
-}
-
-void RemoveUntrustedVariables() {
-    const std::string kept = Variable("FRONTEND_KEEP_ENVIRONMENT");
-    for (const char *name : kUntrustedVariables) {
-        if (!NamesWord(kept, name)) {
-            unsetenv(name);
-        }
-    }
-}
 
 void Limit(decltype(RLIMIT_CORE) resource, rlim_t most) {
     rlimit limit{};
@@ -94,9 +72,11 @@ bool Write(const Web::Response &response) {
     return std::cout.good();
 }
 
-bool IsAllowed(std::string methods) {
-    std::replace(methods.begin(), methods.end(), ',', ' ');
-    return NamesWord(methods, Variable("REQUEST_METHOD"));
+/// `methods` is as in an Allow header.
+bool IsAllowed(const std::string &methods) {
+    std::vector<std::string> names;
+    boost::split(names, methods, boost::is_any_of(", "), boost::token_compress_on);
+    return std::find(names.begin(), names.end(), Variable("REQUEST_METHOD")) != names.end();
 }
 
 }  // namespace

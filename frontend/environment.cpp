@@ -1,7 +1,10 @@
 #include "frontend/environment.h"
 
+#include <algorithm>
+#include <boost/algorithm/string.hpp>
 #include <charconv>
 #include <cstdlib>
+#include <vector>
 
 #include "web/refusal.h"
 
@@ -10,6 +13,13 @@ namespace Frontend {
 namespace {
 
 constexpr std::size_t kMostPendingLogins = 1000;
+
+// OpenSSL and libcurl read these: a file to write keys to, modules to load, authorities and proxies.
+constexpr const char *kUntrustedVariables[] = {
+    "ALL_PROXY",    "CURL_CA_BUNDLE",  "CURL_HOME",       "HTTPS_PROXY",   "HTTP_PROXY",   "NO_PROXY",
+    "OPENSSL_CONF", "OPENSSL_ENGINES", "OPENSSL_MODULES", "SSLKEYLOGFILE", "SSL_CERT_DIR", "SSL_CERT_FILE",
+    "all_proxy",    "http_proxy",      "https_proxy",     "no_proxy",
+};
 
 }  // namespace
 
@@ -33,6 +43,17 @@ std::size_t MostPendingLogins() {
         throw TAVO::Web::Refusal("FRONTEND_PENDING_LOGINS must be a number above 0.");
     }
     return most;
+}
+
+void RemoveUntrustedVariables() {
+    const std::string setting = Variable("FRONTEND_KEEP_ENVIRONMENT");
+    std::vector<std::string> kept;
+    boost::split(kept, setting, boost::is_any_of(" "));
+    for (const char *name : kUntrustedVariables) {
+        if (std::find(kept.begin(), kept.end(), name) == kept.end()) {
+            unsetenv(name);
+        }
+    }
 }
 
 }  // namespace Frontend

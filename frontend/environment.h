@@ -19,6 +19,10 @@ bool AcceptsUnverifiedEmail();
 /// FRONTEND_PENDING_LOGINS: how many logins may be pending. Throws `Refusal` unless it is a number above 0.
 std::size_t MostPendingLogins();
 
+/// Removes the variables that change what OpenSSL and libcurl trust, except those that FRONTEND_KEEP_ENVIRONMENT names,
+/// separated by blanks. All other variables reach libcurl.
+void RemoveUntrustedVariables();
+
 }  // namespace Frontend
 
 #endif

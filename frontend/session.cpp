@@ -1,9 +1,9 @@
 #include "frontend/session.h"
 
 #include "web/configured_profile.h"
+#include "web/cookie.h"
 #include "web/private_folder.h"
 #include "web/refusal.h"
-#include "web/request.h"
 #include "web/text.h"
 
 namespace Frontend {

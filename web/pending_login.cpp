@@ -2,6 +2,7 @@
 
 #include "platform/platform.h"
 #include "web/configured_profile.h"
+#include "web/cookie.h"
 #include "web/private_folder.h"
 #include "web/refusal.h"
 #include "web/request.h"

@@ -48,17 +48,6 @@ std::string DecodePercent(const std::string &text) {
     return decoded;
 }
 
-Parameters ParseCookies(const std::string &header) {
-    Parameters cookies;
-    for (const std::string &piece : Split(header, ';')) {
-        const std::size_t begin = piece.find_first_not_of(' ');
-        if (begin != std::string::npos) {
-            cookies.insert(SplitAtEqualsSign(piece.substr(begin)));
-        }
-    }
-    return cookies;
-}
-
 }  // namespace
 
 Parameters ParseQuery(const std::string &query) {
@@ -74,12 +63,6 @@ Parameters ParseQuery(const std::string &query) {
 
 std::optional<std::string> OnlyValue(const Parameters &parameters, const std::string &name) {
     return parameters.count(name) == 1 ? std::optional(parameters.find(name)->second) : std::nullopt;
-}
-
-bool HasCookie(const std::string &header, const std::string &name) { return ParseCookies(header).count(name) != 0; }
-
-std::optional<std::string> FindCookie(const std::string &header, const std::string &name) {
-    return OnlyValue(ParseCookies(header), name);
 }
 
 }  // namespace TAVO::Web

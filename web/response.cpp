@@ -2,6 +2,7 @@
 
 #include <stdexcept>
 
+#include "web/cookie.h"
 #include "web/text.h"
 
 namespace TAVO::Web {
@@ -23,8 +24,7 @@ void Response::AddHeader(const std::string &name, const std::string &value) {
 }
 
 void Response::SetCookie(const std::string &name, const std::string &value, const std::string &attributes) {
-    // Lax, not Strict: the browser comes back from the provider's site, and brings the cookie only then.
-    AddHeader("Set-Cookie", name + "=" + value + "; Path=/; Secure; HttpOnly; SameSite=Lax" + attributes);
+    AddHeader("Set-Cookie", MakeCookie(name, value, attributes));
 }
 
 void Response::ExpireCookie(const std::string &name) { SetCookie(name, "", "; Max-Age=0"); }

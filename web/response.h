@@ -22,8 +22,7 @@ class Response {
 
     /// Throws std::invalid_argument for a value that is not one printable line.
     void AddHeader(const std::string &name, const std::string &value);
-    /// A cookie for this host alone, over TLS alone, out of reach of scripts. Without a Max-Age in `attributes` it ends
-    /// with the browser.
+    /// Sets a cookie with the attributes of `MakeCookie`.
     void SetCookie(const std::string &name, const std::string &value, const std::string &attributes = "");
     void ExpireCookie(const std::string &name);
     void Redirect(const std::string &address);

@@ -1,8 +1,7 @@
 // A whole site for a run: the appliance with the front end, a real OpenID provider, users, and an authority that both
 // trust. Runs as root of private namespaces.
 import {randomBytes, randomUUID} from 'node:crypto';
-import {appendFileSync, copyFileSync, mkdtempSync} from 'node:fs';
-import {join} from 'node:path';
+import {copyFileSync, mkdtempSync} from 'node:fs';
 
 import {listen, startWebServer, writeDomains, writeSettings} from './front_end.mjs';
 import {makeAuthority} from './certificate_authority.mjs';
@@ -33,11 +32,6 @@ function makeClients(origin, tenant) {
     ];
 }
 
-/** For tests/secrets/search, which looks for them in all that the tests of this build print. */
-function recordSecrets(webroot, clients) {
-    appendFileSync(join(webroot, '../../secrets'), clients.map(({secret}) => `${secret}\n`).join(''), {mode: 0o600});
-}
-
 /**
  * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it
  * gives, `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
@@ -51,7 +45,6 @@ export async function startSite({webroot, nodeModules, users, onRequest, onLog})
     const origin = `https://localhost:${socket.address().port}`;
     const tenant = randomUUID();
     const clients = makeClients(origin, tenant);
-    recordSecrets(webroot, clients);
     const providerCertificate = authority.issue('provider', 'IP:127.0.0.1');
     const applianceCertificate = authority.issue('appliance', 'DNS:localhost');
     const fingerprints = [providerCertificate, applianceCertificate].map(({fingerprint}) => fingerprint);
