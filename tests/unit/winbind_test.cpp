@@ -1,5 +1,5 @@
 // How the stand-in asks winbindd, where a real one cannot be had to do what is needed: this program defines the calls
-// of the question itself. A real winbindd is asked in tests/directory.
+// of the question itself. A real winbindd is asked in tests/e2e/directory.
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>

@@ -10,17 +10,6 @@ export function read(file) {
     return readFileSync(path.join(PROJECT, file), 'utf8');
 }
 
-/** A regular expression for this very text. */
-export function asPattern(text) {
-    return text.replace(/[.*+?^${}()|[\]\\]/g, '\\$&');
-}
-
-/** A manual page's text as it is shown: what is written by a name or behind a backslash is the character itself. */
-export function unescaped(roff) {
-    return roff.replaceAll('\\(aq', '\'').replaceAll('\\(dq', '"').replaceAll('\\e', '\\').replaceAll('\\-', '-')
-        .replaceAll('\\&', '');
-}
-
 /** Files that are ours and match: those under version control, and new ones that git does not ignore. */
 export function filesMatching(...patterns) {
     const listing = spawnSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],
@@ -71,47 +60,3 @@ export function proseLines(document) {
         return {document, line: index + 1, text: inside || isFence ? '' : text};
     });
 }
-
-/** What stands in backticks in a text. */
-export function codeSpans(text) {
-    return [...text.matchAll(/`([^`]+)`/g)].map(([, span]) => span);
-}
-
-/** What stands in double quotation marks in a document's prose: a line may end within them, a paragraph may not. */
-export function quotations(document) {
-    const prose = proseLines(document).map(({text}) => text.replace(/`[^`]*`/g, '``')).join('\n');
-    return [...prose.matchAll(/"((?:[^"\n]|\n(?!\n))*)"/g)].map(({index, 1: text}) =>
-        ({document, line: prose.slice(0, index).split('\n').length, text: text.replace(/\s+/g, ' ')}));
-}
-
-/** The rows of a document's tables, each with the heading that it stands under and its table's header. */
-export function tableRows(document) {
-    const rows = [];
-    let heading = '';
-    let header;
-    for (const {line, text} of proseLines(document)) {
-        heading = /^#+ (.*)/.exec(text)?.[1] ?? heading;
-        if (!text.startsWith('|')) {
-            header = undefined;
-            continue;
-        }
-        const cells = text.replace(/^\|\s*|\s*\|\s*$/g, '').split(/\s*(?<!\\)\|\s*/);
-        if (header === undefined) {
-            header = cells;
-        } else if (!/^[-| :]+$/.test(text)) {
-            rows.push({document, line, heading, header, cells});
-        }
-    }
-    return rows;
-}
-
-/** What is in one list and not in the other, and what is there twice: all empty where documents and sources agree. */
-export function differences({told, real}) {
-    return {
-        notTold: real.filter((item) => !told.includes(item)),
-        notThere: told.filter((item) => !real.includes(item)),
-        toldTwice: told.filter((item, index) => told.indexOf(item) !== index),
-    };
-}
-
-export const NO_DIFFERENCES = {notTold: [], notThere: [], toldTwice: []};

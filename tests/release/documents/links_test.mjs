@@ -3,7 +3,7 @@ import assert from 'node:assert/strict';
 import path from 'node:path';
 import {test} from 'node:test';
 
-import {documents, filesAndFolders, proseLines, tableRows} from './documents.mjs';
+import {documents, filesAndFolders, proseLines} from './documents.mjs';
 
 const links = documents.flatMap(proseLines).flatMap(({document, line, text}) =>
     [...text.replace(/`[^`]*`/g, '``').matchAll(/\]\(([^)\s]+)\)/g)].map(([, target]) => ({document, line, target})))
@@ -29,26 +29,9 @@ test('each anchor is a heading there', () => {
     assert.deepEqual(anchored.filter(({file, anchor}) => !anchors(file).includes(anchor)), []);
 });
 
-test('links have no other form, which would not be looked at', () => {
-    const others = documents.flatMap(proseLines).map(({document, line, text}) =>
-        ({document, line, text: text.replace(/`[^`]*`/g, '``')}));
-    // References, titles, elements other than a line break, and addresses: of these no document has any.
-    const otherForm = /\]\[|^ *\[[^\]]*\]:|\]\([^)]*(\s|$)|<(?!br>)[\w/]|\w:\/\//;
-    assert.deepEqual(others.filter(({text}) => otherForm.test(text)), []);
-});
-
 test('the index leads to every chapter', () => {
     const led = links.filter(({document}) => document === 'docs/README.md').map(({file}) => file);
     const chapters = documents.filter((document) => document.startsWith('docs/') && document !== 'docs/README.md');
     assert.ok(chapters.length > 5);
     assert.deepEqual(chapters.filter((chapter) => !led.includes(chapter)), []);
-});
-
-test('the table in README.md has the chapters of the index', () => {
-    const chapters = (document) => tableRows(document).filter(({header}) => header[0] === 'chapter')
-        .map(({cells}) => cells[0]);
-    // The index has one more, which lies beside the README.
-    const inFolder = chapters('docs/README.md').filter((chapter) => !chapter.includes('](../'));
-    assert.ok(inFolder.length > 5);
-    assert.deepEqual(chapters('README.md'), inFolder.map((chapter) => chapter.replace('](', '](docs/')));
 });
