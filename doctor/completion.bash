@@ -19,6 +19,7 @@ _tavosso_doctor() {
     '') choices+=' token login explain' ;;
     token) choices+=' --fetch' ;;
     login) choices+=' --redirect-uri' ;;
+    explain) choices+=' --list --markdown' ;;
     esac
     mapfile -t COMPREPLY < <(compgen -W "$choices" -- "$word")
     if [ "$command" = token ] && [[ $word != -* ]]; then

@@ -14,9 +14,8 @@
 #include <string>
 #include <vector>
 
-#include "doctor/book.h"
-#include "doctor/built_in.h"
 #include "doctor/checks.h"
+#include "doctor/explain.h"
 #include "doctor/login_walk.h"
 #include "doctor/watch.h"
 
@@ -43,6 +42,8 @@ struct Options {
     bool mayFetch = false;
     std::string redirectURI;
     std::vector<std::string> words;
+    bool isList = false;
+    bool isMarkdown = false;
 };
 
 /// Why the command cannot run at all.
@@ -134,29 +135,25 @@ int Login(Report &report, const Options &options) {
 }
 
 int Explain(const Options &options) {
-    const std::vector<Doctor::Explanation> explanations = Doctor::LookUp(boost::join(options.words, " "));
-    Json::Value json;
-    json["version"] = Doctor::kJsonVersion;
-    json["command"] = "explain";
-    json["explanations"] = Json::arrayValue;
-    for (const Doctor::Explanation &explanation : explanations) {
-        Json::Value one;
-        one["about"] = explanation.about;
-        if (!options.isJson) {
-            std::cout << explanation.about << '\n';
-        }
-        for (const auto &[head, text] : explanation.told) {
-            one[head] = text;
-            if (!options.isJson) {
-                std::cout << "  " << head << ": " << text << '\n';
-            }
-        }
-        json["explanations"].append(one);
+    if (options.isList != options.words.empty()) {
+        throw cannot_run("explain takes either a text or --list");
     }
+    if (options.isMarkdown) {
+        Doctor::PrintMarkdown();
+        return kHealthy;
+    }
+    const std::vector<Doctor::Explanation> explanations =
+        options.isList ? Doctor::AllExplanations() : Doctor::LookUp(boost::join(options.words, " "));
     if (options.isJson) {
+        Json::Value json;
+        json["version"] = Doctor::kJsonVersion;
+        json["command"] = "explain";
+        json["explanations"] = Doctor::ExplanationsAsJson(explanations);
         Doctor::WriteJson(json);
     } else if (explanations.empty()) {
-        std::cout << "The guides do not know this text. Try a whole line of the log, or an exception's text.\n";
+        std::cout << "This text is unknown. Try a whole line of the log, or an exception's text.\n";
+    } else {
+        Doctor::PrintExplanations(explanations);
     }
     return explanations.empty() ? kFindings : kHealthy;
 }
@@ -167,7 +164,7 @@ int main(int argc, char **argv) try {
     Options options;
     CLI::App app("Tells why a single sign-on login fails, from this machine's configuration and its provider.",
                  "tavosso-doctor");
-    app.set_version_flag("--version", std::string("tavosso-doctor ") + Doctor::kVersion);
+    app.set_version_flag("--version", "tavosso-doctor " TAVOSSO_VERSION);
     app.add_flag("--json", options.isJson, "Write one JSON object");
     app.add_flag("--verbose", options.isVerbose, "Show the library's requests and log lines, too");
     app.add_option("--timeout", options.timeout, "Seconds to wait for each answer of the provider")
@@ -188,7 +185,9 @@ int main(int argc, char **argv) try {
     login->add_option("--redirect-uri", options.redirectURI, "Another one that is registered at the provider");
 
     CLI::App *explain = app.add_subcommand("explain", "Explain an exception's text or a line of the log");
-    explain->add_option("TEXT", options.words, "The text")->required();
+    explain->add_option("TEXT", options.words, "The text");
+    CLI::Option *list = explain->add_flag("--list", options.isList, "Print all that it explains");
+    explain->add_flag("--markdown", options.isMarkdown, "Print that as the tables of the documents")->needs(list);
 
     try {
         app.parse(argc, argv);

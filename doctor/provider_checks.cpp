@@ -8,8 +8,8 @@
 #include <vector>
 
 #include "doctor/address.h"
-#include "doctor/book.h"
 #include "doctor/checks.h"
+#include "doctor/failure_text.h"
 #include "doctor/key_set.h"
 #include "doctor/watch.h"
 #include "web/request.h"
@@ -79,7 +79,8 @@ class ProviderCheck {
     bool CheckTransfer(const std::string &id, const std::string &subject, const Transfer &transfer) {
         if (transfer.result != CURLE_OK) {
             const std::string text = curl_easy_strerror(transfer.result);
-            const std::string cause = CauseOf(text);
+            const Failure *row = FindTransfer(transfer.result);
+            const std::string cause = row != nullptr ? row->cause : "";
             report_.Finding(id + ".reachable", subject,
                             transfer.url + ": " + text + (cause.empty() ? "" : " (" + cause + ")"),
                             // Not as a command to copy: the provider may have chosen the address.

@@ -10,7 +10,7 @@ add_library(test_support STATIC support/conversion.cpp support/encoding.cpp supp
             support/openssl_errors.cpp support/token.cpp)
 tavosso_options(test_support)
 target_compile_definitions(test_support PRIVATE TAVOSSO_WINBIND=$<BOOL:${TAVOSSO_WINBIND}>)
-target_link_libraries(test_support PUBLIC OpenSSL::Crypto PkgConfig::JSONCPP)
+target_link_libraries(test_support PUBLIC failure_table OpenSSL::Crypto PkgConfig::JSONCPP)
 
 # Sources of many programs, each compiled once. Objects, not an archive: a program links all of them, so that they
 # replace functions that the library calls.

@@ -12,6 +12,8 @@
 #include <algorithm>
 #include <cerrno>
 #include <csignal>
+#include <fstream>
+#include <iterator>
 #include <memory>
 #include <stdexcept>
 #include <utility>
@@ -153,6 +155,14 @@ void ExpectHarmless(const DoctorRun &run) {
     EXPECT_LT(run.status, 128) << "a signal has ended it: " << run.errors;
 }
 
+void ExpectDocumented(const std::vector<Check> &checks) {
+    std::ifstream file(TAVOSSO_SOURCES "/docs/doctor.md");
+    const std::string chapter{std::istreambuf_iterator<char>(file), {}};
+    for (const Check &check : checks) {
+        EXPECT_NE(chapter.find('`' + check.id + '`'), std::string::npos) << check.id << " is not in the chapter";
+    }
+}
+
 Strings With(Strings arguments, const std::string &more) {
     arguments.push_back(more);
     return arguments;
@@ -232,6 +242,7 @@ Report AskMachine(const Strings &arguments, const std::string &input) {
                                  check["found"].asString(), check["remedy"].asString(), check["library"].asString()});
     }
     EXPECT_FALSE(report.checks.empty()) << "nothing was looked at";
+    ExpectDocumented(report.checks);
     EXPECT_EQ(report.json["healthy"].asBool(), report.Findings().empty());
     EXPECT_EQ(report.status, report.Findings().empty() ? 0 : 1);
     return report;

@@ -16,12 +16,20 @@ using ::testing::StartsWith;
 
 TEST(CommandLine, ThatIsWrongIsRefusedOnStandardError) {
     const Strings wrong[] = {
-        {"examine"},          {"--no-such-option"},
-        {"--timeout", "0"},   {"--timeout", "soon"},
-        {"--timeout"},        {"token"},
-        {"token", "a", "b"},  {"explain"},
-        {"login", "now"},     {"login", "explain", "a"},
-        {"--user", "no-one"}, {"--domain"},
+        {"examine"},
+        {"--no-such-option"},
+        {"--timeout", "0"},
+        {"--timeout", "soon"},
+        {"--timeout"},
+        {"token"},
+        {"token", "a", "b"},
+        {"explain"},
+        {"login", "now"},
+        {"login", "explain", "a"},
+        {"--user", "no-one"},
+        {"--domain"},
+        {"explain", "a", "--list"},
+        {"explain", "a", "--markdown"},
     };
     for (const Strings &arguments : wrong) {
         SCOPED_TRACE(::testing::PrintToString(arguments));

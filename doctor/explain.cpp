@@ -1,0 +1,146 @@
+#include "doctor/explain.h"
+
+#include <boost/algorithm/string/erase.hpp>
+#include <iostream>
+
+#include "doctor/failure_text.h"
+
+namespace Doctor {
+
+namespace {
+
+struct Column {
+    const char *head;
+    const char *Failure::*value;
+};
+
+struct Table {
+    FailureKind kind;
+    const char *title;
+    const char *head;  // of the column with the texts
+    std::vector<Column> columns;
+};
+
+const std::vector<Table> &Tables() {
+    const Column level{"level", &Failure::type};
+    const Column type{"class", &Failure::type};
+    const Column thrownBy{"thrown by", &Failure::thrownBy};
+    const Column cause{"cause", &Failure::cause};
+    const Column remedy{"remedy", &Failure::remedy};
+    static const std::vector<Table> tables = {
+        {FailureKind::kLibraryLine, "log lines of the library", "line", {level, cause, remedy}},
+        {FailureKind::kPlatformLine, "log lines of the stand-in", "line", {level, cause, remedy}},
+        {FailureKind::kFrontEndLine, "log lines of the front end", "line", {level, cause, remedy}},
+        {FailureKind::kReason, "reasons of the front end", "reason", {cause, remedy}},
+        {FailureKind::kException, "exceptions of the library", "text", {type, thrownBy, cause, remedy}},
+        {FailureKind::kTransfer, "results of libcurl", "result", {cause, remedy}},
+    };
+    return tables;
+}
+
+const Table &TableOf(const Failure &failure) { return Tables()[static_cast<std::size_t>(failure.kind)]; }
+
+constexpr char kForeignText[] = "a text of another library";
+
+std::vector<std::string> TextsOf(const Failure &failure) {
+    return failure.texts.empty() ? std::vector<std::string>{kForeignText}
+                                 : std::vector<std::string>(failure.texts.begin(), failure.texts.end());
+}
+
+std::string WithoutBackticks(const std::string &text) { return boost::erase_all_copy(text, "`"); }
+
+void PrintMarkdown(const Table &table) {
+    std::cout << "<!-- failures: " << table.title << " -->\n\n| " << table.head;
+    std::string line = "| ---";
+    for (const Column &column : table.columns) {
+        std::cout << " | " << column.head;
+        line += " | ---";
+    }
+    std::cout << " |\n" << line << " |\n";
+    for (const Failure &failure : Failures()) {
+        if (failure.kind != table.kind) {
+            continue;
+        }
+        const char *separator = "| ";
+        for (const std::string &text : TextsOf(failure)) {
+            std::cout << separator << (text == kForeignText ? text : '`' + text + '`');
+            separator = "<br>";
+        }
+        for (const Column &column : table.columns) {
+            const std::string value = failure.*column.value;
+            std::cout << " | "
+                      << (column.value == &Failure::type && table.kind == FailureKind::kException ? '`' + value + '`'
+                                                                                                  : value);
+        }
+        std::cout << " |\n";
+    }
+    std::cout << "\n<!-- end -->\n";
+}
+
+}  // namespace
+
+std::vector<Explanation> LookUp(const std::string &text) {
+    std::vector<Explanation> found;
+    for (const Table &table : Tables()) {
+        Explanation best{nullptr, ""};
+        for (const Failure &failure : Failures()) {
+            for (const char *about : failure.texts) {
+                // A text of placeholders alone would explain anything.
+                if (failure.kind == table.kind && EndsInText(text, about) &&
+                    Specificity(about) > Specificity(best.about.c_str())) {
+                    best = {&failure, about};
+                }
+            }
+        }
+        if (const Failure *transfer = FindTransfer(FindTransferText(text));
+            table.kind == FailureKind::kTransfer && transfer != nullptr) {
+            best = {transfer, transfer->texts.front()};
+        }
+        if (best.failure != nullptr) {
+            found.push_back(best);
+        }
+    }
+    return found;
+}
+
+std::vector<Explanation> AllExplanations() {
+    std::vector<Explanation> all;
+    for (const Failure &failure : Failures()) {
+        for (const std::string &text : TextsOf(failure)) {
+            all.push_back({&failure, text});
+        }
+    }
+    return all;
+}
+
+void PrintExplanations(const std::vector<Explanation> &explanations) {
+    for (const Explanation &explanation : explanations) {
+        std::cout << explanation.about << '\n';
+        for (const Column &column : TableOf(*explanation.failure).columns) {
+            std::cout << "  " << column.head << ": " << WithoutBackticks(explanation.failure->*column.value) << '\n';
+        }
+    }
+}
+
+Json::Value ExplanationsAsJson(const std::vector<Explanation> &explanations) {
+    Json::Value json = Json::arrayValue;
+    for (const Explanation &explanation : explanations) {
+        const Table &table = TableOf(*explanation.failure);
+        Json::Value one;
+        one["about"] = explanation.about;
+        one["table"] = table.title;
+        for (const Column &column : table.columns) {
+            one[column.head] = WithoutBackticks(explanation.failure->*column.value);
+        }
+        json.append(one);
+    }
+    return json;
+}
+
+void PrintMarkdown() {
+    for (const Table &table : Tables()) {
+        PrintMarkdown(table);
+    }
+}
+
+}  // namespace Doctor

@@ -1,0 +1,33 @@
+#ifndef TAVOSSO_DOCTOR_EXPLAIN_H
+#define TAVOSSO_DOCTOR_EXPLAIN_H
+
+#include <json/json.h>
+
+#include <string>
+#include <vector>
+
+#include "doctor/failure_table.h"
+
+// What the table of failures has about a text, and the table itself, as they are printed.
+namespace Doctor {
+
+struct Explanation {
+    const Failure *failure;
+    std::string about;  // the text of the table
+};
+
+/// Of each kind of failure, the most specific text of the table that `text` ends in.
+std::vector<Explanation> LookUp(const std::string &text);
+
+/// Each text of the table.
+std::vector<Explanation> AllExplanations();
+
+void PrintExplanations(const std::vector<Explanation> &explanations);
+Json::Value ExplanationsAsJson(const std::vector<Explanation> &explanations);
+
+/// The tables of the documents, each between the comments that mark it there.
+void PrintMarkdown();
+
+}  // namespace Doctor
+
+#endif

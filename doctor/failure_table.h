@@ -1,0 +1,42 @@
+#ifndef TAVOSSO_DOCTOR_FAILURE_TABLE_H
+#define TAVOSSO_DOCTOR_FAILURE_TABLE_H
+
+#include <curl/curl.h>
+
+#include <vector>
+
+// Every failure that the library, the platform's stand-in and the front end report, with its cause and its remedy. The
+// documents and `tavosso-doctor explain` print this table, and the tests compare it with what is thrown and logged.
+namespace Doctor {
+
+enum class FailureKind {
+    kLibraryLine,   // of the system log
+    kPlatformLine,  // the stand-in's
+    kFrontEndLine,
+    kReason,     // the front end's own reason for a failed sign-in
+    kException,  // of the library
+    kTransfer,   // libcurl's result
+};
+
+/// In the table, a provider's error answer (RFC 6749, section 5.2), which the library throws as a text.
+constexpr char kErrorAnswer[] = "{... \"error\": ...}";
+
+struct Failure {
+    FailureKind kind;
+
+    /// Words in capitals are placeholders: see failure_text.h. Of a transfer, the name of its CURLcode. Empty where the
+    /// text is another library's.
+    std::vector<const char *> texts;
+
+    const char *cause;  // a key, file, path or command is in backticks
+    const char *remedy;
+    const char *type = "";       // a line's level, or an exception's exact class
+    const char *thrownBy = "";   // of an exception
+    CURLcode result = CURLE_OK;  // of a transfer
+};
+
+const std::vector<Failure> &Failures();
+
+}  // namespace Doctor
+
+#endif

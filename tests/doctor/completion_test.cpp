@@ -1,0 +1,78 @@
+#include <gmock/gmock.h>
+
+#include <cstdio>
+#include <fstream>
+#include <iterator>
+#include <memory>
+#include <regex>
+#include <set>
+#include <string>
+
+#include "tests/doctor/doctor_process.h"
+
+// The command line in the manual page, and in the completion of bash.
+namespace Test {
+
+namespace {
+
+using ::testing::HasSubstr;
+
+constexpr char kCompletion[] = TAVOSSO_SOURCES "/doctor/completion.bash";
+const Strings kCommands = {"token", "login", "explain"};
+
+std::string Read(const std::string &path) {
+    std::ifstream file(path);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+/// The options that the help of a command lists.
+std::set<std::string> OptionsOf(const Strings &command) {
+    Strings arguments = command;
+    arguments.emplace_back("--help");
+    const std::string help = RunDoctor(arguments).output;
+    static const std::regex option("--[a-z-]+");
+    return {std::sregex_token_iterator(help.begin(), help.end(), option), std::sregex_token_iterator()};
+}
+
+/// What bash offers for the last of these words.
+std::string Complete(const std::string &words) {
+    const std::string script = std::string("cd " TAVOSSO_SOURCES "; source ") + kCompletion +
+                               "; COMP_WORDS=(tavosso-doctor " + words +
+                               "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _tavosso_doctor 2>/dev/null;"
+                               " echo -n \"${COMPREPLY[*]}\"";
+    const std::unique_ptr<FILE, decltype(&pclose)> pipe(popen(("bash -c '" + script + "'").c_str(), "r"), pclose);
+    char offered[1024] = {};
+    EXPECT_LT(std::fread(offered, 1, sizeof offered, pipe.get()), sizeof offered);
+    return offered;
+}
+
+TEST(Options, AreInTheManualPageAndCompleted) {
+    const std::string manual = Read(TAVOSSO_SOURCES "/docs/man/tavosso-doctor.8");
+    for (const Strings &command : {Strings{}, {"token"}, {"login"}, {"explain"}}) {
+        for (const std::string &option : OptionsOf(command)) {
+            EXPECT_THAT(manual, HasSubstr("Fl " + option.substr(1))) << option;
+            EXPECT_EQ(Complete((command.empty() ? "" : command.front() + " ") + option), option);
+        }
+    }
+}
+
+TEST(Commands, AreInTheHelpTheManualPageAndCompleted) {
+    const std::string help = RunDoctor({"--help"}).output;
+    const std::string manual = Read(TAVOSSO_SOURCES "/docs/man/tavosso-doctor.8");
+    for (const std::string &command : kCommands) {
+        EXPECT_THAT(help, HasSubstr("\n  " + command + " ")) << command;
+        EXPECT_THAT(manual, HasSubstr(".It Cm " + command + "\n")) << command;
+        EXPECT_EQ(Complete(command), command);
+    }
+}
+
+TEST(Completion, OffersWhatTheCommandTakes) {
+    EXPECT_EQ(Complete("to"), "token");
+    EXPECT_EQ(Complete("login --f"), "");
+    EXPECT_EQ(Complete("token READ"), "README.md");
+    EXPECT_EQ(Complete("--user roo"), "root");
+}
+
+}  // namespace
+
+}  // namespace Test
