@@ -10,7 +10,7 @@ const NO_NAME = `Your organisation gave no name that this device can use. ${ASK}
 const NOT_KNOWN = `Something went wrong on the way. Please try again; if it happens again, tell your administrator.`;
 
 // By how a reason begins: a provider adds words of its own.
-const EXPLANATIONS = new Map([
+export const EXPLANATIONS = new Map([
     ['id_token expired.', `Your sign-in took too long. Please try again; if it happens again, the clock of this device may be wrong.`],
     ['This sign-in took too long', TOO_LONG],
     ['The provider refused: invalid_grant', TOO_LONG],
