@@ -1,9 +1,7 @@
 #include "tests/faults/scenario.h"
 
-#include <cxxabi.h>
 #include <openssl/evp.h>
 
-#include <cstdlib>
 #include <iomanip>
 #include <ostream>
 #include <regex>
@@ -11,6 +9,7 @@
 
 #include "sso/sso.h"
 #include "tests/support/encoding.h"
+#include "tests/support/failure.h"
 #include "tests/support/files.h"
 #include "tests/support/token.h"
 
@@ -118,12 +117,6 @@ std::string Readable(std::string url) {
     return url;
 }
 
-std::string ClassOf(const std::exception &error) {
-    const std::unique_ptr<char, decltype(&std::free)> name(
-        abi::__cxa_demangle(typeid(error).name(), nullptr, nullptr, nullptr), std::free);
-    return name.get();
-}
-
 }  // namespace
 
 void PrintTo(const Scenario &scenario, std::ostream *stream) { *stream << scenario.name; }
@@ -175,6 +168,7 @@ std::string Describe(const Scenario &scenario, const Ending &ending) {
     try {
         std::rethrow_exception(ending.failure);
     } catch (const std::exception &error) {
+        RequireInTable(error);
         return "throws " + ClassOf(error) + ": " + error.what() + change;
     } catch (...) {
         return "throws something else" + change;

@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <sso/sso.h>
 
+#include "tests/support/failure.h"
 #include "tests/support/token.h"
 #include "web/refusal.h"
 
@@ -40,12 +41,7 @@ class NameClaim : public testing::Test {
   protected:
     static std::string Failure(const std::string &claims, const std::string &profile = "azure",
                                bool acceptsUnverifiedEmail = false) {
-        try {
-            RequireTrustworthyName(Parse(claims), profile, acceptsUnverifiedEmail);
-        } catch (const Refusal &refusal) {
-            return refusal.what();
-        }
-        return "";
+        return ::Test::FailureOf([&] { RequireTrustworthyName(Parse(claims), profile, acceptsUnverifiedEmail); }).text;
     }
 };
 

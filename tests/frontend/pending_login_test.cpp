@@ -13,6 +13,7 @@
 #include "frontend/session.h"
 #include "platform/platform.h"
 #include "tests/frontend/set_cookie.h"
+#include "tests/support/failure.h"
 #include "web/refusal.h"
 #include "web/request.h"
 #include "web/text.h"
@@ -75,12 +76,7 @@ class PendingLogin : public testing::Test {
     std::string Cookie() { return "__Host-login-" + Name().substr(0, 1) + "=" + Name(); }
 
     std::string Refusal(const std::string &cookies, const std::string &returned) {
-        try {
-            ConcludeLogin(response, cookies, returned);
-        } catch (const TAVO::Web::Refusal &refusal) {
-            return refusal.what();
-        }
-        return "";
+        return ::Test::FailureOf([&] { ConcludeLogin(response, cookies, returned); }).text;
     }
 
     Response response;

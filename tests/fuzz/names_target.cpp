@@ -20,7 +20,7 @@ constexpr std::size_t kLongestName = 1023;
 Json::Value Claims(const std::string &part) {
     const ExpectedPart claims = ReadPart(part, "bad jwt body format!");
     if (part.empty()) {
-        throw std::logic_error("");
+        throw std::logic_error("empty jwt part");
     }
     if (!(claims.failure == Test::kNothingThrown)) {
         throw std::invalid_argument("bad jwt body format!");

@@ -18,8 +18,8 @@ constexpr char kClaimsNotJson[] = "bad jwt body format!";
 /// The part's value. Throws what must be thrown of it.
 Json::Value Read(const std::string &part, const char *notJson) {
     const ExpectedPart read = ReadPart(part, notJson);
-    if (read.failure == Test::Fails<std::logic_error>("")) {
-        throw std::logic_error("");
+    if (read.failure == Test::Fails<std::logic_error>("empty jwt part")) {
+        throw std::logic_error("empty jwt part");
     }
     if (!(read.failure == Test::kNothingThrown)) {
         throw std::invalid_argument(notJson);
@@ -46,7 +46,7 @@ bool IsReason(const Test::Failure &failure, const std::vector<Test::Failure> &re
 ExpectedPart ReadPart(const std::string &part, const char *notJson) {
     ExpectedPart read;
     if (UpToNUL(part).empty()) {
-        read.failure = Test::Fails<std::logic_error>("");
+        read.failure = Test::Fails<std::logic_error>("empty jwt part");
         return read;
     }
     const Decoded decoded = DecodeBase64(part);

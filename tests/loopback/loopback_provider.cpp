@@ -6,6 +6,7 @@
 
 #include "sso/sso.h"
 #include "tests/support/authority.h"
+#include "tests/support/failure.h"
 #include "tests/support/files.h"
 #include "tests/support/interposed/clock.h"
 #include "tests/support/system_log.h"
@@ -58,6 +59,7 @@ Outcome LogIn(const std::string &code) {
     try {
         TAVO::SSO::OIDCLogin(code, outcome.userName);
     } catch (const std::exception &error) {
+        RequireInTable(error);
         outcome.exception = typeid(error).name();
         outcome.text = error.what();
     }

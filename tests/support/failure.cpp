@@ -1,13 +1,66 @@
 #include "tests/support/failure.h"
 
+#include <cxxabi.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <memory>
 #include <ostream>
+#include <stdexcept>
+
+#include "doctor/failure_text.h"
 
 namespace Test {
+
+namespace {
+
+/// The class as the table names it: without the library's namespaces, and without what Boost wraps around its own.
+std::string NameInTable(std::string name) {
+    for (const std::string around : {"TAVO::SSO::", "TAVO::JWT::", "boost::wrapexcept<"}) {
+        if (name.compare(0, around.size(), around) == 0) {
+            name.erase(0, around.size());
+        }
+    }
+    return name.substr(0, name.find('>'));
+}
+
+bool IsText(const std::string &type, const std::string &text, const char *ofTable) {
+    // The text begins with the token's "alg", and what() ends at a NUL in it.
+    const bool isCut = type == "jwt_not_support" && text.find(' ') == std::string::npos;
+    return std::string(ofTable) == "CURL" ? Doctor::FindTransferText(text) != CURLE_OK
+                                          : isCut || Doctor::IsText(text, ofTable);
+}
+
+bool IsInTable(const std::string &type, const std::string &text) {
+    const bool isOfFrontEnd = type == "Frontend::Refusal" || type == "std::system_error";
+    const Doctor::FailureKind kind = isOfFrontEnd ? Doctor::FailureKind::kReason : Doctor::FailureKind::kException;
+    const std::vector<Doctor::Failure> &rows = Doctor::Failures();
+    return std::any_of(rows.begin(), rows.end(), [&](const Doctor::Failure &row) {
+        return row.kind == kind && (isOfFrontEnd || type == row.type) &&
+               (row.texts.empty() || std::any_of(row.texts.begin(), row.texts.end(),
+                                                 [&](const char *ofTable) { return IsText(type, text, ofTable); }));
+    });
+}
+
+}  // namespace
 
 bool operator==(const Failure &a, const Failure &b) { return a.type == b.type && a.text == b.text; }
 
 std::ostream &operator<<(std::ostream &stream, const Failure &failure) {
     return stream << failure.type << " \"" << failure.text << "\"";
+}
+
+std::string ClassOf(const std::exception &error) {
+    const std::unique_ptr<char, decltype(&std::free)> name(
+        abi::__cxa_demangle(typeid(error).name(), nullptr, nullptr, nullptr), std::free);
+    return name.get();
+}
+
+void RequireInTable(const std::exception &error) {
+    const std::string type = ClassOf(error);
+    if (!IsInTable(NameInTable(type), error.what())) {
+        throw std::logic_error("doctor/failure_table.cpp has no row for " + type + ": " + error.what());
+    }
 }
 
 }  // namespace Test

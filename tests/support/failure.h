@@ -24,11 +24,18 @@ Failure Fails(const std::string &text) {
     return {typeid(Exception).name(), text};
 }
 
+/// The class of an exception, in the words of C++.
+std::string ClassOf(const std::exception &error);
+
+/// Throws if the table of failures has no such exception. `FailureOf` and `LogIn` do this with each that they catch.
+void RequireInTable(const std::exception &error);
+
 template <typename Function>
 Failure FailureOf(Function function) {
     try {
         function();
     } catch (const std::exception &error) {
+        RequireInTable(error);
         return {typeid(error).name(), error.what()};
     }
     return kNothingThrown;

@@ -1,5 +1,6 @@
 #include "tests/support/system_log.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <cstdarg>
@@ -8,6 +9,9 @@
 #include <cstring>
 #include <ostream>
 #include <regex>
+#include <stdexcept>
+
+#include "doctor/failure_text.h"
 
 namespace Test {
 
@@ -43,6 +47,28 @@ void Write(int priority, const char *format, std::va_list arguments) {
     errno = EINTR;  // as a real one may leave it: nothing in the library may rely on it
 }
 
+std::string LevelOf(int priority) {
+    const int level = LOG_PRI(priority);
+    const std::string name = level == LOG_ERR       ? "err"
+                             : level == LOG_WARNING ? "warning"
+                             : level == LOG_INFO    ? "info"
+                                                    : "?";
+    return name + (LOG_FAC(priority) == LOG_FAC(LOG_AUTH) ? ", auth" : "");
+}
+
+bool IsInTable(const LogLine &line) {
+    const auto isText = [&](const char *ofTable) {
+        // What is behind the source in a line of this text can only be libcurl's.
+        const bool isCurls = std::strstr(ofTable, "CURL") == nullptr || Doctor::FindTransferText(line.text) != CURLE_OK;
+        return isCurls && Doctor::IsText(line.text, ofTable);
+    };
+    const std::vector<Doctor::Failure> &rows = Doctor::Failures();
+    return std::any_of(rows.begin(), rows.end(), [&](const Doctor::Failure &row) {
+        return row.kind <= Doctor::FailureKind::kFrontEndLine && LevelOf(line.priority) == row.type &&
+               std::any_of(row.texts.begin(), row.texts.end(), isText);
+    });
+}
+
 }  // namespace
 
 bool operator==(const LogLine &a, const LogLine &b) { return a.priority == b.priority && a.text == b.text; }
@@ -54,6 +80,17 @@ std::ostream &operator<<(std::ostream &stream, const LogLine &line) {
 LogLine Error(const std::string &text) { return {LOG_ERR, text}; }
 
 std::vector<LogLine> TakeSystemLog() {
+    const std::vector<LogLine> taken = TakeSystemLogWithOwnTexts();
+    for (const LogLine &line : taken) {
+        if (!IsInTable(line)) {
+            throw std::logic_error("doctor/failure_table.cpp has no row for a line of level " + LevelOf(line.priority) +
+                                   ": " + line.text);
+        }
+    }
+    return taken;
+}
+
+std::vector<LogLine> TakeSystemLogWithOwnTexts() {
     std::vector<LogLine> taken;
     for (std::size_t at = 0; at < used;) {
         Record record{};

@@ -21,8 +21,11 @@ std::ostream &operator<<(std::ostream &stream, const LogLine &line);
 /// A line at LOG_ERR.
 LogLine Error(const std::string &text);
 
-/// Every line so far, and no more of them.
+/// Every line so far, and no more of them. Throws if the table of failures has no such line of this level.
 std::vector<LogLine> TakeSystemLog();
+
+/// The same where the test itself has thrown what the library logs, with a text of its own.
+std::vector<LogLine> TakeSystemLogWithOwnTexts();
 
 }  // namespace Test
 

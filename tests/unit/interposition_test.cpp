@@ -36,6 +36,7 @@ namespace {
 using namespace TAVO::SSO;
 using ::Test::LogLine;
 using ::Test::TakeSystemLog;
+using ::Test::TakeSystemLogWithOwnTexts;
 
 TEST(Interposition, URLEncodeIsFoundByTheFunctionsThatUseIt) {
     EXPECT_EQ(WebSphereSSOClient().GetIDTokenReqParams(),
@@ -101,7 +102,7 @@ class FailingExchange : public testing::TestWithParam<Exchange> {
 TEST_P(FailingExchange, AnInvalidArgumentIsOneLineAndGoesNoFurther) {
     transfer = [](std::string &) { throw std::invalid_argument("the reason"); };
     GetParam().run(client);
-    EXPECT_THAT(TakeSystemLog(),
+    EXPECT_THAT(TakeSystemLogWithOwnTexts(),
                 testing::ElementsAre(LogLine{LOG_ERR, std::string(GetParam().source) + ":N the reason"}));
 }
 
