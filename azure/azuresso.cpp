@@ -13,6 +13,7 @@
 #include "jwt/jwt.h"
 #include "platform/platform.h"
 #include "sso/authorization_request.h"
+#include "sso/base64.h"
 #include "sso/fetch.h"
 #include "sso/id_token.h"
 #include "sso/names.h"
@@ -168,7 +169,7 @@ void AzureSSOClient::GetUserName(std::string &userName) {
     }
     userName = boost::to_upper_copy(pieces[1]) + '\\' + pieces[0];
 
-    char buffer[1024] = {};
+    char buffer[kPlatformBuffer] = {};
     if (TAVOWinsUserNameFqdn2Netbios(userName.c_str(), buffer, sizeof buffer - 1) < 0) {
         throw sso_op_failed("TAVOWinsUserNameFqdn2Netbios failed.");
     }

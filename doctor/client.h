@@ -23,9 +23,6 @@ Profile ProfileNamed(const std::string &name);
 /// The signatures that the profile's client can verify.
 std::vector<std::string> AlgorithmsOf(Profile profile);
 
-/// In bytes: in base64 it becomes the key's text, for which there are 1024 bytes, its NUL and three more among them.
-constexpr std::size_t kLongestWebSphereSecret = 765;
-
 /// In bytes, of a key of HS256 (RFC 7518, section 3.2). The library takes any.
 constexpr std::size_t kShortestWebSphereKey = 32;
 

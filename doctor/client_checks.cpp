@@ -1,4 +1,6 @@
 // The client's file, key by key.
+#include <sso/base64.h>
+
 #include <algorithm>
 #include <boost/algorithm/string/predicate.hpp>
 #include <boost/algorithm/string/trim.hpp>
@@ -131,8 +133,8 @@ class KeyCheck {
     void CheckSecret() {
         const std::string found = "is set, " + std::to_string(value_.size()) + " bytes";
         const bool isKey = client_.profile() == Profile::kWebSphere;
-        if (isKey && value_.size() > kLongestWebSphereSecret) {
-            Finding(found + ": too long", "get one of at most " + std::to_string(kLongestWebSphereSecret) +
+        if (isKey && value_.size() > TAVO::SSO::kLongestSecret) {
+            Finding(found + ": too long", "get one of at most " + std::to_string(TAVO::SSO::kLongestSecret) +
                                               " bytes from the provider: with a longer one no token can be verified");
         } else if (isKey && value_.size() < kShortestWebSphereKey) {
             report_.Note(id_, name_,

@@ -1,6 +1,7 @@
 // An ID token, step by step as the library verifies it.
 #include <jwt/jwt.h>
 #include <openssl/evp.h>
+#include <sso/base64.h>
 
 #include <algorithm>
 #include <boost/algorithm/string/predicate.hpp>
@@ -250,9 +251,9 @@ class TokenCheck {
     void CheckHMACSignature() {
         const EVP_MD *digest = CheckAlgorithm();
         const std::string secret = client_->GetClientSecret();
-        Step("token.secret", "client secret", !secret.empty() && secret.size() <= kLongestWebSphereSecret,
+        Step("token.secret", "client secret", !secret.empty() && secret.size() <= TAVO::SSO::kLongestSecret,
              std::to_string(secret.size()) + " bytes",
-             "set websphere_client_secret: 1 to " + std::to_string(kLongestWebSphereSecret) + " bytes");
+             "set websphere_client_secret: 1 to " + std::to_string(TAVO::SSO::kLongestSecret) + " bytes");
         std::string key = EncodeBase64(secret);
         CheckSignature(
             digest != nullptr && !secret.empty(), [&](TAVO::JWT::Jwt &jwt) { jwt.JwtHMACVerify(key, digest); },

@@ -27,6 +27,8 @@ namespace {
 
 constexpr char kSourceName[] = "jwt";
 
+constexpr std::size_t kScratchOnStack = 4096;  // bytes of a part; larger ones are on the heap
+
 template <auto function>
 struct ReleaseWith {
     template <typename T>
@@ -97,7 +99,7 @@ DecodedPart Base64UrlDecode(const char *part) {
     if (length > INT_MAX) {
         return {};  // OpenSSL counts in int. GCOVR_EXCL_LINE: takes a text of 2 GB
     }
-    char small[4096];
+    char small[kScratchOnStack];
     std::unique_ptr<char[]> large;
     char *text = small;
     if (length >= sizeof small) {

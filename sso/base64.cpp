@@ -10,15 +10,13 @@ namespace TAVO::SSO {
 
 namespace {
 
-constexpr std::size_t kBufferSize = 1024;
-
 /// The platform may fill a buffer to its last byte and leave no room for a NUL.
-std::string TextIn(const char (&buffer)[kBufferSize]) { return {buffer, strnlen(buffer, kBufferSize)}; }
+std::string TextIn(const char (&buffer)[kPlatformBuffer]) { return {buffer, strnlen(buffer, kPlatformBuffer)}; }
 
 }  // namespace
 
 std::string EncodeBase64(const std::string &bytes) {
-    char buffer[kBufferSize] = {};
+    char buffer[kPlatformBuffer] = {};
     const Utils::CleanseOnExit cleanse(buffer, sizeof buffer);  // the bytes may be the client secret
     if (TLIBCBase64SzEncodeFull(bytes.c_str(), bytes.size(), buffer, 1, sizeof buffer, 0, 1) == 0) {
         throw sso_op_failed("encode base64 failed.");
@@ -27,7 +25,7 @@ std::string EncodeBase64(const std::string &bytes) {
 }
 
 bool DecodeBase64(const std::string &text, std::string &decoded) {
-    char buffer[kBufferSize] = {};
+    char buffer[kPlatformBuffer] = {};
     std::size_t length = sizeof buffer;
     if (TLIBCBase64Decode(text.c_str(), text.size(), buffer, &length) == 0) {
         return false;

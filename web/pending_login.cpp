@@ -1,5 +1,7 @@
 #include "web/pending_login.h"
 
+#include <sso/base64.h>
+
 #include "platform/platform.h"
 #include "web/configured_profile.h"
 #include "web/cookie.h"
@@ -15,7 +17,6 @@ namespace {
 constexpr char kFolder[] = "logins";
 constexpr int kSeconds = 600;
 constexpr char kFormat[] = "login 1";
-constexpr std::size_t kDecodedState = 1024;
 constexpr char kCookieSlots[] = "0123456789abcdef";
 
 std::string CookieName(char slot) { return std::string("__Host-login-") + slot; }
@@ -96,7 +97,7 @@ ConcludedLogin ConcludeLogin(Response &response, const std::string &cookies, con
 }
 
 Json::Value DecodeState(const std::string &state) {
-    char buffer[kDecodedState];
+    char buffer[TAVO::SSO::kPlatformBuffer];
     std::size_t length = sizeof buffer;
     if (TLIBCBase64Decode(state.data(), state.size(), buffer, &length) == 0) {
         return {};

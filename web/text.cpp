@@ -1,5 +1,7 @@
 #include "web/text.h"
 
+#include <sso/base64.h>
+
 #include <algorithm>
 #include <boost/locale/utf.hpp>
 #include <memory>
@@ -10,8 +12,10 @@ namespace {
 
 constexpr char kStartPage[] = "/index.cgi";
 constexpr char kReplacementCharacter[] = "\xef\xbf\xbd";  // U+FFFD
-// With the random value beside it, the longest origin must fit into the state: 721 bytes of compact JSON.
 constexpr std::size_t kLongestOrigin = 512;
+static_assert(kLongestOrigin + sizeof R"({"csrf":"0123456789abcdef0123456789abcdef","origin":""})" <=
+                  TAVO::SSO::kLongestState,
+              "the longest origin and the random value beside it must fit into the state");
 
 using UTF8 = boost::locale::utf::utf_traits<char>;
 using boost::locale::utf::code_point;
