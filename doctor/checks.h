@@ -27,9 +27,6 @@ void CheckProvider(Report &report, Client &client);
 /// What the platform converts domains by; of one domain, or that of a user, if one is told, which source answers.
 void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser);
 
-/// How much of what a front end remembers fits into the state.
-void CheckState(Report &report, Client &client);
-
 /// The steps in which a login verifies an ID token and finds the user's name in it. Those that need the provider's keys
 /// are left out unless it may fetch them. Gives the id of the step at which the library stops, empty if at none.
 std::string CheckToken(Report &report, Client &client, const std::string &token, bool mayFetch);

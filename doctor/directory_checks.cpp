@@ -1,4 +1,6 @@
 // The conversion of domain names: the platform's table, and whatever it asks beside that.
+#include <sso/base64.h>
+
 #include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/predicate.hpp>
@@ -22,7 +24,7 @@ struct Conversion {
 };
 
 Conversion Convert(Report &report, const std::string &domain) {
-    char buffer[1024] = {};
+    char buffer[TAVO::SSO::kPlatformBuffer] = {};
     // As a login asks: the domain in capitals, the room for the NUL not counted.
     const std::string name = boost::to_upper_copy(domain) + kUser;
     const bool isConverted = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer, sizeof buffer - 1) >= 0;
@@ -73,27 +75,24 @@ SettingsFile CheckTable(Report &report) {
     return table;
 }
 
-constexpr char kSecondHalf[] = ", and ";  // of the platform's line: what is the matter with winbindd
 const char kHowToTell[] =
     R"(join the domain and start winbindd, or write it into /usr/tavo/etc/domains.conf: {"corp.example.net": "CORP"})";
 
-/// Whether there is a directory, by what the platform writes of a domain that nobody has (RFC 6761, section 6.4).
+/// Whether there is a directory: the platform logs why it has no name for a domain that nobody has (RFC 6761, section
+/// 6.4).
 void CheckSource(Report &report, const SettingsFile &table) {
     constexpr char kID[] = "directory.source";
     constexpr char kSubject[] = "directory";
+    const std::string kTested = "; the log about a made-up domain: ";
     const std::string log = Convert(report, "tavosso-doctor.invalid").log;
-    if (boost::contains(log, "winbindd does not know it")) {
+    if (boost::ends_with(log, "winbindd does not know it")) {
         report.Good(kID, kSubject, "winbindd answers");
     } else if (log.empty()) {
-        report.Note(kID, kSubject, "the platform does not tell whether one answers", "ask for a domain: --domain NAME");
-        return;
-    }
-    // Not with the domain that was asked for, which nobody but the doctor has ever heard of.
-    const std::string reason = log.substr(log.find(kSecondHalf) + sizeof kSecondHalf - 1);
-    if (table.content.empty()) {
-        report.Finding(kID, kSubject, "no domain can be converted: " + reason, kHowToTell);
+        report.Note(kID, kSubject, "the platform does not log whether one answers", "test a domain: --domain NAME");
+    } else if (table.content.empty()) {
+        report.Finding(kID, kSubject, "no domain can be converted" + kTested + log, kHowToTell);
     } else {
-        report.Note(kID, kSubject, "the domains of the table alone are converted: " + reason);
+        report.Note(kID, kSubject, "only the domains of the table are converted" + kTested + log);
     }
 }
 

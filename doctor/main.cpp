@@ -93,7 +93,6 @@ int CheckEverything(Report &report, const Options &options) {
         if (*profile == Profile::kAzure) {
             Doctor::CheckDirectory(report, options.domain);
         }
-        Doctor::CheckState(report, client);
     }
     report.Finish("check");
     return StatusOf(report);
