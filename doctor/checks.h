@@ -27,8 +27,9 @@ void CheckProvider(Report &report, Client &client);
 /// What the platform converts domains by; of one domain, or that of a user, if one is told, which source answers.
 void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser);
 
-/// The steps in which a login verifies an ID token and finds the user's name in it. Those that need the provider's keys
-/// are left out unless it may fetch them. Gives the id of the step at which the library stops, empty if at none.
+/// Has the library verify an ID token and find the user's name in it, and reports its steps. Those that need the
+/// provider's keys are left out unless it may fetch them. Returns the id of the step at which the library stops, empty
+/// if at none.
 std::string CheckToken(Report &report, Client &client, const std::string &token, bool mayFetch);
 
 }  // namespace Doctor

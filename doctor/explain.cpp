@@ -47,8 +47,6 @@ std::vector<std::string> TextsOf(const Failure &failure) {
                                  : std::vector<std::string>(failure.texts.begin(), failure.texts.end());
 }
 
-std::string WithoutBackticks(const std::string &text) { return boost::erase_all_copy(text, "`"); }
-
 void PrintMarkdown(const Table &table) {
     std::cout << "<!-- failures: " << table.title << " -->\n\n| " << table.head;
     std::string line = "| ---";
@@ -112,6 +110,8 @@ std::vector<Explanation> AllExplanations() {
     }
     return all;
 }
+
+std::string WithoutBackticks(const std::string &text) { return boost::erase_all_copy(text, "`"); }
 
 void PrintExplanations(const std::vector<Explanation> &explanations) {
     for (const Explanation &explanation : explanations) {

@@ -22,6 +22,9 @@ std::vector<Explanation> LookUp(const std::string &text);
 /// Each text of the table.
 std::vector<Explanation> AllExplanations();
 
+/// As a terminal shows it.
+std::string WithoutBackticks(const std::string &text);
+
 void PrintExplanations(const std::vector<Explanation> &explanations);
 Json::Value ExplanationsAsJson(const std::vector<Explanation> &explanations);
 

@@ -79,7 +79,7 @@ bool IsText(const std::string &text, const char *ofTable) {
 bool EndsInText(const std::string &line, const char *ofTable) {
     Pieces pieces = SplitAtPlaceholders(ofTable);
     pieces.insert(pieces.begin(), "");
-    return Consists(boost::trim_copy(line), pieces);
+    return Consists(boost::trim_right_copy(line), pieces);
 }
 
 std::size_t Specificity(const char *ofTable) {

@@ -32,6 +32,13 @@ std::vector<unsigned char> DecodeBase64Url(std::string text) {
     return bytes;
 }
 
+/// The size of an RSA key's modulus in bits, 0 where that is not base64url.
+int SizeOf(const Json::Value &key) {
+    const std::vector<unsigned char> bytes = DecodeBase64Url(TAVO::Web::StringMember(key, "n"));
+    const std::unique_ptr<BIGNUM, FreeNumber> modulus(BN_bin2bn(bytes.data(), static_cast<int>(bytes.size()), nullptr));
+    return modulus ? BN_num_bits(modulus.get()) : 0;
+}
+
 std::string Describe(const Json::Value &key) {
     std::string text =
         "\"kid\" " + Quoted(TAVO::Web::StringMember(key, "kid")) + ", " + TAVO::Web::StringMember(key, "kty");
@@ -42,14 +49,7 @@ std::string Describe(const Json::Value &key) {
     return algorithm.empty() ? text : text + ", " + algorithm;
 }
 
-}  // namespace
-
-int SizeOf(const Json::Value &key) {
-    const std::vector<unsigned char> bytes = DecodeBase64Url(TAVO::Web::StringMember(key, "n"));
-    const std::unique_ptr<BIGNUM, FreeNumber> modulus(BN_bin2bn(bytes.data(), static_cast<int>(bytes.size()), nullptr));
-    return modulus ? BN_num_bits(modulus.get()) : 0;
-}
-
+/// What is wrong with a key for the library; empty if nothing is.
 std::string FaultOf(const Json::Value &key) {
     if (!key.isObject()) {
         return "is no object";
@@ -65,6 +65,8 @@ std::string FaultOf(const Json::Value &key) {
     }
     return {};
 }
+
+}  // namespace
 
 void CheckKeySet(Report &report, const Json::Value &keySet) {
     constexpr char kSet[] = "keys.set";

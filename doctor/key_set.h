@@ -12,12 +12,6 @@ namespace Doctor {
 
 void CheckKeySet(Report &report, const Json::Value &keySet);
 
-/// What is wrong with a key for the library; empty if nothing is.
-std::string FaultOf(const Json::Value &key);
-
-/// The size of an RSA key's modulus in bits, 0 where that is not base64url.
-int SizeOf(const Json::Value &key);
-
 }  // namespace Doctor
 
 #endif

@@ -64,9 +64,9 @@ Report AskMachine(const Strings &arguments, const std::string &input = "");
 /// Of a token's report the library's own word, empty where it takes the token.
 std::string LibraryIn(const Report &report);
 
-/// Of a token's report: the library stops at the first finding, or at none where there is none. Whether the client's
-/// secret can verify anything is told before its signature.
-void ExpectToStopAtTheFirstFinding(const Report &report);
+/// Of a token's report with --fetch: the steps before the library's stop are good, that one is the only finding, and
+/// those behind it are not checked.
+void ExpectToStopAtTheOnlyFinding(const Report &report);
 
 /// A doctor that one talks with.
 class Dialogue {

@@ -296,7 +296,7 @@ TEST_P(FailureRow, IsExplainedBeforeTheLoginEndsSo) {
         EXPECT_EQ(check.id, row.check) << "findings: " << ::testing::PrintToString(report.Findings());
         if (row.command == kToken) {
             EXPECT_EQ(report.json["stops_at"], row.check);
-            ExpectToStopAtTheFirstFinding(report);
+            ExpectToStopAtTheOnlyFinding(report);
         } else {
             // That of a certificate comes with the transfer that failed.
             EXPECT_EQ(GroupOf(report.FirstFinding().id), GroupOf(row.check));

@@ -13,8 +13,8 @@ const START_PAGE = '/index.cgi';
 const SITE = 'https://appliance.example';
 const {foreign, own} = JSON.parse(readFileSync(new URL('origins.json', import.meta.url)));
 
-// The table of failures. Two rows are not reasons as they are: a provider's error answer, of which the front end shows the
-// error, and what it then shows, of which some are explained by the error.
+// The table of failures. These rows are not reasons as they are: of a provider's error answer the front end shows the
+// error, and some of these errors have a sentence.
 const ALTERED = ['{... "error": ...}', 'The provider refused: REASON', 'a text of another library'];
 const failures = JSON.parse(execFileSync(process.argv[2], ['explain', '--list', '--json'], {encoding: 'utf8'}))
     .explanations.filter(({table}) => ['exceptions of the library', 'reasons of the front end'].includes(table));

@@ -32,7 +32,7 @@ bool IsText(const std::string &type, const std::string &text, const char *ofTabl
 }
 
 bool IsInTable(const std::string &type, const std::string &text) {
-    const bool isOfFrontEnd = type == "Frontend::Refusal" || type == "std::system_error";
+    const bool isOfFrontEnd = type == "TAVO::Web::Refusal" || type == "std::system_error";
     const Doctor::FailureKind kind = isOfFrontEnd ? Doctor::FailureKind::kReason : Doctor::FailureKind::kException;
     const std::vector<Doctor::Failure> &rows = Doctor::Failures();
     return std::any_of(rows.begin(), rows.end(), [&](const Doctor::Failure &row) {

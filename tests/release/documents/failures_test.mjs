@@ -1,5 +1,5 @@
-// The tables of failures in the documents are those that `tavosso-doctor explain --list --markdown` prints. Each of their
-// texts is in a source, and the doctor explains each line of log that a document shows.
+// The tables of failures in the documents are those that `tavosso-doctor explain --list --markdown` prints. Each of
+// their texts is in a source, and the doctor explains each line of log that a document shows.
 //
 //   node failures_test.mjs DOCTOR            fails where they differ
 //   node failures_test.mjs DOCTOR --update   writes the tables into the documents
