@@ -21,10 +21,6 @@ namespace Frontend {
 
 namespace {
 
-// In seconds. The web server's own limit of 60 s (lighttpd.conf) is shorter and answers the browser, but lighttpd
-// 1.4.69 does not apply it to a request that arrives together with its connection.
-constexpr unsigned int kLongestRun = 70;
-
 // An endless answer of the provider ends the program, not the machine.
 constexpr rlim_t kAddressSpace = rlim_t{1} << 30;
 

@@ -53,7 +53,7 @@ rlim_t LimitOf(decltype(RLIMIT_CORE) resource) {
 TEST_F(Program, IsEndedByAnAlarmIfItRunsTooLong) {
     const auto runTooLong = [](Response &) {
         const unsigned int seconds = alarm(0);
-        if (seconds == 70) {
+        if (seconds == kLongestRun) {
             raise(SIGALRM);
         }
     };

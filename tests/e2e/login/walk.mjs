@@ -7,7 +7,7 @@ const START_PAGE = '/index.cgi';
 const RELAY_PAGE = '/webman/ssoclient/relay.html';
 const RETURN_PAGE = '/webman/sso/return.cgi';
 const AUTHORIZATION_PARAMETERS = ['client_id', 'nonce', 'redirect_uri', 'response_type', 'scope', 'state'];
-const README_PROGRAM = '/webman/sso/sso.cgi';
+export const README_PROGRAM = '/webman/sso/sso.cgi';
 const COOKIE = /^__Host-[\w-]+=[0-9a-f]*; Path=\/; Secure; HttpOnly; SameSite=Lax(; Max-Age=\d+)?$/;
 
 export class Walk {
@@ -50,6 +50,14 @@ export class Walk {
         return line.replace('sso.cgi: signed in: ', '');
     }
 
+    /** Opens a return address of another browser's sign-in through the program of the README, which must refuse it. */
+    async isRefusedByReadmeProgram(browser, address) {
+        const view = await this.#runRelayScript(browser, await browser.open(address));
+        assert.equal(view.headline, 'You could not be signed in');
+        await this.log.until(/^sso\.cgi: sign-in failed$/);
+        assert.equal(this.#tokenRequests(), 0, 'a token request was made');
+    }
+
     /** The site's bare address, which is what a user types. */
     async openSite(browser) {
         const site = await browser.open(`${this.origin}/`);
@@ -82,8 +90,8 @@ export class Walk {
     }
 
     /** The return address of the browser's last login, as its history holds it. */
-    lastReturnAddress(browser) {
-        return browser.history.findLast(({url}) => url.pathname === RETURN_PAGE).url;
+    lastReturnAddress(browser, page = RETURN_PAGE) {
+        return browser.history.findLast(({url}) => url.pathname === page && url.searchParams.has('state')).url;
     }
 
     /** A login in progress, up to the return address, which is not followed. */

@@ -6,6 +6,7 @@ import {copyFileSync, rmSync} from 'node:fs';
 import {Controller} from '../directory/controller.mjs';
 import {useProfile, writeDomains, writeSettings} from '../site/front_end.mjs';
 import {makeWalk, startEverything} from './login_stage.mjs';
+import {README_PROGRAM} from './walk.mjs';
 
 async function walkAzure(walk, report) {
     useProfile('azure');
@@ -65,7 +66,9 @@ async function walkReadmeProgram(walk, report, {provider, clients}) {
     for (const [profile, login, name] of [['azure', 'alice', 'ACME\\alice'], ['websphere', 'bob', 'bob']]) {
         useProfile(profile);
         report.title(`Profile ${profile}: ${login} signs in through the program of the README`);
-        assert.equal(await walk.signInThroughReadmeProgram(walk.newBrowser(), login), name);
+        const browser = walk.newBrowser();
+        assert.equal(await walk.signInThroughReadmeProgram(browser, login), name);
+        await walk.isRefusedByReadmeProgram(walk.newBrowser(), walk.lastReturnAddress(browser, README_PROGRAM));
     }
 }
 

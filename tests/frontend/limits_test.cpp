@@ -1,0 +1,38 @@
+#include <gmock/gmock.h>
+#include <sso/base64.h>
+
+#include <fstream>
+#include <sstream>
+
+#include "frontend/cgi_program.h"
+
+// The limits that documents state are those of the sources.
+namespace {
+
+/// A file of the project, with each line break as a blank.
+std::string Read(const std::string &file) {
+    std::ifstream stream(TAVOSSO_SOURCES "/" + file);
+    std::ostringstream text;
+    for (std::string line; std::getline(stream, line);) {
+        text << line << ' ';
+    }
+    return text.str();
+}
+
+std::string Bytes(std::size_t limit) { return std::to_string(limit) + " bytes"; }
+
+TEST(Limits, OfSecretAndStateAreDocumented) {
+    for (const char *file : {"sso/sso.h", "docs/configuration.md", "docs/man/tavosso-websphere.conf.5"}) {
+        EXPECT_THAT(Read(file), testing::HasSubstr(Bytes(TAVO::SSO::kLongestSecret))) << file;
+    }
+    EXPECT_THAT(Read("sso/sso.h"), testing::HasSubstr(Bytes(TAVO::SSO::kLongestState)));
+}
+
+TEST(Limits, OfTimeAreDocumented) {
+    const std::string program = std::to_string(Frontend::kLongestRun) + " seconds";
+    for (const char *file : {"frontend/lighttpd.conf", "docs/integration.md", "docs/operations.md"}) {
+        EXPECT_THAT(Read(file), testing::HasSubstr(program)) << file;
+    }
+}
+
+}  // namespace
