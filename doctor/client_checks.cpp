@@ -1,5 +1,5 @@
 // The client's file, key by key.
-#include <sso/base64.h>
+#include <sso/limits.h>
 
 #include <algorithm>
 #include <boost/algorithm/string/predicate.hpp>

@@ -1,5 +1,5 @@
 // The conversion of domain names: the platform's table, and whatever it asks beside that.
-#include <sso/base64.h>
+#include <sso/limits.h>
 
 #include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>

@@ -3,7 +3,7 @@
 #include <boost/algorithm/string/erase.hpp>
 #include <iostream>
 
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 
 namespace Doctor {
 

@@ -24,8 +24,8 @@ constexpr char kErrorAnswer[] = "{... \"error\": ...}";
 struct Failure {
     FailureKind kind;
 
-    /// Words in capitals are placeholders: see failure_text.h. Of a transfer, the name of its CURLcode. Empty where the
-    /// text is another library's.
+    /// Words in capitals are placeholders: see failure_lookup.h. Of a transfer, the name of its CURLcode. Empty where
+    /// the text is another library's.
     std::vector<const char *> texts;
 
     const char *cause;  // a key, file, path or command is in backticks

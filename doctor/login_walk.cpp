@@ -12,7 +12,7 @@
 #include "doctor/address.h"
 #include "doctor/checks.h"
 #include "doctor/watch.h"
-#include "web/claims.h"
+#include "web/nonce.h"
 #include "web/request.h"
 #include "web/text.h"
 

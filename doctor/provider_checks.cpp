@@ -9,7 +9,7 @@
 
 #include "doctor/address.h"
 #include "doctor/checks.h"
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 #include "doctor/key_set.h"
 #include "doctor/watch.h"
 #include "web/request.h"

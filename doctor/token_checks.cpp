@@ -1,6 +1,6 @@
 // An ID token: the library verifies it, and the report says at which step it stops and what the token has there.
 #include <jwt/jwt.h>
-#include <sso/base64.h>
+#include <sso/limits.h>
 
 #include <algorithm>
 #include <boost/algorithm/string/join.hpp>
@@ -13,7 +13,7 @@
 
 #include "doctor/checks.h"
 #include "doctor/explain.h"
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 #include "doctor/watch.h"
 #include "web/text.h"
 

@@ -8,21 +8,21 @@
 #include <random>
 #include <sstream>
 
-constexpr char kRedirect[] = "Status: 302 Found\nLocation: /webman/";
-
-std::string Variable(const char *name) { return std::getenv(name) != nullptr ? std::getenv(name) : ""; }
+std::string Variable(const char *name) {
+    const char *value = std::getenv(name);
+    return value != nullptr ? value : "";
+}
 
 /// A parameter of the query, percent-decoded; empty if there is none.
 std::string Parameter(const std::string &name) {
     std::istringstream query(Variable("QUERY_STRING"));
-    std::string pair, value;
+    std::string pair;
+    std::string value;
     while (std::getline(query, pair, '&') && pair.rfind(name + "=", 0) != 0) {
         pair.clear();
     }
-    for (std::size_t i = name.size() + 1; i < pair.size(); ++i) {
-        const bool isEscape = pair[i] == '%';
-        value += isEscape ? static_cast<char>(std::stoi(pair.substr(i + 1, 2), nullptr, 16)) : pair[i];
-        i += isEscape ? 2 : 0;
+    for (std::size_t i = name.size() + 1; i < pair.size(); i += pair[i] == '%' ? 3 : 1) {
+        value += static_cast<char>(pair[i] == '%' ? std::stoi(pair.substr(i + 1, 2), nullptr, 16) : pair[i]);
     }
     return value;
 }
@@ -39,13 +39,12 @@ Json::Value DecodeState(const std::string &state) {
 
 template <typename Client>
 void StartLogin(Client &client) {
-    std::random_device random;
-    std::ostringstream login;
-    login << random() << '.' << random() << '.' << random() << '.' << random();
     Json::Value state;
     state["origin"] = "/index.cgi";
-    state["login"] = login.str();
-    std::cout << "Cache-Control: no-store\nSet-Cookie: __Host-login=" << login.str()
+    for (int i = 0; i < 4; ++i) {
+        state["login"] = state["login"].asString() + std::to_string(std::random_device()());
+    }
+    std::cout << "Cache-Control: no-store\nSet-Cookie: __Host-login=" << state["login"].asString()
               << "; Path=/; Secure; HttpOnly; SameSite=Lax; Max-Age=600\n";
     client.RedirectAuthEndpoint(state);
 }
@@ -57,13 +56,13 @@ void FinishLogin(TAVO::SSO::SSOClient &client) {
     const std::string login = state["login"].asString();  // of the browser that started it
     Require(!login.empty() &&
             ("; " + Variable("HTTP_COOKIE") + ";").find("; __Host-login=" + login + ";") != std::string::npos);
-    Require(!Parameter("code").empty());
     std::string user;
     client.OpenIDConnectLogin(Parameter("code"), user);
     const std::string nonce = TAVO::JWT::Jwt(client.GetToken()).GetBody()["nonce"].asString();
     Require(!nonce.empty() && TAVO::SSO::MD5Digest(nonce) == state["nonce"].asString());
     syslog(LOG_AUTH | LOG_INFO, "signed in: %s", user.c_str());  // Open your session here.
-    std::cout << kRedirect << TAVO::SSO::GetSSORelayURL(true, Parameter("state"), "") << "\n\n";
+    std::cout << "Status: 302 Found\nLocation: /webman/" << TAVO::SSO::GetSSORelayURL(true, Parameter("state"), "")
+              << "\n\n";
 }
 
 int main() {
@@ -75,6 +74,7 @@ int main() {
         name == "azure" ? serve(TAVO::SSO::AzureSSOClient()) : serve(TAVO::SSO::WebSphereSSOClient());
     } catch (const std::exception &) {  // Its text may hold the provider's whole answer.
         syslog(LOG_AUTH | LOG_WARNING, "sign-in failed");
-        std::cout << kRedirect << TAVO::SSO::GetSSORelayURL(false, "", "sign-in%20failed") << "\n\n";
+        std::cout << "Status: 302 Found\nLocation: /webman/" << TAVO::SSO::GetSSORelayURL(false, "", "sign-in%20failed")
+                  << "\n\n";
     }
 }

@@ -9,6 +9,7 @@
 #include "frontend/session.h"
 #include "web/azure_client.h"
 #include "web/claims.h"
+#include "web/nonce.h"
 #include "web/pending_login.h"
 #include "web/refusal.h"
 #include "web/request.h"

@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "platform/platform.h"
+#include "sso/limits.h"
 #include "sso/sso.h"
 #include "utils/cleanse.h"
 

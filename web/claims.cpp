@@ -20,14 +20,6 @@ const char *NameClaim(const Json::Value &claims, const std::string &profile) {
 
 }  // namespace
 
-void RequireNonce(const Json::Value &claims, const Json::Value &state) {
-    const std::string nonce = StringMember(claims, "nonce");
-    const std::string digest = StringMember(state, "nonce");
-    if (nonce.empty() || digest.empty() || TAVO::SSO::MD5Digest(nonce) != digest) {
-        throw Refusal("The provider's answer belongs to another sign-in.");
-    }
-}
-
 void RequireTrustworthyName(const Json::Value &claims, const std::string &profile, bool acceptsUnverifiedEmail) {
     const std::string claim = NameClaim(claims, profile);
     const std::string name = StringMember(claims, claim.c_str());

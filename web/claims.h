@@ -9,13 +9,6 @@
 namespace TAVO::Web {
 
 /**
- * Throws `Refusal` unless the ID token was issued for the login that `state`, the state's object, belongs to (OpenID
- * Connect Core 1.0, section 3.1.3.7, number 11). A code or a token that was stolen from another login has that login's
- * nonce, of which the state has the digest.
- */
-void RequireNonce(const Json::Value &claims, const Json::Value &state);
-
-/**
  * Throws `Refusal` unless the claim that names the user can be trusted: "unique_name" under the profile azure, "sub"
  * under another. It must be a printable string, since the platform reads a name up to its first NUL. "email", which the
  * library takes where "unique_name" is missing, is often the user's own choice: it counts only if "email_verified" is

@@ -1,6 +1,6 @@
 #include "web/pending_login.h"
 
-#include <sso/base64.h>
+#include <sso/limits.h>
 
 #include "platform/platform.h"
 #include "web/configured_profile.h"

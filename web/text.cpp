@@ -1,6 +1,6 @@
 #include "web/text.h"
 
-#include <sso/base64.h>
+#include <sso/limits.h>
 
 #include <algorithm>
 #include <boost/locale/utf.hpp>

@@ -5,7 +5,7 @@
 #include <set>
 #include <string>
 
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 #include "tests/doctor/doctor_process.h"
 #include "tests/support/token.h"
 

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 #include "tests/doctor/appliance.h"
 #include "tests/doctor/doctor_process.h"
 #include "tests/doctor/login_dialogue.h"

@@ -1,5 +1,5 @@
 #include <gmock/gmock.h>
-#include <sso/base64.h>
+#include <sso/limits.h>
 
 #include <fstream>
 #include <sstream>

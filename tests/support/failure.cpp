@@ -8,7 +8,7 @@
 #include <ostream>
 #include <stdexcept>
 
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 
 namespace Test {
 

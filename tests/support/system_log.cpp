@@ -11,7 +11,7 @@
 #include <regex>
 #include <stdexcept>
 
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 
 namespace Test {
 

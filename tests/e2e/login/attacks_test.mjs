@@ -91,6 +91,14 @@ describe('An attacker', () => {
     const sessionFile = (browser) =>
         `${FRONT_END}/sessions/${browser.cookies.for(at('/')).find(({name}) => name === SESSION_COOKIE).value}`;
 
+    test('cannot finish a login in a browser that did not start it', async () => {
+        const address = await stopBeforeReturn(newBrowser(), 'alice');
+        const victim = newBrowser();
+        assert.equal((await comeBack(victim, address)).reason, 'This sign-in was not started in this browser.');
+        assert.equal(tokenRequests, 0);
+        assert.equal(await isSignedIn(victim), false);
+    });
+
     test('cannot fill the requests of a browser by starting logins from another site', async () => {
         const browser = newBrowser();
         for (let i = 0; i < 150; ++i) {

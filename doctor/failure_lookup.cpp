@@ -1,4 +1,4 @@
-#include "doctor/failure_text.h"
+#include "doctor/failure_lookup.h"
 
 #include <algorithm>
 #include <boost/algorithm/string/predicate.hpp>
