@@ -24,7 +24,12 @@ int main() {
         const std::string attributes = "; Path=/; Secure; HttpOnly; SameSite=Lax; Max-Age=600";
         std::cout << "Cache-Control: no-store\n"
                   << "Set-Cookie: __Host-login=" << state["csrf"].asString() << attributes << "\n";
-        WithClient([&](auto &client) { client.RedirectAuthEndpoint(state); });
+        WithClient([&](auto &client) {
+            if (client.GetAuthEndpoint().empty()) {
+                throw std::runtime_error("Single sign-on is not completely set up on this device.");
+            }
+            client.RedirectAuthEndpoint(state);
+        });
     } catch (const std::exception &failure) {
         Fail(failure.what());
     }

@@ -1,4 +1,4 @@
-// guide_logout.cpp: ends the session, here and at the provider.
+// guide_logout.cpp: ends the session here and, for Azure, at the provider.
 #include "guide_request.h"
 
 int main() {

@@ -4,11 +4,18 @@
  * Single sign-on of the appliance's web front end through an external OpenID Connect provider: the relying party's
  * side of the authorization-code flow (OpenID Connect Core 1.0, section 3.1; RFC 6749, section 4.1).
  *
- * A login crosses three requests of the front end:
- *  1. construct the client of the profile in force and call its `RedirectAuthEndpoint`: the browser goes to the
- *     provider;
- *  2. the browser comes back to the redirect URI with a code: `OIDCLogin` turns it into the appliance's user name;
- *  3. `GetSSORelayURL` gives the address of the relay page that tells the user how it went.
+ * A login takes two requests of the front end:
+ *  1. Start: put a random value into the state and into a cookie of the browser. Construct the client of the profile in
+ *     force and send the browser to the address that its `GetAccessTokenReqURI` returns.
+ *  2. Return: the browser comes back to the redirect URI with a code and the state. Compare the state's random value
+ *     with the cookie. Exchange the code with the client's `OpenIDConnectLogin`, which yields the appliance's user name.
+ *     Compare the "nonce" of the ID token (`GetUserInfo`) with the nonce of the start. Then open a session.
+ *
+ * `GetSSORelayURL` returns the address of the relay page, which shows the user the outcome.
+ *
+ * @warning The library keeps nothing between requests. The caller must bind each return to the browser that started the
+ * login, and the token's nonce to that start. Without the first, anyone can sign a victim's browser in to an account of
+ * their own. Without the second, anyone who has a stolen code can sign in with it. `OIDCLogin` checks neither.
  *
  * Every failure is an exception; every text that `what()` gives is fixed and part of this interface, misspellings
  * included. Diagnostics go to `syslog`, each line beginning "SOURCE:LINE ". Any function may also throw
@@ -80,7 +87,13 @@ class sso_op_failed : public sso_exception {
 
 /**
  * What every provider's client has in common: its settings, the two exchanges with the provider, and the fixed order
- * of a login. It serves one login; it has no virtual destructor, so never delete a client through this type.
+ * of a login. It serves one login.
+ *
+ * It has no virtual destructor. To delete a client through this type is undefined behaviour:
+ * @code
+ * std::unique_ptr<TAVO::SSO::SSOClient> client = std::make_unique<TAVO::SSO::AzureSSOClient>();  // forbidden
+ * TAVO::SSO::AzureSSOClient client;                                                             // use this
+ * @endcode
  */
 class SSOClient {
   public:
@@ -107,7 +120,7 @@ class SSOClient {
     virtual std::string GetLogoutEndpoint();
     /** Sets another redirect URI. @param uri  takes the place of the configured one; not checked */
     virtual void SetRedirectURI(std::string uri);
-    /** Sets the code. @param authorizationCode  that of this login; not checked, and never given out again */
+    /** Sets the code. @param authorizationCode  that of this login, percent-decoded; not checked, never returned */
     virtual void SetCode(std::string authorizationCode);
 
     /**
@@ -183,7 +196,7 @@ class SSOClient {
      * Runs a login: `SetCode`, `GetIDTokenReqParams`, `RequestTokenEndpoint`, `ProcessTokenResponse`, `VerifyIDToken`,
      * `GetUserName`, in this order, each as a virtual call.
      *
-     * @param authorizationCode  the code that the browser brought back
+     * @param authorizationCode  the code that the browser brought back, percent-decoded
      * @param userName           receives the user's name; see the client's `GetUserName` for what it holds after a
      *                           failure
      *
@@ -280,7 +293,7 @@ class AzureSSOClient : public SSOClient {
     void ProcessTokenResponse(std::string response) override;
 
     /**
-     * Gives all claims of the ID token, unverified.
+     * Returns the claims of the ID token. It verifies nothing: call `VerifyIDToken` first.
      *
      * @param info  receives the decoded body; untouched on failure
      *
@@ -309,12 +322,18 @@ class AzureSSOClient : public SSOClient {
     void RequestKeysInfo(std::string uri, Json::Value &keys);
 
     /**
-     * Builds the address that the browser is sent to for signing in (OpenID Connect Core 1.0, section 3.1.2.1): scope
-     * "openid", a fresh random nonce, and a state that carries `state` with the MD5 digest of the nonce added.
+     * Builds the authentication request (OpenID Connect Core 1.0, section 3.1.2.1). The parameters are, in this order:
+     *  - client_id;
+     *  - nonce: fresh and random. The caller can take it from the address and keep it on the server;
+     *  - redirect_uri;
+     *  - response_type: "code";
+     *  - scope: "openid";
+     *  - state: `state` with the member "nonce" added, the MD5 digest of the nonce. It is compact JSON and a line feed in
+     *    padded base64. Percent-decode the state that comes back before you compare it.
      *
      * @param state  the caller's JSON object, or null; its member "nonce" is replaced. As compact JSON, without a
      *               "nonce", it may be 721 bytes long
-     * @return the authorization endpoint, as configured, and the query
+     * @return the authorization endpoint, as configured, "?", and the parameters, percent-encoded
      *
      * @throws sso_op_failed  "encode base64 failed.": the state does not fit
      * @throws Json::LogicError  when `state` is neither an object nor null
@@ -391,7 +410,7 @@ class WebSphereSSOClient : public SSOClient {
     void ProcessTokenResponse(std::string response) override;
 
     /**
-     * Gives all claims of the ID token, unverified.
+     * Returns the claims of the ID token. It verifies nothing: call `VerifyIDToken` first.
      *
      * @param claims  receives the decoded body; untouched on failure
      *
@@ -453,7 +472,7 @@ class SSOProfile {
  * Completes a login: reads `/usr/tavo/etc/ssoclient/profile.conf` (with the ids that the process has), constructs the
  * client that it names, and runs that client's `OpenIDConnectLogin`.
  *
- * @param code      the authorization code that the browser brought back
+ * @param code      the authorization code that the browser brought back, percent-decoded
  * @param userName  receives the user's name; see the client's `GetUserName` for what it holds after a failure
  *
  * @throws sso_op_failed  "read profile file failed."; "sso does not enable."; "not specify sso profile"
@@ -478,10 +497,11 @@ void OIDCLogin(const std::string &code, std::string &userName);
 std::string GetSSORelayURL(bool success, const std::string &state, const std::string &reason);
 
 /**
- * Gives the address that ends the Azure session and brings the browser back to the relay page (OpenID Connect
- * RP-Initiated Logout 1.0, section 2). Reads `/usr/tavo/etc/ssoclient/azure.conf` as `AzureSSOClient()` does.
+ * Returns the address that ends the Azure session and brings the browser back to the relay page (OpenID Connect
+ * RP-Initiated Logout 1.0, section 2). WebSphere has no such page: end your own session only. Reads `/usr/tavo/etc/ssoclient/azure.conf` as `AzureSSOClient()` does.
  *
- * @param base  where the web interface is reached; a final "/index.cgi" or one final "/" is cut off
+ * @param base  the address of the web interface. One final "/index.cgi", then one final "/", is removed, and
+ *              "/webman/ssoclient/relay.html" is always appended
  * @return the logout endpoint, as configured, with the relay page as "post_logout_redirect_uri"; the bare endpoint when
  *         `base` is empty
  *
