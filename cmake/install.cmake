@@ -2,6 +2,7 @@
 # pkg-config file.
 set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/tavosso)
 
+set_target_properties(tavosso PROPERTIES INSTALL_RPATH $ORIGIN)
 install(TARGETS tavosso EXPORT tavosso
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}
         INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
@@ -18,5 +19,9 @@ install(FILES ${PROJECT_BINARY_DIR}/tavossoConfig.cmake ${PROJECT_BINARY_DIR}/ta
 
 # Found from where the file itself lies, so that the tree may be installed under any prefix, or moved.
 file(RELATIVE_PATH prefix_from_pkgconfig /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
+# Programs find a library under a private prefix by a run path. Under /usr the loader finds it.
+if(NOT CMAKE_INSTALL_PREFIX STREQUAL /usr)
+    set(pkgconfig_run_path " -Wl,-rpath,\${libdir}")
+endif()
 configure_file(cmake/tavosso.pc.in tavosso.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/tavosso.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)

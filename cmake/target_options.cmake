@@ -33,6 +33,13 @@ function(tavosso_options target)
     endif()
 endfunction()
 
+# Where an installed file finds the library: relative to itself, so that any prefix works without environment variables.
+# A Debian package is built with CMAKE_SKIP_RPATH, since its libraries are in the loader's own folders.
+function(tavosso_find_library_from target destination)
+    file(RELATIVE_PATH to_library /${destination} /${CMAKE_INSTALL_LIBDIR})
+    set_target_properties(${target} PROPERTIES INSTALL_RPATH $ORIGIN/${to_library})
+endfunction()
+
 # A program that is served, and what is linked into it: loaded at any address, whatever the compiler does by itself.
 function(tavosso_program_options target)
     tavosso_options(${target})

@@ -8,7 +8,7 @@
  *  1. Start: put a random value into the state and into a cookie of the browser. Construct the client of the profile in
  *     force and send the browser to the address that its `GetAccessTokenReqURI` returns.
  *  2. Return: the browser comes back to the redirect URI with a code and the state. Compare the state's random value
- *     with the cookie. Exchange the code with the client's `OpenIDConnectLogin`, which yields the appliance's user name.
+ *     with the cookie. Exchange the code with the client's `OpenIDConnectLogin`, which yields the user's name.
  *     Compare the "nonce" of the ID token (`GetUserInfo`) with the nonce of the start. Then open a session.
  *
  * `GetSSORelayURL` returns the address of the relay page, which shows the user the outcome.
@@ -328,7 +328,7 @@ class AzureSSOClient : public SSOClient {
      *  - redirect_uri;
      *  - response_type: "code";
      *  - scope: "openid";
-     *  - state: `state` with the member "nonce" added, the MD5 digest of the nonce. It is compact JSON and a line feed in
+     *  - state: `state` with the member "nonce" added, the MD5 digest of the nonce. Compact JSON and a line feed in
      *    padded base64. Percent-decode the state that comes back before you compare it.
      *
      * @param state  the caller's JSON object, or null; its member "nonce" is replaced. As compact JSON, without a
@@ -498,7 +498,8 @@ std::string GetSSORelayURL(bool success, const std::string &state, const std::st
 
 /**
  * Returns the address that ends the Azure session and brings the browser back to the relay page (OpenID Connect
- * RP-Initiated Logout 1.0, section 2). WebSphere has no such page: end your own session only. Reads `/usr/tavo/etc/ssoclient/azure.conf` as `AzureSSOClient()` does.
+ * RP-Initiated Logout 1.0, section 2). WebSphere has no such page: end your own session only. Reads
+ * `/usr/tavo/etc/ssoclient/azure.conf` as `AzureSSOClient()` does.
  *
  * @param base  the address of the web interface. One final "/index.cgi", then one final "/", is removed, and
  *              "/webman/ssoclient/relay.html" is always appended
