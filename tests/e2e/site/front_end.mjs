@@ -6,7 +6,7 @@ import net from 'node:net';
 import path from 'node:path';
 import {fileURLToPath} from 'node:url';
 
-const SETTINGS = '/usr/tavo/etc/ssoclient';
+const ETC = '/usr/tavo/etc';
 // Where the front end is installed and enabled, the web server's own settings say what is served.
 const INSTALLED_SETTINGS = process.env.INSTALLED_LIGHTTPD_CONF;
 export const FRONT_END_SETTINGS = fileURLToPath(new URL('../../../frontend/lighttpd.conf', import.meta.url));
@@ -16,16 +16,15 @@ function writePrivately(file, settings) {
 }
 
 /** The platform's domains: DNS name to NetBIOS name. */
-export function writeDomains(domains) {
-    mkdirSync(SETTINGS, {recursive: true, mode: 0o755});
-    mkdirSync('/usr/tavo/var', {recursive: true});
-    writeFileSync('/usr/tavo/etc/domains.conf', JSON.stringify(domains));
+export function writeDomains(domains, etc = ETC) {
+    mkdirSync(`${etc}/ssoclient`, {recursive: true, mode: 0o755});
+    writeFileSync(`${etc}/domains.conf`, JSON.stringify(domains));
 }
 
 /** The settings of both profiles' clients. */
-export function writeSettings({provider, clients}) {
+export function writeSettings({provider, clients}, etc = ETC) {
     const [azure, websphere] = clients;
-    writePrivately(`${SETTINGS}/azure.conf`, {
+    writePrivately(`${etc}/ssoclient/azure.conf`, {
         azure_sso_enable: true,
         azure_wellknown: provider.endpoints.discovery,
         azure_client_id: azure.id,
@@ -36,7 +35,7 @@ export function writeSettings({provider, clients}) {
         azure_redirect_uri: azure.redirectURI,
         azure_logout_endpoint: provider.endpoints.logout,
     });
-    writePrivately(`${SETTINGS}/websphere.conf`, {
+    writePrivately(`${etc}/ssoclient/websphere.conf`, {
         websphere_wellknown: provider.endpoints.discovery,
         websphere_client_id: websphere.id,
         websphere_client_secret: websphere.secret,
@@ -47,8 +46,8 @@ export function writeSettings({provider, clients}) {
     });
 }
 
-export function useProfile(name, enable = true) {
-    writePrivately(`${SETTINGS}/profile.conf`, {sso_enable: enable, sso_profile: name});
+export function useProfile(name, enable = true, etc = ETC) {
+    writePrivately(`${etc}/ssoclient/profile.conf`, {sso_enable: enable, sso_profile: name});
 }
 
 /** A listening socket on a port of the kernel's choice, for `startWebServer`: its port is known before the server. */
@@ -67,6 +66,7 @@ export function startWebServer({socket, webroot, certificate, folder, frontEndSe
     const log = path.join(folder, 'lighttpd.log');
     const uploads = path.join(folder, 'uploads');
     mkdirSync(uploads);
+    mkdirSync('/usr/tavo/var', {recursive: true}); // the front end makes its own folder in it
     const served = INSTALLED_SETTINGS
         ? `include "${INSTALLED_SETTINGS}"`
         : `server.document-root = "${webroot}"\ninclude "${frontEndSettings}"`;

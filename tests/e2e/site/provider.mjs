@@ -18,7 +18,7 @@ function registration({id, secret, algorithm, redirectURI, otherRedirectURI, log
     return {
         client_id: id,
         client_secret: secret,
-        redirect_uris: [redirectURI, otherRedirectURI],
+        redirect_uris: [redirectURI, otherRedirectURI].filter(Boolean),
         post_logout_redirect_uris: [logoutURI],
         grant_types: ['authorization_code'],
         response_types: ['code'],

@@ -20,15 +20,11 @@ export function makeUsers(named) {
         ([login, uniqueName]) => [login, {uniqueName, password: randomPassword()}]));
 }
 
-function makeClients(origin, tenant) {
-    const common = {
-        redirectURI: `${origin}/webman/sso/return.cgi`,
-        otherRedirectURI: `${origin}/webman/sso/sso.cgi`, // the program of the README
-        logoutURI: `${origin}/webman/ssoclient/relay.html`,
-    };
+/** The clients of both profiles, as they are registered at the provider; `addresses` are those of the appliance. */
+export function makeClients(addresses) {
     return [
-        {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant, ...common},
-        {id: 'appliance-websphere', secret: randomSecret(), algorithm: 'HS256', ...common},
+        {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant: randomUUID(), ...addresses},
+        {id: 'appliance-websphere', secret: randomSecret(), algorithm: 'HS256', ...addresses},
     ];
 }
 
@@ -43,8 +39,12 @@ export async function startSite({webroot, nodeModules, users, onRequest, onLog})
 
     const socket = await listen();
     const origin = `https://localhost:${socket.address().port}`;
-    const tenant = randomUUID();
-    const clients = makeClients(origin, tenant);
+    const clients = makeClients({
+        redirectURI: `${origin}/webman/sso/return.cgi`,
+        otherRedirectURI: `${origin}/webman/sso/sso.cgi`, // the program of the README
+        logoutURI: `${origin}/webman/ssoclient/relay.html`,
+    });
+    const [{tenant}] = clients;
     const providerCertificate = authority.issue('provider', 'IP:127.0.0.1');
     const applianceCertificate = authority.issue('appliance', 'DNS:localhost');
     const fingerprints = [providerCertificate, applianceCertificate].map(({fingerprint}) => fingerprint);
