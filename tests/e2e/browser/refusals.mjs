@@ -10,7 +10,7 @@ const PENDING_LOGINS = '/usr/tavo/var/frontend/logins';
 const NOT_STARTED_HERE = /This sign-in was not started in this browser/;
 const STOPPED = /For your safety this sign-in was stopped/;
 const START_PAGE = '/index.cgi';
-const {foreign} = JSON.parse(readFileSync(new URL('../frontend/origins.json', import.meta.url)));
+const {foreign} = JSON.parse(readFileSync(new URL('../../frontend/origins.json', import.meta.url)));
 
 const returnWith = (values) => `${RETURN_PAGE}?${new URLSearchParams(values)}`;
 const relayWith = (values) => `${RELAY_PAGE}#${new URLSearchParams(values)}`;
