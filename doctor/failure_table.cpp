@@ -27,8 +27,7 @@ const std::vector<Failure> &Failures() {
         {kLibraryLine,
          {"sso:N request token uri CURL."},
          "The token endpoint did not answer completely. \"URL using bad/illegal format or missing URL\": its address "
-         "is "
-         "empty.",
+         "is empty.",
          "Run `tavosso-doctor`. Check the network, the client's file and the address of the token endpoint in it.",
          "err"},
         {kLibraryLine,
@@ -39,8 +38,7 @@ const std::vector<Failure> &Failures() {
         {kLibraryLine,
          {"azuresso:N request wellknown uri CURL.", "azuresso:N request wellknown uri bad wellknown json format.."},
          "The key set could not be fetched, or is not JSON. \"URL using bad/illegal format or missing URL\": the "
-         "discovery "
-         "document has no \"jwks_uri\".",
+         "discovery document has no \"jwks_uri\".",
          "Read the line before this one. If there is none, check \"jwks_uri\" of the discovery document and what it "
          "answers.",
          "err"},
@@ -62,11 +60,9 @@ const std::vector<Failure> &Failures() {
         {kLibraryLine,
          {"jwt:N EVP_DigestVerifyFinal failed"},
          "The signature of the token is wrong: `azure_wellknown` belongs to another provider, its keys have just "
-         "changed, "
-         "or someone tries a forged token.",
+         "changed, or someone tries a forged token.",
          "Check `azure_wellknown`. If it is correct and the line repeats, ask the provider and find out where the "
-         "requests "
-         "come from.",
+         "requests come from.",
          "err"},
         {kLibraryLine,
          {"jwt:N EVP_PKEY_assign_RSA failed", "jwt:N check key type failed", "jwt:N EVP_DigestVerifyInit failed",
@@ -107,8 +103,7 @@ const std::vector<Failure> &Failures() {
         {kPlatformLine,
          {"platform:N domain 'DOMAIN' is not in domains.conf, and winbindd does not know it"},
          "The machine's directory neither is nor trusts the domain, or DOMAIN is not its DNS name. Or `domains.conf` "
-         "is "
-         "missing, not JSON or unreadable.",
+         "is missing, not JSON or unreadable.",
          "Compare it with \"Alt_Name\" in the output of wbinfo(1) with its option -D. Otherwise add it to "
          "`domains.conf`.",
          "err"},
@@ -126,8 +121,7 @@ const std::vector<Failure> &Failures() {
         {kPlatformLine,
          {"platform:N domain 'DOMAIN' is not in domains.conf, and winbindd cannot be asked: SYSTEM"},
          "A pipe or a child process was refused, or libwbclient failed with an error such as \"WBC_ERR_NO_MEMORY\". "
-         "\"left "
-         "out of this build\": the stand-in was built without libwbclient.",
+         "\"left out of this build\": the stand-in was built without libwbclient.",
          "Raise the web server's limits on descriptors, processes and memory.",
          "err"},
         {kPlatformLine,
@@ -160,8 +154,7 @@ const std::vector<Failure> &Failures() {
         {kFrontEndLine,
          {"frontend: jwks_uri of the discovery document is not an https:// URL"},
          "The front end fetches signing keys over HTTPS only. The login fails with `kid does not exist in Azure "
-         "verified "
-         "kyes`.",
+         "verified kyes`.",
          "Check `azure_wellknown`. Ask the provider.",
          "err, auth"},
         {kFrontEndLine,
@@ -174,8 +167,7 @@ const std::vector<Failure> &Failures() {
         {kReason,
          {"This sign-in was not started in this browser."},
          "The cookie of this sign-in is missing: another browser, cookies refused, a start over `http:`, a second "
-         "return, "
-         "or a link from someone else.",
+         "return, or a link from someone else.",
          "None, if it is rare. Serve the front end over HTTPS only."},
         {kReason,
          {"This sign-in took too long, or was already completed."},
@@ -188,8 +180,7 @@ const std::vector<Failure> &Failures() {
         {kReason,
          {"The provider's answer belongs to another sign-in."},
          "The token has no nonce, or that of another login: a stolen code, a provider that omits \"nonce\", or a "
-         "failed "
-         "digest.",
+         "failed digest.",
          "Read the log of that login's start. Ask the provider."},
         {kReason,
          {"The provider's answer has no single NAME."},
@@ -305,8 +296,7 @@ const std::vector<Failure> &Failures() {
         {kException,
          {"parse json falied"},
          "The token endpoint gave no usable answer. The log has libcurl's reason; without a line, what answers is no "
-         "token "
-         "endpoint.",
+         "token endpoint.",
          "Run `tavosso-doctor`. Check the network, the certificate and the address of the token endpoint.",
          "std::invalid_argument",
          "a login"},
@@ -344,8 +334,7 @@ const std::vector<Failure> &Failures() {
         {kException,
          {"kid does not exist in Azure verified kyes"},
          "The key set has no such \"kid\", or the log has a line about a key set that could not be fetched. The "
-         "provider "
-         "may just have changed its keys.",
+         "provider may just have changed its keys.",
          "Run `tavosso-doctor`. Check that `azure_wellknown` belongs to the token's tenant. Sign in again.",
          "std::invalid_argument",
          "an Azure login"},
@@ -400,8 +389,7 @@ const std::vector<Failure> &Failures() {
         {kException,
          {"TAVOWinsUserNameFqdn2Netbios failed."},
          "The account's domain is not known to this machine, or nobody could be asked. Off the appliance one log line "
-         "has "
-         "the reason.",
+         "has the reason.",
          "Join the domain and start winbindd. Or, off the appliance, add the domain to `/usr/tavo/etc/domains.conf`: "
          "`{\"corp.example.net\": \"CORP\"}`.",
          "sso_op_failed",
@@ -475,8 +463,7 @@ const std::vector<Failure> &Failures() {
                  "Check port, firewall and proxy."),
         Transfer(CURLE_PEER_FAILED_VERIFICATION, "CURLE_PEER_FAILED_VERIFICATION",
                  "no authority in the bundle has signed the certificate, it is for another name or has expired, or "
-                 "this machine's "
-                 "clock is wrong",
+                 "this machine's clock is wrong",
                  "Run `tavosso-doctor`, which prints the certificate. Add a private authority to the bundle."),
         Transfer(CURLE_SSL_CACERT_BADFILE, "CURLE_SSL_CACERT_BADFILE",
                  "the bundle of authorities is missing, empty or unreadable for the program",
