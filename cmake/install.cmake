@@ -1,12 +1,12 @@
-# The installed tree: library, public headers side by side as <tavosso/sso.h> and <tavosso/jwt.h>, a CMake package, a
-# pkg-config file.
+# The installed tree: libraries, public headers side by side as <tavosso/NAME.h>, a CMake package, pkg-config files.
 set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/tavosso)
 
 set_target_properties(tavosso PROPERTIES INSTALL_RPATH $ORIGIN)
-install(TARGETS tavosso EXPORT tavosso
+install(TARGETS tavosso tavosso-web EXPORT tavosso
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}
+        ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR}
         INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
-install(FILES jwt/jwt.h sso/sso.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/tavosso)
+install(FILES jwt/jwt.h sso/sso.h web/web.h DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/tavosso)
 if(TARGET tavoplatform)
     install(TARGETS tavoplatform EXPORT tavosso LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} NAMELINK_SKIP)
 endif()
@@ -24,4 +24,6 @@ if(NOT CMAKE_INSTALL_PREFIX STREQUAL /usr)
     set(pkgconfig_run_path " -Wl,-rpath,\${libdir}")
 endif()
 configure_file(cmake/tavosso.pc.in tavosso.pc @ONLY)
-install(FILES ${PROJECT_BINARY_DIR}/tavosso.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+configure_file(cmake/tavosso-web.pc.in tavosso-web.pc @ONLY)
+install(FILES ${PROJECT_BINARY_DIR}/tavosso.pc ${PROJECT_BINARY_DIR}/tavosso-web.pc
+        DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)

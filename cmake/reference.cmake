@@ -20,4 +20,5 @@ set(DOXYGEN_HTML_TIMESTAMP NO)
 # From where they lie as they are installed, so that the reference names them as programs include them.
 set(DOXYGEN_STRIP_FROM_PATH ${installed_headers})
 set(DOXYGEN_STRIP_FROM_INC_PATH ${installed_headers})
-doxygen_add_docs(reference ${installed_headers}/tavosso/sso.h ${installed_headers}/tavosso/jwt.h)
+doxygen_add_docs(reference ${installed_headers}/tavosso/sso.h ${installed_headers}/tavosso/jwt.h
+                 ${installed_headers}/tavosso/web.h)

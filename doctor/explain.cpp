@@ -3,7 +3,8 @@
 #include <boost/algorithm/string/erase.hpp>
 #include <iostream>
 
-#include "doctor/failure_lookup.h"
+#include "web/failure.h"
+#include "web/failure_lookup.h"
 
 namespace Doctor {
 
@@ -11,38 +12,38 @@ namespace {
 
 struct Column {
     const char *head;
-    const char *Failure::*value;
+    const char *TAVO::Web::FailureRow::*value;
 };
 
 struct Table {
-    FailureKind kind;
+    TAVO::Web::FailureKind kind;
     const char *title;
     const char *head;  // of the column with the texts
     std::vector<Column> columns;
 };
 
 const std::vector<Table> &Tables() {
-    const Column level{"level", &Failure::type};
-    const Column type{"class", &Failure::type};
-    const Column thrownBy{"thrown by", &Failure::thrownBy};
-    const Column cause{"cause", &Failure::cause};
-    const Column remedy{"remedy", &Failure::remedy};
+    const Column level{"level", &TAVO::Web::FailureRow::type};
+    const Column type{"class", &TAVO::Web::FailureRow::type};
+    const Column thrownBy{"thrown by", &TAVO::Web::FailureRow::thrownBy};
+    const Column cause{"cause", &TAVO::Web::FailureRow::cause};
+    const Column remedy{"remedy", &TAVO::Web::FailureRow::remedy};
     static const std::vector<Table> tables = {
-        {FailureKind::kLibraryLine, "log lines of the library", "line", {level, cause, remedy}},
-        {FailureKind::kPlatformLine, "log lines of the stand-in", "line", {level, cause, remedy}},
-        {FailureKind::kFrontEndLine, "log lines of the front end", "line", {level, cause, remedy}},
-        {FailureKind::kReason, "reasons of the front end", "reason", {cause, remedy}},
-        {FailureKind::kException, "exceptions of the library", "text", {type, thrownBy, cause, remedy}},
-        {FailureKind::kTransfer, "results of libcurl", "result", {cause, remedy}},
+        {TAVO::Web::FailureKind::kLibraryLine, "log lines of the library", "line", {level, cause, remedy}},
+        {TAVO::Web::FailureKind::kPlatformLine, "log lines of the stand-in", "line", {level, cause, remedy}},
+        {TAVO::Web::FailureKind::kFrontEndLine, "log lines of the front end", "line", {level, cause, remedy}},
+        {TAVO::Web::FailureKind::kReason, "reasons of the front end", "reason", {cause, remedy}},
+        {TAVO::Web::FailureKind::kException, "exceptions of the library", "text", {type, thrownBy, cause, remedy}},
+        {TAVO::Web::FailureKind::kTransfer, "results of libcurl", "result", {cause, remedy}},
     };
     return tables;
 }
 
-const Table &TableOf(const Failure &failure) { return Tables()[static_cast<std::size_t>(failure.kind)]; }
+const Table &TableOf(const TAVO::Web::FailureRow &failure) { return Tables()[static_cast<std::size_t>(failure.kind)]; }
 
 constexpr char kForeignText[] = "a text of another library";
 
-std::vector<std::string> TextsOf(const Failure &failure) {
+std::vector<std::string> TextsOf(const TAVO::Web::FailureRow &failure) {
     return failure.texts.empty() ? std::vector<std::string>{kForeignText}
                                  : std::vector<std::string>(failure.texts.begin(), failure.texts.end());
 }
@@ -55,7 +56,7 @@ void PrintMarkdown(const Table &table) {
         line += " | ---";
     }
     std::cout << " |\n" << line << " |\n";
-    for (const Failure &failure : Failures()) {
+    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
         if (failure.kind != table.kind) {
             continue;
         }
@@ -67,8 +68,10 @@ void PrintMarkdown(const Table &table) {
         for (const Column &column : table.columns) {
             const std::string value = failure.*column.value;
             std::cout << " | "
-                      << (column.value == &Failure::type && table.kind == FailureKind::kException ? '`' + value + '`'
-                                                                                                  : value);
+                      << (column.value == &TAVO::Web::FailureRow::type &&
+                                  table.kind == TAVO::Web::FailureKind::kException
+                              ? '`' + value + '`'
+                              : value);
         }
         std::cout << " |\n";
     }
@@ -81,17 +84,17 @@ std::vector<Explanation> LookUp(const std::string &text) {
     std::vector<Explanation> found;
     for (const Table &table : Tables()) {
         Explanation best{nullptr, ""};
-        for (const Failure &failure : Failures()) {
+        for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
             for (const char *about : failure.texts) {
                 // A text of placeholders alone would explain anything.
-                if (failure.kind == table.kind && EndsInText(text, about) &&
-                    Specificity(about) > Specificity(best.about.c_str())) {
+                if (failure.kind == table.kind && TAVO::Web::EndsInText(text, about) &&
+                    TAVO::Web::Specificity(about) > TAVO::Web::Specificity(best.about.c_str())) {
                     best = {&failure, about};
                 }
             }
         }
-        if (const Failure *transfer = FindTransfer(FindTransferText(text));
-            table.kind == FailureKind::kTransfer && transfer != nullptr) {
+        if (const TAVO::Web::FailureRow *transfer = TAVO::Web::FindTransfer(TAVO::Web::FindTransferText(text));
+            table.kind == TAVO::Web::FailureKind::kTransfer && transfer != nullptr) {
             best = {transfer, transfer->texts.front()};
         }
         if (best.failure != nullptr) {
@@ -103,7 +106,7 @@ std::vector<Explanation> LookUp(const std::string &text) {
 
 std::vector<Explanation> AllExplanations() {
     std::vector<Explanation> all;
-    for (const Failure &failure : Failures()) {
+    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
         for (const std::string &text : TextsOf(failure)) {
             all.push_back({&failure, text});
         }
@@ -132,6 +135,7 @@ Json::Value ExplanationsAsJson(const std::vector<Explanation> &explanations) {
         for (const Column &column : table.columns) {
             one[column.head] = WithoutBackticks(explanation.failure->*column.value);
         }
+        one["sentence"] = TAVO::Web::SentenceOf(explanation.failure->code);
         json.append(one);
     }
     return json;

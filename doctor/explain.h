@@ -6,13 +6,13 @@
 #include <string>
 #include <vector>
 
-#include "doctor/failure_table.h"
+#include "web/failure_table.h"
 
 // What the table of failures has about a text, and the table itself, as they are printed.
 namespace Doctor {
 
 struct Explanation {
-    const Failure *failure;
+    const TAVO::Web::FailureRow *failure;
     std::string about;  // the text of the table
 };
 

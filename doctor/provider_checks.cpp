@@ -9,9 +9,9 @@
 
 #include "doctor/address.h"
 #include "doctor/checks.h"
-#include "doctor/failure_lookup.h"
 #include "doctor/key_set.h"
 #include "doctor/watch.h"
+#include "web/failure_lookup.h"
 #include "web/request.h"
 #include "web/text.h"
 
@@ -79,7 +79,7 @@ class ProviderCheck {
     bool CheckTransfer(const std::string &id, const std::string &subject, const Transfer &transfer) {
         if (transfer.result != CURLE_OK) {
             const std::string text = curl_easy_strerror(transfer.result);
-            const Failure *row = FindTransfer(transfer.result);
+            const TAVO::Web::FailureRow *row = TAVO::Web::FindTransfer(transfer.result);
             const std::string cause = row != nullptr ? row->cause : "";
             report_.Finding(id + ".reachable", subject,
                             transfer.url + ": " + text + (cause.empty() ? "" : " (" + cause + ")"),

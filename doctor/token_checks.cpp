@@ -13,8 +13,8 @@
 
 #include "doctor/checks.h"
 #include "doctor/explain.h"
-#include "doctor/failure_lookup.h"
 #include "doctor/watch.h"
+#include "web/failure_lookup.h"
 #include "web/text.h"
 
 namespace Doctor {
@@ -35,7 +35,7 @@ std::string DescribeExpiry(const Json::Value &claims) {
 
 std::string RemedyOf(const std::string &text) {
     for (const Explanation &explanation : LookUp(text)) {
-        if (explanation.failure->kind == FailureKind::kException) {
+        if (explanation.failure->kind == TAVO::Web::FailureKind::kException) {
             return WithoutBackticks(explanation.failure->remedy);
         }
     }
@@ -89,7 +89,8 @@ class TokenCheck {
               const std::string &found, bool needsKeys = false) {
         if (!stop_.empty()) {
             report_.NotChecked(id, subject, "the library stops before it");
-        } else if (std::any_of(stops.begin(), stops.end(), [&](const char *text) { return IsText(failure_, text); })) {
+        } else if (std::any_of(stops.begin(), stops.end(),
+                               [&](const char *text) { return TAVO::Web::IsText(failure_, text); })) {
             stop_ = id;
             report_.Add({id, subject, Mark::kFinding,
                          found + log_ + (id == "token.key" && log_.empty() ? PublishedKeys() : ""), RemedyOf(failure_),

@@ -49,15 +49,19 @@ void RefuseMethod(Web::Response &response, const std::string &methods) {
              "<p><a href=\"/index.cgi\">Go to the start page</a></p>\n");
 }
 
-void Fail(Web::Response &response, const std::string &reason) {
+}  // namespace
+
+void Fail(Web::Response &response, const std::string &reason, const std::string &origin) {
     syslog(LOG_AUTH | LOG_WARNING, "frontend: sign-in failed: %s", reason.c_str());
     // The relay URL takes the reason unencoded, so another parameter can follow it.
     std::string encoded = TAVO::SSO::URLEncode(reason);
-    if (!response.origin.empty()) {
-        encoded += "&origin=" + TAVO::SSO::URLEncode(response.origin);
+    if (!origin.empty()) {
+        encoded += "&origin=" + TAVO::SSO::URLEncode(origin);
     }
     response.Redirect("/webman/" + TAVO::SSO::GetSSORelayURL(false, "", encoded));
 }
+
+namespace {
 
 bool Write(const Web::Response &response) {
     std::cout << "Status: " << response.status << "\n";
@@ -88,9 +92,9 @@ int Serve(const std::string &methods, void (*serve)(Web::Response &)) {
             RefuseMethod(response, methods);
         }
     } catch (const std::exception &failure) {
-        Fail(response, Web::ReasonOf(failure));
+        Fail(response, Web::ReasonOf(failure), "");
     } catch (...) {
-        Fail(response, "unexpected failure");
+        Fail(response, "unexpected failure", "");
     }
     return Write(response) ? 0 : 1;
 }

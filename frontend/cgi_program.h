@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "web/response.h"
+#include "web/web.h"
 
 namespace Frontend {
 
@@ -24,6 +24,9 @@ constexpr unsigned int kLongestRun = 70;
  * @return the exit status: 1 if the answer could not be written
  */
 int Serve(const std::string &methods, void (*serve)(Web::Response &));
+
+/// Logs the reason why a sign-in failed, and sends the browser to the relay page. "Try again" leads back to `origin`.
+void Fail(Web::Response &response, const std::string &reason, const std::string &origin);
 
 }  // namespace Frontend
 

@@ -28,6 +28,10 @@ std::string Variable(const char *name) {
     return value != nullptr ? value : "";
 }
 
+TAVO::Web::Request ReceivedRequest() {
+    return {Variable("REQUEST_METHOD"), Variable("QUERY_STRING"), Variable("HTTP_COOKIE")};
+}
+
 bool IsHeadRequest() { return Variable("REQUEST_METHOD") == "HEAD"; }
 
 bool AcceptsUnverifiedEmail() { return Variable("FRONTEND_ACCEPT_EMAIL") == "yes"; }

@@ -4,11 +4,16 @@
 #include <cstddef>
 #include <string>
 
+#include "web/web.h"
+
 // The environment of a CGI program: its request (RFC 3875), and the front end's settings, which the web server sets.
 namespace Frontend {
 
 /// A variable, empty if it is not set.
 std::string Variable(const char *name);
+
+/// The browser's request.
+TAVO::Web::Request ReceivedRequest();
 
 /// Whether the request asks for the headers alone. Such a request must not start or complete a login.
 bool IsHeadRequest();

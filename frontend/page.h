@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "web/response.h"
+#include "web/web.h"
 
 namespace Frontend {
 

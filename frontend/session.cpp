@@ -1,8 +1,8 @@
 #include "frontend/session.h"
 
+#include "frontend/folders.h"
 #include "web/configured_profile.h"
 #include "web/cookie.h"
-#include "web/private_folder.h"
 #include "web/refusal.h"
 #include "web/text.h"
 
@@ -11,12 +11,7 @@ namespace Frontend {
 namespace {
 
 constexpr char kCookie[] = "__Host-session";
-constexpr char kFolder[] = "sessions";
-constexpr std::time_t kSeconds = std::time_t{8} * 60 * 60;
 constexpr char kFormat[] = "session 1";
-constexpr std::size_t kMostSessions = 10000;
-
-Web::PrivateFolder OpenSessions() { return {kFolder, kSeconds, kMostSessions}; }
 
 /// Accepts a session in exactly the format that StartSession writes.
 std::optional<Session> ParseSession(const std::optional<std::string> &text) {

@@ -4,7 +4,7 @@
 #include <optional>
 #include <string>
 
-#include "web/response.h"
+#include "web/web.h"
 
 namespace Frontend {
 

@@ -1,8 +1,9 @@
 #include "web/pending_login.h"
 
-#include <sso/limits.h>
+#include <openssl/evp.h>
 
-#include "platform/platform.h"
+#include <algorithm>
+
 #include "web/configured_profile.h"
 #include "web/cookie.h"
 #include "web/private_folder.h"
@@ -14,9 +15,8 @@ namespace TAVO::Web {
 
 namespace {
 
-constexpr char kFolder[] = "logins";
-constexpr int kSeconds = 600;
 constexpr char kFormat[] = "login 1";
+constexpr std::size_t kLongestState = 2048;
 constexpr char kCookieSlots[] = "0123456789abcdef";
 
 std::string CookieName(char slot) { return std::string("__Host-login-") + slot; }
@@ -50,35 +50,44 @@ std::string StateIn(const std::string &address) {
     return OnlyValue(parameters, "state").value_or("");
 }
 
+std::string EncodeBase64(const std::string &bytes) {
+    std::string text((bytes.size() + 2) / 3 * 4 + 1, '\0');
+    text.resize(static_cast<std::size_t>(EVP_EncodeBlock(reinterpret_cast<unsigned char *>(text.data()),
+                                                         reinterpret_cast<const unsigned char *>(bytes.data()),
+                                                         static_cast<int>(bytes.size()))));
+    return text;
+}
+
 }  // namespace
 
-std::string StartLogin(Response &response, const std::string &cookies, const std::string &profile,
-                       std::size_t mostPending, const std::function<std::string(const Json::Value &)> &makeAddress) {
+std::string BeginLogin(Response &response, const Request &request, LoginStore &store, const std::string &profile,
+                       const std::string &origin, const std::function<std::string(const Json::Value &)> &makeAddress) {
     const std::string login = PrivateFolder::NewName();
     Json::Value state;
-    state["origin"] = SafeOrigin(response.origin);
+    state["origin"] = SafeOrigin(origin);
     state["csrf"] = login;
     std::string address = makeAddress(state);
     Json::Value started;
     started["format"] = kFormat;
     started["state"] = StateIn(address);
     started["profile"] = profile;
-    if (!PrivateFolder(kFolder, kSeconds, mostPending).Keep(login, WriteCompact(started))) {
+    if (!store.Keep(login, WriteCompact(started))) {
         throw Refusal("Too many sign-ins are under way on this device.");
     }
-    response.SetCookie(FreeCookieName(cookies, login), login, "; Max-Age=" + std::to_string(kSeconds));
+    response.SetCookie(FreeCookieName(request.cookies, login), login, "; Max-Age=" + std::to_string(kLoginSeconds));
     return address;
 }
 
-ConcludedLogin ConcludeLogin(Response &response, const std::string &cookies, const std::string &state) {
+PendingLogin EndLogin(Response &response, std::string &origin, const Request &request, LoginStore &store,
+                      const std::string &state) {
     const Json::Value returned = DecodeState(state);
     const std::string login = StringMember(returned, "csrf");
-    const std::string cookie = CookieOf(cookies, login);
+    const std::string cookie = CookieOf(request.cookies, login);
     if (login.empty() || cookie.empty()) {
         throw Refusal("This sign-in was not started in this browser.");
     }
     response.ExpireCookie(cookie);
-    const Json::Value started = ParseObject(PrivateFolder(kFolder, kSeconds).Take(login).value_or(""));
+    const Json::Value started = ParseObject(store.Take(login).value_or(""));
     if (StringMember(started, "format") != kFormat) {
         throw Refusal("This sign-in took too long, or was already completed.");
     }
@@ -87,7 +96,7 @@ ConcludedLogin ConcludeLogin(Response &response, const std::string &cookies, con
     if (state != StringMember(started, "state")) {
         throw Refusal("This sign-in was changed on its way.");
     }
-    response.origin = StringMember(returned, "origin");
+    origin = StringMember(returned, "origin");
     // The code must not go to another provider, with that provider's client secret.
     const std::string profile = StringMember(started, "profile");
     if (profile != ProfileInForce()) {
@@ -97,12 +106,19 @@ ConcludedLogin ConcludeLogin(Response &response, const std::string &cookies, con
 }
 
 Json::Value DecodeState(const std::string &state) {
-    char buffer[TAVO::SSO::kPlatformBuffer];
-    std::size_t length = sizeof buffer;
-    if (TLIBCBase64Decode(state.data(), state.size(), buffer, &length) == 0) {
+    std::string decoded(state.size(), '\0');
+    const int length =
+        state.size() > kLongestState
+            ? -1
+            : EVP_DecodeBlock(reinterpret_cast<unsigned char *>(decoded.data()),
+                              reinterpret_cast<const unsigned char *>(state.data()), static_cast<int>(state.size()));
+    if (length < 0) {
         return {};
     }
-    return ParseObject(std::string(buffer, length));
+    const std::size_t padding = state.size() - (state.find_last_not_of('=') + 1);
+    decoded.resize(static_cast<std::size_t>(length) - std::min<std::size_t>(padding, 2));
+    // OpenSSL also decodes texts that it would not encode.
+    return EncodeBase64(decoded) == state ? ParseObject(decoded) : Json::Value();
 }
 
 }  // namespace TAVO::Web

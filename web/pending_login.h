@@ -7,7 +7,7 @@
 #include <functional>
 #include <string>
 
-#include "web/response.h"
+#include "web/web.h"
 
 /*
  * Ties a login to the browser that started it. Otherwise anyone could send a victim's browser to the return page with
@@ -19,21 +19,21 @@
  */
 namespace TAVO::Web {
 
-/// Starts a login under a profile, to return to the response's origin. `makeAddress` makes the provider's URL from the
-/// state's object, as `GetAccessTokenReqURI` of the clients does. Returns that URL. Throws `Refusal` if `mostPending`
-/// logins are pending.
-std::string StartLogin(Response &response, const std::string &cookies, const std::string &profile,
-                       std::size_t mostPending, const std::function<std::string(const Json::Value &)> &makeAddress);
+/// Begins a login under a profile, to return to `origin`. `makeAddress` makes the provider's URL from the state's
+/// object, as `GetAccessTokenReqURI` of the clients does. Returns that URL. Throws `Refusal` if the store is full.
+std::string BeginLogin(Response &response, const Request &request, LoginStore &store, const std::string &profile,
+                       const std::string &origin, const std::function<std::string(const Json::Value &)> &makeAddress);
 
-struct ConcludedLogin {
+struct PendingLogin {
     Json::Value state;  // the state's object
     std::string profile;
 };
 
 /// Throws `Refusal` unless this browser started the login that `state` belongs to, within the last ten minutes, has not
-/// completed it before, returns the state unchanged, and the login's profile is still in force. Sets the
-/// response's origin.
-ConcludedLogin ConcludeLogin(Response &response, const std::string &cookies, const std::string &state);
+/// completed it before, returns the state unchanged, and the login's profile is still in force. Sets the origin as soon
+/// as the state is known to be the one that was sent.
+PendingLogin EndLogin(Response &response, std::string &origin, const Request &request, LoginStore &store,
+                      const std::string &state);
 
 /// The JSON object in the state; null if there is none.
 Json::Value DecodeState(const std::string &state);

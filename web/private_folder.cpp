@@ -8,6 +8,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <boost/algorithm/string.hpp>
 #include <cerrno>
 #include <chrono>
 #include <cstring>
@@ -22,7 +23,6 @@ namespace TAVO::Web {
 
 namespace {
 
-constexpr char kSystemFolder[] = "/usr";
 constexpr std::size_t kRandomBytes = 16;
 constexpr char kHexDigits[] = "0123456789abcdef";
 constexpr char kUnfinished[] = ".new";
@@ -44,13 +44,13 @@ struct stat StatusOf(const Descriptor &file) {
     return status;
 }
 
-Descriptor OpenFolderIn(const Descriptor &parent, const char *name) {
-    return {openat(parent.Number(), name, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC),
+Descriptor OpenFolderIn(const Descriptor &parent, const std::string &name) {
+    return {openat(parent.Number(), name.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC),
             "The front end's folder cannot be opened"};
 }
 
 /// A folder on the way: only root or this user can put something else in its place.
-Descriptor OpenTrusted(const Descriptor &parent, const char *name) {
+Descriptor OpenTrusted(const Descriptor &parent, const std::string &name) {
     Descriptor folder = OpenFolderIn(parent, name);
     const struct stat status = StatusOf(folder);
     if ((status.st_uid != 0 && status.st_uid != geteuid()) || (status.st_mode & 022) != 0) {
@@ -60,8 +60,8 @@ Descriptor OpenTrusted(const Descriptor &parent, const char *name) {
     return folder;
 }
 
-Descriptor OpenPrivate(const Descriptor &parent, const char *name) {
-    if (mkdirat(parent.Number(), name, 0700) != 0 && errno != EEXIST) {
+Descriptor OpenPrivate(const Descriptor &parent, const std::string &name) {
+    if (mkdirat(parent.Number(), name.c_str(), 0700) != 0 && errno != EEXIST) {
         ThrowSystemError("The front end's folder cannot be made");
     }
     Descriptor folder = OpenFolderIn(parent, name);
@@ -73,10 +73,14 @@ Descriptor OpenPrivate(const Descriptor &parent, const char *name) {
     return folder;
 }
 
-/// The folder `name` in /usr/tavo/var/frontend.
-Descriptor OpenFolder(const char *name) {
-    const Descriptor system(open(kSystemFolder, O_RDONLY | O_DIRECTORY | O_CLOEXEC), "/usr cannot be opened");
-    return OpenPrivate(OpenPrivate(OpenTrusted(OpenTrusted(system, "tavo"), "var"), "frontend"), name);
+Descriptor OpenFolder(const std::string &path) {
+    std::vector<std::string> names;
+    boost::split(names, path, boost::is_any_of("/"), boost::token_compress_on);
+    Descriptor folder(open("/", O_RDONLY | O_DIRECTORY | O_CLOEXEC), "/ cannot be opened");
+    for (std::size_t i = 1; i + 1 < names.size(); ++i) {
+        folder = OpenTrusted(folder, names[i]);
+    }
+    return OpenPrivate(folder, names.back());
 }
 
 /// Whether a file is one of ours: what another user has put or linked here is not.
@@ -148,14 +152,19 @@ Descriptor::Descriptor(int opened, const char *what) : number(opened) {
 
 Descriptor::Descriptor(Descriptor &&other) noexcept : number(std::exchange(other.number, -1)) {}
 
+Descriptor &Descriptor::operator=(Descriptor &&other) noexcept {
+    std::swap(number, other.number);
+    return *this;
+}
+
 Descriptor::~Descriptor() {
     if (number >= 0) {
         close(number);
     }
 }
 
-PrivateFolder::PrivateFolder(const char *name, std::time_t seconds, std::size_t most)
-    : folder(OpenFolder(name)), lifetime(seconds), capacity(most) {}
+PrivateFolder::PrivateFolder(const std::string &path, std::time_t seconds, std::size_t most)
+    : folder(OpenFolder(path)), lifetime(seconds), capacity(most) {}
 
 std::string PrivateFolder::NewName() {
     unsigned char bytes[kRandomBytes];

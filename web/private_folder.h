@@ -16,6 +16,7 @@ class Descriptor {
     Descriptor(int opened, const char *what);
     ~Descriptor();
     Descriptor(Descriptor &&other) noexcept;
+    Descriptor &operator=(Descriptor &&other) noexcept;
     Descriptor(const Descriptor &) = delete;
     Descriptor &operator=(const Descriptor &) = delete;
     int Number() const { return number; }
@@ -35,9 +36,9 @@ class PrivateFolder {
   public:
     static constexpr std::size_t kUnlimited = std::numeric_limits<std::size_t>::max();
 
-    /// The folder `name` in the front end's own, made if missing. Texts expire `seconds` after they were kept; at most
-    /// about `most` are kept at a time.
-    PrivateFolder(const char *name, std::time_t seconds, std::size_t most = kUnlimited);
+    /// The folder at an absolute path, made if missing; its parent must exist. Texts expire `seconds` after they were
+    /// kept; at most about `most` are kept at a time.
+    PrivateFolder(const std::string &path, std::time_t seconds, std::size_t most = kUnlimited);
 
     /// A name that cannot be guessed.
     static std::string NewName();

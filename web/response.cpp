@@ -1,9 +1,8 @@
-#include "web/response.h"
-
 #include <stdexcept>
 
 #include "web/cookie.h"
 #include "web/text.h"
+#include "web/web.h"
 
 namespace TAVO::Web {
 
@@ -23,8 +22,8 @@ void Response::AddHeader(const std::string &name, const std::string &value) {
     headers.emplace_back(name, value);
 }
 
-void Response::SetCookie(const std::string &name, const std::string &value, const std::string &attributes) {
-    AddHeader("Set-Cookie", MakeCookie(name, value, attributes));
+void Response::SetCookie(const std::string &name, const std::string &value, const std::string &more) {
+    AddHeader("Set-Cookie", MakeCookie(name, value, more));
 }
 
 void Response::ExpireCookie(const std::string &name) { SetCookie(name, "", "; Max-Age=0"); }

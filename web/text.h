@@ -6,11 +6,10 @@
 #include <cstddef>
 #include <string>
 
+#include "web/web.h"
+
 // Texts that come from elsewhere, made fit to be shown, logged or followed.
 namespace TAVO::Web {
-
-/// For element content and quoted attribute values.
-std::string EscapeHtml(const std::string &text);
 
 /// Whether a text is UTF-8 without controls (C0, DEL and C1), line and paragraph separators, and the format characters
 /// that are invisible or change the direction of the text.

@@ -54,6 +54,7 @@ export const EXPLANATIONS = new Map([
     ['profile not support.', NOT_SET_UP],
     ['not specify sso profile', NOT_SET_UP],
     ['Single sign-on is not completely set up', NOT_SET_UP],
+    ['This program may not read the configuration of single sign-on.', NOT_SET_UP],
     ['encode base64 failed.', NOT_SET_UP],
 ]);
 

@@ -5,9 +5,9 @@
 #include <set>
 #include <string>
 
-#include "doctor/failure_lookup.h"
 #include "tests/doctor/doctor_process.h"
 #include "tests/support/token.h"
+#include "web/failure_lookup.h"
 
 // `tavosso-doctor explain`: each text of the table of failures is explained by its own row.
 namespace Test {
@@ -34,8 +34,8 @@ const std::map<std::string, std::string> kWords = {
 };
 
 /// A real text for one of the table: each placeholder is replaced.
-std::string Fill(const Doctor::Failure &failure, const std::string &text) {
-    if (failure.kind == Doctor::FailureKind::kTransfer) {
+std::string Fill(const TAVO::Web::FailureRow &failure, const std::string &text) {
+    if (failure.kind == TAVO::Web::FailureKind::kTransfer) {
         return curl_easy_strerror(failure.result);
     }
     std::string filled;
@@ -66,10 +66,10 @@ Strings Explanations(const std::string &text) {
 }
 
 TEST(Explain, FindsTheRowOfEveryText) {
-    for (const char *placeholder : Doctor::kPlaceholders) {
+    for (const char *placeholder : TAVO::Web::kPlaceholders) {
         EXPECT_EQ(kWords.count(placeholder), 1U) << placeholder;
     }
-    for (const Doctor::Failure &failure : Doctor::Failures()) {
+    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
         for (const std::string text : failure.texts) {
             const std::string filled = Fill(failure, text);
             if (text == "CURL") {
@@ -99,7 +99,7 @@ TEST(Explain, KnowsTheWordsOfLibcurl7And8) {
 
 TEST(Explain, KnowsAProvidersAnswerByItsError) {
     EXPECT_THAT(Explanations(R"({"error": "invalid_client", "error_description": "AADSTS7000215"})"),
-                Contains(Doctor::kErrorAnswer));
+                Contains(TAVO::Web::kErrorAnswer));
     for (const char *text :
          {"The provider refused: access_denied (not today)", "The provider refused: unknown error"}) {
         EXPECT_THAT(Explanations(text), ElementsAre("The provider refused: REASON"));
@@ -135,7 +135,7 @@ TEST(Explain, ListsEveryRow) {
     for (const Json::Value &explanation : report["explanations"]) {
         listed.insert(explanation["about"].asString());
     }
-    for (const Doctor::Failure &failure : Doctor::Failures()) {
+    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
         for (const std::string text : failure.texts) {
             EXPECT_EQ(listed.count(text), 1U) << text;
             EXPECT_THAT(printed, HasSubstr("\n" + text + "\n  ")) << text;

@@ -7,13 +7,13 @@
 #include <string>
 #include <vector>
 
-#include "doctor/failure_lookup.h"
 #include "tests/doctor/appliance.h"
 #include "tests/doctor/doctor_process.h"
 #include "tests/doctor/login_dialogue.h"
 #include "tests/support/authority.h"
 #include "tests/support/files.h"
 #include "tests/support/token.h"
+#include "web/failure_lookup.h"
 
 // Whatever a login can end with: the doctor, run first, names the cause, and the login then ends so. Each row is
 // printed with what the doctor found.
@@ -35,7 +35,7 @@ const char *Name(Command command) {
                                         : "tavosso-doctor login";
 }
 
-using Doctor::kErrorAnswer;
+using TAVO::Web::kErrorAnswer;
 constexpr char kAlgorithm[] = "ALG algorithm is not supported";
 
 struct Row {
@@ -306,7 +306,7 @@ TEST_P(FailureRow, IsExplainedBeforeTheLoginEndsSo) {
     PrintRow(row, check);
 
     const Outcome outcome = appliance.LogIn();
-    EXPECT_TRUE(Doctor::IsText(outcome.text, row.text.c_str())) << outcome.text;
+    EXPECT_TRUE(TAVO::Web::IsText(outcome.text, row.text.c_str())) << outcome.text;
     if (row.command != kPass || !check.library.empty()) {
         EXPECT_EQ(check.library, Shown(outcome.text));
     }
@@ -317,7 +317,7 @@ INSTANTIATE_TEST_SUITE_P(Doctor, FailureRow, ::testing::ValuesIn(Rows()),
 
 std::set<std::string> TextsOfLogins() {
     std::set<std::string> texts;
-    for (const Doctor::Failure &failure : Doctor::Failures()) {
+    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
         if (std::string(failure.thrownBy).find("login") != std::string::npos) {
             texts.insert(failure.texts.begin(), failure.texts.end());
         }

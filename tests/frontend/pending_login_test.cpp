@@ -35,19 +35,18 @@ std::string MakeAddress(Json::Value state) {
     return "https://provider.example/auth?scope=openid&state=" + TAVO::SSO::URLEncode(Encode(WriteCompact(state)));
 }
 
-constexpr std::size_t kManyLogins = 1000;
 constexpr char kTookTooLong[] = "This sign-in took too long, or was already completed.";
-const std::string kFolder = "/usr/tavo/var/frontend/logins/";
+const std::string kLogins = "/usr/tavo/var/logins";
+const std::string kFolder = kLogins + "/";
 
-class PendingLogin : public testing::Test {
+class PendingLoginTest : public testing::Test {
   protected:
-    PendingLogin() {
+    PendingLoginTest() {
         std::filesystem::create_directory("/usr/tavo/var");
         UseProfile("azure");
-        response.origin = "/files";
         state = Start();
     }
-    ~PendingLogin() override {
+    ~PendingLoginTest() override {
         std::filesystem::remove_all("/usr/tavo/var");
         std::filesystem::remove_all("/usr/tavo/etc");
     }
@@ -59,15 +58,17 @@ class PendingLogin : public testing::Test {
     }
 
     /// Starts a login in a browser with these cookies. Returns its state.
-    std::string Start(const std::string &cookies = "", std::size_t mostPending = kManyLogins) {
-        const std::string address = StartLogin(response, cookies, "azure", mostPending, MakeAddress);
+    std::string Start(const std::string &cookies = "", std::size_t mostPending = kMostLogins) {
+        FolderLoginStore store(kLogins, mostPending);
+        const std::string address = BeginLogin(response, With(cookies), store, "azure", "/files", MakeAddress);
         return OnlyValue(ParseQuery(address.substr(address.find('?') + 1)), "state").value();
     }
 
     /// The cookie of a login that starts in a browser with these cookies.
     static std::string CookieHeader(const std::string &cookies) {
         Response other;
-        StartLogin(other, cookies, "azure", kManyLogins, MakeAddress);
+        FolderLoginStore store(kLogins);
+        BeginLogin(other, With(cookies), store, "azure", "/files", MakeAddress);
         return LastSetCookie(other);
     }
 
@@ -75,26 +76,34 @@ class PendingLogin : public testing::Test {
     std::string Name() { return NameOf(state); }
     std::string Cookie() { return "__Host-login-" + Name().substr(0, 1) + "=" + Name(); }
 
+    static Request With(const std::string &cookies) { return {"GET", "", cookies}; }
+
+    PendingLogin End(const std::string &cookies, const std::string &returned) {
+        FolderLoginStore store(kLogins);
+        return EndLogin(response, origin, With(cookies), store, returned);
+    }
+
     std::string Refusal(const std::string &cookies, const std::string &returned) {
-        return ::Test::FailureOf([&] { ConcludeLogin(response, cookies, returned); }).text;
+        return ::Test::FailureOf([&] { End(cookies, returned); }).text;
     }
 
     Response response;
+    std::string origin;
     std::string state;
 };
 
-TEST_F(PendingLogin, IsConcludedOnceByTheBrowserThatStartedIt) {
+TEST_F(PendingLoginTest, IsConcludedOnceByTheBrowserThatStartedIt) {
     EXPECT_EQ(Refusal(Cookie(), state), "");
     EXPECT_EQ(Refusal(Cookie(), state), kTookTooLong);
 }
 
-TEST_F(PendingLogin, GivesWhatTheStateHolds) {
-    const Json::Value object = ConcludeLogin(response, Cookie(), state).state;
+TEST_F(PendingLoginTest, GivesWhatTheStateHolds) {
+    const Json::Value object = End(Cookie(), state).state;
     EXPECT_EQ(object["origin"].asString(), "/files");
     EXPECT_EQ(object["nonce"].asString(), "digest");
 }
 
-TEST_F(PendingLogin, IsRefusedToAnotherBrowserAndStaysPending) {
+TEST_F(PendingLoginTest, IsRefusedToAnotherBrowserAndStaysPending) {
     const std::string reason = "This sign-in was not started in this browser.";
     EXPECT_EQ(Refusal("", state), reason);
     EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 1) + "=" + std::string(32, '0'), state), reason);
@@ -102,7 +111,7 @@ TEST_F(PendingLogin, IsRefusedToAnotherBrowserAndStaysPending) {
     EXPECT_EQ(Refusal(Cookie(), state), "");
 }
 
-TEST_F(PendingLogin, IsRefusedAfterTenMinutes) {
+TEST_F(PendingLoginTest, IsRefusedAfterTenMinutes) {
     for (const auto &[age, reason] : {std::pair(598, ""), std::pair(602, kTookTooLong), std::pair(-60, kTookTooLong)}) {
         state = Start();
         const utimbuf past{std::time(nullptr) - age, std::time(nullptr) - age};
@@ -111,12 +120,12 @@ TEST_F(PendingLogin, IsRefusedAfterTenMinutes) {
     }
 }
 
-TEST_F(PendingLogin, HasACookieThatEndsWithIt) {
+TEST_F(PendingLoginTest, HasACookieThatEndsWithIt) {
     EXPECT_THAT(CookieHeader(""), testing::MatchesRegex("__Host-login-[0-9a-f]=[0-9a-f]{32}; Path=/; "
                                                         "Secure; HttpOnly; SameSite=Lax; Max-Age=600"));
 }
 
-TEST_F(PendingLogin, ExpiresItsCookieWhenItIsConcludedOrTooLate) {
+TEST_F(PendingLoginTest, ExpiresItsCookieWhenItIsConcludedOrTooLate) {
     const utimbuf past{std::time(nullptr) - 602, std::time(nullptr) - 602};
     for (const bool isLate : {false, true}) {
         state = Start();
@@ -130,7 +139,7 @@ TEST_F(PendingLogin, ExpiresItsCookieWhenItIsConcludedOrTooLate) {
     }
 }
 
-TEST_F(PendingLogin, UsesSixteenCookieNamesAndAFreeOneFirst) {
+TEST_F(PendingLoginTest, UsesSixteenCookieNamesAndAFreeOneFirst) {
     std::string cookies;
     std::set<std::string> names;
     for (int i = 0; i < 16; ++i) {
@@ -145,26 +154,27 @@ TEST_F(PendingLogin, UsesSixteenCookieNamesAndAFreeOneFirst) {
     }
 }
 
-TEST_F(PendingLogin, IsConcludedByACookieOfAnyName) {
+TEST_F(PendingLoginTest, IsConcludedByACookieOfAnyName) {
     EXPECT_EQ(Refusal("__Host-login-" + std::string(Name()[0] == '0' ? "1" : "0") + "=" + Name(), state), "");
 }
 
-TEST_F(PendingLogin, IsRefusedUnderAnotherProfileAndWhenSwitchedOff) {
+TEST_F(PendingLoginTest, IsRefusedUnderAnotherProfileAndWhenSwitchedOff) {
     UseProfile("websphere");
     EXPECT_EQ(Refusal(Cookie(), state), "The settings of this device were changed during this sign-in.");
     state = Start();
     UseProfile("azure", false);
-    EXPECT_THROW(ConcludeLogin(response, Cookie(), state), TAVO::SSO::sso_op_failed);
+    EXPECT_THROW(End(Cookie(), state), TAVO::SSO::sso_op_failed);
 }
 
-TEST_F(PendingLogin, IsNotASession) {
-    std::filesystem::create_directory("/usr/tavo/var/frontend/sessions");
+TEST_F(PendingLoginTest, IsNotASession) {
+    std::filesystem::create_directories("/usr/tavo/var/frontend/sessions");
+    ASSERT_EQ(chmod("/usr/tavo/var/frontend", 0700), 0);
     ASSERT_EQ(chmod("/usr/tavo/var/frontend/sessions", 0700), 0);
     std::filesystem::copy_file(kFolder + Name(), "/usr/tavo/var/frontend/sessions/" + Name());
     EXPECT_FALSE(FindSession(response, "__Host-session=" + Name()));
 }
 
-TEST_F(PendingLogin, IsRefusedBeyondTheConfiguredNumber) {
+TEST_F(PendingLoginTest, IsRefusedBeyondTheConfiguredNumber) {
     constexpr std::size_t kMost = 3;
     Start("", kMost);
     Start("", kMost);
@@ -174,19 +184,19 @@ TEST_F(PendingLogin, IsRefusedBeyondTheConfiguredNumber) {
     Start("", kMost);
 }
 
-TEST_F(PendingLogin, IsRefusedWithAnotherOriginThanItWasStartedWith) {
+TEST_F(PendingLoginTest, IsRefusedWithAnotherOriginThanItWasStartedWith) {
     Json::Value changed = DecodeState(state);
     changed["origin"] = "/elsewhere";
     EXPECT_EQ(Refusal(Cookie(), Encode(WriteCompact(changed))), "This sign-in was changed on its way.");
 }
 
-TEST_F(PendingLogin, IsRefusedWithTheNonceOfAnotherLogin) {
+TEST_F(PendingLoginTest, IsRefusedWithTheNonceOfAnotherLogin) {
     Json::Value changed = DecodeState(state);
     changed["nonce"] = "another digest";
     EXPECT_EQ(Refusal(Cookie(), Encode(WriteCompact(changed))), "This sign-in was changed on its way.");
 }
 
-TEST_F(PendingLogin, IsRefusedWithoutAStateThatCanBeRead) {
+TEST_F(PendingLoginTest, IsRefusedWithoutAStateThatCanBeRead) {
     const std::string reason = "This sign-in was not started in this browser.";
     for (const std::string &text : {std::string(), std::string("[1]"), std::string("{\"csrf\":1}"),
                                     std::string("{\"csrf\":\"../sessions\"}"), std::string("not JSON")}) {
@@ -195,11 +205,18 @@ TEST_F(PendingLogin, IsRefusedWithoutAStateThatCanBeRead) {
     EXPECT_EQ(Refusal(Cookie(), "not base64"), reason);
 }
 
-TEST(State, MayFillItsBufferWithoutATerminatingNul) {
-    const std::string full = "{\"csrf\":\"" + std::string(1013, 'a') + "\"}";
-    ASSERT_EQ(full.size(), 1024U);
-    EXPECT_EQ(DecodeState(Encode(full))["csrf"].asString(), std::string(1013, 'a'));
-    EXPECT_TRUE(DecodeState(Encode(full + " ")).isNull());
+TEST(State, IsReadUpToAGenerousLength) {
+    const std::string name(1013, 'a');
+    EXPECT_EQ(DecodeState(Encode("{\"csrf\":\"" + name + "\"}"))["csrf"].asString(), name);
+    EXPECT_TRUE(DecodeState(Encode("{\"csrf\":\"" + std::string(2000, 'a') + "\"}")).isNull());
+}
+
+TEST(State, IsRefusedInAnotherEncoding) {
+    const std::string text = Encode("{\"a\":1}");
+    EXPECT_FALSE(DecodeState(text).isNull());
+    for (const std::string &other : {" " + text, text + "\n", text + "====", "=" + text, text.substr(1)}) {
+        EXPECT_TRUE(DecodeState(other).isNull()) << other;
+    }
 }
 
 }  // namespace

@@ -42,6 +42,12 @@ namespace {
 constexpr char kFolder[] = "/usr/tavo/var/frontend/things/";
 constexpr std::time_t kLifetime = 60;
 
+/// A private folder within a private folder.
+PrivateFolder OpenThings(std::size_t most = PrivateFolder::kUnlimited) {
+    const PrivateFolder parent("/usr/tavo/var/frontend", kLifetime);
+    return {"/usr/tavo/var/frontend/things", kLifetime, most};
+}
+
 class PrivateFolderTest : public testing::Test {
   protected:
     PrivateFolderTest() { std::filesystem::create_directory("/usr/tavo/var"); }
@@ -66,7 +72,7 @@ class PrivateFolderTest : public testing::Test {
 };
 
 TEST_F(PrivateFolderTest, KeepsATextUnderARandomNameForThisUserAlone) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     EXPECT_THAT(name, testing::MatchesRegex("[0-9a-f]{32}"));
     EXPECT_NE(Keep(things, "text"), name);
@@ -77,21 +83,21 @@ TEST_F(PrivateFolderTest, KeepsATextUnderARandomNameForThisUserAlone) {
 }
 
 TEST_F(PrivateFolderTest, GivesATextToOneTakerOnly) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     EXPECT_EQ(things.Take(name), "text");
     EXPECT_EQ(things.Take(name), std::nullopt);
 }
 
 TEST_F(PrivateFolderTest, ForgetsATextThatIsTooOld) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     MakeOld(name);
     EXPECT_EQ(things.Read(name), std::nullopt);
 }
 
 TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     std::ofstream(kFolder + std::string(32, 'a') + ".new") << "half of it";
     MakeOld(name);
@@ -110,7 +116,7 @@ TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
 }
 
 TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
-    PrivateFolder things("things", kLifetime, 2);
+    PrivateFolder things = OpenThings(2);
     Keep(things, "one");
     Keep(things, "two");
     const std::string name = PrivateFolder::NewName();
@@ -119,7 +125,7 @@ TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
 }
 
 TEST_F(PrivateFolderTest, KeepsNoTextThatItWouldNotRead) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     EXPECT_EQ(things.Read(Keep(things, std::string(16384, 'x'))), std::string(16384, 'x'));
     EXPECT_EQ(
         FailureOf([&] { static_cast<void>(things.Keep(PrivateFolder::NewName(), std::string(16385, 'x'))); }).type,
@@ -127,7 +133,7 @@ TEST_F(PrivateFolderTest, KeepsNoTextThatItWouldNotRead) {
 }
 
 TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = PrivateFolder::NewName();
     const rlimit none{0, RLIM_INFINITY};
     rlimit former{};
@@ -141,7 +147,7 @@ TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
 }
 
 TEST_F(PrivateFolderTest, TakesNoTextThatItCannotRemove) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     unlinkError = EROFS;
     EXPECT_EQ(FailureOf([&] { things.Take(name); }).type, kSystemError);
@@ -152,19 +158,19 @@ TEST_F(PrivateFolderTest, TakesNoTextThatItCannotRemove) {
 }
 
 TEST_F(PrivateFolderTest, OfTwoTakersOneGetsTheText) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     for (int i = 0; i < 100; ++i) {
         const std::string name = Keep(things, "text");
         std::array<bool, 2> got{};
-        std::thread other([&] { got[0] = PrivateFolder("things", kLifetime).Take(name).has_value(); });
-        got[1] = PrivateFolder("things", kLifetime).Take(name).has_value();
+        std::thread other([&] { got[0] = OpenThings().Take(name).has_value(); });
+        got[1] = OpenThings().Take(name).has_value();
         other.join();
         EXPECT_NE(got[0], got[1]);
     }
 }
 
 TEST_F(PrivateFolderTest, ReadsNothingButItsOwnFiles) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     for (const char *name : {"", ".", "../things", "/etc/passwd", "0123456789abcdef0123456789abcdeF"}) {
         EXPECT_EQ(things.Read(name), std::nullopt);
     }
@@ -174,7 +180,7 @@ TEST_F(PrivateFolderTest, ReadsNothingButItsOwnFiles) {
 }
 
 TEST_F(PrivateFolderTest, RefusesAFileThatIsNotItsOwn) {
-    PrivateFolder things("things", kLifetime);
+    PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     ASSERT_EQ(chmod((kFolder + name).c_str(), 0640), 0);
     EXPECT_EQ(FailureOf([&] { things.Read(name); }).type, kSystemError);
@@ -190,10 +196,9 @@ TEST_F(PrivateFolderTest, RefusesAFileThatIsNotItsOwn) {
 TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
     for (const char *folder : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend"}) {
         for (const mode_t mode : {0750U, 0770U, 0701U, 0755U}) {
-            PrivateFolder("things", kLifetime);
+            OpenThings();
             ASSERT_EQ(chmod(folder, mode), 0);
-            EXPECT_EQ(FailureOf([&] { PrivateFolder("things", kLifetime); }).type, kSystemError)
-                << folder << std::oct << mode;
+            EXPECT_EQ(FailureOf([&] { OpenThings(); }).type, kSystemError) << folder << std::oct << mode;
             ASSERT_EQ(chmod(folder, 0700), 0);
         }
     }
@@ -202,18 +207,18 @@ TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
 TEST_F(PrivateFolderTest, RefusesAPathThatOthersCanChange) {
     for (const mode_t mode : {0775U, 0757U, 01777U}) {
         ASSERT_EQ(chmod("/usr/tavo/var", mode), 0);
-        EXPECT_EQ(FailureOf([&] { PrivateFolder("things", kLifetime); }).type, kSystemError) << std::oct << mode;
+        EXPECT_EQ(FailureOf([&] { OpenThings(); }).type, kSystemError) << std::oct << mode;
     }
     ASSERT_EQ(chmod("/usr/tavo/var", 0755), 0);
-    PrivateFolder("things", kLifetime);
+    OpenThings();
 }
 
 TEST_F(PrivateFolderTest, FollowsNoLinkOnItsPath) {
     for (const char *name : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend", "/usr/tavo/var"}) {
-        PrivateFolder("things", kLifetime);
+        OpenThings();
         std::filesystem::rename(name, "/usr/tavo/elsewhere");
         std::filesystem::create_directory_symlink("/usr/tavo/elsewhere", name);
-        EXPECT_EQ(FailureOf([&] { PrivateFolder("things", kLifetime); }).type, kSystemError) << name;
+        EXPECT_EQ(FailureOf([&] { OpenThings(); }).type, kSystemError) << name;
         std::filesystem::remove(name);
         std::filesystem::rename("/usr/tavo/elsewhere", name);
     }

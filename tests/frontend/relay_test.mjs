@@ -107,8 +107,10 @@ test('explains an unknown algorithm whatever the token calls it', () => {
 
 const UNEXPLAINED = [ // on purpose: only an administrator can act on them
     'A header must be one printable line.', 'FRONTEND_PENDING_LOGINS must be a number above 0.',
-    "The provider's answer has no single NAME.", 'unexpected failure',
+    "The provider's answer has no single NAME.", 'This request cannot start or complete a sign-in.',
+    'unexpected failure',
 ];
+const OF_SESSIONS = 'Too many users are signed in.';
 const isUnexplained = ({about, 'thrown by': thrownBy = 'a login'}) =>
     about.endsWith(': SYSTEM') || !thrownBy.includes('login') || UNEXPLAINED.includes(about) || ALTERED.includes(about);
 
@@ -117,6 +119,10 @@ test('explains each text of the table of failures that a login ends with', () =>
     assert.ok(texts.length >= 30, `${texts.length} texts`);
     for (const text of texts) {
         assert.doesNotMatch(after({success: 'false', reason: text}).explanation, /^Something went wrong/, text);
+    }
+    // A program without the relay page shows the same sentences: <tavosso/web.h>.
+    for (const {about, sentence} of failures.filter((failure) => !isUnexplained(failure) && failure.about !== OF_SESSIONS)) {
+        assert.equal(after({success: 'false', reason: about}).explanation, sentence, about);
     }
     for (const text of UNEXPLAINED) {
         assert.ok(failures.some(({about}) => about === text), text);

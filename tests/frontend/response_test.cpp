@@ -1,11 +1,10 @@
-#include "web/response.h"
-
 #include <gmock/gmock.h>
 
 #include <stdexcept>
 
 #include "frontend/page.h"
 #include "tests/frontend/set_cookie.h"
+#include "web/web.h"
 
 using namespace Frontend;
 using namespace TAVO::Web;

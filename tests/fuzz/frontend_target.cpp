@@ -25,18 +25,21 @@ constexpr char kSession[] = "fedcba9876543210fedcba9876543210";
 constexpr char kSessionCookie[] = "__Host-session";
 constexpr char kUser[] = "CORP\\alice";
 constexpr std::time_t kSeconds = 600;
+constexpr char kFolder[] = "/usr/tavo/var/frontend";
+constexpr char kLogins[] = "/usr/tavo/var/frontend/logins";
 
 /// One login under way and one session open, whatever the last input made of them.
 void Prepare() {
     std::filesystem::create_directories("/usr/tavo/var");
     std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
     std::ofstream("/usr/tavo/etc/ssoclient/profile.conf") << R"({"sso_enable": true, "sso_profile": "azure"})";
-    TAVO::Web::PrivateFolder logins("logins", kSeconds);
+    TAVO::Web::PrivateFolder(kFolder, kSeconds);
+    TAVO::Web::PrivateFolder logins(kLogins, kSeconds);
     logins.Take(kLogin);
     Require(
         logins.Keep(kLogin, R"({"format": "login 1", "profile": "azure", "state": ")" + std::string(kState) + "\"}"),
         "there is room for a login");
-    TAVO::Web::PrivateFolder sessions("sessions", kSeconds);
+    TAVO::Web::PrivateFolder sessions("/usr/tavo/var/frontend/sessions", kSeconds);
     sessions.Take(kSession);
     Require(sessions.Keep(kSession, R"({"format": "session 1", "user": "CORP\\alice", "profile": "azure"})"),
             "there is room for a session");
@@ -156,7 +159,11 @@ void RequireDecoded(const std::string &text) {
 
 bool Concludes(const std::string &cookies, const std::string &state) {
     TAVO::Web::Response response;
-    const Test::Failure failure = FailureOf([&] { TAVO::Web::ConcludeLogin(response, cookies, state); });
+    TAVO::Web::FolderLoginStore store(kLogins);
+    std::string origin;
+    const Test::Failure failure = FailureOf([&] {
+        TAVO::Web::EndLogin(response, origin, {"GET", "", cookies}, store, state);
+    });
     RequireOneOf(failure, {Test::kNothingThrown,
                            Test::Fails<TAVO::Web::Refusal>("This sign-in was not started in this browser."),
                            Test::Fails<TAVO::Web::Refusal>("This sign-in took too long, or was already completed."),

@@ -8,7 +8,7 @@
 #include <ostream>
 #include <stdexcept>
 
-#include "doctor/failure_lookup.h"
+#include "web/failure_lookup.h"
 
 namespace Test {
 
@@ -27,15 +27,16 @@ std::string NameInTable(std::string name) {
 bool IsText(const std::string &type, const std::string &text, const char *ofTable) {
     // The text begins with the token's "alg", and what() ends at a NUL in it.
     const bool isCut = type == "jwt_not_support" && text.find(' ') == std::string::npos;
-    return std::string(ofTable) == "CURL" ? Doctor::FindTransferText(text) != CURLE_OK
-                                          : isCut || Doctor::IsText(text, ofTable);
+    return std::string(ofTable) == "CURL" ? TAVO::Web::FindTransferText(text) != CURLE_OK
+                                          : isCut || TAVO::Web::IsText(text, ofTable);
 }
 
 bool IsInTable(const std::string &type, const std::string &text) {
     const bool isOfFrontEnd = type == "TAVO::Web::Refusal" || type == "std::system_error";
-    const Doctor::FailureKind kind = isOfFrontEnd ? Doctor::FailureKind::kReason : Doctor::FailureKind::kException;
-    const std::vector<Doctor::Failure> &rows = Doctor::Failures();
-    return std::any_of(rows.begin(), rows.end(), [&](const Doctor::Failure &row) {
+    const TAVO::Web::FailureKind kind =
+        isOfFrontEnd ? TAVO::Web::FailureKind::kReason : TAVO::Web::FailureKind::kException;
+    const std::vector<TAVO::Web::FailureRow> &rows = TAVO::Web::FailureTable();
+    return std::any_of(rows.begin(), rows.end(), [&](const TAVO::Web::FailureRow &row) {
         return row.kind == kind && (isOfFrontEnd || type == row.type) &&
                (row.texts.empty() || std::any_of(row.texts.begin(), row.texts.end(),
                                                  [&](const char *ofTable) { return IsText(type, text, ofTable); }));
@@ -59,7 +60,7 @@ std::string ClassOf(const std::exception &error) {
 void RequireInTable(const std::exception &error) {
     const std::string type = ClassOf(error);
     if (!IsInTable(NameInTable(type), error.what())) {
-        throw std::logic_error("doctor/failure_table.cpp has no row for " + type + ": " + error.what());
+        throw std::logic_error("web/failure_table.cpp has no row for " + type + ": " + error.what());
     }
 }
 

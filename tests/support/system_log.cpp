@@ -11,7 +11,7 @@
 #include <regex>
 #include <stdexcept>
 
-#include "doctor/failure_lookup.h"
+#include "web/failure_lookup.h"
 
 namespace Test {
 
@@ -59,12 +59,13 @@ std::string LevelOf(int priority) {
 bool IsInTable(const LogLine &line) {
     const auto isText = [&](const char *ofTable) {
         // What is behind the source in a line of this text can only be libcurl's.
-        const bool isCurls = std::strstr(ofTable, "CURL") == nullptr || Doctor::FindTransferText(line.text) != CURLE_OK;
-        return isCurls && Doctor::IsText(line.text, ofTable);
+        const bool isCurls =
+            std::strstr(ofTable, "CURL") == nullptr || TAVO::Web::FindTransferText(line.text) != CURLE_OK;
+        return isCurls && TAVO::Web::IsText(line.text, ofTable);
     };
-    const std::vector<Doctor::Failure> &rows = Doctor::Failures();
-    return std::any_of(rows.begin(), rows.end(), [&](const Doctor::Failure &row) {
-        return row.kind <= Doctor::FailureKind::kFrontEndLine && LevelOf(line.priority) == row.type &&
+    const std::vector<TAVO::Web::FailureRow> &rows = TAVO::Web::FailureTable();
+    return std::any_of(rows.begin(), rows.end(), [&](const TAVO::Web::FailureRow &row) {
+        return row.kind <= TAVO::Web::FailureKind::kFrontEndLine && LevelOf(line.priority) == row.type &&
                std::any_of(row.texts.begin(), row.texts.end(), isText);
     });
 }
@@ -83,7 +84,7 @@ std::vector<LogLine> TakeSystemLog() {
     const std::vector<LogLine> taken = TakeSystemLogWithOwnTexts();
     for (const LogLine &line : taken) {
         if (!IsInTable(line)) {
-            throw std::logic_error("doctor/failure_table.cpp has no row for a line of level " + LevelOf(line.priority) +
+            throw std::logic_error("web/failure_table.cpp has no row for a line of level " + LevelOf(line.priority) +
                                    ": " + line.text);
         }
     }

@@ -1,12 +1,16 @@
-// A program of one's own beside the provider that `./demo provider` serves: the program of the README signs users in.
+// A program of one's own beside the provider that `./demo provider` serves: the program of the README signs users
+// in, and withstands what may come back.
 // Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {spawn, spawnSync} from 'node:child_process';
-import {copyFileSync, readFileSync} from 'node:fs';
+import {once} from 'node:events';
+import {copyFileSync, mkdirSync, mkdtempSync, readFileSync, rmSync, writeFileSync} from 'node:fs';
 import {createInterface} from 'node:readline';
 import {fileURLToPath} from 'node:url';
-import {after, describe, test} from 'node:test';
+import {after, afterEach, describe, test} from 'node:test';
 
+import {makeAuthority} from '../site/certificate_authority.mjs';
+import {collectSystemLog} from '../site/syslog_collector.mjs';
 import {Browser} from './browser.mjs';
 
 const [webroot, nodeModules] = process.argv.slice(2);
@@ -30,6 +34,7 @@ async function startProvider(profile) {
         }
     }
     copyFileSync(authority, SYSTEM_BUNDLE);
+    mkdirSync('/usr/tavo/var', {recursive: true}); // the program makes its folder in it
     return {server, passwords, authority: readFileSync(authority)};
 }
 
@@ -41,22 +46,63 @@ function ask(query, cookie = '') {
     return Object.fromEntries(stdout.trim().split('\n').map((line) => line.split(/: (.*)/s).slice(0, 2)));
 }
 
-describe('A program of one\'s own', () => {
-    const servers = [];
-    after(() => servers.forEach((server) => server.kill('SIGINT')));
+const cookieOf = (answer) => answer['Set-Cookie'].split(';')[0];
+const isReturn = (url) => url.href.startsWith(REDIRECT_URI);
+
+describe('A program of one\'s own', async () => {
+    const log = await collectSystemLog(() => {});
+    const folder = mkdtempSync('/tmp/own-program-');
+    let provider;
+    after(() => log.stop());
+    afterEach(() => provider.server.kill('SIGINT'));
+
+    /** Signs a user in at the provider; gives the query and the cookies with which the browser comes back. */
+    async function signIn(login) {
+        const browser = new Browser(provider.authority, () => {});
+        const start = ask('');
+        const form = await browser.open(start.Location);
+        const {next} = await browser.submit(form, {login, password: provider.passwords.get(login)}, isReturn);
+        return {query: next.search.slice(1), parameters: next.searchParams, cookie: cookieOf(start)};
+    }
+
+    async function isRefused(query, cookie, code) {
+        assert.match(ask(query, cookie).Location, /success=false$/);
+        await log.until(new RegExp(`^sso\\.cgi: sign-in failed \\(${code}\\): `));
+    }
 
     for (const profile of ['azure', 'websphere']) {
-        test(`signs a user in under profile ${profile}`, async () => {
-            const {server, passwords, authority} = await startProvider(profile);
-            servers.push(server);
-            const browser = new Browser(authority, () => {});
-            const start = ask('');
-            const form = await browser.open(start.Location);
-            const isReturn = (url) => url.href.startsWith(REDIRECT_URI);
-            const {next} = await browser.submit(form, {login: 'alice', password: passwords.get('alice')}, isReturn);
-            const cookie = start['Set-Cookie'].split(';')[0];
-            assert.match(ask(next.search.slice(1)).Location, /success=false$/); // without its cookie
-            assert.match(ask(next.search.slice(1), cookie).Location, /success=true$/);
+        test(`signs users in under profile ${profile}, and withstands attacks`, async () => {
+            provider = await startProvider(profile);
+            const alice = await signIn('alice');
+            const bob = await signIn('bob');
+            await isRefused(alice.query, '', 'other_browser');
+            await isRefused(alice.query, bob.cookie, 'other_browser');
+            const stolenCode = new URLSearchParams({code: alice.parameters.get('code'), state: bob.parameters.get('state')});
+            await isRefused(stolenCode.toString(), bob.cookie, 'other_login');
+            await isRefused(bob.query, bob.cookie, 'login_expired');
+            const carol = await signIn('alice');
+            assert.match(ask(carol.query, carol.cookie).Location, /success=true$/);
+            await isRefused(carol.query, carol.cookie, 'login_expired');
         });
     }
+
+    test('tells the network from a certificate', async () => {
+        provider = await startProvider('azure');
+        const first = await signIn('alice');
+        const second = await signIn('alice');
+        copyFileSync(makeAuthority(folder).file, SYSTEM_BUNDLE);
+        await isRefused(first.query, first.cookie, 'certificate');
+        const ended = once(provider.server, 'exit');
+        provider.server.kill('SIGINT');
+        await ended;
+        await isRefused(second.query, second.cookie, 'network');
+    });
+
+    test('reports what is not set up', async () => {
+        provider = await startProvider('azure');
+        rmSync('/usr/tavo/etc/ssoclient/azure.conf');
+        await isRefused('', '', 'not_set_up');
+        writeFileSync('/usr/tavo/etc/ssoclient/profile.conf', '{"sso_enable": false}');
+        await isRefused('', '', 'switched_off');
+    });
 });

@@ -54,7 +54,7 @@ export class Walk {
     async isRefusedByReadmeProgram(browser, address) {
         const view = await this.#runRelayScript(browser, await browser.open(address));
         assert.equal(view.headline, 'You could not be signed in');
-        await this.log.until(/^sso\.cgi: sign-in failed$/);
+        await this.log.until(/^sso\.cgi: sign-in failed \(other_browser\): /);
         assert.equal(this.#tokenRequests(), 0, 'a token request was made');
     }
 

@@ -1,8 +1,13 @@
-// guide_logout.cpp: ends the session here and, for Azure, at the provider.
-#include "guide_request.h"
+// logout.cgi: ends the session here and, for Azure, at the provider.
+#include <tavosso/sso.h>
+
+#include <cstdlib>
+#include <iostream>
+#include <string>
 
 int main() {
-    if (Variable("REQUEST_METHOD") != "POST") {
+    const char *method = std::getenv("REQUEST_METHOD");
+    if (method == nullptr || std::string(method) != "POST") {
         std::cout << "Status: 405 Method Not Allowed\nAllow: POST\n\n";
         return 0;
     }
@@ -14,6 +19,6 @@ int main() {
     if (profile.GetSSOProfile() == "azure" && !profile.GetSSOClient()->GetLogoutEndpoint().empty() && !site.empty()) {
         next = TAVO::SSO::GetAzureSSOLogoutURL(site + "/index.cgi");
     }
-    // Not "Location": browsers hold a redirect that follows a form against the page's form-action.
+    // Not "Location": browsers compare a redirect that follows a form with the page's form-action.
     std::cout << "Cache-Control: no-store\nRefresh: 0; url=" << next << "\nContent-Type: text/plain\n\nSigning out\n";
 }

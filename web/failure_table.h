@@ -1,13 +1,15 @@
-#ifndef TAVOSSO_DOCTOR_FAILURE_TABLE_H
-#define TAVOSSO_DOCTOR_FAILURE_TABLE_H
+#ifndef TAVOSSO_WEB_FAILURE_TABLE_H
+#define TAVOSSO_WEB_FAILURE_TABLE_H
 
 #include <curl/curl.h>
 
 #include <vector>
 
+#include "web/web.h"
+
 // Every failure that the library, the platform's stand-in and the front end report, with its cause and its remedy. The
 // documents and `tavosso-doctor explain` print this table, and the tests compare it with what is thrown and logged.
-namespace Doctor {
+namespace TAVO::Web {
 
 enum class FailureKind {
     kLibraryLine,   // of the system log
@@ -21,12 +23,14 @@ enum class FailureKind {
 /// In the table, a provider's error answer (RFC 6749, section 5.2), which the library throws as a text.
 constexpr char kErrorAnswer[] = "{... \"error\": ...}";
 
-struct Failure {
+struct FailureRow {
     FailureKind kind;
 
     /// Words in capitals are placeholders: see failure_lookup.h. Of a transfer, the name of its CURLcode. Empty where
     /// the text is another library's.
     std::vector<const char *> texts;
+
+    Failure code;  // of a login that ends so
 
     const char *cause;  // a key, file, path or command is in backticks
     const char *remedy;
@@ -35,8 +39,8 @@ struct Failure {
     CURLcode result = CURLE_OK;  // of a transfer
 };
 
-const std::vector<Failure> &Failures();
+const std::vector<FailureRow> &FailureTable();
 
-}  // namespace Doctor
+}  // namespace TAVO::Web
 
 #endif

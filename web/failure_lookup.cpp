@@ -1,4 +1,4 @@
-#include "doctor/failure_lookup.h"
+#include "web/failure_lookup.h"
 
 #include <algorithm>
 #include <boost/algorithm/string/predicate.hpp>
@@ -7,7 +7,7 @@
 #include <cctype>
 #include <iterator>
 
-namespace Doctor {
+namespace TAVO::Web {
 
 namespace {
 
@@ -90,9 +90,9 @@ std::size_t Specificity(const char *ofTable) {
     return characters;
 }
 
-const Failure *FindTransfer(CURLcode result) {
-    const std::vector<Failure> &rows = Failures();
-    const auto row = std::find_if(rows.begin(), rows.end(), [&](const Failure &failure) {
+const FailureRow *FindTransfer(CURLcode result) {
+    const std::vector<FailureRow> &rows = FailureTable();
+    const auto row = std::find_if(rows.begin(), rows.end(), [&](const FailureRow &failure) {
         return failure.kind == FailureKind::kTransfer && failure.result == result;
     });
     return row != rows.end() ? &*row : nullptr;
@@ -113,4 +113,4 @@ CURLcode FindTransferText(const std::string &text) {
     return found;
 }
 
-}  // namespace Doctor
+}  // namespace TAVO::Web

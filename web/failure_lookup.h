@@ -1,14 +1,14 @@
-#ifndef TAVOSSO_DOCTOR_FAILURE_TEXT_H
-#define TAVOSSO_DOCTOR_FAILURE_TEXT_H
+#ifndef TAVOSSO_WEB_FAILURE_TEXT_H
+#define TAVOSSO_WEB_FAILURE_TEXT_H
 
 #include <cstddef>
 #include <string>
 
-#include "doctor/failure_table.h"
+#include "web/failure_table.h"
 
 // Which text of the table of failures a real text is. In a text of the table, a placeholder matches anything; JSON
 // alone matches a provider's error answer (RFC 6749, section 5.2).
-namespace Doctor {
+namespace TAVO::Web {
 
 constexpr const char *kPlaceholders[] = {"N",   "CURL", "SYSTEM", "NAME",   "UID",
                                          "GID", "ALG",  "SOURCE", "REASON", "DOMAIN"};
@@ -23,11 +23,11 @@ bool EndsInText(const std::string &line, const char *ofTable);
 std::size_t Specificity(const char *ofTable);
 
 /// The row of a failed transfer; null if the table has none.
-const Failure *FindTransfer(CURLcode result);
+const FailureRow *FindTransfer(CURLcode result);
 
 /// The result whose text, in the words of libcurl 7 or 8, is in `text`; CURLE_OK if there is none.
 CURLcode FindTransferText(const std::string &text);
 
-}  // namespace Doctor
+}  // namespace TAVO::Web
 
 #endif

@@ -1,0 +1,27 @@
+#include "frontend/folders.h"
+
+#include "frontend/environment.h"
+
+namespace Frontend {
+
+namespace {
+
+constexpr char kFolder[] = "/usr/tavo/var/frontend";
+constexpr std::time_t kSessionSeconds = std::time_t{8} * 60 * 60;
+constexpr std::size_t kMostSessions = 10000;
+
+/// Makes the front end's own folder if it is missing.
+std::string FolderNamed(const std::string &name) {
+    const TAVO::Web::PrivateFolder folder(kFolder, 0);
+    return kFolder + ("/" + name);
+}
+
+}  // namespace
+
+TAVO::Web::FolderLoginStore OpenLogins() {
+    return TAVO::Web::FolderLoginStore(FolderNamed("logins"), MostPendingLogins());
+}
+
+TAVO::Web::PrivateFolder OpenSessions() { return {FolderNamed("sessions"), kSessionSeconds, kMostSessions}; }
+
+}  // namespace Frontend

@@ -1,0 +1,240 @@
+/**
+ * @file
+ * A secure sign-in for a web front end: what a program needs around the library's login. Link `tavosso::web` with
+ * CMake, or `tavosso-web` with pkg-config.
+ */
+#ifndef TAVOSSO_WEB_WEB_H
+#define TAVOSSO_WEB_WEB_H
+
+#include <json/json.h>
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+/**
+ * The relying party's checks that belong to the front end (OpenID Connect Core 1.0, section 3.1). `StartLogin` and
+ * `FinishLogin` take and return plain values: they fit CGI, FastCGI and any web framework. They keep no global state
+ * and write nothing but log lines. One thread at a time, as for `sso.h`.
+ */
+namespace TAVO::Web {
+
+/** A request of the browser. */
+struct Request {
+    std::string method;   ///< such as "GET"
+    std::string query;    ///< without its "?", percent-encoded as received
+    std::string cookies;  ///< the Cookie header; empty if there is none
+};
+
+/**
+ * The response to the browser. Every response starts with the headers that keep it out of caches, frames and referrers.
+ */
+class Response {
+  public:
+    std::string status = "200 OK";                             ///< status code and reason phrase
+    std::vector<std::pair<std::string, std::string>> headers;  ///< names and values, in order
+    std::string body;                                          ///< empty for a redirect
+
+    Response();
+
+    /**
+     * Adds a header.
+     * @param name   of the header
+     * @param value  one printable line of UTF-8
+     * @throws std::invalid_argument  for another value; nothing is added then
+     */
+    void AddHeader(const std::string &name, const std::string &value);
+
+    /**
+     * Sets a cookie for this host, over TLS, out of reach of scripts: Path=/, Secure, HttpOnly, SameSite=Lax.
+     * @param name   with the prefix "__Host-"
+     * @param value  of the cookie
+     * @param more   further attributes, such as "; Max-Age=600". Without a Max-Age the cookie ends with the browser
+     * @throws std::invalid_argument  as `AddHeader`
+     */
+    void SetCookie(const std::string &name, const std::string &value, const std::string &more = "");
+
+    /** Expires a cookie. @param name  of the cookie. @throws std::invalid_argument  as `AddHeader` */
+    void ExpireCookie(const std::string &name);
+
+    /**
+     * Redirects the browser, with status 302.
+     * @param address  an absolute URL, or a path of this site
+     * @throws std::invalid_argument  as `AddHeader`; the status is unchanged then
+     */
+    void Redirect(const std::string &address);
+};
+
+/** Remembers logins between start and return. Several requests may use the same store at once. */
+class LoginStore {
+  public:
+    virtual ~LoginStore();
+
+    /**
+     * Remembers a login for `kLoginSeconds`.
+     * @param name  32 lowercase hexadecimal digits, never used before
+     * @param text  the login, up to 4 KB
+     * @return false, and remembers nothing, if no more logins fit
+     */
+    [[nodiscard]] virtual bool Keep(const std::string &name, const std::string &text) = 0;
+
+    /**
+     * Returns a login and forgets it. Of two requests that take the same login, one gets it.
+     * @param name  as given to `Keep`, or any text of a browser's choice
+     * @return the text; nothing if it is unknown, taken or too old
+     */
+    virtual std::optional<std::string> Take(const std::string &name) = 0;
+};
+
+constexpr int kLoginSeconds = 600;          ///< how long a user may take to sign in
+constexpr std::size_t kMostLogins = 1'000;  ///< how many logins a folder remembers, unless told otherwise
+
+/** Remembers each login in a file that only the program's user can read. */
+class FolderLoginStore : public LoginStore {
+  public:
+    /**
+     * @param folder  an absolute path. Its parent must exist, and only root or the program's user may be able to change
+     *                the path. The folder is made, with mode 0700, when it is first used
+     * @param most    how many logins it remembers at a time
+     */
+    explicit FolderLoginStore(std::string folder, std::size_t most = kMostLogins);
+
+    /**
+     * As `LoginStore::Keep`. Removes files that are too old, at most once a minute unless the folder is full.
+     * @param name  as for `LoginStore::Keep`
+     * @param text  as for `LoginStore::Keep`
+     * @return as `LoginStore::Keep`
+     * @throws std::system_error  if the system refuses, or another user can read the folder or change its path
+     */
+    [[nodiscard]] bool Keep(const std::string &name, const std::string &text) override;
+
+    /**
+     * As `LoginStore::Take`.
+     * @param name  as for `LoginStore::Take`
+     * @return as `LoginStore::Take`
+     * @throws std::system_error  as `Keep`
+     */
+    std::optional<std::string> Take(const std::string &name) override;
+
+  private:
+    std::string folder_;
+    std::size_t most_;
+};
+
+/** Why a login failed. The names that `NameOf` returns are stable; a later version may add some. */
+enum class Failure {
+    kSwitchedOff,       ///< "switched_off": single sign-on is off, or profile.conf is missing or not JSON
+    kNotSetUp,          ///< "not_set_up": the profile is unknown, or a setting of its client is empty
+    kNotPermitted,      ///< "not_permitted": the program may not read a configuration file
+    kTooManyLogins,     ///< "too_many_logins": the store is full
+    kStorage,           ///< "storage": the store failed
+    kInvalidRequest,    ///< "invalid_request": method, state or code are not those of a return
+    kOtherBrowser,      ///< "other_browser": this browser did not start the login
+    kLoginExpired,      ///< "login_expired": the login took too long, or was already completed
+    kStateChanged,      ///< "state_changed": the state is not the one that was sent
+    kProfileChanged,    ///< "profile_changed": another profile is in force than at the start
+    kProviderRefused,   ///< "provider_refused": the provider reported an error; see `FailedLogin::providerError`
+    kNetwork,           ///< "network": a request to the provider failed
+    kCertificate,       ///< "certificate": the provider's certificate was refused
+    kInvalidResponse,   ///< "invalid_response": the provider's answer is not usable
+    kInvalidToken,      ///< "invalid_token": the ID token is malformed, or has another audience or algorithm
+    kTokenExpired,      ///< "token_expired": the ID token has expired, or this machine's clock is wrong
+    kOtherTenant,       ///< "other_tenant": the account belongs to another organisation
+    kUnknownKey,        ///< "unknown_key": the provider does not publish the key that signed the token
+    kInvalidSignature,  ///< "invalid_signature": the signature of the ID token is wrong
+    kOtherLogin,        ///< "other_login": the ID token was issued for another login
+    kUserName,          ///< "user_name": the ID token has no usable name
+    kUnverifiedEmail,   ///< "unverified_email": the provider has not verified the e-mail address that names the user
+    kUnknownDomain,     ///< "unknown_domain": the appliance does not know the user's domain
+    kInternal,          ///< "internal": anything else, such as want of memory
+};
+
+/** Returns the stable name of a failure. @param failure  any. @return as documented at its enumerator */
+std::string NameOf(Failure failure);
+
+/** A login that failed. */
+struct FailedLogin {
+    Failure failure = Failure::kInternal;  ///< the code
+    std::string reason;  ///< one printable line for the log, without secrets; the library's texts are fixed
+    std::string
+        providerError;     ///< the provider's "error" (RFC 6749, sections 4.1.2.1 and 5.2); empty for other failures
+    std::string sentence;  ///< one sentence for the user, in English
+    std::string hint;      ///< what an administrator can do
+};
+
+/**
+ * Describes an exception of the library, for programs that call it themselves.
+ * @param error  any exception
+ * @return the failure; its texts contain no secret
+ */
+FailedLogin FailedLoginOf(const std::exception &error);
+
+/** A login that was started, or was not. */
+struct StartedLogin {
+    Response response;                   ///< sends the browser to the provider; of a failed start only its headers
+    std::optional<FailedLogin> failure;  ///< nothing if the login was started
+};
+
+/**
+ * Starts a login: chooses the client of the profile in force, remembers the login in the store, ties it to the browser
+ * by a cookie, and sends the browser to the provider. A browser can sign in in several tabs at once: 16 cookies are
+ * used, each for one login.
+ *
+ * @param request  of the browser, with method GET
+ * @param store    remembers the login
+ * @param origin   the page to return to; a path of this site, else "/index.cgi"
+ * @return the response, and the failure if there is one. Failures of the store, of the configuration and of the system
+ *         are returned, not thrown
+ *
+ * Log lines and side effects: those of the clients' construction and of `GetAccessTokenReqURI` in `sso.h`.
+ */
+StartedLogin StartLogin(const Request &request, LoginStore &store, const std::string &origin);
+
+/** The user of a login that was finished. */
+struct User {
+    std::string name;         ///< the appliance's name for the user; printable, never empty
+    std::string displayName;  ///< the claim "name" on one printable line; may be empty
+    std::string profile;      ///< "azure" or "websphere"
+    Json::Value claims;       ///< all claims of the verified ID token
+};
+
+/** How a login ended. */
+struct FinishedLogin {
+    Response response;                   ///< expires the login's cookie; the caller adds the session and a redirect
+    std::optional<User> user;            ///< the user, if the login succeeded
+    std::optional<FailedLogin> failure;  ///< else the failure
+    std::string origin;                  ///< the page to return to; empty if the state is not the one that was sent
+    std::string state;                   ///< as received, percent-decoded: for `GetSSORelayURL`
+};
+
+/** What the caller accepts. */
+struct FinishOptions {
+    /** Whether "email" names an Azure user although the provider has not verified it. Often the user chooses it. */
+    bool acceptUnverifiedEmail = false;
+};
+
+/**
+ * Finishes a login at the redirect URI. It refuses the return unless this browser started the login, within
+ * `kLoginSeconds`, has not finished it before, returns the state unchanged, and the same profile is in force. Then it
+ * exchanges the code, verifies the ID token, and refuses a token of another login (nonce) and a name that cannot be
+ * trusted. Open the session for `user` afterwards, under a new random name.
+ *
+ * @param request  of the browser, with method GET
+ * @param store    as given to `StartLogin`
+ * @param options  what to accept
+ * @return the user or the failure; failures are returned, not thrown
+ *
+ * Log lines: those of the library's steps; and, at `LOG_AUTH | LOG_ERR`, "frontend: jwks_uri of the discovery document
+ * is not an https:// URL": key sets are fetched over HTTPS only. Side effects: those of `OpenIDConnectLogin` in
+ * `sso.h`. Where the provider's answer or key is missing, it is asked once more, without secrets, to find out why.
+ */
+FinishedLogin FinishLogin(const Request &request, LoginStore &store, const FinishOptions &options = {});
+
+/** Escapes a text for element content and quoted attribute values of HTML. @param text  any. @return the HTML */
+std::string EscapeHtml(const std::string &text);
+
+}  // namespace TAVO::Web
+
+#endif
