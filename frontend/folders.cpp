@@ -12,7 +12,7 @@ constexpr std::size_t kMostSessions = 10000;
 
 /// Makes the front end's own folder if it is missing.
 std::string FolderNamed(const std::string &name) {
-    const TAVO::Web::PrivateFolder folder(kFolder, 0);
+    static_cast<void>(TAVO::Web::PrivateFolder(kFolder, 0));
     return kFolder + ("/" + name);
 }
 

@@ -157,11 +157,10 @@ std::string NameOf(Failure failure);
 /** A login that failed. */
 struct FailedLogin {
     Failure failure = Failure::kInternal;  ///< the code
-    std::string reason;  ///< one printable line for the log, without secrets; the library's texts are fixed
-    std::string
-        providerError;     ///< the provider's "error" (RFC 6749, sections 4.1.2.1 and 5.2); empty for other failures
-    std::string sentence;  ///< one sentence for the user, in English
-    std::string hint;      ///< what an administrator can do
+    std::string reason;         ///< one printable line for the log, without secrets; the library's texts are fixed
+    std::string providerError;  ///< the provider's "error" (RFC 6749, section 5.2); empty for other failures
+    std::string sentence;       ///< one sentence for the user, in English
+    std::string hint;           ///< what an administrator can do
 };
 
 /**

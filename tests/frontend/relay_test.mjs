@@ -121,7 +121,8 @@ test('explains each text of the table of failures that a login ends with', () =>
         assert.doesNotMatch(after({success: 'false', reason: text}).explanation, /^Something went wrong/, text);
     }
     // A program without the relay page shows the same sentences: <tavosso/web.h>.
-    for (const {about, sentence} of failures.filter((failure) => !isUnexplained(failure) && failure.about !== OF_SESSIONS)) {
+    const ofLogins = failures.filter((failure) => !isUnexplained(failure) && failure.about !== OF_SESSIONS);
+    for (const {about, sentence} of ofLogins) {
         assert.equal(after({success: 'false', reason: about}).explanation, sentence, about);
     }
     for (const text of UNEXPLAINED) {
