@@ -8,7 +8,7 @@
 
 #include "web/failure_table.h"
 
-// What the table of failures has about a text, and the table itself, as they are printed.
+// Prints the table of failures, and what it has about a text. The texts are in web/failure_table.cpp.
 namespace Doctor {
 
 struct Explanation {

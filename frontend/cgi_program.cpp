@@ -19,6 +19,10 @@
 
 namespace Frontend {
 
+// In seconds. The web server's own limit, 60 s (lighttpd.conf), is shorter and answers the browser. lighttpd 1.4.69
+// does not apply it to a request that arrives together with its connection.
+const unsigned int kLongestRun = 70;
+
 namespace {
 
 // An endless answer of the provider ends the program, not the machine.

@@ -9,9 +9,8 @@ namespace Frontend {
 
 namespace Web = TAVO::Web;
 
-// In seconds. The web server's own limit, 60 s (lighttpd.conf), is shorter and answers the browser. lighttpd 1.4.69
-// does not apply it to a request that arrives together with its connection.
-constexpr unsigned int kLongestRun = 70;
+/// After how many seconds a program ends itself.
+extern const unsigned int kLongestRun;
 
 /**
  * The main function of a CGI program. What `serve` throws becomes one line in the log and a relay page with a reason. A

@@ -16,7 +16,8 @@
 /** The token format that ID tokens have. */
 namespace TAVO::JWT {
 
-/** Root of the token failures; never thrown by itself. Malformed tokens are `std::invalid_argument`, not of this kind.
+/** Root of the token failures; only classes derived from it are thrown. Malformed tokens are `std::invalid_argument`,
+ * not of this kind.
  */
 class jwt_exception : public std::runtime_error {
   public:
@@ -63,7 +64,7 @@ class Jwt {
      * @return the header, parsed afresh: any JSON value, not only an object
      *
      * @throws std::invalid_argument  "bad jwt header format!": not JSON
-     * @throws std::logic_error  (itself) "empty jwt part": the part is empty, or memory runs out over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the part is empty, or memory runs out over it
      */
     Json::Value GetHeader();
 
@@ -73,7 +74,7 @@ class Jwt {
      * @return the claims, parsed afresh: any JSON value, not only an object
      *
      * @throws std::invalid_argument  "bad jwt body format!": not JSON
-     * @throws std::logic_error  (itself) "empty jwt part": the part is empty, or memory runs out over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the part is empty, or memory runs out over it
      */
     Json::Value GetBody();
 

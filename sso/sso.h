@@ -48,8 +48,8 @@
 namespace TAVO::SSO {
 
 /**
- * Root of the failures of single sign-on. Thrown by itself only by `OIDCLogin`, for a profile that is not supported:
- * a caller that catches `sso_op_failed` alone does not see that one.
+ * Root of the failures of single sign-on. Only `OIDCLogin` throws exactly this class, for a profile that is not
+ * supported: a caller that catches `sso_op_failed` alone does not see that one.
  */
 class sso_exception : public std::runtime_error {
   public:
@@ -246,8 +246,8 @@ class AzureSSOClient : public SSOClient {
      * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "tenant ID
      * invalid"; "client ID invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be
      * fetched); "RSA public 'n' cannot be found!", "RSA public 'e' cannot be found!"
-     * @throws std::logic_error  (itself) "empty jwt part": header or body of the token is empty, or memory runs out
-     * over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": header or body of the token is empty, or memory
+     * runs out over it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not RS256, RS384 or RS512
      * @throws TAVO::JWT::jwt_verify_failed  "verify rsa signature failed"
      *
@@ -275,7 +275,8 @@ class AzureSSOClient : public SSOClient {
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
      *         (`VerifyIDToken`); "cannot find the user name!" (neither claim is a string); "cannot get the user name!"
      *         (not exactly one at sign)
-     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
+     * out over it
      * @throws sso_op_failed  "TAVOWinsUserNameFqdn2Netbios failed.": the platform does not know the domain
      */
     void GetUserName(std::string &userName) override;
@@ -298,7 +299,8 @@ class AzureSSOClient : public SSOClient {
      * @param info  receives the decoded body; untouched on failure
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
+     * out over it
      */
     void GetUserInfo(Json::Value &info);
 
@@ -376,8 +378,8 @@ class WebSphereSSOClient : public SSOClient {
      * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
      * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "client ID
      * invalid"
-     * @throws std::logic_error  (itself) "empty jwt part": header or body of the token is empty, or memory runs out
-     * over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": header or body of the token is empty, or memory
+     * runs out over it
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
      * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes
      * @throws TAVO::JWT::jwt_verify_failed  "verify hmac signature failed", also under an empty client secret
@@ -394,7 +396,8 @@ class WebSphereSSOClient : public SSOClient {
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
      *         (`VerifyIDToken`); "cannot find the user name!": "sub" is missing or not a string
-     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
+     * out over it
      */
     void GetUserName(std::string &userName) override;
 
@@ -415,7 +418,8 @@ class WebSphereSSOClient : public SSOClient {
      * @param claims  receives the decoded body; untouched on failure
      *
      * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  (itself) "empty jwt part": the body of the token is empty, or memory runs out over it
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
+     * out over it
      */
     void GetUserInfo(Json::Value &claims);
 
@@ -476,7 +480,7 @@ class SSOProfile {
  * @param userName  receives the user's name; see the client's `GetUserName` for what it holds after a failure
  *
  * @throws sso_op_failed  "read profile file failed."; "sso does not enable."; "not specify sso profile"
- * @throws sso_exception  (itself) "profile not support."
+ * @throws sso_exception  (exactly this class) "profile not support."
  * What the client's construction and its `OpenIDConnectLogin` throw passes through.
  *
  * Log lines and side effects: those of the client's construction, which raises the process's ids for a moment, and of

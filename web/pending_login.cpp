@@ -13,6 +13,8 @@
 
 namespace TAVO::Web {
 
+const int kLoginSeconds = 600;
+
 namespace {
 
 constexpr char kFormat[] = "login 1";

@@ -88,7 +88,7 @@ class LoginStore {
     virtual std::optional<std::string> Take(const std::string &name) = 0;
 };
 
-constexpr int kLoginSeconds = 600;          ///< how long a user may take to sign in
+extern const int kLoginSeconds;             ///< how long a user may take to sign in
 constexpr std::size_t kMostLogins = 1'000;  ///< how many logins a folder remembers, unless told otherwise
 
 /** Remembers each login in a file that only the program's user can read. */
