@@ -30,8 +30,8 @@ void Fail(Web::Response &response, const Web::FailedLogin &failed) {
 int main() {
     const Web::Request request{Variable("REQUEST_METHOD"), Variable("QUERY_STRING"), Variable("HTTP_COOKIE")};
     Web::FolderLoginStore logins("/usr/tavo/var/sso");
-    if (request.query.empty()) {
-        Web::StartedLogin started = StartLogin(request, logins, "/index.cgi");
+    if (!IsReturn(request)) {
+        Web::StartedLogin started = StartLogin(request, logins);
         if (started.failure) {
             Fail(started.response, *started.failure);
         }

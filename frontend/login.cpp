@@ -2,8 +2,7 @@
 #include "frontend/cgi_program.h"
 #include "frontend/environment.h"
 #include "frontend/folders.h"
-#include "web/request.h"
-#include "web/text.h"
+#include "web/web.h"
 
 namespace Web = TAVO::Web;
 
@@ -14,13 +13,11 @@ void GoToProvider(Web::Response &response) {
         response.Redirect("/index.cgi");
         return;
     }
-    const Web::Request request = Frontend::ReceivedRequest();
-    const std::string origin = Web::OnlyValue(Web::ParseQuery(request.query), "origin").value_or("");
     Web::FolderLoginStore logins = Frontend::OpenLogins();
-    const Web::StartedLogin started = StartLogin(request, logins, origin);
+    const Web::StartedLogin started = StartLogin(Frontend::ReceivedRequest(), logins);
     response = started.response;
     if (started.failure) {
-        Frontend::Fail(response, started.failure->reason, Web::SafeOrigin(origin));
+        Frontend::Fail(response, started.failure->reason, started.origin);
     }
 }
 

@@ -5,7 +5,7 @@
 
 #include <string>
 
-// The profile in force, for logins that need the client itself.
+// The configured profile and its client.
 namespace TAVO::Web {
 
 enum class SetUp { kOff, kIncomplete, kComplete };
@@ -13,9 +13,11 @@ enum class SetUp { kOff, kIncomplete, kComplete };
 /// Whether users can sign in, for pages that offer it.
 SetUp HowFarSetUp();
 
-/// The profile's name. Refuses where `OIDCLogin` does: "sso does not enable." for a profile that is off or cannot be
-/// read, "profile not support." for one that is missing or unknown.
-std::string ProfileInForce();
+/// Returns the settings that must not change during a login: "profile", "client_id" and "token_endpoint".
+///
+/// Throws what `OIDCLogin` throws for a profile that is off or unknown, and `Refusal` if the program may not read a
+/// file or a setting is missing.
+Json::Value RequireSettings();
 
 /// Whether single sign-on is on and this is its profile.
 bool IsInForce(const std::string &profile);

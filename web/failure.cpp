@@ -68,15 +68,6 @@ static_assert(kDescriptions.size() == static_cast<std::size_t>(Failure::kInterna
 
 const Description &Describe(Failure failure) { return kDescriptions[static_cast<std::size_t>(failure)]; }
 
-/// The error in a reason that `ProviderError` made; empty in any other.
-std::string ProviderErrorIn(const std::string &reason) {
-    const std::string beginning = "The provider refused: ";
-    if (reason.rfind(beginning, 0) != 0) {
-        return "";
-    }
-    return reason.substr(beginning.size(), reason.find(" (", beginning.size()) - beginning.size());
-}
-
 /// The row with the most specific text for a reason; null if there is none.
 const FailureRow *FindRow(const std::string &reason) {
     const FailureRow *found = nullptr;
@@ -93,6 +84,14 @@ const FailureRow *FindRow(const std::string &reason) {
     return found;
 }
 
+/// A text to look up in the table. Texts that the provider chose are not looked up.
+std::string TextInTable(const std::exception &error) {
+    if (dynamic_cast<const ProviderRefusal *>(&error) != nullptr) {
+        return kReturnedError;
+    }
+    return ProviderErrorOf(error) ? kErrorAnswer : ReasonOf(error);
+}
+
 }  // namespace
 
 std::string SentenceOf(Failure failure) { return Describe(failure).sentence; }
@@ -100,13 +99,23 @@ std::string SentenceOf(Failure failure) { return Describe(failure).sentence; }
 std::string NameOf(Failure failure) { return Describe(failure).name; }
 
 FailedLogin FailedLoginOf(const std::exception &error) {
-    const std::string reason = ReasonOf(error);
-    FailedLogin failed{Failure::kInternal, reason, ProviderErrorIn(reason), Describe(Failure::kInternal).sentence, ""};
-    if (const FailureRow *row = FindRow(reason)) {
+    FailedLogin failed;
+    failed.reason = ReasonOf(error);
+    failed.providerError = ProviderErrorOf(error).value_or("");
+    if (const FailureRow *row = FindRow(TextInTable(error))) {
         failed.failure = row->code;
-        failed.sentence = Describe(row->code).sentence;
         failed.hint = row->remedy;
+    } else if (dynamic_cast<const StoreFailure *>(&error) != nullptr) {
+        failed.failure = Failure::kStorage;
     }
+    failed.sentence = SentenceOf(failed.failure);
+    return failed;
+}
+
+FailedLogin UnusableDocuments(FailedLogin failed) {
+    failed.failure = Failure::kInvalidResponse;
+    failed.sentence = SentenceOf(failed.failure);
+    failed.hint = "Run `tavosso-doctor`. Check what `azure_wellknown` and the address in its \"jwks_uri\" answer.";
     return failed;
 }
 

@@ -13,6 +13,9 @@ std::string SentenceOf(Failure failure);
 /// The failed login with the cause that libcurl reports.
 FailedLogin FailedTransfer(FailedLogin failed, CURLcode result);
 
+/// The failed login of a discovery document or key set that is not what it must be.
+FailedLogin UnusableDocuments(FailedLogin failed);
+
 }  // namespace TAVO::Web
 
 #endif

@@ -1,5 +1,5 @@
-#ifndef TAVOSSO_WEB_FAILURE_TEXT_H
-#define TAVOSSO_WEB_FAILURE_TEXT_H
+#ifndef TAVOSSO_WEB_FAILURE_LOOKUP_H
+#define TAVOSSO_WEB_FAILURE_LOOKUP_H
 
 #include <cstddef>
 #include <string>

@@ -20,8 +20,11 @@ enum class FailureKind {
     kTransfer,   // libcurl's result
 };
 
-/// In the table, a provider's error answer (RFC 6749, section 5.2), which the library throws as a text.
+/// The table's text for an error response of the token endpoint (RFC 6749, section 5.2), which the library throws.
 constexpr char kErrorAnswer[] = "{... \"error\": ...}";
+
+/// The table's text for an error of the authorization endpoint (RFC 6749, section 4.1.2.1).
+constexpr char kReturnedError[] = "The provider refused: REASON";
 
 struct FailureRow {
     FailureKind kind;

@@ -13,12 +13,10 @@
 
 namespace TAVO::Web {
 
-const int kLoginSeconds = 600;
-
 namespace {
 
-constexpr char kFormat[] = "login 1";
-constexpr std::size_t kLongestState = 2048;
+constexpr char kFormat[] = "login 2";
+constexpr std::size_t kLongestEncodedState = 2048;
 constexpr char kCookieSlots[] = "0123456789abcdef";
 
 std::string CookieName(char slot) { return std::string("__Host-login-") + slot; }
@@ -37,14 +35,36 @@ std::string FreeCookieName(const std::string &cookies, const std::string &login)
     return CookieName(login.front());
 }
 
-/// The cookie that has the login's value; empty if this browser did not start it.
+/// The login that a cookie's value belongs to: the first half of its SHA-256, in hexadecimal.
+std::string LoginOf(const std::string &secret) {
+    unsigned char digest[EVP_MAX_MD_SIZE];
+    if (EVP_Digest(secret.data(), secret.size(), digest, nullptr, EVP_sha256(), nullptr) != 1) {
+        throw Refusal("The digest of a cookie cannot be computed.");
+    }
+    return PrivateFolder::NameOf(digest);
+}
+
+/// The name of the login's cookie; empty if this browser did not start it.
 std::string CookieOf(const std::string &cookies, const std::string &login) {
     for (const char slot : std::string(kCookieSlots)) {
-        if (FindCookie(cookies, CookieName(slot)) == login) {
+        const std::optional<std::string> secret = FindCookie(cookies, CookieName(slot));
+        if (secret && LoginOf(*secret) == login) {
             return CookieName(slot);
         }
     }
     return "";
+}
+
+/// An integrator's store may throw anything.
+template <typename Call>
+auto CallStore(Call call) {
+    try {
+        return call();
+    } catch (const std::exception &error) {
+        throw StoreFailure(error.what());
+    } catch (...) {
+        throw StoreFailure("unexpected failure");
+    }
 }
 
 std::string StateIn(const std::string &address) {
@@ -62,21 +82,22 @@ std::string EncodeBase64(const std::string &bytes) {
 
 }  // namespace
 
-std::string BeginLogin(Response &response, const Request &request, LoginStore &store, const std::string &profile,
+std::string BeginLogin(Response &response, const Request &request, LoginStore &store, const Json::Value &settings,
                        const std::string &origin, const std::function<std::string(const Json::Value &)> &makeAddress) {
-    const std::string login = PrivateFolder::NewName();
+    const std::string secret = PrivateFolder::NewName();
+    const std::string login = LoginOf(secret);
     Json::Value state;
-    state["origin"] = SafeOrigin(origin);
+    state["origin"] = origin;
     state["csrf"] = login;
     std::string address = makeAddress(state);
     Json::Value started;
     started["format"] = kFormat;
     started["state"] = StateIn(address);
-    started["profile"] = profile;
-    if (!store.Keep(login, WriteCompact(started))) {
+    started["settings"] = settings;
+    if (!CallStore([&] { return store.Keep(login, WriteCompact(started)); })) {
         throw Refusal("Too many sign-ins are under way on this device.");
     }
-    response.SetCookie(FreeCookieName(request.cookies, login), login, "; Max-Age=" + std::to_string(kLoginSeconds));
+    response.SetCookie(FreeCookieName(request.cookies, login), secret, "; Max-Age=" + std::to_string(kLoginSeconds));
     return address;
 }
 
@@ -85,11 +106,11 @@ PendingLogin EndLogin(Response &response, std::string &origin, const Request &re
     const Json::Value returned = DecodeState(state);
     const std::string login = StringMember(returned, "csrf");
     const std::string cookie = CookieOf(request.cookies, login);
-    if (login.empty() || cookie.empty()) {
+    if (cookie.empty()) {
         throw Refusal("This sign-in was not started in this browser.");
     }
     response.ExpireCookie(cookie);
-    const Json::Value started = ParseObject(store.Take(login).value_or(""));
+    const Json::Value started = ParseObject(CallStore([&] { return store.Take(login).value_or(""); }));
     if (StringMember(started, "format") != kFormat) {
         throw Refusal("This sign-in took too long, or was already completed.");
     }
@@ -100,17 +121,17 @@ PendingLogin EndLogin(Response &response, std::string &origin, const Request &re
     }
     origin = StringMember(returned, "origin");
     // The code must not go to another provider, with that provider's client secret.
-    const std::string profile = StringMember(started, "profile");
-    if (profile != ProfileInForce()) {
+    const Json::Value settings = RequireSettings();
+    if (settings != started["settings"]) {
         throw Refusal("The settings of this device were changed during this sign-in.");
     }
-    return {returned, profile};
+    return {returned, settings["profile"].asString()};
 }
 
 Json::Value DecodeState(const std::string &state) {
     std::string decoded(state.size(), '\0');
     const int length =
-        state.size() > kLongestState
+        state.size() > kLongestEncodedState
             ? -1
             : EVP_DecodeBlock(reinterpret_cast<unsigned char *>(decoded.data()),
                               reinterpret_cast<const unsigned char *>(state.data()), static_cast<int>(state.size()));

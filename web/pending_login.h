@@ -10,18 +10,20 @@
 #include "web/web.h"
 
 /*
- * Ties a login to the browser that started it. Otherwise anyone could send a victim's browser to the return page with
+ * Binds a login to the browser that started it. Otherwise anyone could send a victim's browser to the return page with
  * the attacker's code, and the victim would unknowingly work in the attacker's account.
  *
- * A random value goes to the provider in the state and to the browser in a cookie. The server remembers it for one use
- * and for ten minutes. Each login has its own cookie, since several tabs may be signing in at once. There are 16 names
- * for these cookies, so that another site that starts logins cannot fill the browser's requests with them.
+ * The browser has a random value in a cookie. Its digest is in the state and is the login's name in the store, for one
+ * use within ten minutes: who reads the state in a log or a browser's history cannot derive the cookie from it. Each
+ * login has its own cookie, since several tabs may sign in at once. There are 16 cookie names, so another site that
+ * starts logins cannot fill the browser's request headers.
  */
 namespace TAVO::Web {
 
-/// Begins a login under a profile, to return to `origin`. `makeAddress` makes the provider's URL from the state's
-/// object, as `GetAccessTokenReqURI` of the clients does. Returns that URL. Throws `Refusal` if the store is full.
-std::string BeginLogin(Response &response, const Request &request, LoginStore &store, const std::string &profile,
+/// Begins a login under the settings in force, to return to `origin`. `makeAddress` makes the provider's URL from the
+/// state's object, as `GetAccessTokenReqURI` of the clients does. Returns that URL. Throws `Refusal` if the store is
+/// full, and `StoreFailure`.
+std::string BeginLogin(Response &response, const Request &request, LoginStore &store, const Json::Value &settings,
                        const std::string &origin, const std::function<std::string(const Json::Value &)> &makeAddress);
 
 struct PendingLogin {
@@ -30,8 +32,8 @@ struct PendingLogin {
 };
 
 /// Throws `Refusal` unless this browser started the login that `state` belongs to, within the last ten minutes, has not
-/// completed it before, returns the state unchanged, and the login's profile is still in force. Sets the origin as soon
-/// as the state is known to be the one that was sent.
+/// completed it before, returns the state unchanged, and its settings are still in force. Sets the origin once the
+/// state is known to be the one that was sent. Throws `StoreFailure`, and what `RequireSettings` throws.
 PendingLogin EndLogin(Response &response, std::string &origin, const Request &request, LoginStore &store,
                       const std::string &state);
 

@@ -11,8 +11,8 @@
 #include <boost/algorithm/string.hpp>
 #include <cerrno>
 #include <chrono>
-#include <cstring>
 #include <memory>
+#include <stdexcept>
 #include <system_error>
 #include <utility>
 #include <vector>
@@ -23,7 +23,7 @@ namespace TAVO::Web {
 
 namespace {
 
-constexpr std::size_t kRandomBytes = 16;
+constexpr std::size_t kNameBytes = 16;
 constexpr char kHexDigits[] = "0123456789abcdef";
 constexpr char kUnfinished[] = ".new";
 constexpr char kCounter[] = "counter";
@@ -33,7 +33,7 @@ constexpr std::size_t kLongestText = 16384;
 [[noreturn]] void ThrowSystemError(const char *what) { throw std::system_error(errno, std::generic_category(), what); }
 
 bool IsName(const std::string &name) {
-    return name.size() == 2 * kRandomBytes && name.find_first_not_of(kHexDigits) == std::string::npos;
+    return name.size() == 2 * kNameBytes && name.find_first_not_of(kHexDigits) == std::string::npos;
 }
 
 struct stat StatusOf(const Descriptor &file) {
@@ -74,6 +74,9 @@ Descriptor OpenPrivate(const Descriptor &parent, const std::string &name) {
 }
 
 Descriptor OpenFolder(const std::string &path) {
+    if (path.empty() || path.front() != '/') {
+        throw std::invalid_argument("The path of a folder must be absolute.");
+    }
     std::vector<std::string> names;
     boost::split(names, path, boost::is_any_of("/"), boost::token_compress_on);
     Descriptor folder(open("/", O_RDONLY | O_DIRECTORY | O_CLOEXEC), "/ cannot be opened");
@@ -127,16 +130,21 @@ struct CloseDirectory {
     void operator()(DIR *directory) const { closedir(directory); }
 };
 
+/// The names of texts, also of unfinished ones. Other files are not ours to remove.
 std::vector<std::string> NamesIn(const Descriptor &folder) {
     const int reopened = openat(folder.Number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     const std::unique_ptr<DIR, CloseDirectory> directory(reopened < 0 ? nullptr : fdopendir(reopened));
     if (!directory) {
+        if (reopened >= 0) {
+            close(reopened);
+        }
         ThrowSystemError("The front end's folder cannot be read");
     }
     std::vector<std::string> names;
     while (const dirent *entry = readdir(directory.get())) {
-        if (entry->d_type != DT_DIR && std::strcmp(entry->d_name, kCounter) != 0) {
-            names.emplace_back(entry->d_name);
+        const std::string name = entry->d_name;
+        if (IsName(name) || (boost::ends_with(name, kUnfinished) && IsName(name.substr(0, 2 * kNameBytes)))) {
+            names.push_back(name);
         }
     }
     return names;
@@ -167,19 +175,26 @@ PrivateFolder::PrivateFolder(const std::string &path, std::time_t seconds, std::
     : folder(OpenFolder(path)), lifetime(seconds), capacity(most) {}
 
 std::string PrivateFolder::NewName() {
-    unsigned char bytes[kRandomBytes];
+    unsigned char bytes[kNameBytes];
     if (getrandom(bytes, sizeof bytes, 0) != static_cast<ssize_t>(sizeof bytes)) {
         ThrowSystemError("No random name can be made");
     }
+    return NameOf(bytes);
+}
+
+std::string PrivateFolder::NameOf(const unsigned char *bytes) {
     std::string name;
-    for (const unsigned char byte : bytes) {
-        name += kHexDigits[byte >> 4];
-        name += kHexDigits[byte & 15];
+    for (std::size_t i = 0; i < kNameBytes; ++i) {
+        name += kHexDigits[bytes[i] >> 4];
+        name += kHexDigits[bytes[i] & 15];
     }
     return name;
 }
 
 bool PrivateFolder::Keep(const std::string &name, const std::string &text) {
+    if (!IsName(name)) {
+        throw std::invalid_argument("The name of a file must be 32 hexadecimal digits.");
+    }
     if (text.size() > kLongestText) {
         errno = EFBIG;
         ThrowSystemError("The front end's file cannot be kept");

@@ -36,14 +36,17 @@ class PrivateFolder {
   public:
     static constexpr std::size_t kUnlimited = std::numeric_limits<std::size_t>::max();
 
-    /// The folder at an absolute path, made if missing; its parent must exist. Texts expire `seconds` after they were
-    /// kept; at most about `most` are kept at a time.
+    /// The folder at an absolute path, created if missing. Its parent must exist; symbolic links are refused. Texts
+    /// expire `seconds` after they were kept; at most about `most` are kept at a time. Throws std::invalid_argument for
+    /// a relative path.
     PrivateFolder(const std::string &path, std::time_t seconds, std::size_t most = kUnlimited);
 
     /// A name that cannot be guessed.
     static std::string NewName();
-    /// Keeps a text under a new name. Returns false, and keeps nothing, if the folder is full. Removes and counts
-    /// expired texts once a minute, and at each call only while the folder is full.
+    /// The name of 16 bytes: 32 hexadecimal digits.
+    static std::string NameOf(const unsigned char *bytes);
+    /// Keeps a text under a new name, one of `NewName` or `NameOf`. Returns false, and keeps nothing, if the folder is
+    /// full. Removes and counts expired texts once a minute, and at each call only while the folder is full.
     [[nodiscard]] bool Keep(const std::string &name, const std::string &text);
     std::optional<std::string> Read(const std::string &name);
     /// Reads a text and removes it. Of two that take the same text, one gets it.

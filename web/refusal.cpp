@@ -4,19 +4,38 @@
 
 namespace TAVO::Web {
 
+namespace {
+
+bool IsJson(const std::string &text) {
+    const std::size_t begin = text.find_first_not_of(" \t\r\n");
+    return begin != std::string::npos && (text[begin] == '{' || text[begin] == '[');
+}
+
+std::string DescribeProviderError(const std::string &error, const std::string &description) {
+    const std::string named = error.empty() ? "unknown error" : error;
+    return OneLine("The provider refused: " + named + (description.empty() ? "" : " (" + description + ")"));
+}
+
+}  // namespace
+
+ProviderRefusal::ProviderRefusal(const std::string &name, const std::string &description)
+    : Refusal(DescribeProviderError(name, description)), error(OneLine(name)) {}
+
 std::string ReasonOf(const std::exception &failure) {
     const std::string text = failure.what();
-    const std::size_t begin = text.find_first_not_of(" \t\r\n");
-    if (begin == std::string::npos || (text[begin] != '{' && text[begin] != '[')) {
+    if (!IsJson(text)) {
         return OneLine(text);
     }
     const Json::Value answer = ParseObject(text);
-    return ProviderError(StringMember(answer, "error"), StringMember(answer, "error_description"));
+    return DescribeProviderError(StringMember(answer, "error"), StringMember(answer, "error_description"));
 }
 
-std::string ProviderError(const std::string &error, const std::string &description) {
-    const std::string named = error.empty() ? "unknown error" : error;
-    return OneLine("The provider refused: " + named + (description.empty() ? "" : " (" + description + ")"));
+std::optional<std::string> ProviderErrorOf(const std::exception &failure) {
+    if (const auto *refusal = dynamic_cast<const ProviderRefusal *>(&failure)) {
+        return refusal->error;
+    }
+    const std::string text = failure.what();
+    return IsJson(text) ? std::optional(OneLine(StringMember(ParseObject(text), "error"))) : std::nullopt;
 }
 
 }  // namespace TAVO::Web

@@ -1,3 +1,6 @@
+#include <algorithm>
+#include <cctype>
+#include <cstring>
 #include <stdexcept>
 
 #include "web/cookie.h"
@@ -5,6 +8,18 @@
 #include "web/web.h"
 
 namespace TAVO::Web {
+
+namespace {
+
+/// A token of HTTP (RFC 9110, section 5.6.2).
+bool IsToken(const std::string &name) {
+    const auto isTokenCharacter = [](unsigned char c) {
+        return (c < 0x80 && std::isalnum(c) != 0) || (c != 0 && std::strchr("!#$%&'*+-.^_`|~", c) != nullptr);
+    };
+    return !name.empty() && std::all_of(name.begin(), name.end(), isTokenCharacter);
+}
+
+}  // namespace
 
 // The referrer policy is not "no-referrer", under which browsers send no Origin with a form.
 Response::Response()
@@ -16,13 +31,16 @@ Response::Response()
                "form-action 'self'; frame-ancestors 'none'"}} {}
 
 void Response::AddHeader(const std::string &name, const std::string &value) {
-    if (!IsPrintable(value)) {
+    if (!IsToken(name) || !IsPrintable(value)) {
         throw std::invalid_argument("A header must be one printable line.");
     }
     headers.emplace_back(name, value);
 }
 
 void Response::SetCookie(const std::string &name, const std::string &value, const std::string &more) {
+    if (!IsToken(name) || value.find_first_of(" \",;\\") != std::string::npos) {
+        throw std::invalid_argument("A cookie must not contain separators.");
+    }
     AddHeader("Set-Cookie", MakeCookie(name, value, more));
 }
 
@@ -30,6 +48,11 @@ void Response::ExpireCookie(const std::string &name) { SetCookie(name, "", "; Ma
 
 void Response::Redirect(const std::string &address) {
     AddHeader("Location", address);
+    const auto former =
+        std::find_if(headers.begin(), headers.end() - 1, [](const auto &header) { return header.first == "Location"; });
+    if (former != headers.end() - 1) {
+        headers.erase(former);
+    }
     status = "302 Found";
 }
 

@@ -10,7 +10,6 @@ namespace TAVO::Web {
 
 namespace {
 
-constexpr char kStartPage[] = "/index.cgi";
 constexpr char kReplacementCharacter[] = "\xef\xbf\xbd";  // U+FFFD
 constexpr std::size_t kLongestOrigin = 512;
 static_assert(kLongestOrigin + sizeof R"({"csrf":"0123456789abcdef0123456789abcdef","origin":""})" <=
@@ -96,11 +95,11 @@ std::string OneLine(const std::string &text, std::size_t longest) {
     return line;
 }
 
-std::string SafeOrigin(const std::string &origin) {
+std::string SafeOrigin(const std::string &origin, const std::string &startPage) {
     const bool isPath = !origin.empty() && origin[0] == '/' && origin.compare(0, 2, "//") != 0;
     const bool isSafe =
         isPath && origin.size() <= kLongestOrigin && std::all_of(origin.begin(), origin.end(), IsPathCharacter);
-    return isSafe ? origin : kStartPage;
+    return isSafe ? origin : startPage;
 }
 
 Json::Value ParseObject(const std::string &text) {

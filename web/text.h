@@ -21,8 +21,8 @@ constexpr std::size_t kLongestLine = 200;
 /// UTF-8 becomes U+FFFD, and the text is cut between two characters.
 std::string OneLine(const std::string &text, std::size_t longest = kLongestLine);
 
-/// The page to come back to after a login: `origin` where that is a path on this very site, else the start page.
-std::string SafeOrigin(const std::string &origin);
+/// The page to return to after a login: `origin` if it is a path of this site, else the start page.
+std::string SafeOrigin(const std::string &origin, const std::string &startPage = "/index.cgi");
 
 /// The JSON object that a text holds, null where it holds none.
 Json::Value ParseObject(const std::string &text);

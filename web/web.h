@@ -16,8 +16,8 @@
 
 /**
  * The relying party's checks that belong to the front end (OpenID Connect Core 1.0, section 3.1). `StartLogin` and
- * `FinishLogin` take and return plain values: they fit CGI, FastCGI and any web framework. They keep no global state
- * and write nothing but log lines. One thread at a time, as for `sso.h`.
+ * `FinishLogin` take and return plain values: they fit CGI, FastCGI and any web framework. They keep state only in the
+ * `LoginStore`. One thread at a time, as for `sso.h`.
  */
 namespace TAVO::Web {
 
@@ -25,7 +25,7 @@ namespace TAVO::Web {
 struct Request {
     std::string method;   ///< such as "GET"
     std::string query;    ///< without its "?", percent-encoded as received
-    std::string cookies;  ///< the Cookie header; empty if there is none
+    std::string cookies;  ///< the Cookie header; join several with "; "; empty if there is none
 };
 
 /**
@@ -41,18 +41,18 @@ class Response {
 
     /**
      * Adds a header.
-     * @param name   of the header
+     * @param name   a token (RFC 9110, section 5.6.2)
      * @param value  one printable line of UTF-8
-     * @throws std::invalid_argument  for another value; nothing is added then
+     * @throws std::invalid_argument  for another name or value; nothing is added then
      */
     void AddHeader(const std::string &name, const std::string &value);
 
     /**
-     * Sets a cookie for this host, over TLS, out of reach of scripts: Path=/, Secure, HttpOnly, SameSite=Lax.
-     * @param name   with the prefix "__Host-"
-     * @param value  of the cookie
+     * Sets a cookie for this host, over TLS, hidden from scripts: Path=/, Secure, HttpOnly, SameSite=Lax.
+     * @param name   a token with the prefix "__Host-"
+     * @param value  without blanks, quotation marks, commas, semicolons and backslashes
      * @param more   further attributes, such as "; Max-Age=600". Without a Max-Age the cookie ends with the browser
-     * @throws std::invalid_argument  as `AddHeader`
+     * @throws std::invalid_argument  for another name or value; nothing is added then
      */
     void SetCookie(const std::string &name, const std::string &value, const std::string &more = "");
 
@@ -60,53 +60,58 @@ class Response {
     void ExpireCookie(const std::string &name);
 
     /**
-     * Redirects the browser, with status 302.
+     * Redirects the browser, with status 302. Replaces an earlier redirect.
      * @param address  an absolute URL, or a path of this site
-     * @throws std::invalid_argument  as `AddHeader`; the status is unchanged then
+     * @throws std::invalid_argument  as `AddHeader`; the response is unchanged then
      */
     void Redirect(const std::string &address);
 };
 
-/** Remembers logins between start and return. Several requests may use the same store at once. */
+/**
+ * Stores logins between start and return. Several requests may use the same store at once. `StartLogin` and
+ * `FinishLogin` return what a store throws as `Failure::kStorage`; its text becomes the `reason`.
+ */
 class LoginStore {
   public:
     virtual ~LoginStore();
 
     /**
-     * Remembers a login for `kLoginSeconds`.
+     * Stores a login for `kLoginSeconds`.
      * @param name  32 lowercase hexadecimal digits, never used before
      * @param text  the login, up to 4 KB
-     * @return false, and remembers nothing, if no more logins fit
+     * @return false, and stores nothing, if no more logins fit
      */
     [[nodiscard]] virtual bool Keep(const std::string &name, const std::string &text) = 0;
 
     /**
-     * Returns a login and forgets it. Of two requests that take the same login, one gets it.
-     * @param name  as given to `Keep`, or any text of a browser's choice
-     * @return the text; nothing if it is unknown, taken or too old
+     * Returns a login and removes it. Of two requests that take the same login, one gets it.
+     * @param name  as given to `Keep`
+     * @return the text; nothing if it is unknown, taken or older than `kLoginSeconds`
      */
     virtual std::optional<std::string> Take(const std::string &name) = 0;
 };
 
-extern const int kLoginSeconds;             ///< how long a user may take to sign in
-constexpr std::size_t kMostLogins = 1'000;  ///< how many logins a folder remembers, unless told otherwise
+constexpr int kLoginSeconds = 600;          ///< how long a user may take to sign in
+constexpr std::size_t kMostLogins = 1'000;  ///< default capacity of a `FolderLoginStore`
 
-/** Remembers each login in a file that only the program's user can read. */
+/** Stores each login in a file that only the program's user can read. */
 class FolderLoginStore : public LoginStore {
   public:
     /**
-     * @param folder  an absolute path. Its parent must exist, and only root or the program's user may be able to change
-     *                the path. The folder is made, with mode 0700, when it is first used
-     * @param most    how many logins it remembers at a time
+     * @param folder  an absolute path without symbolic links. Its parent must exist, and only root or the program's
+     * user may be able to change the path. The first use creates the folder with mode 0700. Use the folder for nothing
+     * else
+     * @param most    maximum number of logins at a time
      */
     explicit FolderLoginStore(std::string folder, std::size_t most = kMostLogins);
 
     /**
-     * As `LoginStore::Keep`. Removes files that are too old, at most once a minute unless the folder is full.
+     * As `LoginStore::Keep`. Removes logins that are too old, at most once a minute unless the folder is full.
      * @param name  as for `LoginStore::Keep`
      * @param text  as for `LoginStore::Keep`
      * @return as `LoginStore::Keep`
-     * @throws std::system_error  if the system refuses, or another user can read the folder or change its path
+     * @throws std::system_error      if the system refuses, or another user can read the folder or change its path
+     * @throws std::invalid_argument  for another name, or a relative path of the folder
      */
     [[nodiscard]] bool Keep(const std::string &name, const std::string &text) override;
 
@@ -114,7 +119,8 @@ class FolderLoginStore : public LoginStore {
      * As `LoginStore::Take`.
      * @param name  as for `LoginStore::Take`
      * @return as `LoginStore::Take`
-     * @throws std::system_error  as `Keep`
+     * @throws std::system_error      as `Keep`
+     * @throws std::invalid_argument  for a relative path of the folder
      */
     std::optional<std::string> Take(const std::string &name) override;
 
@@ -134,11 +140,11 @@ enum class Failure {
     kOtherBrowser,      ///< "other_browser": this browser did not start the login
     kLoginExpired,      ///< "login_expired": the login took too long, or was already completed
     kStateChanged,      ///< "state_changed": the state is not the one that was sent
-    kProfileChanged,    ///< "profile_changed": another profile is in force than at the start
+    kProfileChanged,    ///< "profile_changed": profile, client id or token endpoint differ from the start's
     kProviderRefused,   ///< "provider_refused": the provider reported an error; see `FailedLogin::providerError`
     kNetwork,           ///< "network": a request to the provider failed
     kCertificate,       ///< "certificate": the provider's certificate was refused
-    kInvalidResponse,   ///< "invalid_response": the provider's answer is not usable
+    kInvalidResponse,   ///< "invalid_response": a response of the provider is not what it must be
     kInvalidToken,      ///< "invalid_token": the ID token is malformed, or has another audience or algorithm
     kTokenExpired,      ///< "token_expired": the ID token has expired, or this machine's clock is wrong
     kOtherTenant,       ///< "other_tenant": the account belongs to another organisation
@@ -148,7 +154,7 @@ enum class Failure {
     kUserName,          ///< "user_name": the ID token has no usable name
     kUnverifiedEmail,   ///< "unverified_email": the provider has not verified the e-mail address that names the user
     kUnknownDomain,     ///< "unknown_domain": the appliance does not know the user's domain
-    kInternal,          ///< "internal": anything else, such as want of memory
+    kInternal,          ///< "internal": anything else, such as exhausted memory
 };
 
 /** Returns the stable name of a failure. @param failure  any. @return as documented at its enumerator */
@@ -157,10 +163,11 @@ std::string NameOf(Failure failure);
 /** A login that failed. */
 struct FailedLogin {
     Failure failure = Failure::kInternal;  ///< the code
-    std::string reason;         ///< one printable line for the log, without secrets; the library's texts are fixed
-    std::string providerError;  ///< the provider's "error" (RFC 6749, section 5.2); empty for other failures
-    std::string sentence;       ///< one sentence for the user, in English
-    std::string hint;           ///< what an administrator can do
+    std::string reason;  ///< one printable line for the log, without secrets; the library's texts are fixed
+    std::string
+        providerError;  ///< the provider's "error" (RFC 6749); empty for others, and if the library does not report it
+    std::string sentence;  ///< one sentence for the user, in English
+    std::string hint;      ///< what an administrator can do
 };
 
 /**
@@ -174,22 +181,29 @@ FailedLogin FailedLoginOf(const std::exception &error);
 struct StartedLogin {
     Response response;                   ///< sends the browser to the provider; of a failed start only its headers
     std::optional<FailedLogin> failure;  ///< nothing if the login was started
+    std::string origin;                  ///< the page to return to
 };
 
 /**
- * Starts a login: chooses the client of the profile in force, remembers the login in the store, ties it to the browser
- * by a cookie, and sends the browser to the provider. A browser can sign in in several tabs at once: 16 cookies are
- * used, each for one login.
+ * Returns whether the provider sent the browser, for a program that is both start and redirect URI.
+ * @param request  of the browser
+ * @return whether the query has "state" or "error" (RFC 6749, section 4.1.2)
+ */
+bool IsReturn(const Request &request);
+
+/**
+ * Starts a login: chooses the client of the configured profile, stores the login, binds it to the browser by a cookie,
+ * and redirects the browser to the provider. Up to 16 tabs of a browser can sign in at once.
  *
- * @param request  of the browser, with method GET
- * @param store    remembers the login
- * @param origin   the page to return to; a path of this site, else "/index.cgi"
- * @return the response, and the failure if there is one. Failures of the store, of the configuration and of the system
- *         are returned, not thrown
+ * @param request    of the browser, with method GET. Its parameter "origin" is the page to return to: a path of this
+ *                   site, else `startPage`
+ * @param store      stores the login
+ * @param startPage  a path of this site
+ * @return the response, and the failure if there is one. Failures are returned, not thrown
  *
  * Log lines and side effects: those of the clients' construction and of `GetAccessTokenReqURI` in `sso.h`.
  */
-StartedLogin StartLogin(const Request &request, LoginStore &store, const std::string &origin);
+StartedLogin StartLogin(const Request &request, LoginStore &store, const std::string &startPage = "/index.cgi");
 
 /** The user of a login that was finished. */
 struct User {
@@ -215,9 +229,9 @@ struct FinishOptions {
 };
 
 /**
- * Finishes a login at the redirect URI. It refuses the return unless this browser started the login, within
- * `kLoginSeconds`, has not finished it before, returns the state unchanged, and the same profile is in force. Then it
- * exchanges the code, verifies the ID token, and refuses a token of another login (nonce) and a name that cannot be
+ * Finishes a login at the redirect URI. It accepts the return only if this browser started the login within
+ * `kLoginSeconds`, has not finished it before and returns the state unchanged, and if the settings are the same. Then
+ * it exchanges the code, verifies the ID token, and rejects a token of another login (nonce) and a name that cannot be
  * trusted. Open the session for `user` afterwards, under a new random name.
  *
  * @param request  of the browser, with method GET
@@ -226,8 +240,10 @@ struct FinishOptions {
  * @return the user or the failure; failures are returned, not thrown
  *
  * Log lines: those of the library's steps; and, at `LOG_AUTH | LOG_ERR`, "frontend: jwks_uri of the discovery document
- * is not an https:// URL": key sets are fetched over HTTPS only. Side effects: those of `OpenIDConnectLogin` in
- * `sso.h`. Where the provider's answer or key is missing, it is asked once more, without secrets, to find out why.
+ * is not an https:// URL": key sets are fetched over HTTPS only.
+ *
+ * Side effects: those of `httpGet` and `httpPost` in `sso.h`. If the provider's response or key is missing, one or two
+ * more requests, without secrets and of at most five seconds each, find out why.
  */
 FinishedLogin FinishLogin(const Request &request, LoginStore &store, const FinishOptions &options = {});
 

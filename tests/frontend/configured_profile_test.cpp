@@ -6,6 +6,7 @@
 #include <filesystem>
 #include <fstream>
 
+#include "web/refusal.h"
 #include "web/text.h"
 
 using namespace TAVO::Web;
@@ -46,7 +47,7 @@ std::string Failure(Choose choose) {
     return "";
 }
 
-std::string OwnFailure() { return Failure(ProfileInForce); }
+std::string OwnFailure() { return Failure(RequireSettings); }
 
 std::string FailureOfOIDCLogin() {
     return Failure([] {
@@ -78,7 +79,6 @@ TEST_F(Profile, ChoosesTheClient) {
     Write("websphere.conf", "{\"websphere_client_id\":\"of websphere\"}");
     for (const auto &[name, id] : {std::pair("azure", "given"), std::pair("websphere", "of websphere")}) {
         Write("profile.conf", std::string("{\"sso_enable\":true,\"sso_profile\":\"") + name + "\"}");
-        EXPECT_EQ(ProfileInForce(), name);
         EXPECT_EQ(TAVO::SSO::WithClient(name, [](TAVO::SSO::SSOClient &client) { return client.GetClientID(); }), id);
     }
 }
@@ -98,6 +98,16 @@ TEST_F(Profile, IsSetUpWhenNothingIsMissing) {
     }
     Write("profile.conf", "{\"sso_enable\":true,\"sso_profile\":\"another\"}");
     EXPECT_EQ(HowFarSetUp(), SetUp::kIncomplete);
+}
+
+TEST_F(Profile, HasTheSettingsThatALoginDependsOn) {
+    WriteClient("websphere", "nothing");
+    Write("profile.conf", "{\"sso_enable\":true,\"sso_profile\":\"websphere\"}");
+    EXPECT_EQ(WriteCompact(RequireSettings()),
+              R"({"client_id":"given","profile":"websphere","token_endpoint":"given"})");
+    WriteClient("websphere", "client_secret");
+    EXPECT_THAT(RequireSettings,
+                testing::ThrowsMessage<Refusal>("Single sign-on is not completely set up on this device."));
 }
 
 TEST_F(Profile, NeedsADiscoveryDocumentOnlyForAzure) {

@@ -45,7 +45,19 @@ TEST(FailureCode, NamesTheProvidersError) {
     EXPECT_EQ(failed.failure, Failure::kProviderRefused);
     EXPECT_EQ(failed.providerError, "invalid_client");
     EXPECT_EQ(failed.reason, "The provider refused: invalid_client (d)");
-    EXPECT_EQ(Of("The provider refused: access_denied").providerError, "access_denied");
+    EXPECT_THAT(failed.hint, testing::HasSubstr("client secret"));
+    EXPECT_EQ(FailedLoginOf(ProviderRefusal("a (b)", "c")).providerError, "a (b)");
+    EXPECT_EQ(FailedLoginOf(ProviderRefusal("", "")).providerError, "");
+}
+
+TEST(FailureCode, IgnoresTheTableForTheProvidersWords) {
+    EXPECT_EQ(FailedLoginOf(ProviderRefusal("x algorithm is not supported", "")).failure, Failure::kProviderRefused);
+}
+
+TEST(FailureCode, IsStorageForAStoreOfTheProgram) {
+    const FailedLogin failed = FailedLoginOf(StoreFailure("disk on fire"));
+    EXPECT_EQ(failed.failure, Failure::kStorage);
+    EXPECT_EQ(failed.reason, "disk on fire");
 }
 
 TEST(FailureCode, TellsTheNetworkFromACertificate) {

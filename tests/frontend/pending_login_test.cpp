@@ -14,6 +14,7 @@
 #include "platform/platform.h"
 #include "tests/frontend/set_cookie.h"
 #include "tests/support/failure.h"
+#include "web/configured_profile.h"
 #include "web/refusal.h"
 #include "web/request.h"
 #include "web/text.h"
@@ -55,12 +56,25 @@ class PendingLoginTest : public testing::Test {
         std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
         std::ofstream("/usr/tavo/etc/ssoclient/profile.conf")
             << "{\"sso_enable\": " << std::boolalpha << enable << ", \"sso_profile\": \"" << name << "\"}";
+        SetUpClient(name, "https://provider.example/token");
+    }
+
+    static void SetUpClient(const std::string &name, const std::string &tokenEndpoint) {
+        Json::Value settings;
+        for (const char *key : {"client_id", "client_secret", "redirect_uri", "authorization_endpoint", "wellknown"}) {
+            settings[name + "_" + key] = "given";
+        }
+        settings[name + "_token_endpoint"] = tokenEndpoint;
+        std::ofstream("/usr/tavo/etc/ssoclient/" + name + ".conf") << WriteCompact(settings);
     }
 
     /// Starts a login in a browser with these cookies. Returns its state.
     std::string Start(const std::string &cookies = "", std::size_t mostPending = kMostLogins) {
         FolderLoginStore store(kLogins, mostPending);
-        const std::string address = BeginLogin(response, With(cookies), store, "azure", "/files", MakeAddress);
+        const std::string address =
+            BeginLogin(response, With(cookies), store, RequireSettings(), "/files", MakeAddress);
+        const std::string set = LastSetCookie(response);
+        cookie = set.substr(0, set.find(';'));
         return OnlyValue(ParseQuery(address.substr(address.find('?') + 1)), "state").value();
     }
 
@@ -68,13 +82,14 @@ class PendingLoginTest : public testing::Test {
     static std::string CookieHeader(const std::string &cookies) {
         Response other;
         FolderLoginStore store(kLogins);
-        BeginLogin(other, With(cookies), store, "azure", "/files", MakeAddress);
+        BeginLogin(other, With(cookies), store, RequireSettings(), "/files", MakeAddress);
         return LastSetCookie(other);
     }
 
     static std::string NameOf(const std::string &started) { return DecodeState(started)["csrf"].asString(); }
     std::string Name() { return NameOf(state); }
-    std::string Cookie() { return "__Host-login-" + Name().substr(0, 1) + "=" + Name(); }
+    std::string Cookie() { return cookie; }
+    std::string Secret() { return cookie.substr(cookie.find('=') + 1); }
 
     static Request With(const std::string &cookies) { return {"GET", "", cookies}; }
 
@@ -89,6 +104,7 @@ class PendingLoginTest : public testing::Test {
 
     Response response;
     std::string origin;
+    std::string cookie;
     std::string state;
 };
 
@@ -109,6 +125,11 @@ TEST_F(PendingLoginTest, IsRefusedToAnotherBrowserAndStaysPending) {
     EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 1) + "=" + std::string(32, '0'), state), reason);
     EXPECT_EQ(Refusal(Cookie() + "; " + Cookie(), state), reason);
     EXPECT_EQ(Refusal(Cookie(), state), "");
+}
+
+TEST_F(PendingLoginTest, IsRefusedToACookieMadeOfTheState) {
+    EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 1) + "=" + Name(), state),
+              "This sign-in was not started in this browser.");
 }
 
 TEST_F(PendingLoginTest, IsRefusedAfterTenMinutes) {
@@ -144,9 +165,9 @@ TEST_F(PendingLoginTest, UsesSixteenCookieNamesAndAFreeOneFirst) {
     std::set<std::string> names;
     for (int i = 0; i < 16; ++i) {
         const std::string set = CookieHeader(cookies);
-        const std::string cookie = set.substr(0, set.find(';'));
-        EXPECT_TRUE(names.insert(cookie.substr(0, cookie.find('='))).second) << "a tab lost its cookie";
-        cookies += (cookies.empty() ? "" : "; ") + cookie;
+        const std::string first = set.substr(0, set.find(';'));
+        EXPECT_TRUE(names.insert(first.substr(0, first.find('='))).second) << "a tab lost its cookie";
+        cookies += (cookies.empty() ? "" : "; ") + first;
     }
     for (int i = 0; i < 100; ++i) {
         const std::string set = CookieHeader(cookies);
@@ -155,15 +176,33 @@ TEST_F(PendingLoginTest, UsesSixteenCookieNamesAndAFreeOneFirst) {
 }
 
 TEST_F(PendingLoginTest, IsConcludedByACookieOfAnyName) {
-    EXPECT_EQ(Refusal("__Host-login-" + std::string(Name()[0] == '0' ? "1" : "0") + "=" + Name(), state), "");
+    EXPECT_EQ(Refusal("__Host-login-" + std::string(Name()[0] == '0' ? "1" : "0") + "=" + Secret(), state), "");
 }
 
 TEST_F(PendingLoginTest, IsRefusedUnderAnotherProfileAndWhenSwitchedOff) {
     UseProfile("websphere");
     EXPECT_EQ(Refusal(Cookie(), state), "The settings of this device were changed during this sign-in.");
     state = Start();
-    UseProfile("azure", false);
+    UseProfile("websphere", false);
     EXPECT_THROW(End(Cookie(), state), TAVO::SSO::sso_op_failed);
+}
+
+TEST_F(PendingLoginTest, IsRefusedAtAnotherTokenEndpoint) {
+    SetUpClient("azure", "https://elsewhere.example/token");
+    EXPECT_EQ(Refusal(Cookie(), state), "The settings of this device were changed during this sign-in.");
+}
+
+class FailingStore : public LoginStore {
+  public:
+    bool Keep(const std::string &, const std::string &) override { throw std::runtime_error("disk on fire"); }
+    std::optional<std::string> Take(const std::string &) override { throw 1; }
+};
+
+TEST_F(PendingLoginTest, FailsWithAnythingThatItsStoreThrows) {
+    FailingStore store;
+    EXPECT_THAT([&] { BeginLogin(response, With(""), store, RequireSettings(), "/files", MakeAddress); },
+                testing::ThrowsMessage<StoreFailure>("disk on fire"));
+    EXPECT_THROW(EndLogin(response, origin, With(Cookie()), store, state), StoreFailure);
 }
 
 TEST_F(PendingLoginTest, IsNotASession) {

@@ -115,6 +115,25 @@ TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
     EXPECT_FALSE(std::filesystem::exists(kFolder + std::string(32, 'a') + ".new"));
 }
 
+TEST_F(PrivateFolderTest, LeavesOtherFilesAlone) {
+    PrivateFolder things = OpenThings();
+    for (const char *name : {"id_rsa", "0123", "id_rsa.new"}) {
+        std::ofstream(std::string(kFolder) + name) << "another program's";
+        MakeOld(name);
+    }
+    Keep(things, "text");
+    for (const char *name : {"id_rsa", "0123", "id_rsa.new"}) {
+        EXPECT_TRUE(std::filesystem::exists(std::string(kFolder) + name)) << name;
+    }
+}
+
+TEST_F(PrivateFolderTest, RefusesOtherNamesAndRelativePaths) {
+    PrivateFolder things = OpenThings();
+    EXPECT_THROW(static_cast<void>(things.Keep("../escaped", "text")), std::invalid_argument);
+    EXPECT_THROW(PrivateFolder("var/things", kLifetime), std::invalid_argument);
+    EXPECT_THROW(PrivateFolder("", kLifetime), std::invalid_argument);
+}
+
 TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
     PrivateFolder things = OpenThings(2);
     Keep(things, "one");

@@ -108,7 +108,7 @@ test('explains an unknown algorithm whatever the token calls it', () => {
 const UNEXPLAINED = [ // on purpose: only an administrator can act on them
     'A header must be one printable line.', 'FRONTEND_PENDING_LOGINS must be a number above 0.',
     "The provider's answer has no single NAME.", 'This request cannot start or complete a sign-in.',
-    'unexpected failure',
+    'unexpected failure', 'The digest of a cookie cannot be computed.',
 ];
 const OF_SESSIONS = 'Too many users are signed in.';
 const isUnexplained = ({about, 'thrown by': thrownBy = 'a login'}) =>

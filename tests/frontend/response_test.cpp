@@ -53,6 +53,22 @@ TEST(Response, RefusesAHeaderThatWouldBecomeTwo) {
     }
 }
 
+TEST(Response, RefusesNamesAndCookiesWithSeparators) {
+    Response response;
+    EXPECT_THROW(response.AddHeader("A: b\nC", "d"), std::invalid_argument);
+    EXPECT_THROW(response.AddHeader("", "d"), std::invalid_argument);
+    EXPECT_THROW(response.SetCookie("__Host-a", "b; Domain=example.com"), std::invalid_argument);
+    EXPECT_THROW(response.SetCookie("__Host-a=b;", "c"), std::invalid_argument);
+}
+
+TEST(Response, RedirectsToTheLastAddress) {
+    Response response;
+    response.Redirect("/first");
+    response.Redirect("/last");
+    EXPECT_THAT(response.headers, Contains(Pair("Location", "/last")));
+    EXPECT_THAT(response.headers, Not(Contains(Pair("Location", "/first"))));
+}
+
 TEST(Page, ShowsATitleAsText) {
     Response response;
     Frontend::ShowPage(response, "200 OK", "</title><script>", "");

@@ -8,6 +8,7 @@
 #include "frontend/session.h"
 #include "tests/fuzz/oracle.h"
 #include "tests/fuzz/target.h"
+#include "web/configured_profile.h"
 #include "web/pending_login.h"
 #include "web/private_folder.h"
 #include "web/refusal.h"
@@ -18,9 +19,10 @@ namespace Fuzz {
 
 namespace {
 
-constexpr char kLogin[] = "0123456789abcdef0123456789abcdef";
+constexpr char kLogin[] = "3eb1bd439947eb762998e566ccc2e099";  // the first half of the SHA-256 of kSecret
+constexpr char kSecret[] = "0123456789abcdef0123456789abcdef";
 constexpr char kLoginCookie[] = "__Host-login-";  // and a hexadecimal digit
-constexpr char kState[] = "eyJjc3JmIjoiMDEyMzQ1Njc4OWFiY2RlZjAxMjM0NTY3ODlhYmNkZWYiLCJvcmlnaW4iOiIvcGFnZSJ9";
+constexpr char kState[] = "eyJjc3JmIjoiM2ViMWJkNDM5OTQ3ZWI3NjI5OThlNTY2Y2NjMmUwOTkiLCJvcmlnaW4iOiIvcGFnZSJ9";
 constexpr char kSession[] = "fedcba9876543210fedcba9876543210";
 constexpr char kSessionCookie[] = "__Host-session";
 constexpr char kUser[] = "CORP\\alice";
@@ -32,16 +34,21 @@ constexpr char kLogins[] = "/usr/tavo/var/frontend/logins";
 void Prepare() {
     std::filesystem::create_directories("/usr/tavo/var");
     std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
-    std::ofstream("/usr/tavo/etc/ssoclient/profile.conf") << R"({"sso_enable": true, "sso_profile": "azure"})";
+    std::ofstream("/usr/tavo/etc/ssoclient/profile.conf") << R"({"sso_enable": true, "sso_profile": "websphere"})";
+    std::ofstream("/usr/tavo/etc/ssoclient/websphere.conf")
+        << R"({"websphere_client_id": "nas", "websphere_client_secret": "secret", "websphere_redirect_uri": "r",)"
+        << R"("websphere_authorization_endpoint": "a", "websphere_token_endpoint": "t"})";
     TAVO::Web::PrivateFolder(kFolder, kSeconds);
     TAVO::Web::PrivateFolder logins(kLogins, kSeconds);
     logins.Take(kLogin);
-    Require(
-        logins.Keep(kLogin, R"({"format": "login 1", "profile": "azure", "state": ")" + std::string(kState) + "\"}"),
-        "there is room for a login");
+    Json::Value login;
+    login["format"] = "login 2";
+    login["settings"] = TAVO::Web::RequireSettings();
+    login["state"] = kState;
+    Require(logins.Keep(kLogin, TAVO::Web::WriteCompact(login)), "there is room for a login");
     TAVO::Web::PrivateFolder sessions("/usr/tavo/var/frontend/sessions", kSeconds);
     sessions.Take(kSession);
-    Require(sessions.Keep(kSession, R"({"format": "session 1", "user": "CORP\\alice", "profile": "azure"})"),
+    Require(sessions.Keep(kSession, R"({"format": "session 1", "user": "CORP\\alice", "profile": "websphere"})"),
             "there is room for a session");
 }
 
@@ -95,7 +102,7 @@ bool HasOnly(const std::string &cookies, const char *name, const char *value) {
 bool HasLoginCookie(const std::string &cookies) {
     const std::string digits = "0123456789abcdef";
     return std::any_of(digits.begin(), digits.end(), [&](char digit) {
-        return HasOnly(cookies, (std::string(kLoginCookie) + digit).c_str(), kLogin);
+        return HasOnly(cookies, (std::string(kLoginCookie) + digit).c_str(), kSecret);
     });
 }
 

@@ -24,7 +24,7 @@ class Stage {
         this.origin = this.site.origin;
     }
 
-    /** Everything as it should be, under the profile named. */
+    /** A working site with the given profile. */
     reset(profile = 'azure') {
         useProfile(profile);
         writeSettings(this.site);

@@ -1,5 +1,4 @@
-// A program of one's own beside the provider that `./demo provider` serves: the program of the README signs users
-// in, and withstands what may come back.
+// The README's program with the provider that `./demo provider` serves: it signs users in and resists attacks.
 // Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {spawn, spawnSync} from 'node:child_process';
@@ -26,7 +25,7 @@ async function startProvider(profile) {
     const passwords = new Map();
     let authority;
     for await (const line of createInterface(server.stdout)) {
-        authority ??= /^ {2}authority +(\S+),/.exec(line)?.[1];
+        authority ??= /^ {2}authority +(\S+)$/.exec(line)?.[1];
         const [, login, password] = /^ {2}(\w+) +password (\S+)/.exec(line) ?? [];
         passwords.set(login, password);
         if (login === 'bob') { // the last one
@@ -47,9 +46,10 @@ function ask(query, cookie = '') {
 }
 
 const cookieOf = (answer) => answer['Set-Cookie'].split(';')[0];
+const csrfOf = ({parameters}) => JSON.parse(Buffer.from(parameters.get('state'), 'base64').toString()).csrf;
 const isReturn = (url) => url.href.startsWith(REDIRECT_URI);
 
-describe('A program of one\'s own', async () => {
+describe('The README\'s program', async () => {
     const log = await collectSystemLog(() => {});
     const folder = mkdtempSync('/tmp/own-program-');
     let provider;
@@ -77,6 +77,7 @@ describe('A program of one\'s own', async () => {
             const bob = await signIn('bob');
             await isRefused(alice.query, '', 'other_browser');
             await isRefused(alice.query, bob.cookie, 'other_browser');
+            await isRefused(alice.query, `__Host-login-0=${csrfOf(alice)}`, 'other_browser');
             const stolenCode = new URLSearchParams({code: alice.parameters.get('code'), state: bob.parameters.get('state')});
             await isRefused(stolenCode.toString(), bob.cookie, 'other_login');
             await isRefused(bob.query, bob.cookie, 'login_expired');
@@ -98,10 +99,19 @@ describe('A program of one\'s own', async () => {
         await isRefused(second.query, second.cookie, 'network');
     });
 
+    test('starts again with the page to return to', async () => {
+        provider = await startProvider('azure');
+        const {Location: address} = ask('origin=%2Ffiles');
+        const state = new URL(address).searchParams.get('state');
+        assert.equal(JSON.parse(Buffer.from(state, 'base64').toString()).origin, '/files');
+    });
+
     test('reports what is not set up', async () => {
         provider = await startProvider('azure');
+        const alice = await signIn('alice');
         rmSync('/usr/tavo/etc/ssoclient/azure.conf');
         await isRefused('', '', 'not_set_up');
+        await isRefused(alice.query, alice.cookie, 'not_set_up');
         writeFileSync('/usr/tavo/etc/ssoclient/profile.conf', '{"sso_enable": false}');
         await isRefused('', '', 'switched_off');
     });

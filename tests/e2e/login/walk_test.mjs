@@ -78,7 +78,7 @@ async function walkEverything(running) {
     const azureUser = await walkAzure(walk, report);
     const websphereUser = await walkWebsphere(walk, report);
     await walkReadmeProgram(walk, report, running);
-    report.title('Every step was as it should be. Signed in through a real OpenID provider:');
+    report.title('All steps passed. Signed in through a real OpenID provider:');
     report.fact(`azure      ${azureUser}`);
     report.fact(`websphere  ${websphereUser}`);
 }

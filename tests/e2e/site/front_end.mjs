@@ -11,20 +11,20 @@ const ETC = '/usr/tavo/etc';
 const INSTALLED_SETTINGS = process.env.INSTALLED_LIGHTTPD_CONF;
 export const FRONT_END_SETTINGS = fileURLToPath(new URL('../../../frontend/lighttpd.conf', import.meta.url));
 
-function writePrivately(file, settings) {
-    writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode: 0o600});
+function writeJson(file, settings, mode) {
+    writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode});
 }
 
 /** The platform's domains: DNS name to NetBIOS name. */
 export function writeDomains(domains, etc = ETC) {
     mkdirSync(`${etc}/ssoclient`, {recursive: true, mode: 0o755});
-    writeFileSync(`${etc}/domains.conf`, JSON.stringify(domains));
+    writeJson(`${etc}/domains.conf`, domains, 0o644);
 }
 
 /** The settings of both profiles' clients. */
 export function writeSettings({provider, clients}, etc = ETC) {
     const [azure, websphere] = clients;
-    writePrivately(`${etc}/ssoclient/azure.conf`, {
+    writeJson(`${etc}/ssoclient/azure.conf`, {
         azure_sso_enable: true,
         azure_wellknown: provider.endpoints.discovery,
         azure_client_id: azure.id,
@@ -34,8 +34,8 @@ export function writeSettings({provider, clients}, etc = ETC) {
         azure_token_endpoint: provider.endpoints.token,
         azure_redirect_uri: azure.redirectURI,
         azure_logout_endpoint: provider.endpoints.logout,
-    });
-    writePrivately(`${etc}/ssoclient/websphere.conf`, {
+    }, 0o600);
+    writeJson(`${etc}/ssoclient/websphere.conf`, {
         websphere_wellknown: provider.endpoints.discovery,
         websphere_client_id: websphere.id,
         websphere_client_secret: websphere.secret,
@@ -43,11 +43,11 @@ export function writeSettings({provider, clients}, etc = ETC) {
         websphere_token_endpoint: provider.endpoints.token,
         websphere_redirect_uri: websphere.redirectURI,
         websphere_logout_endpoint: provider.endpoints.logout,
-    });
+    }, 0o600);
 }
 
 export function useProfile(name, enable = true, etc = ETC) {
-    writePrivately(`${etc}/ssoclient/profile.conf`, {sso_enable: enable, sso_profile: name});
+    writeJson(`${etc}/ssoclient/profile.conf`, {sso_enable: enable, sso_profile: name}, 0o644);
 }
 
 /** A listening socket on a port of the kernel's choice, for `startWebServer`: its port is known before the server. */

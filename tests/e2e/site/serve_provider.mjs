@@ -1,4 +1,4 @@
-// Serves the OpenID provider alone, for a program of the reader's own, until Ctrl-C: see ../../../demo.
+// Serves only the OpenID provider, for the reader's own program, until Ctrl-C: see ../../../demo.
 import {mkdirSync, mkdtempSync, rmSync} from 'node:fs';
 import {tmpdir} from 'node:os';
 import path from 'node:path';
@@ -43,14 +43,20 @@ writeSettings({provider, clients}, etc);
 useProfile(profile, true, etc);
 writeDomains({'corp.example.net': 'ACME'}, etc);
 
-console.log(`Profile ${profile}, until Ctrl-C:
+console.log(`Profile ${profile}, until Ctrl-C. Each start has a new port, authority, secrets and passwords.
 
-  issuer               ${provider.address}
-  redirect URI         ${redirectURI}
-  configuration files  ${path.resolve(etc)}, for /usr/tavo/etc
-  authority            ${authority.file}, for /etc/ssl/certs/ca-certificates.crt and the browser
+  issuer         ${provider.address}
+  redirect URI   ${redirectURI}
+  authority      ${authority.file}
 
-Users:
+Install the configuration files and the authority:
+
+  sudo mkdir -p /usr/tavo/etc /usr/tavo/var
+  sudo cp -r ${path.resolve(etc)}/. /usr/tavo/etc/
+  sudo cp ${authority.file} /usr/local/share/ca-certificates/tavosso-provider.crt
+  sudo update-ca-certificates
+
+The browser must trust the authority, too. Users:
 `);
 for (const [login, {password, uniqueName}] of users) {
     console.log(`  ${login.padEnd(6)} password ${password}  (${uniqueName})`);
