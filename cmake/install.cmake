@@ -1,4 +1,4 @@
-# The installed tree: libraries, public headers side by side as <tavosso/NAME.h>, a CMake package, pkg-config files.
+# Installs the libraries, the public headers as <tavosso/NAME.h>, a CMake package and pkg-config files.
 set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/tavosso)
 
 set_target_properties(tavosso PROPERTIES INSTALL_RPATH $ORIGIN)
@@ -17,9 +17,9 @@ write_basic_package_version_file(tavossoConfigVersion.cmake COMPATIBILITY SameMa
 install(FILES ${PROJECT_BINARY_DIR}/tavossoConfig.cmake ${PROJECT_BINARY_DIR}/tavossoConfigVersion.cmake
         DESTINATION ${package_dir})
 
-# Found from where the file itself lies, so that the tree may be installed under any prefix, or moved.
+# Relative to the pkg-config file, so the tree can be installed under any prefix, or moved.
 file(RELATIVE_PATH prefix_from_pkgconfig /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
-# Programs find a library under a private prefix by a run path. Under /usr the loader finds it.
+# Outside /usr, programs need a run path to find the library.
 if(NOT CMAKE_INSTALL_PREFIX STREQUAL /usr)
     set(pkgconfig_run_path " -Wl,-rpath,\${libdir}")
 endif()

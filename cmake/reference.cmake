@@ -1,5 +1,5 @@
-# The API reference, from the public headers alone: cmake --build BUILD --target reference, then
-# BUILD/reference/html/index.html. A public name without documentation, or without that of a parameter, fails.
+# The API reference of the public headers. The target "reference" writes BUILD/reference/html/index.html.
+# It fails if a public name or a parameter is not documented.
 find_package(Doxygen QUIET)
 if(NOT DOXYGEN_FOUND)
     return()
@@ -17,7 +17,7 @@ set(DOXYGEN_QUIET YES)
 set(DOXYGEN_VERBATIM_HEADERS NO)
 set(DOXYGEN_HAVE_DOT NO)
 set(DOXYGEN_HTML_TIMESTAMP NO)
-# From where they lie as they are installed, so that the reference names them as programs include them.
+# The reference shows the headers' names as programs include them.
 set(DOXYGEN_STRIP_FROM_PATH ${installed_headers})
 set(DOXYGEN_STRIP_FROM_INC_PATH ${installed_headers})
 doxygen_add_docs(reference ${installed_headers}/tavosso/sso.h ${installed_headers}/tavosso/jwt.h

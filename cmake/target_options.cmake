@@ -8,14 +8,14 @@ option(TAVOSSO_FUZZ "Build everything for libFuzzer (clang alone), and the fuzz 
 check_cxx_compiler_flag(-fcf-protection=full TAVOSSO_HAS_CF_PROTECTION)
 check_pie_supported(LANGUAGES CXX)
 
-# What everything is built with.
+# Options of every target.
 function(tavosso_options target)
     target_compile_features(${target} PRIVATE cxx_std_17)
     set_target_properties(${target} PROPERTIES CXX_EXTENSIONS OFF)
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR})
     target_compile_options(${target} PRIVATE -Wall -Wextra -Wshadow -Wconversion)
     if(TAVOSSO_HARDENING)
-        # Not _FORTIFY_SOURCE: it renames the calls that the library makes, and belongs to the packager's flags.
+        # Not _FORTIFY_SOURCE: it renames the library's calls, and the packager sets it.
         target_compile_options(${target} PRIVATE -fstack-protector-strong -fstack-clash-protection
             $<$<BOOL:${TAVOSSO_HAS_CF_PROTECTION}>:-fcf-protection=full>)
         target_link_options(${target} PRIVATE LINKER:-z,relro LINKER:-z,now LINKER:-z,noexecstack
@@ -27,20 +27,20 @@ function(tavosso_options target)
         target_link_options(${target} PRIVATE -fsanitize=address,undefined)
     endif()
     if(TAVOSSO_FUZZ)
-        # Counts the edges that an input reaches; _GLIBCXX_ASSERTIONS holds every index against its container's bounds.
+        # Edge coverage; _GLIBCXX_ASSERTIONS checks every index.
         target_compile_options(${target} PRIVATE -fsanitize=fuzzer-no-link)
         target_compile_definitions(${target} PRIVATE _GLIBCXX_ASSERTIONS)
     endif()
 endfunction()
 
-# Where an installed file finds the library: relative to itself, so that any prefix works without environment variables.
-# A Debian package is built with CMAKE_SKIP_RPATH, since its libraries are in the loader's own folders.
+# Sets a run path relative to the installed file, so any prefix works without environment variables. Debian packages are
+# built with CMAKE_SKIP_RPATH, because the loader searches their folders.
 function(tavosso_find_library_from target destination)
     file(RELATIVE_PATH to_library /${destination} /${CMAKE_INSTALL_LIBDIR})
     set_target_properties(${target} PROPERTIES INSTALL_RPATH $ORIGIN/${to_library})
 endfunction()
 
-# A program that is served, and what is linked into it: loaded at any address, whatever the compiler does by itself.
+# Options of served programs and of objects linked into them: PIE, independent of the compiler's default.
 function(tavosso_program_options target)
     tavosso_options(${target})
     if(TAVOSSO_HARDENING)
@@ -48,8 +48,8 @@ function(tavosso_program_options target)
     endif()
 endfunction()
 
-# A library exports what stands in its NAME.map and nothing else. Calls between its exported functions stay
-# interposable: programs may put their own in front.
+# Options of a library. It exports only the names in its NAME.map. Calls between exported functions remain interposable:
+# programs may define their own.
 function(tavosso_library_options target)
     tavosso_options(${target})
     set(map ${PROJECT_SOURCE_DIR}/cmake/lib${target}.map)

@@ -1,4 +1,4 @@
-# Test programs against the built library. They need GoogleTest. A build of what is shipped has none of them.
+# Test programs for the built library. They need GoogleTest. Release builds do not contain them.
 option(TAVOSSO_TEST_PROGRAMS "Build the test programs" ON)
 if(NOT TAVOSSO_TEST_PROGRAMS)
     return()
@@ -12,8 +12,8 @@ tavosso_options(test_support)
 target_compile_definitions(test_support PRIVATE TAVOSSO_WINBIND=$<BOOL:${TAVOSSO_WINBIND}>)
 target_link_libraries(test_support PUBLIC failure_table OpenSSL::Crypto PkgConfig::JSONCPP)
 
-# Sources of many programs, each compiled once. Objects, not an archive: a program links all of them, so that they
-# replace functions that the library calls.
+# Compiles a source of several programs once. An object library, not an archive: it is always linked, so it replaces
+# functions that the library calls.
 function(tavosso_objects name source)
     add_library(${name} OBJECT ${source})
     tavosso_options(${name})
@@ -23,14 +23,14 @@ endfunction()
 foreach(interposed calls clock crypto_calls memory platform_calls process releases transport)
     tavosso_objects(interposed_${interposed} support/interposed/${interposed}.cpp)
 endforeach()
-# A sanitizer's run time allocates memory before it is ready for instrumented code.
+# Sanitizers allocate memory before they support instrumented code.
 foreach(interposed calls memory releases)
     target_compile_options(interposed_${interposed} PRIVATE -fno-sanitize=all)
 endforeach()
 tavosso_objects(refused_calls support/refused_calls.cpp)
 tavosso_objects(system_log support/system_log.cpp)
 
-# all_LABEL_tests builds the test programs of one label: building all of them takes minutes.
+# all_LABEL_tests builds the test programs of one label, because building all takes minutes.
 function(tavosso_label_program label name)
     if(NOT TARGET all_${label}_tests)
         add_custom_target(all_${label}_tests)
@@ -38,7 +38,7 @@ function(tavosso_label_program label name)
     add_dependencies(all_${label}_tests ${name})
 endfunction()
 
-# Runs a program's tests in one process, in private namespaces: to start those takes longer than most tests.
+# Runs a program's tests in one process in private namespaces, because starting these takes longer than most tests.
 function(tavosso_add_test label name)
     tavosso_label_program(${label} ${name})
     add_test(NAME ${label}.${name} COMMAND ${PROJECT_SOURCE_DIR}/tools/private-root $<TARGET_FILE:${name}>)
