@@ -1,14 +1,13 @@
 #include <gmock/gmock.h>
 
-#include <cstdio>
 #include <fstream>
 #include <iterator>
-#include <memory>
 #include <regex>
 #include <set>
 #include <string>
 
 #include "tests/doctor/doctor_process.h"
+#include "tests/support/command_output.h"
 
 // The command line in the manual page, and in the completion of bash.
 namespace Test {
@@ -40,10 +39,7 @@ std::string Complete(const std::string &words) {
                                "; COMP_WORDS=(tavosso-doctor " + words +
                                "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _tavosso_doctor 2>/dev/null;"
                                " echo -n \"${COMPREPLY[*]}\"";
-    const std::unique_ptr<FILE, decltype(&pclose)> pipe(popen(("bash -c '" + script + "'").c_str(), "r"), pclose);
-    char offered[1024] = {};
-    EXPECT_LT(std::fread(offered, 1, sizeof offered, pipe.get()), sizeof offered);
-    return offered;
+    return Test::OutputOf("bash -c '" + script + "'");
 }
 
 TEST(Options, AreInTheManualPageAndCompleted) {

@@ -1,5 +1,6 @@
 #include "tests/support/interposed/calls.h"
 
+#include <curl/curl.h>
 #include <dirent.h>
 #include <dlfcn.h>
 #include <gmock/gmock.h>
@@ -7,11 +8,13 @@
 #include <openssl/err.h>
 
 #include <algorithm>
+#include <boost/algorithm/string/replace.hpp>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <iterator>
-#include <memory>
+#include <map>
 #include <set>
 #include <sstream>
 #include <string>
@@ -20,6 +23,7 @@
 #include "sso/sso.h"
 #include "tests/faults/call_table.h"
 #include "tests/faults/scenario.h"
+#include "tests/support/command_output.h"
 #include "tests/support/interposed/process.h"
 #include "tests/support/system_log.h"
 
@@ -63,6 +67,18 @@ Trial Try(const Scenario &scenario, const std::string &function = "", int n = 0)
     return trial;
 }
 
+/// Replaces libcurl's texts, which differ between versions, by their numbers.
+std::string NumberTransferErrors(std::string text) {
+    std::map<std::string, int, std::greater<>> codes;  // a text before its own beginning
+    for (int code = CURL_LAST - 1; code > CURLE_OK; --code) {
+        codes[curl_easy_strerror(static_cast<CURLcode>(code))] = code;
+    }
+    for (const auto &[words, code] : codes) {
+        boost::replace_all(text, words, "libcurl's error " + std::to_string(code));
+    }
+    return text;
+}
+
 /// The ending, and what was logged. Where that begins with the usual lines, only the others.
 std::string Describe(const Trial &trial, const std::vector<LogLine> &usualLog) {
     std::ostringstream text;
@@ -73,7 +89,7 @@ std::string Describe(const Trial &trial, const std::vector<LogLine> &usualLog) {
     for (std::size_t i = usual ? usualLog.size() : 0; i < trial.log.size(); ++i) {
         text << (usual ? "    " : "    only ") << trial.log[i] << "\n";
     }
-    return text.str();
+    return NumberTransferErrors(text.str());
 }
 
 /// Every open descriptor; the one that looks at them is always there.
@@ -147,11 +163,10 @@ std::set<std::string> UndefinedSymbols() {
     Dl_info library;
     EXPECT_NE(dladdr(reinterpret_cast<void *>(TAVO::SSO::OIDCLogin), &library), 0);
     const std::string command = std::string("nm -D --undefined-only --format=just-symbols ") + library.dli_fname;
-    const std::unique_ptr<FILE, decltype(&pclose)> pipe(popen(command.c_str(), "r"), pclose);
+    std::istringstream lines(OutputOf(command));
     std::set<std::string> names;
-    char line[4096];
-    while (std::fgets(line, sizeof line, pipe.get()) != nullptr) {
-        const std::string symbol(line, std::strcspn(line, "@\n"));
+    for (std::string line; std::getline(lines, line);) {
+        const std::string symbol = line.substr(0, line.find('@'));
         if (symbol.rfind("_Z", 0) != 0 && symbol.rfind("__asan", 0) != 0 && symbol.rfind("__ubsan", 0) != 0) {
             names.insert(symbol);
         }

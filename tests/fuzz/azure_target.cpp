@@ -20,7 +20,6 @@ constexpr char kClientSecret[] = "secret-of-this-appliance";
 constexpr char kDiscovery[] = "https://login.example.com/discovery";
 constexpr char kKeys[] = "https://login.example.com/keys";
 
-constexpr char kNotConnected[] = "Couldn't connect to server";
 constexpr char kNotJson[] = "bad wellknown json format.";
 
 struct Client : TAVO::SSO::AzureSSOClient {
@@ -71,7 +70,7 @@ class Expected {
         }
         urls.push_back(UpToNUL(TextMember(discovery.value_or(Json::Value()), "jwks_uri").value_or("")));
         if (urls.back() != kKeys && urls.back() != kDiscovery) {
-            log.push_back(std::string("azuresso:N request wellknown uri ") + kNotConnected + ".");
+            log.push_back(std::string("azuresso:N request wellknown uri ") + Test::kNotConnected + ".");
             return {};
         }
         return ReadKeys(urls.back() == kKeys ? keys_ : discovery_);

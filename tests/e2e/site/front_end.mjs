@@ -81,6 +81,8 @@ server.breakagelog := "${log}"
 server.upload-dirs := ( "${uploads}" )
 server.modules += ( "mod_openssl" )
 ssl.engine := "enable"
+# Also for a client that needs TLS 1.2: newer versions of lighttpd accept only 1.3 by default.
+ssl.openssl.ssl-conf-cmd := ( "MinProtocol" => "TLSv1.2" )
 ssl.pemfile := "${certificate.certFile}"
 ssl.privkey := "${certificate.keyFile}"
 `);

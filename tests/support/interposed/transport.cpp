@@ -55,6 +55,8 @@ CURLcode Perform(const Handle &handle) {
 
 Transport &CurrentTransport() { return State(); }
 void ResetTransport() { State() = Transport(); }
+const std::string kNotConnected = curl_easy_strerror(CURLE_COULDNT_CONNECT);
+
 Answer Whole(const std::string &body) { return {CURLE_OK, {body}}; }
 
 }  // namespace Test

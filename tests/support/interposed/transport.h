@@ -42,6 +42,9 @@ void ResetTransport();
 /// An answer that arrives whole.
 Answer Whole(const std::string &body);
 
+/// libcurl's text for a URL without an answer. It differs between versions.
+extern const std::string kNotConnected;
+
 }  // namespace Test
 
 #endif
