@@ -281,8 +281,8 @@ TEST_F(AzureVerification, AnUnreachableDiscoveryDocumentIsAnUnknownKid) {
     CurrentTransport().answers.erase(kWellknown);
     EXPECT_EQ(Verify(), kUnknownKid);
     EXPECT_THAT(CurrentTransport().urls, ElementsAre(kWellknown, ""));
-    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N " + Test::kNotConnected),
-                                             Error("azuresso:N request wellknown uri " + Test::kNotConnected + ".")));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N " + ::Test::kNotConnected),
+                                             Error("azuresso:N request wellknown uri " + ::Test::kNotConnected + ".")));
 }
 
 TEST_F(AzureVerification, AnExpiredTokenCausesNoRequestEvenIfDiscoveryIsDown) {
@@ -298,7 +298,7 @@ TEST_F(AzureVerification, ADiscoveryDocumentWithoutJwksUriIsAnUnknownKid) {
         EXPECT_EQ(Verify(), kUnknownKid) << document;
         EXPECT_EQ(CurrentTransport().urls.back(), "");
         EXPECT_THAT(TakeSystemLog(),
-                    ElementsAre(Error("azuresso:N request wellknown uri " + Test::kNotConnected + ".")));
+                    ElementsAre(Error("azuresso:N request wellknown uri " + ::Test::kNotConnected + ".")));
     }
 }
 
@@ -487,7 +487,7 @@ TEST_F(AzureKeySet, LibcurlIsCleanedUpOnceMoreAfterAHandledFailureToo) {
     client.RequestKeysInfo(kKeys, keys);
     EXPECT_TRUE(keys.isNull());
     EXPECT_EQ(std::count(CurrentTransport().calls.begin(), CurrentTransport().calls.end(), "curl_global_cleanup"), 2);
-    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("azuresso:N request wellknown uri " + Test::kNotConnected + ".")));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("azuresso:N request wellknown uri " + ::Test::kNotConnected + ".")));
 }
 
 TEST_F(AzureKeySet, WithoutATransferHandleItIsOneLine) {

@@ -78,7 +78,7 @@ TEST_F(LoginEntry, TheProfileChoosesTheClientThatLogsIn) {
 
     EXPECT_THAT(CurrentTransport().urls,
                 testing::ElementsAre("https://azure.example/token", "https://websphere.example/token"));
-    const auto unreachable = Error("sso:N request token uri " + Test::kNotConnected + ".");
+    const auto unreachable = Error("sso:N request token uri " + ::Test::kNotConnected + ".");
     EXPECT_THAT(TakeSystemLog(), testing::ElementsAre(unreachable, unreachable));
     EXPECT_EQ(userName, "before");
 }

@@ -125,7 +125,7 @@ TEST_F(ClientBase, AnUnreachableDiscoveryURLIsOneLineAndLeavesOutNull) {
     client.wellknownEndpoint = "https://nobody.example/";
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
-    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N " + Test::kNotConnected)));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N " + ::Test::kNotConnected)));
 }
 
 TEST_F(ClientBase, ADiscoveryDocumentThatIsNotJSONIsOneLineAndLeavesOutNull) {
@@ -213,7 +213,7 @@ TEST_F(ClientBase, AnUnreachableTokenEndpointReturnsWithAnEmptyResponse) {
     client.tokenEndpoint = "https://nobody.example/";
     client.RequestTokenEndpoint(response, "a=b");
     EXPECT_EQ(response, "");
-    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N request token uri " + Test::kNotConnected + ".")));
+    EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N request token uri " + ::Test::kNotConnected + ".")));
 }
 
 TEST_F(ClientBase, ATokenRequestWithoutATransferHandleIsOneLine) {

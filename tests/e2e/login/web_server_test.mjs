@@ -91,6 +91,11 @@ function request(target, {method = 'GET', headers = {}, body = ''} = {}) {
     return `${method} ${target} HTTP/1.1\r\n${all.map(([name, value]) => `${name}: ${value}\r\n`).join('')}\r\n${body}`;
 }
 
+/** Versions of lighttpd differ in some statuses. */
+function expectStatus(actual, expected) {
+    assert.ok([expected].flat().includes(actual), `status ${actual}, expected ${expected}`);
+}
+
 describe('The web server', () => {
     let site;
     before(async () => {
@@ -140,7 +145,7 @@ describe('The web server', () => {
             const watcher = watch(site.uploads);
             const stored = once(watcher, 'change').then(([, name]) => assert.fail(`the server stores ${name}`));
             try {
-                assert.equal(await Promise.race([sendAndReadStatus(), stored]), expected);
+                expectStatus(await Promise.race([sendAndReadStatus(), stored]), expected);
                 assert.deepEqual(readdirSync(site.uploads), []);
             } finally {
                 watcher.close();
@@ -156,7 +161,7 @@ describe('The web server', () => {
 
         test('of a huge length, over HTTP/2', () => expectNothingStored(413, () =>
             statusOverHttp2({':method': 'POST', ':path': '/index.cgi', 'content-length': '1000000000000'}, part)));
-        test('of no length, over HTTP/2', () => expectNothingStored(411, () =>
+        test('of no length, over HTTP/2', () => expectNothingStored([411, 413], () =>
             statusOverHttp2({':method': 'POST', ':path': '/index.cgi'}, part)));
     });
 
@@ -216,12 +221,12 @@ describe('The web server', () => {
             [431, 'a long header', request('/index.cgi', {headers: {Cookie: 'x'.repeat(10_000)}})],
             [501, 'an unknown method', request('/index.cgi', {method: 'NONSENSE'})],
             [504, 'a program that does not answer', request('/webman/sso/stuck.cgi')],
-            [505, 'an unknown version', 'GET / HTTP/4.2\r\nHost: localhost\r\n\r\n'],
+            [[400, 505], 'an unknown version', 'GET / HTTP/4.2\r\nHost: localhost\r\n\r\n'],
         ];
         for (const [status, kind, bytes] of answers) {
-            test(`${status}: ${kind}`, async () => {
+            test(`${[status].flat().join(' or ')}: ${kind}`, async () => {
                 const answer = await send(bytes);
-                assert.equal(answer.status, status);
+                expectStatus(answer.status, status);
                 const found = answer.headers.filter(([name]) => name in PROTECTION).sort();
                 assert.deepEqual(found, Object.entries(PROTECTION));
             });
