@@ -122,7 +122,7 @@ void ReportUnknownKeys(Report &report, const std::string &id, const SettingsFile
 }
 
 void ReportRights(Report &report, const std::string &id, const SettingsFile &file, bool holdsSecret) {
-    struct stat status {};
+    struct stat status = {};
     if (stat(file.path.c_str(), &status) != 0) {
         return;  // which the check of the file has already told
     }

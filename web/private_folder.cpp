@@ -37,7 +37,7 @@ bool IsName(const std::string &name) {
 }
 
 struct stat StatusOf(const Descriptor &file) {
-    struct stat status {};
+    struct stat status = {};
     if (fstat(file.Number(), &status) != 0) {
         ThrowSystemError("The front end's folder cannot be examined");
     }
@@ -276,7 +276,7 @@ bool PrivateFolder::CountOneMore() {
 std::size_t PrivateFolder::Sweep() {
     std::size_t remaining = 0;
     for (const std::string &name : NamesIn(folder)) {
-        struct stat status {};
+        struct stat status = {};
         if (fstatat(folder.Number(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 && IsAlive(status, lifetime)) {
             ++remaining;
         } else {

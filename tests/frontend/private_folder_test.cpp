@@ -65,7 +65,7 @@ class PrivateFolderTest : public testing::Test {
     }
 
     static unsigned Mode(const std::string &path) {
-        struct stat status {};
+        struct stat status = {};
         EXPECT_EQ(stat(path.c_str(), &status), 0);
         return status.st_mode & 0777;
     }

@@ -124,7 +124,7 @@ TEST_F(SessionTest, EndsAfterEightHours) {
 
 TEST_F(SessionTest, CannotBeReadByAnotherUserOfTheMachine) {
     Start("", "alice");
-    struct stat status {};
+    struct stat status = {};
     ASSERT_EQ(stat(kFolder, &status), 0);
     EXPECT_EQ(status.st_mode & 0777, 0700U);
     const std::filesystem::directory_iterator files(kFolder);

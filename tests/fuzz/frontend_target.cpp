@@ -168,9 +168,8 @@ bool Concludes(const std::string &cookies, const std::string &state) {
     TAVO::Web::Response response;
     TAVO::Web::FolderLoginStore store(kLogins);
     std::string origin;
-    const Test::Failure failure = FailureOf([&] {
-        TAVO::Web::EndLogin(response, origin, {"GET", "", cookies}, store, state);
-    });
+    const TAVO::Web::Request request = {"GET", "", cookies};
+    const Test::Failure failure = FailureOf([&] { TAVO::Web::EndLogin(response, origin, request, store, state); });
     RequireOneOf(failure, {Test::kNothingThrown,
                            Test::Fails<TAVO::Web::Refusal>("This sign-in was not started in this browser."),
                            Test::Fails<TAVO::Web::Refusal>("This sign-in took too long, or was already completed."),

@@ -486,8 +486,8 @@ std::vector<DocumentCase> Documents() {
         rows.push_back({name, answers, outcome, log});
     };
     const auto badKeySet = [&](const char *name, const std::string &document, const std::vector<LogLine> &log) {
-        keySet(
-            name, [document] { return document; }, unknownKey, log);
+        const auto answer = [document] { return document; };
+        keySet(name, answer, unknownKey, log);
     };
     badKeySet("KeySetEmpty", "", {notJSON});
     badKeySet("KeySetNotJSON", "<html>", {notJSON});
@@ -504,16 +504,11 @@ std::vector<DocumentCase> Documents() {
             return KeySetOf({5, "first key", Json::nullValue, Parse(R"({"kty": "RSA"})"), ProviderKey().JWK(kKeyID)});
         },
         loggedIn, {});
-    keySet("TwoKeysOfThatNameTheFirstIsRight",
-           [] {
-               return KeySetOf({ProviderKey().JWK(kKeyID), ForeignKey()});
-           },
-           loggedIn, {});
-    keySet("TwoKeysOfThatNameTheFirstIsWrong",
-           [] {
-               return KeySetOf({ForeignKey(), ProviderKey().JWK(kKeyID)});
-           },
-           Refused<jwt_verify_failed>("verify rsa signature failed"), {Error("jwt:N EVP_DigestVerifyFinal failed")});
+    const auto rightKeyFirst = [] { return KeySetOf({ProviderKey().JWK(kKeyID), ForeignKey()}); };
+    const auto wrongKeyFirst = [] { return KeySetOf({ForeignKey(), ProviderKey().JWK(kKeyID)}); };
+    keySet("TwoKeysOfThatNameTheFirstIsRight", rightKeyFirst, loggedIn, {});
+    keySet("TwoKeysOfThatNameTheFirstIsWrong", wrongKeyFirst, Refused<jwt_verify_failed>("verify rsa signature failed"),
+           {Error("jwt:N EVP_DigestVerifyFinal failed")});
     return rows;
 }
 

@@ -38,14 +38,14 @@ static_assert(
 
 // Programs keep clients by value. A copy is made in their own code: no exported name would be lost with it.
 template <typename... Types>
-constexpr bool kAreCopied = ((std::is_copy_constructible_v<Types> && std::is_copy_assignable_v<Types>)&&...);
+constexpr bool kAreCopied = std::conjunction_v<std::is_copy_constructible<Types>..., std::is_copy_assignable<Types>...>;
 static_assert(kAreCopied<SSO::SSOClient, SSO::AzureSSOClient, SSO::WebSphereSSOClient, SSO::SSOProfile, JWT::Jwt>);
 
 /// An exception with nothing of its own, caught as `Base` too, and made of a text that has to be named as one.
 template <typename Exception, typename Base>
 constexpr bool kIsCaughtAs =
     std::is_base_of_v<Base, Exception> &&
-    sizeof(Exception) == sizeof(std::runtime_error) && std::is_constructible_v<Exception, std::string> &&
+    (sizeof(Exception) == sizeof(std::runtime_error)) && std::is_constructible_v<Exception, std::string> &&
     !std::is_convertible_v<std::string, Exception>;
 static_assert(kIsCaughtAs<SSO::sso_exception, std::runtime_error>);
 static_assert(kIsCaughtAs<SSO::sso_err_resp, SSO::sso_exception>);

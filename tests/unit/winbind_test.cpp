@@ -74,7 +74,7 @@ int ErrorOfWaiting() {
 class Disposition {
   public:
     Disposition(int signal, void (*handler)(int), int flags = 0) : signal_(signal) {
-        struct sigaction action {};
+        struct sigaction action = {};
         action.sa_handler = handler;
         action.sa_flags = flags;
         sigaction(signal, &action, &before_);
@@ -85,7 +85,7 @@ class Disposition {
 
   private:
     int signal_;
-    struct sigaction before_ {};
+    struct sigaction before_ = {};
 };
 
 class Question : public testing::Test {
