@@ -1,5 +1,6 @@
 #include "sso/id_token.h"
 
+#include <cstdint>
 #include <ctime>
 #include <locale>
 #include <sstream>
@@ -19,7 +20,7 @@ JWT::Jwt SplitIDToken(const std::string &token) {
 void CheckExpiry(const Json::Value &claims) {
     std::istringstream text(Utils::MemberText(claims, "exp").value_or(""));
     text.imbue(std::locale::classic());  // the host's locale may take a decimal point for a digit separator
-    long expiry = 0;
+    std::int64_t expiry = 0;  // on 32-bit, a long ends in 2038
     text >> expiry;
     const std::time_t now = std::time(nullptr);
     // time() returns -1 on failure, which is before every expiry.

@@ -44,9 +44,9 @@ static_assert(kAreCopied<SSO::SSOClient, SSO::AzureSSOClient, SSO::WebSphereSSOC
 /// An exception with nothing of its own, caught as `Base` too, and made of a text that has to be named as one.
 template <typename Exception, typename Base>
 constexpr bool kIsCaughtAs =
-    std::is_base_of_v<Base, Exception> &&
-    (sizeof(Exception) == sizeof(std::runtime_error)) && std::is_constructible_v<Exception, std::string> &&
-    !std::is_convertible_v<std::string, Exception>;
+    std::conjunction_v<std::is_base_of<Base, Exception>, std::is_constructible<Exception, std::string>,
+                       std::negation<std::is_convertible<std::string, Exception>>> &&
+    (sizeof(Exception) == sizeof(std::runtime_error));
 static_assert(kIsCaughtAs<SSO::sso_exception, std::runtime_error>);
 static_assert(kIsCaughtAs<SSO::sso_err_resp, SSO::sso_exception>);
 static_assert(kIsCaughtAs<SSO::sso_not_implemented, SSO::sso_exception>);
