@@ -1,0 +1,8 @@
+# Builds for another Debian architecture with Debian's cross compiler: cmake -DTAVOSSO_TARGET=aarch64-linux-gnu
+list(APPEND CMAKE_TRY_COMPILE_PLATFORM_VARIABLES TAVOSSO_TARGET)
+set(CMAKE_SYSTEM_NAME Linux)
+string(REGEX REPLACE "-.*" "" CMAKE_SYSTEM_PROCESSOR "${TAVOSSO_TARGET}")
+set(CMAKE_CXX_COMPILER ${TAVOSSO_TARGET}-g++)
+set(CMAKE_LIBRARY_ARCHITECTURE ${TAVOSSO_TARGET})
+set(CMAKE_INSTALL_LIBDIR lib/${TAVOSSO_TARGET} CACHE PATH "")
+set(ENV{PKG_CONFIG_LIBDIR} "/usr/lib/${TAVOSSO_TARGET}/pkgconfig:/usr/share/pkgconfig")
