@@ -28,7 +28,7 @@ std::optional<std::string> NetBIOSName(const std::string &domain) {
 std::string Shown(std::string domain) {
     domain.resize(std::min<std::size_t>(domain.size(), 255));
     for (char &c : domain) {
-        c = (c >= '\0' && c < ' ') || c == '\x7f' ? '?' : c;
+        c = (static_cast<unsigned char>(c) < ' ') || c == '\x7f' ? '?' : c;
     }
     return domain;
 }
