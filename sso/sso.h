@@ -1,37 +1,33 @@
 /**
  * @mainpage Reference
  *
- * Single sign-on of the appliance's web front end through an external OpenID Connect provider: the relying party's
- * side of the authorization-code flow (OpenID Connect Core 1.0, section 3.1; RFC 6749, section 4.1).
+ * The relying party of the authorization-code flow (OpenID Connect Core 1.0, section 3.1) for the appliance's web front
+ * end.
  *
- * A login takes two requests of the front end:
- *  1. Start: put a random value into the state and into a cookie of the browser. Construct the client of the profile in
- *     force and send the browser to the address that its `GetAccessTokenReqURI` returns.
- *  2. Return: the browser comes back to the redirect URI with a code and the state. Compare the state's random value
- *     with the cookie. Exchange the code with the client's `OpenIDConnectLogin`, which yields the user's name.
- *     Compare the "nonce" of the ID token (`GetUserInfo`) with the nonce of the start. Then open a session.
+ * A login takes two requests of the browser:
+ *  1. Start: put a random value into the state and into a cookie. Construct the client of the configured profile and
+ *     redirect the browser to the URL that `GetAccessTokenReqURI` returns.
+ *  2. Return: the provider sends the browser to the redirect URI with a code and the state. Compare the state with the
+ *     cookie. Call `OpenIDConnectLogin` with the code. Compare the ID token's "nonce" (`GetUserInfo`) with the nonce of
+ *     the start. Then open a session.
  *
- * `GetSSORelayURL` returns the address of the relay page, which shows the user the outcome.
+ * @warning The library keeps nothing between requests and checks neither cookie nor nonce. Without the cookie, an
+ * attacker can sign a victim's browser in to the attacker's account. Without the nonce, an attacker can sign in with a
+ * stolen code.
  *
- * @warning The library keeps nothing between requests. The caller must bind each return to the browser that started the
- * login, and the token's nonce to that start. Without the first, anyone can sign a victim's browser in to an account of
- * their own. Without the second, anyone who has a stolen code can sign in with it. `OIDCLogin` checks neither.
+ * Failures are exceptions. The texts of `what()` are fixed, including misspellings. Any function may throw
+ * `std::bad_alloc`. Log lines begin with "SOURCE:LINE ".
  *
- * Every failure is an exception; every text that `what()` gives is fixed and part of this interface, misspellings
- * included. Diagnostics go to `syslog`, each line beginning "SOURCE:LINE ". Any function may also throw
- * `std::bad_alloc` when memory runs out.
+ * Use the library in one thread at a time. Constructing a client or a profile changes the effective ids of the process
+ * while it reads a file. Each HTTP request initialises and cleans up libcurl globally; over TLS, libcurl also clears
+ * the calling thread's OpenSSL error queue, including marks.
  *
- * One thread at a time: constructing a client or a profile changes the effective ids of the whole process while a file
- * is read, and every HTTP request initialises and cleans up libcurl globally. A request over TLS also clears the
- * calling thread's OpenSSL error queue, marks included, because libcurl does.
- *
- * The layout of the classes and the order of their virtual functions are fixed under soname `libtavosso.so.6`:
- * programs are linked against them, and a change would break them silently.
+ * The layout of the classes and the order of their virtual functions are fixed under soname `libtavosso.so.6`.
  */
 
 /**
  * @file
- * The login and the addresses around it: the clients of the two providers, the profile, the exceptions.
+ * Clients of the two providers, the profile, the login, and its exceptions.
  */
 #ifndef TAVOSSO_SSO_SSO_H
 #define TAVOSSO_SSO_SSO_H
@@ -48,48 +44,46 @@
 namespace TAVO::SSO {
 
 /**
- * Root of the failures of single sign-on. Only `OIDCLogin` throws exactly this class, for a profile that is not
- * supported: a caller that catches `sso_op_failed` alone does not see that one.
+ * Base class of the failures of single sign-on. Only `OIDCLogin` throws exactly this class, for an unsupported profile.
  */
 class sso_exception : public std::runtime_error {
   public:
-    /** @param message  the text that `what()` gives */
+    /** @param message  the text of `what()` */
     explicit sso_exception(std::string message);
     ~sso_exception() override;
 };
 
 /**
- * A transfer failed (`what()` is then libcurl's text for it), or the provider's answer cannot be used. Where the Azure
- * provider answered with an error, `what()` holds the whole answer: do not show it to a user or write it to a log.
+ * A transfer failed (`what()` is libcurl's text), or the provider's response cannot be used. For an error response of
+ * Azure, `what()` is the whole response: do not show it or log it.
  */
 class sso_err_resp : public sso_exception {
   public:
-    /** @param message  the text that `what()` gives */
+    /** @param message  the text of `what()` */
     explicit sso_err_resp(std::string message);
     ~sso_err_resp() override;
 };
 
-/** A step of the login was called on the plain base client, which does not know any provider. */
+/** A step of the login was called on the base client, which supports no provider. */
 class sso_not_implemented : public sso_exception {
   public:
-    /** @param message  the text that `what()` gives */
+    /** @param message  the text of `what()` */
     explicit sso_not_implemented(std::string message);
     ~sso_not_implemented() override;
 };
 
-/** Something on this machine is missing or failed: the profile, the platform's encoder, its domain conversion. */
+/** An operation on this machine failed: reading the profile, encoding, or converting a domain. */
 class sso_op_failed : public sso_exception {
   public:
-    /** @param message  the text that `what()` gives */
+    /** @param message  the text of `what()` */
     explicit sso_op_failed(std::string message);
     ~sso_op_failed() override;
 };
 
 /**
- * What every provider's client has in common: its settings, the two exchanges with the provider, and the fixed order
- * of a login. It serves one login.
+ * A client's settings, its requests to the provider, and the order of a login. Use an object for one login.
  *
- * It has no virtual destructor. To delete a client through this type is undefined behaviour:
+ * It has no virtual destructor. Deleting a client through a pointer to this class is undefined behaviour:
  * @code
  * std::unique_ptr<TAVO::SSO::SSOClient> client = std::make_unique<TAVO::SSO::AzureSSOClient>();  // forbidden
  * TAVO::SSO::AzureSSOClient client;                                                             // use this
@@ -98,156 +92,152 @@ class sso_op_failed : public sso_exception {
 class SSOClient {
   public:
     /**
-     * Tells whether the client's own file switches it on. Logins go by the profile instead.
-     * @return "azure_sso_enable"; always false for WebSphere, whose file has no such key
+     * Returns whether the client's own file enables it. Logins depend on the profile instead.
+     * @return "azure_sso_enable"; false for WebSphere, whose file has no such key
      */
     virtual bool isEnable();
-    /** Gives the client identifier. @return as registered at the provider (RFC 6749, section 2.2) */
+    /** Returns the client identifier (RFC 6749, section 2.2). @return as configured */
     virtual std::string GetClientID();
-    /** Gives the client secret. @return as registered at the provider: never show it or log it */
+    /** Returns the client secret. Never show it or log it. @return as configured */
     virtual std::string GetClientSecret();
-    /** Gives the redirect URI. @return as registered at the provider, or as `SetRedirectURI` set it */
+    /** Returns the redirect URI. @return as configured, or as set by `SetRedirectURI` */
     virtual std::string GetRedirectURI();
-    /** Gives the ID token. @return the compact token; empty before `ProcessTokenResponse`, and after it failed */
+    /** Returns the ID token. @return compact; empty unless `ProcessTokenResponse` succeeded */
     virtual std::string GetToken();
-    /** Gives the authorization endpoint. @return as configured */
+    /** Returns the authorization endpoint. @return as configured */
     virtual std::string GetAuthEndpoint();
-    /** Gives the token endpoint. @return as configured */
+    /** Returns the token endpoint. @return as configured */
     virtual std::string GetTokenEndpoint();
-    /** Gives the address of the discovery document. @return as configured */
+    /** Returns the URL of the discovery document. @return as configured */
     virtual std::string GetWellknownEndpoint();
-    /** Gives the logout endpoint. @return as configured */
+    /** Returns the logout endpoint. @return as configured */
     virtual std::string GetLogoutEndpoint();
-    /** Sets another redirect URI. @param uri  takes the place of the configured one; not checked */
+    /** Replaces the redirect URI. @param uri  not checked */
     virtual void SetRedirectURI(std::string uri);
-    /** Sets the code. @param authorizationCode  that of this login, percent-decoded; not checked, never returned */
+    /** Stores the authorization code. @param authorizationCode  percent-decoded; not checked */
     virtual void SetCode(std::string authorizationCode);
 
     /**
-     * Fetches the discovery document (OpenID Connect Discovery 1.0, section 4), with the provider's certificate and
-     * host name verified.
+     * Fetches the discovery document (OpenID Connect Discovery 1.0, section 4). Verifies certificate and host name.
      *
-     * @param out  receives the document; null when the answer is not JSON, untouched when the transfer failed or memory
-     *             ran out
+     * @param out  receives the document; null if the response is not JSON; unchanged if the transfer fails or memory
+     *             runs out
      *
-     * Does not throw for a failed transfer or a malformed answer. Each is one line at `LOG_ERR`:
-     *  - "sso:LINE TEXT" with libcurl's text or "bad wellknown json format.";
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made.
-     *
-     * Memory that runs out during the transfer fails it with libcurl's text; otherwise it is the second line.
+     * Does not throw. Logs a failure at `LOG_ERR`:
+     *  - "sso:LINE TEXT": libcurl's text, or "bad wellknown json format.";
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT": memory ran out outside the transfer.
      *
      * Side effects: those of `httpGet`.
      */
     virtual void RequestWellknownInfo(Json::Value &out);
 
     /**
-     * Posts the token request to the token endpoint (RFC 6749, section 4.1.3), with the provider's certificate and
-     * host name verified.
+     * Sends the token request (RFC 6749, section 4.1.3). Verifies certificate and host name.
      *
-     * @param response  the answer is appended to it, whatever its HTTP status; on a failure it holds what had arrived.
-     *                  Of a chunk that holds a NUL byte, only the part before it is taken
-     * @param body      the form-encoded body, as `GetIDTokenReqParams` gives it
+     * @param response  the response is appended, with any HTTP status; of a failed transfer, the part that arrived.
+     *                  Each chunk is cut at its first NUL
+     * @param body      as returned by `GetIDTokenReqParams`
      *
-     * Does not throw for a failed transfer; the next step reports it. It is one line at `LOG_ERR`:
-     *  - "sso:LINE request token uri TEXT." with libcurl's text;
-     *  - "sso:LINE bad_alloc. SYSTEM TEXT" when no transfer handle can be made.
-     *
-     * Memory that runs out during the transfer fails it with libcurl's text; otherwise it is the second line.
+     * Does not throw. Logs a failure at `LOG_ERR`:
+     *  - "sso:LINE request token uri TEXT.": libcurl's text;
+     *  - "sso:LINE bad_alloc. SYSTEM TEXT": memory ran out outside the transfer.
      *
      * Side effects: those of `httpPost`.
      */
     virtual void RequestTokenEndpoint(std::string &response, const std::string &body);
 
     /**
-     * Decides whether the ID token may be trusted; returns if so.
+     * Verifies the ID token. Derived classes implement it.
      *
-     * @throws sso_not_implemented  "VerifyIDToken not implemented", always, in this class
+     * @throws sso_not_implemented  "VerifyIDToken not implemented"
      */
     virtual void VerifyIDToken();
 
     /**
-     * Builds the body of the token request (RFC 6749, section 4.1.3).
+     * Returns the body of the token request (RFC 6749, section 4.1.3). Derived classes implement it.
      *
-     * @return nothing in this class; a provider's client gives the form-encoded body
+     * @return the form-encoded body
      *
-     * @throws sso_not_implemented  "GetIDTokenReqParams not implemented", always, in this class
+     * @throws sso_not_implemented  "GetIDTokenReqParams not implemented"
      */
     virtual std::string GetIDTokenReqParams();
 
     /**
-     * Gives the appliance's name of the user whom the ID token names. Verifies nothing: call `VerifyIDToken` first.
+     * Reads the user's name from the ID token, unverified. Derived classes implement it.
      *
-     * @param userName  untouched in this class; a provider's client writes the name to it
+     * @param userName  receives the name; unchanged in this class
      *
-     * @throws sso_not_implemented  "GetUserName not implemented", always, in this class
+     * @throws sso_not_implemented  "GetUserName not implemented"
      */
     virtual void GetUserName(std::string &userName);
 
     /**
-     * Takes the ID token out of the token endpoint's answer.
+     * Stores the ID token of a token response. Derived classes implement it.
      *
-     * @param response  the answer; not looked at in this class
+     * @param response  the response; ignored in this class
      *
-     * @throws sso_not_implemented  "ProcessTokenResponse not implemented", always, in this class
+     * @throws sso_not_implemented  "ProcessTokenResponse not implemented"
      */
     virtual void ProcessTokenResponse(std::string response);
 
     /**
-     * Runs a login: `SetCode`, `GetIDTokenReqParams`, `RequestTokenEndpoint`, `ProcessTokenResponse`, `VerifyIDToken`,
-     * `GetUserName`, in this order, each as a virtual call.
+     * Runs a login: calls `SetCode`, `GetIDTokenReqParams`, `RequestTokenEndpoint`, `ProcessTokenResponse`,
+     * `VerifyIDToken` and `GetUserName`, in this order, as virtual functions. Throws what a step throws.
      *
-     * @param authorizationCode  the code that the browser brought back, percent-decoded
-     * @param userName           receives the user's name; see the client's `GetUserName` for what it holds after a
-     *                           failure
+     * @param authorizationCode  as received, percent-decoded
+     * @param userName           receives the name; after a failure as for `GetUserName`
      *
-     * What a step throws passes through, and the steps after it are skipped. On a plain base client that is
-     * sso_not_implemented "GetIDTokenReqParams not implemented", after the code has been stored.
+     * @throws sso_not_implemented  "GetIDTokenReqParams not implemented", on the base client
+     *
+     * Log lines: those of the steps. Side effects: those of `httpGet` and `httpPost` (global initialisation and cleanup
+     * of libcurl), and of `AzureSSOClient::RequestKeysInfo`.
      */
     virtual void OpenIDConnectLogin(std::string authorizationCode, std::string &userName);
 
   protected:
-    bool enable = false;            ///< what `isEnable` gives
-    std::string clientID;           ///< what `GetClientID` gives
-    std::string clientSecret;       ///< what `GetClientSecret` gives
-    std::string redirectURI;        ///< what `GetRedirectURI` gives
-    std::string authEndpoint;       ///< what `GetAuthEndpoint` gives
-    std::string tokenEndpoint;      ///< what `GetTokenEndpoint` gives
-    std::string logoutEndpoint;     ///< what `GetLogoutEndpoint` gives
-    std::string wellknownEndpoint;  ///< what `GetWellknownEndpoint` gives
-    std::string code;               ///< the authorization code that `SetCode` stored
-    std::string token;              ///< what `GetToken` gives
+    bool enable = false;            ///< returned by `isEnable`
+    std::string clientID;           ///< returned by `GetClientID`
+    std::string clientSecret;       ///< returned by `GetClientSecret`
+    std::string redirectURI;        ///< returned by `GetRedirectURI`
+    std::string authEndpoint;       ///< returned by `GetAuthEndpoint`
+    std::string tokenEndpoint;      ///< returned by `GetTokenEndpoint`
+    std::string logoutEndpoint;     ///< returned by `GetLogoutEndpoint`
+    std::string wellknownEndpoint;  ///< returned by `GetWellknownEndpoint`
+    std::string code;               ///< stored by `SetCode`
+    std::string token;              ///< returned by `GetToken`
 };
 
 /**
- * The client of Azure Active Directory: ID tokens signed with RSA keys that the provider publishes, user names in the
- * appliance's NetBIOS form.
+ * Client of Azure Active Directory. ID tokens are signed with published RSA keys. User names have the NetBIOS form.
  */
 class AzureSSOClient : public SSOClient {
   public:
     /**
-     * Reads `/usr/tavo/etc/ssoclient/azure.conf` with root's effective ids. A missing, unreadable or malformed file, a
-     * missing member and a member of another type than told leave the settings at their defaults: empty, and off.
+     * Reads `/usr/tavo/etc/ssoclient/azure.conf` with root's effective ids, and restores the ids. `errno` is 0 or 1
+     * afterwards. If the file is missing, unreadable or malformed, or a member is missing or of the wrong type, the
+     * settings keep their defaults: empty, and off.
      *
-     * The process's effective ids are raised for the read and put back; `errno` is left at 0 or 1. Log lines, under
-     * `LOG_AUTH`, when ids had to change or could not be:
-     *  - `LOG_INFO`: "azuresso:LINE WARNING: setresuid(-1, 0, -1)" (or "setresgid") for each id set to 0;
-     *  - `LOG_ERR`: "azuresso:LINE ERROR: setresuid(-1, ID, -1) [SYSTEM TEXT]" (or "setresgid") for a call that failed,
-     *    then "azuresso:LINE ERROR: ENTERCriticalSection" or "azuresso:LINE ERROR: LEAVECriticalSection".
+     * Log lines, with "setresuid" or "setresgid":
+     *  - `LOG_AUTH | LOG_INFO`: "azuresso:LINE WARNING: setresuid(-1, 0, -1)", for each id set to 0;
+     *  - `LOG_AUTH | LOG_ERR`: "azuresso:LINE ERROR: setresuid(-1, ID, -1) [SYSTEM TEXT]", for a failed call. Then
+     *    "azuresso:LINE ERROR: ENTERCriticalSection" (not raised) or "azuresso:LINE ERROR: LEAVECriticalSection" (not
+     *    restored).
      */
     AzureSSOClient();
     virtual ~AzureSSOClient();
 
     /**
-     * Checks the ID token, in this order: lifetime, tenant, audience; then fetches the discovery document and the key
-     * set, afresh, and checks the RSA signature (RFC 7515, section 5.2; RFC 7518, section 3.3). No leeway for clocks;
-     * issuer, not-before, issued-at and nonce are not looked at.
+     * Verifies the ID token: expiry, tenant, audience, then the RSA signature (RFC 7518, section 3.3). For each call,
+     * fetches the discovery document and the key set. Allows no clock skew. Does not check "iss", "nbf", "iat" and
+     * "nonce".
      *
-     * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
-     * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "tenant ID
-     * invalid"; "client ID invalid"; "kid does not exist in Azure verified kyes" (also when a document could not be
-     * fetched); "RSA public 'n' cannot be found!", "RSA public 'e' cannot be found!"
-     * @throws std::logic_error  (exactly this class) "empty jwt part": header or body of the token is empty, or memory
-     * runs out over it
+     * @throws std::invalid_argument  "token cannot be empty"
+     * @throws std::invalid_argument  "bad jwt format!", "bad jwt header format!", "bad jwt body format!"
+     * @throws std::logic_error  (exactly this class) "empty jwt part": header or body is empty, or memory ran out
+     * @throws std::invalid_argument  "id_token expired.": "exp" is past or missing, or the clock cannot be read
+     * @throws std::invalid_argument  "tenant ID invalid", "client ID invalid"
+     * @throws std::invalid_argument  "kid does not exist in Azure verified kyes", also if a document was not fetched
+     * @throws std::invalid_argument  "RSA public 'n' cannot be found!", "RSA public 'e' cannot be found!"
      * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not RS256, RS384 or RS512
      * @throws TAVO::JWT::jwt_verify_failed  "verify rsa signature failed"
      *
@@ -257,177 +247,163 @@ class AzureSSOClient : public SSOClient {
     void VerifyIDToken() override;
 
     /**
-     * Builds the body of the token request (RFC 6749, section 4.1.3).
+     * Returns the body of the token request (RFC 6749, section 4.1.3). It contains the client secret and the code.
      *
-     * @return client_id, client_secret, code, grant_type and redirect_uri, form-encoded.
-     *         It holds the client secret and the code
+     * @return client_id, client_secret, code, grant_type and redirect_uri, form-encoded
      */
     std::string GetIDTokenReqParams() override;
 
     /**
-     * Gives the user's name as the appliance knows it: NetBIOS domain, backslash, user. It is made of the claim
-     * "unique_name" or, where that is not a string, "email", which must have the form `user@domain`.
+     * Converts a claim of the form `user@domain`, unverified, to the user's name: NetBIOS domain, backslash, user. The
+     * claim is "unique_name" or, if that is not a string, "email".
      *
-     * @param userName  receives the name, step by step: after "cannot get the user name!" it holds the part before the
-     *                  first at sign, after "TAVOWinsUserNameFqdn2Netbios failed." the upper-cased domain, a backslash
-     *                  and the user; after every other failure it is untouched
+     * @param userName  receives the name; after "cannot get the user name!" the part before the first at sign; after
+     *                  "TAVOWinsUserNameFqdn2Netbios failed." the domain in capitals, a backslash and the user.
+     *                  Otherwise unchanged on failure
      *
-     * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     *         (`VerifyIDToken`); "cannot find the user name!" (neither claim is a string); "cannot get the user name!"
-     *         (not exactly one at sign)
-     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
-     * out over it
+     * @throws std::invalid_argument  "cannot find the user name!": neither claim is a string
+     * @throws std::invalid_argument  "cannot get the user name!": the claim does not have exactly one at sign
      * @throws sso_op_failed  "TAVOWinsUserNameFqdn2Netbios failed.": the platform does not know the domain
+     * @throws std::invalid_argument  as `GetUserInfo`
+     * @throws std::logic_error  as `GetUserInfo`
      */
     void GetUserName(std::string &userName) override;
 
     /**
-     * Stores the ID token of a token response (OpenID Connect Core 1.0, section 3.1.3.3). The token of an earlier
-     * response is forgotten first, so that every failure leaves none.
+     * Stores the ID token of a token response (OpenID Connect Core 1.0, section 3.1.3.3). After a failure there is
+     * none.
      *
-     * @param response  the answer of the token endpoint
+     * @param response  of the token endpoint
      *
-     * @throws std::invalid_argument  "parse json falied": not JSON, the empty answer included
-     * @throws sso_err_resp  the whole answer as compact JSON with a line feed at its end, where it has a member
-     *         "error"; "we cannot find key 'id_token' in response!" where "id_token" is missing or not a string
-     */
-    void ProcessTokenResponse(std::string response) override;
-
-    /**
-     * Returns the claims of the ID token. It verifies nothing: call `VerifyIDToken` first.
-     *
-     * @param info  receives the decoded body; untouched on failure
-     *
-     * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
-     * out over it
-     */
-    void GetUserInfo(Json::Value &info);
-
-    /**
-     * Fetches the provider's key set (RFC 7517, section 5), certificate and host name verified.
-     *
-     * @param uri   where it is published ("jwks_uri" of the discovery document)
-     * @param keys  receives the document; null when the answer is not JSON, untouched when the transfer failed or
-     *              memory ran out
-     *
-     * Does not throw for those failures, nor for a document without "keys". Each is one line at `LOG_ERR`:
-     *  - "azuresso:LINE request wellknown uri TEXT." with libcurl's text or "bad wellknown json format.";
-     *  - "azuresso:LINE no kyes information";
-     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT" when no transfer handle can be made.
-     *
-     * Memory that runs out during the transfer fails it with libcurl's text; otherwise it is the third line.
-     *
-     * Side effects: those of `httpGet`. Calls `curl_global_cleanup` once more than it initialises: a host that uses
-     * libcurl itself initialises it again.
-     */
-    void RequestKeysInfo(std::string uri, Json::Value &keys);
-
-    /**
-     * Builds the authentication request (OpenID Connect Core 1.0, section 3.1.2.1). The parameters are, in this order:
-     *  - client_id;
-     *  - nonce: fresh and random. The caller can take it from the address and keep it on the server;
-     *  - redirect_uri;
-     *  - response_type: "code";
-     *  - scope: "openid";
-     *  - state: `state` with the member "nonce" added, the MD5 digest of the nonce. Compact JSON and a line feed in
-     *    padded base64. Percent-decode the state that comes back before you compare it.
-     *
-     * @param state  the caller's JSON object, or null; its member "nonce" is replaced. As compact JSON, without a
-     *               "nonce", it may be 721 bytes long
-     * @return the authorization endpoint, as configured, "?", and the parameters, percent-encoded
-     *
-     * @throws sso_op_failed  "encode base64 failed.": the state does not fit
-     * @throws Json::LogicError  when `state` is neither an object nor null
-     * @throws std::runtime_error  of Boost's, when the system's source of random numbers fails
-     *
-     * Log lines: those of `MD5Digest`, whose failure leaves the state with an empty "nonce".
-     */
-    std::string GetAccessTokenReqURI(const Json::Value &state);
-
-    /**
-     * Writes the CGI redirect to that address on `std::cout`: "Location: ", the address, two line feeds; the stream is
-     * not flushed. The caller may have written other header lines before, and writes nothing after.
-     *
-     * @param state  as for `GetAccessTokenReqURI`, whose exceptions pass through; nothing is written then
-     */
-    void RedirectAuthEndpoint(const Json::Value &state);
-
-  protected:
-    std::string tenantID;  ///< the tenant that the token's "tid" must equal
-};
-
-/**
- * The client of a WebSphere OpenID Connect provider: ID tokens signed with HMAC under the client secret, user names as
- * they stand in the token. It takes every endpoint from its file and never fetches the discovery document.
- */
-class WebSphereSSOClient : public SSOClient {
-  public:
-    /**
-     * Reads `/usr/tavo/etc/ssoclient/websphere.conf`; otherwise as `AzureSSOClient()`, with "webspheresso" as the
-     * source in the log lines.
-     */
-    WebSphereSSOClient();
-    virtual ~WebSphereSSOClient();
-
-    /**
-     * Checks the ID token, in this order: lifetime, audience, and its HMAC signature under the client secret (RFC 7515,
-     * section 5.2; RFC 7518, section 3.2). No leeway for clocks; issuer, not-before, issued-at and nonce are not looked
-     * at.
-     *
-     * @throws std::invalid_argument  "token cannot be empty"; "bad jwt format!", "bad jwt header format!", "bad jwt
-     * body format!"; "id_token expired." ("exp" lies before now or is missing, or the clock cannot be read); "client ID
-     * invalid"
-     * @throws std::logic_error  (exactly this class) "empty jwt part": header or body of the token is empty, or memory
-     * runs out over it
-     * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
-     * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes
-     * @throws TAVO::JWT::jwt_verify_failed  "verify hmac signature failed", also under an empty client secret
-     */
-    void VerifyIDToken() override;
-
-    /** Builds the body of the token request. @return as `AzureSSOClient::GetIDTokenReqParams` gives it */
-    std::string GetIDTokenReqParams() override;
-
-    /**
-     * Gives the user's name: the claim "sub", unchanged.
-     *
-     * @param userName  receives the name; untouched on failure
-     *
-     * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     *         (`VerifyIDToken`); "cannot find the user name!": "sub" is missing or not a string
-     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
-     * out over it
-     */
-    void GetUserName(std::string &userName) override;
-
-    /**
-     * Stores the ID token of a token response. The token of an earlier response is forgotten first, so that every
-     * failure leaves none. An error answer of the provider has no reaction of its own.
-     *
-     * @param response  the answer of the token endpoint
-     *
-     * @throws std::invalid_argument  "parse json falied": not JSON, the empty answer included
+     * @throws std::invalid_argument  "parse json falied": not JSON, or empty
+     * @throws sso_err_resp  the whole response as compact JSON and a line feed, if it has a member "error"
      * @throws sso_err_resp  "we cannot find key 'id_token' in response!": missing, or not a string
      */
     void ProcessTokenResponse(std::string response) override;
 
     /**
-     * Returns the claims of the ID token. It verifies nothing: call `VerifyIDToken` first.
+     * Returns the claims of the ID token, unverified.
      *
-     * @param claims  receives the decoded body; untouched on failure
+     * @param info  receives the decoded body; unchanged on failure
      *
-     * @throws std::invalid_argument  "please request a id_token first."; as the token's format demands
-     * @throws std::logic_error  (exactly this class) "empty jwt part": the body of the token is empty, or memory runs
-     * out over it
+     * @throws std::invalid_argument  "please request a id_token first.", "bad jwt format!", "bad jwt body format!"
+     * @throws std::logic_error  (exactly this class) "empty jwt part": the body is empty, or memory ran out
+     */
+    void GetUserInfo(Json::Value &info);
+
+    /**
+     * Fetches the key set (RFC 7517, section 5). Verifies certificate and host name.
+     *
+     * @param uri   "jwks_uri" of the discovery document
+     * @param keys  receives the document; null if the response is not JSON; unchanged if the transfer fails or memory
+     *              runs out
+     *
+     * Does not throw. Logs a failure at `LOG_ERR`:
+     *  - "azuresso:LINE request wellknown uri TEXT.": libcurl's text, or "bad wellknown json format.";
+     *  - "azuresso:LINE no kyes information": there is no "keys";
+     *  - "azuresso:LINE curl_easy_init failed. SYSTEM TEXT": memory ran out outside the transfer.
+     *
+     * Side effects: those of `httpGet`, and one more global cleanup of libcurl. A program that uses libcurl must
+     * initialise it again.
+     */
+    void RequestKeysInfo(std::string uri, Json::Value &keys);
+
+    /**
+     * Returns the URL of the authentication request (OpenID Connect Core 1.0, section 3.1.2.1): the authorization
+     * endpoint, "?", and these parameters, percent-encoded, in this order:
+     *  - client_id;
+     *  - nonce: random, new for each call. The caller can store it;
+     *  - redirect_uri;
+     *  - response_type: "code";
+     *  - scope: "openid";
+     *  - state: `state` with the MD5 digest of the nonce as "nonce"; compact JSON and a line feed, in padded base64.
+     *    Percent-decode a returned state before you compare it.
+     *
+     * @param state  a JSON object, or null; up to 721 bytes as compact JSON. A member "nonce" is replaced and does not
+     *               count
+     * @return the URL
+     *
+     * @throws sso_op_failed  "encode base64 failed.": the state is too long
+     * @throws Json::LogicError  the state is neither an object nor null
+     * @throws std::runtime_error  (Boost's) the system's source of random numbers failed
+     *
+     * Log lines: those of `MD5Digest`. If it fails, the "nonce" in the state is empty.
+     */
+    std::string GetAccessTokenReqURI(const Json::Value &state);
+
+    /**
+     * Writes "Location: ", the URL of `GetAccessTokenReqURI` and two line feeds to `std::cout`, unflushed; nothing if
+     * that throws. Write other header lines before, and nothing after.
+     *
+     * @param state  as for `GetAccessTokenReqURI`
+     */
+    void RedirectAuthEndpoint(const Json::Value &state);
+
+  protected:
+    std::string tenantID;  ///< the required "tid" of the token
+};
+
+/**
+ * Client of a WebSphere OpenID Connect provider. ID tokens are signed with HMAC and the client secret. User names are
+ * those of the token. The discovery document is not used.
+ */
+class WebSphereSSOClient : public SSOClient {
+  public:
+    /**
+     * Reads `/usr/tavo/etc/ssoclient/websphere.conf` as `AzureSSOClient()` does, with "webspheresso" in the log lines.
+     */
+    WebSphereSSOClient();
+    virtual ~WebSphereSSOClient();
+
+    /**
+     * Verifies the ID token: expiry, audience, then the HMAC signature (RFC 7518, section 3.2). Allows no clock skew.
+     * Does not check "iss", "nbf", "iat" and "nonce".
+     *
+     * @throws std::invalid_argument  format and expiry, as `AzureSSOClient::VerifyIDToken`
+     * @throws std::logic_error  as `AzureSSOClient::VerifyIDToken`
+     * @throws std::invalid_argument  "client ID invalid"
+     * @throws TAVO::JWT::jwt_not_support  "ALG algorithm is not supported": "alg" is not HS256, HS384 or HS512
+     * @throws sso_op_failed  "encode base64 failed.": the client secret is longer than 765 bytes
+     * @throws TAVO::JWT::jwt_verify_failed  "verify hmac signature failed", also if the client secret is empty
+     */
+    void VerifyIDToken() override;
+
+    /** Returns the body of the token request. @return as `AzureSSOClient::GetIDTokenReqParams` */
+    std::string GetIDTokenReqParams() override;
+
+    /**
+     * Returns the user's name: the claim "sub", unverified and unchanged.
+     *
+     * @param userName  receives the name; unchanged on failure
+     *
+     * @throws std::invalid_argument  "cannot find the user name!": "sub" is missing or not a string
+     * @throws std::invalid_argument  as `GetUserInfo`
+     * @throws std::logic_error  as `GetUserInfo`
+     */
+    void GetUserName(std::string &userName) override;
+
+    /**
+     * Stores the ID token of a token response. After a failure there is none. Ignores "error".
+     *
+     * @param response  of the token endpoint
+     *
+     * @throws std::invalid_argument  "parse json falied": not JSON, or empty
+     * @throws sso_err_resp  "we cannot find key 'id_token' in response!": missing, or not a string
+     */
+    void ProcessTokenResponse(std::string response) override;
+
+    /**
+     * As `AzureSSOClient::GetUserInfo`.
+     *
+     * @param claims  receives the decoded body; unchanged on failure
      */
     void GetUserInfo(Json::Value &claims);
 
     /**
      * As `AzureSSOClient::GetAccessTokenReqURI`, with the scope "openid profile email".
      *
-     * @param stateInfo  the caller's JSON object, or null
-     * @return the authorization endpoint, as configured, and the query
+     * @param stateInfo  a JSON object, or null
+     * @return the URL
      */
     std::string GetAccessTokenReqURI(const Json::Value &stateInfo);
 
@@ -439,30 +415,28 @@ class WebSphereSSOClient : public SSOClient {
     void RedirectAuthEndpoint(const Json::Value &stateInfo);
 };
 
-/** The profile in force and the settings of its client, for callers that do not log in. */
+/** The configured profile and its client's settings, for programs that do not log in. */
 class SSOProfile {
   public:
     /**
-     * Reads `/usr/tavo/etc/ssoclient/profile.conf` with root's effective ids and, where single sign-on is on, the
-     * chosen client's own file. Does not throw for a missing, unreadable or malformed file, nor for an unknown profile:
-     * what could not be read stays off and empty.
+     * Reads `/usr/tavo/etc/ssoclient/profile.conf` with root's effective ids and, if single sign-on is on, the client's
+     * file. Values that cannot be read stay off and empty, without an exception.
      *
-     * Side effects and log lines on the process's ids as for `AzureSSOClient()`, with "profile" as the source; and
-     * "profile:LINE Profile 'NAME' not support" at `LOG_ERR` where single sign-on is on and the profile is unknown.
+     * Log lines and side effects: those of `AzureSSOClient()`, with "profile" as the source; and "profile:LINE Profile
+     * 'NAME' not support" at `LOG_ERR` if single sign-on is on and the profile is unknown.
      */
     SSOProfile();
     virtual ~SSOProfile();
 
-    /** Tells whether single sign-on is on. @return whether "sso_enable" is true */
+    /** Returns whether single sign-on is on. @return whether "sso_enable" is true */
     bool SSOIsEnable();
-    /** Gives the profile's name. @return "sso_profile": "azure", "websphere", or whatever else stands in the file */
+    /** Returns the profile's name. @return "sso_profile": "azure", "websphere" or any other text */
     std::string GetSSOProfile();
     /**
-     * Gives the settings of the chosen client. It cannot log in: its provider steps throw `sso_not_implemented`.
-     * Whether single sign-on is on is `SSOIsEnable`, never this client's `isEnable`.
+     * Returns the settings of the client. It cannot log in: its provider steps throw `sso_not_implemented`. Use
+     * `SSOIsEnable`, not its `isEnable`.
      *
-     * @return never null; empty where single sign-on is off or the profile is unknown. It belongs to this object: do
-     *         not delete it, and do not use it when this object is gone
+     * @return owned by this object, never null; empty if single sign-on is off or the profile is unknown
      */
     SSOClient *GetSSOClient();
 
@@ -473,92 +447,91 @@ class SSOProfile {
 };
 
 /**
- * Completes a login: reads `/usr/tavo/etc/ssoclient/profile.conf` (with the ids that the process has), constructs the
- * client that it names, and runs that client's `OpenIDConnectLogin`.
+ * Completes a login. Reads `/usr/tavo/etc/ssoclient/profile.conf` without raising ids, constructs the client of the
+ * profile, and runs its `OpenIDConnectLogin`.
  *
- * @param code      the authorization code that the browser brought back, percent-decoded
- * @param userName  receives the user's name; see the client's `GetUserName` for what it holds after a failure
+ * @param code      as received, percent-decoded
+ * @param userName  receives the name; after a failure as for the client's `GetUserName`
  *
- * @throws sso_op_failed  "read profile file failed."; "sso does not enable."; "not specify sso profile"
+ * @throws sso_op_failed  "read profile file failed.", "sso does not enable.", "not specify sso profile"
  * @throws sso_exception  (exactly this class) "profile not support."
- * What the client's construction and its `OpenIDConnectLogin` throw passes through.
+ * @throws std::exception  as `OpenIDConnectLogin`
  *
- * Log lines and side effects: those of the client's construction, which raises the process's ids for a moment, and of
- * its login.
+ * Log lines and side effects: those of the client's constructor and of `OpenIDConnectLogin`.
  */
 void OIDCLogin(const std::string &code, std::string &userName);
 
 /**
- * Tells the caller where to send the browser after a login.
+ * Returns the address of the relay page, which shows the result of a login.
  *
  * @param success  whether the login succeeded
- * @param state    the state that came back with the code: base64 of a JSON object whose string "origin" is handed on,
- *                 percent-encoded. Anything else leaves the origin out. Not looked at after a failure
- * @param reason   a failure text, put in as it stands: percent-encode what is not your own. Left out when empty
- * @return the address of the relay page, relative to the caller's web root for such pages: "ssoclient/relay.html#",
- * then "origin=ORIGIN&" and "success=true", or "reason=REASON&" and "success=false"
+ * @param state    as received with the code; used on success. Base64 of a JSON object, whose string "origin" is
+ *                 percent-encoded; anything else omits the origin
+ * @param reason   used on failure. Copied verbatim: percent-encode it. Omitted if empty
+ * @return "ssoclient/relay.html#" and "origin=ORIGIN&success=true" or "reason=REASON&success=false"; relative to the
+ *         web root of the appliance's pages
  */
 std::string GetSSORelayURL(bool success, const std::string &state, const std::string &reason);
 
 /**
- * Returns the address that ends the Azure session and brings the browser back to the relay page (OpenID Connect
- * RP-Initiated Logout 1.0, section 2). WebSphere has no such page: end your own session only. Reads
- * `/usr/tavo/etc/ssoclient/azure.conf` as `AzureSSOClient()` does.
+ * Returns the URL that ends the Azure session and then opens the relay page (OpenID Connect RP-Initiated Logout 1.0,
+ * section 2). WebSphere has none: end your own session only. Log lines and side effects: those of `AzureSSOClient()`.
  *
- * @param base  the address of the web interface. One final "/index.cgi", then one final "/", is removed, and
- *              "/webman/ssoclient/relay.html" is always appended
- * @return the logout endpoint, as configured, with the relay page as "post_logout_redirect_uri"; the bare endpoint when
- *         `base` is empty
+ * @param base  the URL of the web interface. A trailing "/index.cgi", then a trailing "/", is removed, and
+ *              "/webman/ssoclient/relay.html" is appended
+ * @return the logout endpoint with the relay page as "post_logout_redirect_uri"; only the endpoint if `base` is empty
  *
- * @throws std::out_of_range  when `base` has 1 to 9 characters
+ * @throws std::out_of_range  `base` has 1 to 9 characters
  */
 std::string GetAzureSSOLogoutURL(const std::string &base);
 
 /**
- * Fetches a document over HTTP or HTTPS with a fresh libcurl handle. No time limit, no redirects followed; the HTTP
- * status is not checked.
+ * Fetches a document over HTTP or HTTPS with a new libcurl handle, without a time limit. Does not follow redirects or
+ * check the HTTP status.
+ *
+ * @param url            of the document
+ * @param response       passed to the callback as its user pointer
+ * @param verifySSL      whether to verify certificate and host name
+ * @param writeCallback  receives the response, as libcurl's CURLOPT_WRITEFUNCTION. Must not be null or throw
+ *
+ * @throws std::bad_alloc  no handle can be created
+ * @throws sso_err_resp  libcurl's text: the transfer failed or cannot be prepared, also if memory ran out
  *
  * Side effects: initialises and cleans up libcurl globally. Over TLS, libcurl clears the calling thread's OpenSSL error
- * queue, marks included.
- *
- * @param url            where
- * @param response       handed to the callback as its user pointer, otherwise untouched
- * @param verifySSL      whether to verify the server's certificate and host name
- * @param writeCallback  receives the answer, in the form of libcurl's CURLOPT_WRITEFUNCTION; must not throw, nor be
- * null
- *
- * @throws std::bad_alloc  when no handle can be made
- * @throws sso_err_resp  with libcurl's text, when the transfer fails or cannot be prepared, also for want of memory
+ * queue, including marks.
  */
 void httpGet(const std::string &url, std::string &response, bool verifySSL,
              std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *));
 
 /**
- * Posts a form (application/x-www-form-urlencoded); otherwise as `httpGet`, whose exceptions and side effects it has.
+ * Posts a form (application/x-www-form-urlencoded). Otherwise as `httpGet`.
  *
- * @param url            where
- * @param body           sent as it stands, up to its first NUL
- * @param response       handed to the callback as its user pointer, otherwise untouched
- * @param verifySSL      whether to verify the server's certificate and host name
- * @param writeCallback  receives the answer, as for `httpGet`
+ * @param url            of the form's receiver
+ * @param body           sent verbatim, up to its first NUL
+ * @param response       as for `httpGet`
+ * @param verifySSL      as for `httpGet`
+ * @param writeCallback  as for `httpGet`
+ *
+ * Exceptions and side effects: those of `httpGet`.
  */
 void httpPost(const std::string &url, const std::string &body, std::string &response, bool verifySSL,
               std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *));
 
 /**
- * Percent-encodes a value for a query or a form with the platform's encoder.
+ * Percent-encodes a value for a query or a form, with the platform's encoder.
  *
  * @param value  encoded up to its first NUL
- * @return the encoded value; `value` unchanged when the platform refuses it or memory runs out
+ * @return the encoded value; `value` unchanged if the platform rejects it or memory runs out
  */
 std::string URLEncode(const std::string &value);
 
 /**
- * Digests a text, as the state carries that of the nonce.
+ * Returns the MD5 digest (RFC 1321) of a text.
  *
- * @param data  any bytes, NUL included
- * @return the MD5 digest (RFC 1321) as 32 lowercase hexadecimal digits. Empty on failure, with one line at `LOG_ERR`:
- *         "utils:LINE MD5 digest failed SYSTEM TEXT" or "utils:LINE calloc failed. SYSTEM TEXT"
+ * @param data  any bytes, including NUL
+ * @return 32 lowercase hexadecimal digits; empty on failure
+ *
+ * Logs a failure at `LOG_ERR`: "utils:LINE MD5 digest failed SYSTEM TEXT" or "utils:LINE calloc failed. SYSTEM TEXT".
  */
 std::string MD5Digest(std::string data);
 
