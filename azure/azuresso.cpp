@@ -39,7 +39,7 @@ constexpr char kStartPage[] = "/index.cgi";
 constexpr char kRelayPage[] = "/webman/ssoclient/relay.html";
 constexpr char kPostLogoutRedirectURI[] = "post_logout_redirect_uri";
 
-/// The first key of the set with that "kid"; null if there is none. A "kid" without text matches no key.
+/// Returns the first key with that "kid", or null.
 const Json::Value *FindKey(const Json::Value &keySet, const std::optional<std::string> &kid) {
     const Json::Value *keys = Utils::FindMember(keySet, "keys");
     if (keys == nullptr || !keys->isArray() || !kid) {
@@ -53,7 +53,7 @@ const Json::Value *FindKey(const Json::Value &keySet, const std::optional<std::s
     return nullptr;
 }
 
-/// The user's principal name, user@domain.
+/// Returns the user's principal name, user@domain.
 std::string FindPrincipalName(const Json::Value &claims) {
     std::string name;
     if (!Utils::ReadMember(claims, "unique_name", name) && !Utils::ReadMember(claims, "email", name)) {
@@ -153,7 +153,7 @@ void AzureSSOClient::RequestKeysInfo(std::string uri, Json::Value &keys) {
     } catch (const sso_err_resp &error) {
         syslog(LOG_ERR, "%s:%d request wellknown uri %s.", SOURCE_LINE, error.what());
     }
-    // One more cleanup than initialisations, as the header documents.
+    // One more cleanup than initialisations; sso.h documents it.
     curl_global_cleanup();
 }
 
@@ -163,7 +163,7 @@ void AzureSSOClient::GetUserName(std::string &userName) {
     const std::string principalName = FindPrincipalName(ReadClaims(token));
     const std::vector<std::string> pieces = Utils::SplitInto(2, principalName, '@');
     if (pieces.empty()) {
-        // The header promises callers the user piece after this failure too.
+        // sso.h documents this value of userName.
         userName.assign(principalName.begin(), boost::find_first(principalName, "@").begin());
         throw std::invalid_argument("cannot get the user name!");
     }
@@ -183,7 +183,7 @@ std::string GetAzureSSOLogoutURL(const std::string &base) {
         return url;
     }
     std::string relayPage = base;
-    // A base shorter than the start page is the caller's error: substr throws std::out_of_range.
+    // If `base` is shorter, substr throws std::out_of_range, as sso.h documents.
     const std::size_t end = relayPage.size() - std::strlen(kStartPage);
     if (relayPage.substr(end) == kStartPage) {
         relayPage.resize(end);

@@ -27,7 +27,7 @@ namespace {
 
 constexpr char kSourceName[] = "jwt";
 
-constexpr std::size_t kScratchOnStack = 4096;  // bytes of a part; larger ones are on the heap
+constexpr std::size_t kScratchOnStack = 4096;  // in bytes; larger parts are decoded on the heap
 
 template <auto function>
 struct ReleaseWith {
@@ -37,7 +37,7 @@ struct ReleaseWith {
     }
 };
 
-/// Overwrites the bytes before it frees them: they may be a key or a token.
+/// Overwrites the bytes before it frees them; they may be a key or a token.
 struct ReleaseBytes {
     std::size_t room = 0;
     void operator()(unsigned char *bytes) const {
@@ -53,7 +53,7 @@ using DigestContext = std::unique_ptr<EVP_MD_CTX, ReleaseWith<EVP_MD_CTX_free>>;
 using PublicKey = std::unique_ptr<EVP_PKEY, ReleaseWith<EVP_PKEY_free>>;
 
 struct DecodedPart {
-    /// False also for a part that decodes to nothing: with an empty key anyone could sign.
+    /// False for an empty result, too: anyone could sign with an empty key.
     explicit operator bool() const { return bytes && size > 0; }
 
     Bytes bytes;   // followed by a NUL; null if the part is empty or memory runs out
@@ -88,7 +88,7 @@ DecodedPart Base64Decode(const char *text, int length) {
     return {std::move(bytes), size};
 }
 
-/// The character of standard base64 for one of base64url (RFC 4648, section 5).
+/// Converts a character of base64url (RFC 4648, section 5) to standard base64.
 char StandardCharacter(char c) { return c == '-' ? '+' : c == '_' ? '/' : c; }
 
 /// Decodes one part of a token: base64url (RFC 7515, section 2) or standard base64.
@@ -97,7 +97,7 @@ DecodedPart Base64UrlDecode(const char *part) {
     const std::size_t padding = (4 - partLength % 4) % 4;
     const std::size_t length = partLength + padding;
     if (length > INT_MAX) {
-        return {};  // OpenSSL counts in int. GCOVR_EXCL_LINE: takes a text of 2 GB
+        return {};  // OpenSSL counts in int. GCOVR_EXCL_LINE: needs a text of 2 GB
     }
     char small[kScratchOnStack];
     std::unique_ptr<char[]> large;
@@ -113,7 +113,7 @@ DecodedPart Base64UrlDecode(const char *part) {
     return Base64Decode(text, static_cast<int>(length));
 }
 
-/// The JSON value that a part encodes. Throws std::invalid_argument with the message `notJson`.
+/// Decodes a part. Throws std::invalid_argument with the text `notJson` if it is not JSON.
 Json::Value ParsePart(const std::string &part, const char *notJson) {
     const Utils::KeepErrorQueue keepErrorQueue;
     const DecodedPart decoded = Base64UrlDecode(part.c_str());
@@ -127,7 +127,7 @@ Json::Value ParsePart(const std::string &part, const char *notJson) {
     return value;
 }
 
-// The low-level RSA calls are deprecated in OpenSSL 3; older versions have no others.
+// Deprecated in OpenSSL 3; older versions have only these calls.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 
@@ -153,7 +153,7 @@ RSAPointer MakeRSA(const DecodedPart &n, const DecodedPart &e) {
     return rsa;
 }
 
-/// The public key of modulus and exponent; null on failure.
+/// Returns the public key, or null on failure.
 PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
     RSAPointer rsa = MakeRSA(n, e);
     if (!rsa) {
@@ -177,7 +177,7 @@ PublicKey MakePublicKey(const DecodedPart &n, const DecodedPart &e) {
 
 #pragma GCC diagnostic pop
 
-/// What is signed (RFC 7515, section 5.2).
+/// Returns the signed text (RFC 7515, section 5.2).
 std::string SigningInput(const std::string &header, const std::string &body) {
     std::string input;
     input.reserve(header.size() + 1 + body.size());  // growth would leave copies of the token in released memory
@@ -274,7 +274,7 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
 
 }  // namespace
 
-// Out of line, so that the type information is in this library alone and programs can catch the exceptions by type.
+// Out of line: programs catch these by type, so the type information must be in this library only.
 
 jwt_exception::jwt_exception(std::string message) : std::runtime_error(message) {}
 jwt_exception::~jwt_exception() = default;

@@ -16,8 +16,7 @@ namespace {
 
 std::string MakeNonce() { return to_string(boost::uuids::random_generator_mt19937()()); }
 
-/// The state carries the digest of the nonce: a front end can compare it with the ID token, and the state does not
-/// disclose the nonce.
+/// Adds the digest of the nonce to the state. A front end compares it with the ID token; the nonce stays secret.
 std::string MakeState(const Json::Value &stateInfo, const std::string &nonce) {
     return EncodeBase64(Utils::WriteCompactJson(Utils::WithMember(stateInfo, kNonce, MD5Digest(nonce))));
 }

@@ -15,11 +15,10 @@ struct AuthorizationRequest {
     const char *scope;
 };
 
-/// The URL of the authorization request, with a fresh nonce and the caller's state with the digest of that nonce.
-/// Throws as documented for AzureSSOClient::GetAccessTokenReqURI.
+/// Implements AzureSSOClient::GetAccessTokenReqURI. Throws as documented there.
 std::string AuthorizationURI(const AuthorizationRequest &request, const Json::Value &stateInfo);
 
-/// Writes the CGI redirect to that URL to standard output, unflushed.
+/// Writes the CGI redirect to standard output, unflushed.
 void WriteRedirect(const std::string &uri);
 
 }  // namespace TAVO::SSO

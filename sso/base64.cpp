@@ -11,7 +11,7 @@ namespace TAVO::SSO {
 
 namespace {
 
-/// The platform may fill a buffer to its last byte and leave no room for a NUL.
+/// The platform may fill the buffer without a NUL.
 std::string TextIn(const char (&buffer)[kPlatformBuffer]) { return {buffer, strnlen(buffer, kPlatformBuffer)}; }
 
 }  // namespace

@@ -13,7 +13,7 @@ std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *r
     try {
         Utils::AppendSecret(*static_cast<std::string *>(response), data, strnlen(data, length));
     } catch (...) {
-        return 0;  // an exception must not cross libcurl's frames: it would leak the connection
+        return 0;  // an exception through libcurl would leak the connection
     }
     return length;
 }

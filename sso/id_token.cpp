@@ -19,11 +19,11 @@ JWT::Jwt SplitIDToken(const std::string &token) {
 
 void CheckExpiry(const Json::Value &claims) {
     std::istringstream text(Utils::MemberText(claims, "exp").value_or(""));
-    text.imbue(std::locale::classic());  // the host's locale may take a decimal point for a digit separator
-    std::int64_t expiry = 0;  // on 32-bit, a long ends in 2038
+    text.imbue(std::locale::classic());  // another locale may read a decimal point as a digit separator
+    std::int64_t expiry = 0;             // on 32-bit, a long ends in 2038
     text >> expiry;
     const std::time_t now = std::time(nullptr);
-    // time() returns -1 on failure, which is before every expiry.
+    // time() returns -1 on failure, which would be before every expiry.
     if (now == -1 || now > expiry) {
         throw std::invalid_argument("id_token expired.");
     }

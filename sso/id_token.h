@@ -11,7 +11,7 @@
 // Checks and claims of the ID token (OpenID Connect Core 1.0, section 2) that both clients share.
 namespace TAVO::SSO {
 
-/// The token to verify. Throws std::invalid_argument "token cannot be empty", "bad jwt format!".
+/// Splits the token. Throws std::invalid_argument "token cannot be empty" or "bad jwt format!".
 JWT::Jwt SplitIDToken(const std::string &token);
 
 /// Throws std::invalid_argument "id_token expired." if "exp" is in the past.
@@ -26,10 +26,10 @@ struct Algorithm {
     const EVP_MD *(*digest)();
 };
 
-/// The digest of the header's "alg". Throws jwt_not_support unless the client supports it.
+/// Returns the digest of the header's "alg". Throws jwt_not_support unless it is supported.
 const EVP_MD *ChooseDigest(const Json::Value &header, const Algorithm (&supported)[3]);
 
-/// All claims, unverified. Throws std::invalid_argument "please request a id_token first.", and as Jwt does.
+/// Returns all claims, unverified. Throws std::invalid_argument "please request a id_token first.", and as Jwt.
 Json::Value ReadClaims(const std::string &token);
 
 }  // namespace TAVO::SSO

@@ -1,7 +1,7 @@
 #ifndef TAVOSSO_SSO_NAMES_H
 #define TAVOSSO_SSO_NAMES_H
 
-// The fixed names of the profile file and of the protocol, shared by both clients.
+// Names of the profile file and of the protocol.
 namespace TAVO::SSO {
 
 constexpr char kProfileFile[] = "/usr/tavo/etc/ssoclient/profile.conf";
@@ -21,7 +21,7 @@ constexpr char kState[] = "state";
 
 constexpr char kAuthorizationCode[] = "authorization_code";
 
-/// The member of the caller's state object with the page to return to.
+/// Member of the caller's state: the page to return to.
 constexpr char kOrigin[] = "origin";
 
 // Token response: RFC 6749, section 5.1, and what Azure adds. Only "id_token" is read.

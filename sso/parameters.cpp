@@ -7,7 +7,7 @@ namespace TAVO::SSO {
 
 namespace {
 
-/// The length of the form if every byte of a value becomes "%XX".
+/// Returns the length of the form if every byte of a value becomes "%XX".
 std::size_t LongestForm(const Parameters &parameters) {
     std::size_t length = 0;
     for (const auto &[name, value] : parameters) {

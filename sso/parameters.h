@@ -6,13 +6,13 @@
 
 namespace TAVO::SSO {
 
-/// The parameters of a request. They are written in the map's order: by name, byte-wise.
+/// Parameters of a request. They are written in the order of their names.
 using Parameters = std::map<std::string, std::string>;
 
-/// "name=value" pairs joined by "&", the values percent-encoded: the body of a form.
+/// Returns the body of a form: "name=value" pairs joined by "&", with percent-encoded values.
 std::string WriteForm(const Parameters &parameters);
 
-/// The same behind a "?": the query of a URL.
+/// Returns the query of a URL: "?" and the form.
 std::string WriteQuery(const Parameters &parameters);
 
 }  // namespace TAVO::SSO

@@ -31,7 +31,7 @@ SSOProfile::SSOProfile() {
         syslog(LOG_ERR, "%s:%d Profile '%s' not support", SOURCE_LINE, profile.c_str());
         return;
     }
-    // Slices: only the settings are kept.
+    // Slicing is intended: it keeps only the settings.
     WithClient(profile, [this](SSOClient &chosen) { client = std::move(chosen); });
 }
 

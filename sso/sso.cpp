@@ -21,7 +21,7 @@ constexpr char kSourceName[] = "sso";
 
 }  // namespace
 
-// Out of line, so that the type information is in this library alone and programs can catch the exceptions by type.
+// Out of line: programs catch these by type, so the type information must be in this library only.
 
 sso_exception::sso_exception(std::string message) : std::runtime_error(message) {}
 sso_exception::~sso_exception() = default;
@@ -98,7 +98,7 @@ void SSOClient::OpenIDConnectLogin(std::string authorizationCode, std::string &u
 }
 
 void OIDCLogin(const std::string &code, std::string &userName) {
-    // Without root's ids: a program that must not read the profile must not log anyone in.
+    // Does not raise ids: a program that cannot read the profile must not log users in.
     Json::Value file;
     if (!Utils::LoadJsonFile(kProfileFile, file)) {
         throw sso_op_failed("read profile file failed.");

@@ -7,7 +7,7 @@
 
 #include "sso/sso.h"
 
-// The profiles and their clients: the one place that chooses a client by the name of its profile.
+// The supported profiles and their clients.
 namespace TAVO::SSO {
 
 constexpr char kAzureProfile[] = "azure";
@@ -19,8 +19,8 @@ inline bool IsSupported(const std::string &profile) {
            std::end(kSupportedProfiles);
 }
 
-/// Calls `use` with a new client of the profile, and returns its result. Throws sso_exception "profile not support."
-/// for any other name. A caller with its own client of Azure, derived from the library's, names it as `Azure`.
+/// Calls `use` with a new client of the profile and returns its result. Throws sso_exception "profile not support." for
+/// any other name. `Azure` may be a class derived from AzureSSOClient.
 template <typename Azure = AzureSSOClient, typename Use>
 auto WithClient(const std::string &profile, Use use) {
     if (profile == kAzureProfile) {

@@ -12,7 +12,7 @@ namespace TAVO::SSO {
 
 std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
                              const std::string &redirectURI) {
-    Parameters parameters;  // no initialiser list: it would keep copies of the secrets
+    Parameters parameters;  // an initialiser list would keep copies of the secrets
     parameters[kClientID] = clientID;
     parameters[kClientSecret] = clientSecret;
     const Utils::CleanseTextOnExit cleanseSecret(parameters[kClientSecret]);

@@ -7,7 +7,7 @@
 
 namespace TAVO::SSO {
 
-/// The form body that exchanges a code for a token (RFC 6749, sections 2.3.1 and 4.1.3).
+/// Returns the form that exchanges a code for a token (RFC 6749, sections 2.3.1 and 4.1.3).
 std::string TokenRequestBody(const std::string &clientID, const std::string &clientSecret, const std::string &code,
                              const std::string &redirectURI);
 

@@ -7,7 +7,7 @@
 
 namespace TAVO::Utils {
 
-/// Overwrites a secret in memory at the end of a scope. Declare it after the memory's owner, so that it runs before the
+/// Overwrites a secret at the end of a scope. Declare it after the owner of the memory, so that it runs before the
 /// memory is released.
 class CleanseOnExit {
   public:
@@ -23,8 +23,8 @@ class CleanseOnExit {
 
 inline void Cleanse(std::string &text) { explicit_bzero(text.data(), text.size()); }
 
-/// The same for a text that may grow in the scope, but only by AppendSecret or within its capacity: any other
-/// reallocation would leave an uncleared copy.
+/// The same for a text. Let the text grow only by AppendSecret or within its capacity: any other reallocation would
+/// leave an uncleared copy.
 class CleanseTextOnExit {
   public:
     explicit CleanseTextOnExit(std::string &text) : text_(text) {}
@@ -36,7 +36,7 @@ class CleanseTextOnExit {
     std::string &text_;
 };
 
-/// Appends to a text that may contain a secret. If the text must be reallocated, the old memory is overwritten.
+/// Appends to a text that may contain a secret. Overwrites the old memory if the text is reallocated.
 void AppendSecret(std::string &text, const char *bytes, std::size_t length);
 
 }  // namespace TAVO::Utils

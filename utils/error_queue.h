@@ -5,7 +5,7 @@
 
 namespace TAVO::Utils {
 
-/// Removes what our calls into libcrypto add to the calling thread's OpenSSL error queue: the queue is the host's.
+/// Removes the library's own entries from the calling thread's OpenSSL error queue, which belongs to the program.
 class KeepErrorQueue {
   public:
     KeepErrorQueue() { ERR_set_mark(); }

@@ -7,8 +7,8 @@
 
 #include "utils/cleanse.h"
 
-// Json::Reader and Json::FastWriter are deprecated, but existing files, providers and relay pages rely on what they
-// accept and write.
+// Json::Reader and Json::FastWriter are deprecated, but existing files, providers and relay pages depend on their
+// format.
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 
 namespace TAVO::Utils {
@@ -32,13 +32,13 @@ bool ReadFile(const char *path, std::string &content) {
     return std::ferror(file.get()) == 0;
 }
 
-/// jsoncpp throws the same class if memory runs out; only the message differs.
+/// jsoncpp throws the same class if memory runs out; only the text differs.
 bool IsNestedTooDeeply(const Json::RuntimeError &error) { return std::strstr(error.what(), "stackLimit") != nullptr; }
 
-/// Parses a text. After a failure `document` has the members read so far.
+/// Parses a text. After a failure `document` contains the members read so far.
 bool Parse(std::string_view text, Json::Value &document) {
     try {
-        // Passed by its bounds: the reader would keep a copy of a std::string, which may contain the client secret.
+        // Pointers, because the reader would keep a copy of a std::string, which may contain the client secret.
         return Json::Reader().parse(text.data(), text.data() + text.size(), document, true);
     } catch (const Json::RuntimeError &error) {
         if (IsNestedTooDeeply(error)) {
@@ -72,7 +72,7 @@ Json::Value WithMember(const Json::Value &document, const char *name, const std:
         copy[name] = text;
         return copy;
     } catch (const Json::RuntimeError &) {
-        throw std::bad_alloc();  // a copy fails for no other reason
+        throw std::bad_alloc();  // the only reason why a copy fails
     }
 }
 

@@ -8,30 +8,27 @@
 #include <string>
 #include <string_view>
 
-// How the library reads and writes JSON. jsoncpp's exceptions do not leave these functions, except as documented: text
-// that it rejects fails to parse, a value that is not an object has no members, and memory that runs out is
-// std::bad_alloc.
+// Reads and writes JSON. No function throws an exception of jsoncpp, except as documented. Exhausted memory is
+// std::bad_alloc. A value that is not an object has no members.
 namespace TAVO::Utils {
 
-/// Parses a text. If it is not JSON, or is nested too deeply, returns false and the document is null. If memory runs
-/// out, throws std::bad_alloc and the document is unchanged.
+/// Parses a text. Returns false, with a null document, if it is not JSON or is nested too deeply. If memory runs out,
+/// throws std::bad_alloc and leaves the document unchanged.
 bool ParseJson(std::string_view text, Json::Value &document);
 
-/// Reads and parses a whole file, as ParseJson does. If the file cannot be read, returns false and the document is
-/// unchanged.
+/// Reads a file and parses it as ParseJson does. Returns false, with an unchanged document, if it cannot be read.
 bool LoadJsonFile(const char *path, Json::Value &document);
 
-/// A copy of an object, or of null, with this member set. Throws Json::LogicError for any other document.
+/// Returns a copy of an object or of null with this member set. Throws Json::LogicError for any other document.
 Json::Value WithMember(const Json::Value &document, const char *name, const std::string &text);
 
-/// The compact text of a document, with the writer's final line feed.
+/// Returns the compact text of a document, with a line feed at its end.
 std::string WriteCompactJson(const Json::Value &document);
 
-/// The member of that name; null if there is none.
+/// Returns the member of that name, or null.
 const Json::Value *FindMember(const Json::Value &document, const char *name);
 
-/// Reads a member into a field if it exists and is a string (a boolean). Otherwise returns false and leaves the field
-/// unchanged.
+/// Reads a member of the field's type. Returns false, with an unchanged field, if there is none.
 bool ReadMember(const Json::Value &document, const char *name, std::string &field);
 bool ReadMember(const Json::Value &document, const char *name, bool &field);
 
@@ -40,13 +37,13 @@ struct StringMember {
     std::string &field;
 };
 
-/// Reads each of the members as ReadMember does, in their order.
+/// Reads each member as ReadMember does.
 void ReadMembers(const Json::Value &document, std::initializer_list<StringMember> members);
 
-/// A member read as text: empty for null and for a missing member; nothing for an array or an object.
+/// Returns a member as text: empty if it is null or missing; nothing if it is an array or an object.
 std::optional<std::string> MemberText(const Json::Value &document, const char *name);
 
-/// Whether the member, read as text, equals this text. Arrays and objects never do.
+/// Returns whether the member as text equals this text; false for arrays and objects.
 bool MemberTextIs(const Json::Value &document, const char *name, const std::string &expected);
 
 }  // namespace TAVO::Utils

@@ -15,11 +15,11 @@ namespace {
 
 // strerror_r has two forms: GNU's returns the text, POSIX's fills the buffer.
 [[maybe_unused]] const char *ErrorText(const char *text, const char * /*buffer*/) { return text; }
-// GCOVR_EXCL_START: the other form is that of glibc with g++ and clang's default macros
+// GCOVR_EXCL_START: glibc with the default macros of g++ and clang uses the other form
 [[maybe_unused]] const char *ErrorText(int /*result*/, const char *buffer) { return buffer; }
 // GCOVR_EXCL_STOP
 
-/// Raises the process's effective ids to root's for its lifetime, as far as the process may.
+/// Raises the process's effective ids to root's for its lifetime, if the process may.
 class RootPrivilege {
   public:
     RootPrivilege(const char *source, int line)
@@ -43,7 +43,7 @@ class RootPrivilege {
                (!changeUID || SetEffectiveUID(savedUID_));
     }
 
-    static constexpr unsigned int kUnchanged = static_cast<unsigned int>(-1);  // the real and the saved id
+    static constexpr unsigned int kUnchanged = static_cast<unsigned int>(-1);  // the real and saved ids
 
     bool SetEffectiveGID(gid_t gid) { return Logged("resgid", gid, setresgid(kUnchanged, gid, kUnchanged)); }
     bool SetEffectiveUID(uid_t uid) { return Logged("resuid", uid, setresuid(kUnchanged, uid, kUnchanged)); }

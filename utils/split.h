@@ -7,8 +7,7 @@
 
 namespace TAVO::Utils {
 
-/// Splits a text at each separator; adjacent separators are not merged. Returns no pieces unless there are exactly
-/// `pieces`.
+/// Splits a text at each separator, without merging adjacent ones. Returns no pieces unless there are exactly `pieces`.
 std::vector<std::string> SplitInto(std::size_t pieces, const std::string &text, char separator);
 
 }  // namespace TAVO::Utils

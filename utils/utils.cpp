@@ -18,7 +18,7 @@ namespace {
 
 constexpr char kSourceName[] = "utils";
 
-/// libcurl's global state during one transfer. Declare it before the handle, so that it is cleaned up after the handle.
+/// libcurl's global state during a transfer. Declare it before the handle, so that it is cleaned up after it.
 struct CurlGlobalState {
     CurlGlobalState() { curl_global_init(CURL_GLOBAL_ALL); }
     ~CurlGlobalState() { curl_global_cleanup(); }
@@ -33,7 +33,7 @@ void Require(CURLcode result) {
     }
 }
 
-/// One request with a fresh handle: a POST of the form if there is one, else a GET.
+/// Sends a request with a new handle: POST if there is a form, else GET.
 void Transfer(const std::string &url, const std::string *form, std::string &response, bool verifySSL,
               curl_write_callback writeCallback) {
     const CurlGlobalState global;
@@ -41,7 +41,7 @@ void Transfer(const std::string &url, const std::string *form, std::string &resp
     if (!handle) {
         throw std::bad_alloc();
     }
-    // The transfer reports a URL that libcurl rejects.
+    // curl_easy_perform reports a failure of this call.
     curl_easy_setopt(handle.get(), CURLOPT_URL, url.c_str());
     if (form != nullptr) {
         Require(curl_easy_setopt(handle.get(), CURLOPT_POSTFIELDS, form->c_str()));
@@ -56,7 +56,7 @@ void Transfer(const std::string &url, const std::string *form, std::string &resp
     Require(curl_easy_perform(handle.get()));
 }
 
-/// Zeroed memory from calloc; null if memory runs out.
+/// Returns zeroed memory from calloc, or null.
 std::shared_ptr<char> AllocateText(std::size_t size) { return {static_cast<char *>(std::calloc(size, 1)), std::free}; }
 
 }  // namespace
@@ -88,7 +88,7 @@ std::string MD5Digest(std::string data) {
     unsigned char digest[MD5_DIGEST_LENGTH];
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
-    // MD5 protects nothing here: it ties the state to the nonce.
+    // MD5 only links the state to the nonce; it need not resist collisions.
     if (MD5(reinterpret_cast<const unsigned char *>(data.data()), data.size(), digest) == nullptr) {
         syslog(LOG_ERR, "%s:%d MD5 digest failed %m", SOURCE_LINE);
         return {};

@@ -30,7 +30,7 @@ WebSphereSSOClient::WebSphereSSOClient() {
     if (!Utils::LoadJsonFileAsRoot(SOURCE_LINE, kConfigurationFile, file)) {
         return;
     }
-    // The file has no key for `enable`: the profile alone decides.
+    // The file has no key for `enable`.
     Utils::ReadMembers(file, {
                                  {"websphere_wellknown", wellknownEndpoint},
                                  {"websphere_client_id", clientID},

@@ -14,11 +14,11 @@ namespace TAVO::Platform {
 
 namespace {
 
-/// DNS domain names and their NetBIOS names: a JSON object of strings.
+/// A JSON object: DNS domain names and their NetBIOS names.
 constexpr char kDomainTable[] = "/usr/tavo/etc/domains.conf";
 
-/// Null where the file is no JSON. Memory that runs out is not taken for a file without the domain: the directory would
-/// be asked about one that the administrator has spoken of.
+/// Returns null if the file is missing or not JSON. Throws if memory runs out: the table overrides the directory, so it
+/// must not count as missing.
 Json::Value ReadTable() {
     Json::Value table;
     try {
@@ -32,7 +32,7 @@ Json::Value ReadTable() {
             return table;
         }
     } catch (const std::ios_base::failure &) {
-        // A directory.
+        // The path is a directory.
     }
     return {};
 }

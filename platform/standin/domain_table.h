@@ -6,9 +6,9 @@
 
 namespace TAVO::Platform {
 
-/// The NetBIOS name that the administrator's table gives a domain, whose case does not matter; nothing where it gives
-/// none, and where there is no table or none that can be read. Throws where memory runs out, and where the JSON library
-/// gives up over a table that is nested too deeply, which it does not tell apart.
+/// Returns the domain's NetBIOS name from the administrator's table, ignoring the domain's case. Returns nothing if the
+/// table has no such domain, is missing, unreadable or not JSON. Throws if memory runs out or the table is nested too
+/// deeply.
 std::optional<std::string> FindInDomainTable(const std::string &domain);
 
 }  // namespace TAVO::Platform

@@ -1,4 +1,4 @@
-// For machines without libwbclient, in the place of winbind.cpp.
+// Replaces winbind.cpp in builds without libwbclient.
 #include "platform/standin/winbind.h"
 
 namespace TAVO::Platform {

@@ -1,4 +1,4 @@
-// A working stand-in for the appliance's libraries, for machines that are not the appliance.
+// A working stand-in for the appliance's libraries, for other machines.
 #include "platform/platform.h"
 
 #include <openssl/evp.h>
@@ -12,7 +12,7 @@
 #include "platform/standin/domain_table.h"
 #include "platform/standin/winbind.h"
 
-// As in the library, whose headers the platform does not include: the two arguments behind the "%s:%d" of a log line.
+// As utils/source_line.h, which the platform does not include.
 #define SOURCE_LINE kSourceName, __LINE__
 
 namespace {
@@ -23,9 +23,9 @@ using TAVO::Platform::WinbindAnswer;
 
 constexpr char kSourceName[] = "platform";
 
-constexpr std::size_t kLongestShown = 255;  // that a domain of the DNS can be
+constexpr std::size_t kLongestShown = 255;  // the longest DNS name
 
-constexpr std::size_t kLongestInput = std::numeric_limits<int>::max() / 2;  // OpenSSL's coder counts in int
+constexpr std::size_t kLongestInput = std::numeric_limits<int>::max() / 2;  // OpenSSL counts in int
 
 bool IsUnreserved(char c) {
     return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9') || c == '-' || c == '.' ||
@@ -53,7 +53,7 @@ std::string EncodeBase64(const std::string &bytes) {
     return text;
 }
 
-/// The bytes of a canonical base64 text: the one text that encodes them, nothing skipped and no bit left over.
+/// Decodes base64. Accepts only the canonical text of the bytes.
 bool DecodeBase64(const std::string &text, std::string &bytes) {
     if (text.size() % 4 != 0) {
         return false;
@@ -63,14 +63,14 @@ bool DecodeBase64(const std::string &text, std::string &bytes) {
                         reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size())) < 0) {
         return false;
     }
-    // The coder counts padding as zero bytes, and is lenient about what surrounds the text.
+    // EVP_DecodeBlock decodes padding to zero bytes and ignores blanks around the text.
     if (!text.empty()) {
         bytes.resize(bytes.size() - (text.back() == '=' ? 1 : 0) - (text[text.size() - 2] == '=' ? 1 : 0));
     }
     return EncodeBase64(bytes) == text;
 }
 
-/// A domain as a log line shows it: whoever wrote the token chose it, and may have put a line feed into it.
+/// Returns the domain for a log line, without control characters: the token's issuer chooses it.
 std::string Shown(const std::string &domain) {
     std::string shown = domain.substr(0, kLongestShown);
     std::replace_if(
@@ -78,7 +78,7 @@ std::string Shown(const std::string &domain) {
     return shown;
 }
 
-/// What the administrator has written goes before what the directory says. Logs why there is nothing.
+/// Finds the NetBIOS name in the administrator's table, then in the directory. Logs a failure.
 std::optional<std::string> FindNetBIOSName(const std::string &domain) {
     if (std::optional<std::string> netBIOSName = FindInDomainTable(domain)) {
         return netBIOSName;
@@ -108,7 +108,7 @@ std::optional<std::string> FindNetBIOSName(const std::string &domain) {
     return std::nullopt;
 }
 
-/// DOMAIN\user with the domain's NetBIOS name. Logs why there is nothing.
+/// Converts the domain in DOMAIN\user to its NetBIOS name. Logs a failure.
 std::optional<std::string> ConvertDomain(const std::string &name) {
     const std::size_t backslash = name.find('\\');
     if (backslash == std::string::npos) {
@@ -124,7 +124,7 @@ std::optional<std::string> ConvertDomain(const std::string &name) {
     return netBIOSName ? std::optional(*netBIOSName + name.substr(backslash)) : std::nullopt;
 }
 
-/// Copies a text and its NUL into a buffer that holds `usableSize` characters and the NUL.
+/// Copies a text and its NUL into a buffer for `usableSize` characters and the NUL.
 bool CopyText(const std::string &text, char *dst, std::size_t usableSize) {
     if (text.size() > usableSize) {
         return false;
@@ -135,7 +135,7 @@ bool CopyText(const std::string &text, char *dst, std::size_t usableSize) {
 
 }  // namespace
 
-// No exception may leave a function with C linkage: want of memory is one more failure.
+// These functions have C linkage and must not throw.
 
 int TavoCgiURLEncode(const char *src, char *dst, size_t size) try {
     if (src == nullptr || dst == nullptr) {

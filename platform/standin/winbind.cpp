@@ -16,7 +16,7 @@
 #include <optional>
 #include <system_error>
 
-// The header is one for C, and takes the standard types for granted.
+// A C header that does not include the standard types.
 extern "C" {
 #include <wbclient.h>
 }
@@ -29,7 +29,7 @@ using Kind = WinbindAnswer::Kind;
 
 constexpr unsigned int kPatience = 1;  // seconds
 
-/// What the child tells its parent: in one piece, which a pipe takes and gives as a whole.
+/// The answer of the child. A pipe transfers up to PIPE_BUF bytes at once.
 struct Message {
     wbcErr error;
     std::array<char, 256> dnsName;  // winbindd's own limit
@@ -51,7 +51,7 @@ class Descriptor {
     int number_;
 };
 
-/// A text that is missing, or too long to be a name, leaves the copy empty.
+/// Leaves the copy empty if the text is null or too long.
 void Copy(const char *text, std::array<char, 256> &copy) {
     if (text != nullptr && std::strlen(text) < copy.size()) {
         std::memcpy(copy.data(), text, std::strlen(text));
@@ -60,7 +60,7 @@ void Copy(const char *text, std::array<char, 256> &copy) {
 
 Message Ask(const char *domain) {
     Message message{};
-    struct wbcDomainInfo *information = nullptr;  // a function has the same name
+    struct wbcDomainInfo *information = nullptr;  // `struct`: a function has the same name
     message.error = ::wbcDomainInfo(domain, &information);
     const std::unique_ptr<struct wbcDomainInfo, decltype(&wbcFreeMemory)> owner(information, wbcFreeMemory);
     if (message.error == WBC_ERR_SUCCESS) {
@@ -70,8 +70,8 @@ Message Ask(const char *domain) {
     return message;
 }
 
-/// The child's whole life. libwbclient waits for minutes, and nothing limits that; the kernel ends the child instead,
-/// whatever the host does with the signal.
+/// Runs the child process. libwbclient waits for minutes and has no time limit, so an alarm ends the child. The program
+/// may have blocked or handled SIGALRM.
 [[noreturn]] void AskInChild(const char *domain, int out) {
     std::signal(SIGALRM, SIG_DFL);
     sigset_t signals;
@@ -79,22 +79,21 @@ Message Ask(const char *domain) {
     sigaddset(&signals, SIGALRM);
     sigprocmask(SIG_UNBLOCK, &signals, nullptr);
     alarm(kPatience);
-    // libwbclient looks into it for who is to be asked, and whether at all: a login that runs with raised ids does not
-    // let its caller's environment decide.
+    // libwbclient reads settings from the environment, which is untrusted in a process with raised ids.
     environ = nullptr;
     const Message message = Ask(domain);
-    // Of the host, nothing is flushed and no handler runs a second time.
+    // _exit does not flush the program's buffers or run its exit handlers.
     _exit(write(out, &message, sizeof message) == sizeof message ? 0 : 1);
 }
 
-/// Returns when the child has ended, whoever has been told of that: the host may have its children collected.
+/// Waits until the child has ended. Other code of the program may collect it.
 void WaitForEnd(pid_t child) {
     while (waitpid(child, nullptr, 0) < 0 && errno == EINTR) {
     }
 }
 
-/// What the child wrote, if anything. It has ended: nothing is waited for, also where the host has forked meanwhile and
-/// the pipe's other end lives on.
+/// Reads the answer of the child, which has ended. Never waits: the pipe is non-blocking, since another fork of the
+/// program may hold its other end open.
 std::optional<Message> Receive(int in) {
     Message message{};
     return read(in, &message, sizeof message) == sizeof message ? std::optional(message) : std::nullopt;
@@ -113,8 +112,8 @@ WinbindAnswer Judge(const Message &message, const std::string &domain) {
         default:
             return {Kind::kNotAsked, wbcErrorString(message.error)};
     }
-    // winbindd knows domains by their NetBIOS names, too, and itself by names without a DNS: one who can choose the
-    // part behind the at sign must not choose among those.
+    // winbindd also answers for NetBIOS names and for the machine's own names. The provider chooses the text after the
+    // at sign and must not be able to name local accounts.
     const std::string netBIOSName = message.netBIOSName.data();
     if (netBIOSName.empty() || !boost::iequals(message.dnsName.data(), domain, std::locale::classic())) {
         return {Kind::kUnknown, ""};

@@ -3,23 +3,23 @@
 
 #include <string>
 
-// The machine's winbindd, which knows the domains of the directory that the machine is a member of.
+// Asks winbindd for the domains of the directory that the machine has joined.
 namespace TAVO::Platform {
 
 struct WinbindAnswer {
     enum class Kind {
-        kKnown,         // `text` is the domain's NetBIOS name, as the directory spells it
-        kUnknown,       // also for a domain that is asked for by another name than that of the DNS
-        kNotAvailable,  // nobody listens
-        kSilent,        // somebody does, and has not answered within a second
-        kNotAsked,      // `text` tells why
+        kKnown,         // `text` is the domain's NetBIOS name, spelt as in the directory
+        kUnknown,       // also if the name is not the DNS name of the domain
+        kNotAvailable,  // winbindd does not run
+        kSilent,        // winbindd did not answer within a second
+        kNotAsked,      // `text` is the reason
     };
     Kind kind;
     std::string text;
 };
 
-/// Asks for a domain by its DNS name, whose case does not matter. It is asked by a child process, whose end can be the
-/// caller's signal SIGCHLD; no child and no descriptor is left.
+/// Asks for a domain by its DNS name, ignoring case. Forks a child process, so the program may receive SIGCHLD. The
+/// child has ended and its descriptors are closed when the function returns.
 WinbindAnswer AskWinbind(const std::string &domain);
 
 }  // namespace TAVO::Platform
