@@ -1,4 +1,4 @@
-// A page for users who are signed in, and an example of one: whoever is not signs in first and comes back to it.
+// An example of a page for signed-in users. Other users sign in first and return to it.
 #include <sso/sso.h>
 
 #include "frontend/cgi_program.h"
@@ -28,7 +28,8 @@ void ShowAccount(Web::Response &response) {
     }
     Frontend::ShowPage(response, "200 OK", "Your account",
                        "<h1>Your account</h1>\n<dl>\n" + Entry("Name", session->displayName) +
-                           Entry("Name on this device", session->user) + Entry("Signed in through", session->profile) +
+                           Entry("User name on this device", session->user) +
+                           Entry("Signed in with", session->profile) +
                            "</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
 }
 

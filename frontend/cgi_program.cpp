@@ -19,19 +19,19 @@
 
 namespace Frontend {
 
-// In seconds. The web server's own limit, 60 s (lighttpd.conf), is shorter and answers the browser. lighttpd 1.4.69
-// does not apply it to a request that arrives together with its connection.
+// In seconds. The web server's limit (lighttpd.conf) is 60 seconds, so that it can still answer the browser. lighttpd
+// 1.4.69 does not apply its limit to a request that arrives together with its connection.
 const unsigned int kLongestRun = 70;
 
 namespace {
 
-// An endless answer of the provider ends the program, not the machine.
+// An endless response of the provider must not exhaust the machine's memory.
 constexpr rlim_t kAddressSpace = rlim_t{1} << 30;
 
 void Limit(decltype(RLIMIT_CORE) resource, rlim_t most) {
     rlimit limit{};
     const bool isKnown = getrlimit(resource, &limit) == 0;
-    limit.rlim_cur = limit.rlim_max = std::min(most, limit.rlim_max);  // the web server may have set a smaller one
+    limit.rlim_cur = limit.rlim_max = std::min(most, limit.rlim_max);  // keep a smaller limit of the web server
     if (!isKnown || setrlimit(resource, &limit) != 0) {
         throw std::system_error(errno, std::generic_category(), "A limit cannot be set");
     }
@@ -41,15 +41,15 @@ void LimitProcess() {
     alarm(kLongestRun);
     Limit(RLIMIT_CORE, 0);
     prctl(PR_SET_DUMPABLE, 0);
-#ifndef __SANITIZE_ADDRESS__  // reserves terabytes
+#ifndef __SANITIZE_ADDRESS__  // the sanitizer reserves terabytes
     Limit(RLIMIT_AS, kAddressSpace);
 #endif
 }
 
 void RefuseMethod(Web::Response &response, const std::string &methods) {
     response.AddHeader("Allow", methods);
-    ShowPage(response, "405 Method Not Allowed", "This page cannot be used like this",
-             "<h1>This page cannot be used like this</h1>\n"
+    ShowPage(response, "405 Method Not Allowed", "This page cannot be opened directly",
+             "<h1>This page cannot be opened directly</h1>\n"
              "<p><a href=\"/index.cgi\">Go to the start page</a></p>\n");
 }
 
@@ -57,7 +57,7 @@ void RefuseMethod(Web::Response &response, const std::string &methods) {
 
 void Fail(Web::Response &response, const std::string &reason, const std::string &origin) {
     syslog(LOG_AUTH | LOG_WARNING, "frontend: sign-in failed: %s", reason.c_str());
-    // The relay URL takes the reason unencoded, so another parameter can follow it.
+    // GetSSORelayURL copies the reason verbatim, so another parameter can follow it.
     std::string encoded = TAVO::SSO::URLEncode(reason);
     if (!origin.empty()) {
         encoded += "&origin=" + TAVO::SSO::URLEncode(origin);
@@ -76,7 +76,7 @@ bool Write(const Web::Response &response) {
     return std::cout.good();
 }
 
-/// `methods` is as in an Allow header.
+/// `methods` has the form of an Allow header.
 bool IsAllowed(const std::string &methods) {
     std::vector<std::string> names;
     boost::split(names, methods, boost::is_any_of(", "), boost::token_compress_on);

@@ -14,7 +14,7 @@ namespace {
 
 constexpr std::size_t kMostPendingLogins = 1000;
 
-// OpenSSL and libcurl read these: a file to write keys to, modules to load, authorities and proxies.
+// OpenSSL and libcurl read these. They set a file for keys, modules to load, authorities and proxies.
 constexpr const char *kUntrustedVariables[] = {
     "ALL_PROXY",    "CURL_CA_BUNDLE",  "CURL_HOME",       "HTTPS_PROXY",   "HTTP_PROXY",   "NO_PROXY",
     "OPENSSL_CONF", "OPENSSL_ENGINES", "OPENSSL_MODULES", "SSLKEYLOGFILE", "SSL_CERT_DIR", "SSL_CERT_FILE",

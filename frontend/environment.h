@@ -6,26 +6,26 @@
 
 #include "web/web.h"
 
-// The environment of a CGI program: its request (RFC 3875), and the front end's settings, which the web server sets.
+// The environment of a CGI program: the request (RFC 3875), and settings that the web server passes.
 namespace Frontend {
 
-/// A variable, empty if it is not set.
+/// Returns a variable; empty if it is not set.
 std::string Variable(const char *name);
 
 /// The browser's request.
 TAVO::Web::Request ReceivedRequest();
 
-/// Whether the request asks for the headers alone. Such a request must not start or complete a login.
+/// Returns whether the method is HEAD. Such a request must not start or finish a login.
 bool IsHeadRequest();
 
-/// FRONTEND_ACCEPT_EMAIL: whether "email" names a user although the provider has not verified it.
+/// FRONTEND_ACCEPT_EMAIL: whether an unverified "email" may name a user.
 bool AcceptsUnverifiedEmail();
 
-/// FRONTEND_PENDING_LOGINS: how many logins may be pending. Throws `Refusal` unless it is a number above 0.
+/// FRONTEND_PENDING_LOGINS: maximum number of pending logins. Throws `Refusal` unless it is a number above 0.
 std::size_t MostPendingLogins();
 
-/// Removes the variables that change what OpenSSL and libcurl trust, except those that FRONTEND_KEEP_ENVIRONMENT names,
-/// separated by blanks. All other variables reach libcurl.
+/// Removes variables that change what OpenSSL and libcurl trust. Keeps those in FRONTEND_KEEP_ENVIRONMENT, separated by
+/// blanks.
 void RemoveUntrustedVariables();
 
 }  // namespace Frontend

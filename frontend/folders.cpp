@@ -10,7 +10,7 @@ constexpr char kFolder[] = "/usr/tavo/var/frontend";
 constexpr std::time_t kSessionSeconds = std::time_t{8} * 60 * 60;
 constexpr std::size_t kMostSessions = 10000;
 
-/// Makes the front end's own folder if it is missing.
+/// Returns the path of a folder. Creates the folder that contains it.
 std::string FolderNamed(const std::string &name) {
     static_cast<void>(TAVO::Web::PrivateFolder(kFolder, 0));
     return kFolder + ("/" + name);

@@ -4,10 +4,10 @@
 #include "web/private_folder.h"
 #include "web/web.h"
 
-// What the front end remembers, in /usr/tavo/var/frontend.
+// The folders of the front end, in /usr/tavo/var/frontend.
 namespace Frontend {
 
-/// Logins that are under way. Throws `Refusal` for a wrong FRONTEND_PENDING_LOGINS.
+/// Pending logins. Throws `Refusal` for an invalid FRONTEND_PENDING_LOGINS.
 TAVO::Web::FolderLoginStore OpenLogins();
 
 TAVO::Web::PrivateFolder OpenSessions();

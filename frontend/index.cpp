@@ -1,4 +1,4 @@
-// The start page: who is signed in, or the way to sign in.
+// The start page: shows the signed-in user, or a link to sign in.
 #include <sso/sso.h>
 
 #include "frontend/cgi_program.h"

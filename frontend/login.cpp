@@ -1,4 +1,4 @@
-// Starts a login: sends the browser to the provider.
+// Starts a login and redirects the browser to the provider.
 #include "frontend/cgi_program.h"
 #include "frontend/environment.h"
 #include "frontend/folders.h"

@@ -1,4 +1,4 @@
-// Ends the session, here and, where the provider has a page for it, there.
+// Ends the session on this device and, if the provider has a logout page, at the provider.
 #include <sso/sso.h>
 #include <sso/supported_profiles.h>
 
@@ -12,7 +12,7 @@ namespace Web = TAVO::Web;
 
 namespace {
 
-// The address of the start page as the provider knows this site; the request's own Host header is anyone's to choose.
+// The start page's URL, from the configured redirect URI: the client chooses the Host header.
 std::string StartPageAddress(const std::string &redirectURI) {
     const std::size_t authority = redirectURI.find("://");
     if (authority == std::string::npos) {
@@ -30,14 +30,14 @@ std::string ProviderLogout(const Frontend::Session &session) {
 }
 
 void LeaveForProvider(Web::Response &response, const std::string &address) {
-    // A page and no redirect: browsers hold the redirects that follow a form against "form-action 'self'".
+    // Not a redirect: browsers apply "form-action 'self'" to the redirects after a form.
     response.AddHeader("Refresh", "0; url=" + address);
     Frontend::ShowPage(response, "200 OK", "Signing out",
                        "<h1>Signing out</h1>\n<p>You are signed out of this device. <a href=\"" +
-                           Web::EscapeHtml(address) + "\">Sign out of your organisation too</a></p>\n");
+                           Web::EscapeHtml(address) + "\">Sign out of your organisation account too</a></p>\n");
 }
 
-// Every browser sends one of these headers with a form, and no other site can forge them.
+// Browsers send one of these headers with a form. Other sites cannot forge them.
 bool ComesFromThisSite() {
     const std::string origin = Frontend::Variable("HTTP_ORIGIN");
     return Frontend::Variable("HTTP_SEC_FETCH_SITE") == "same-origin" ||

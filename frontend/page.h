@@ -7,7 +7,7 @@
 
 namespace Frontend {
 
-/// Answers with a page of the front end. `content` is HTML; `title` is text.
+/// Responds with a page of the front end. `content` is HTML; `title` is text.
 void ShowPage(TAVO::Web::Response &response, const std::string &status, const std::string &title,
               const std::string &content);
 

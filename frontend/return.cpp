@@ -1,4 +1,4 @@
-// The redirect URI: the browser is back from the provider, with a code or with an error.
+// The redirect URI: finishes a login.
 #include <sso/sso.h>
 #include <syslog.h>
 

@@ -13,7 +13,7 @@ namespace {
 constexpr char kCookie[] = "__Host-session";
 constexpr char kFormat[] = "session 1";
 
-/// Accepts a session in exactly the format that StartSession writes.
+/// Accepts only the format that StartSession writes.
 std::optional<Session> ParseSession(const std::optional<std::string> &text) {
     const Json::Value session = Web::ParseObject(text.value_or(""));
     const std::string user = Web::StringMember(session, "user");

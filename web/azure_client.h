@@ -5,8 +5,7 @@
 
 namespace TAVO::Web {
 
-/// The library's client, but it fetches the key set over HTTPS only. libcurl knows other schemes, by which a discovery
-/// document could reach internal services.
+/// Fetches the key set over HTTPS only. With other schemes, a discovery document could reach internal services.
 class AzureClient : public TAVO::SSO::AzureSSOClient {
   public:
     /// Removes a "jwks_uri" that is not an https:// URL from the document, with one line at `LOG_ERR`.

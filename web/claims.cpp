@@ -10,7 +10,7 @@ namespace TAVO::Web {
 
 namespace {
 
-/// The claim that the library makes the user's name of.
+/// Returns the claim that the library converts to the user's name.
 const char *NameClaim(const Json::Value &claims, const std::string &profile) {
     if (profile != TAVO::SSO::kAzureProfile) {
         return "sub";

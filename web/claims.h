@@ -5,18 +5,18 @@
 
 #include <string>
 
-// What the front end checks in the claims of an ID token that the library has verified.
+// Checks of the claims of a verified ID token.
 namespace TAVO::Web {
 
 /**
- * Throws `Refusal` unless the claim that names the user can be trusted: "unique_name" under the profile azure, "sub"
- * under another. It must be a printable string, since the platform reads a name up to its first NUL. "email", which the
- * library takes where "unique_name" is missing, is often the user's own choice: it counts only if "email_verified" is
- * true, or with `acceptsUnverifiedEmail`.
+ * Throws `Refusal` unless the claim that names the user can be trusted: "unique_name" (azure) or "sub". It must be
+ * printable, since the platform reads a name up to its first NUL. Without "unique_name" the library reads "email",
+ * which users often choose themselves. It is accepted only if "email_verified" is true, or with
+ * `acceptsUnverifiedEmail`.
  */
 void RequireTrustworthyName(const Json::Value &claims, const std::string &profile, bool acceptsUnverifiedEmail);
 
-/// The name to show for the user: the claim "name". Empty if it is missing or not printable.
+/// Returns the claim "name", to show to the user. Empty if it is missing or not printable.
 std::string DisplayName(const Json::Value &claims);
 
 }  // namespace TAVO::Web

@@ -19,7 +19,7 @@ bool IsUnreadable(const std::string &file) {
     return faccessat(AT_FDCWD, (kSettings + file).c_str(), R_OK, AT_EACCESS) != 0 && errno == EACCES;
 }
 
-/// The library raises root's ids to read a client's file. This needs root as one of the process's ids.
+/// Returns whether the library can raise root's ids to read a client's file.
 bool CanBecomeRoot() {
     uid_t real = 0;
     uid_t effective = 0;
@@ -40,8 +40,8 @@ bool HasSecret(SSO::SSOClient &client) {
     return isSet;
 }
 
-// Without any of these a login is certain to fail, often only after the user has typed a password. The client does not
-// return the tenant id.
+// Without one of these a login fails, often after the user has entered a password. The client does not return the
+// tenant id.
 bool HasAllSettings(const std::string &profile, SSO::SSOClient &client) {
     return !client.GetClientID().empty() && HasSecret(client) && !client.GetRedirectURI().empty() &&
            !client.GetAuthEndpoint().empty() && !client.GetTokenEndpoint().empty() &&

@@ -10,16 +10,16 @@ namespace TAVO::Web {
 
 enum class SetUp { kOff, kIncomplete, kComplete };
 
-/// Whether users can sign in, for pages that offer it.
+/// Returns whether users can sign in.
 SetUp HowFarSetUp();
 
 /// Returns the settings that must not change during a login: "profile", "client_id" and "token_endpoint".
 ///
-/// Throws what `OIDCLogin` throws for a profile that is off or unknown, and `Refusal` if the program may not read a
-/// file or a setting is missing.
+/// Throws as `OIDCLogin` if the profile is off or unknown, and `Refusal` if a file is not readable or a setting
+/// missing.
 Json::Value RequireSettings();
 
-/// Whether single sign-on is on and this is its profile.
+/// Returns whether single sign-on is on and this is the configured profile.
 bool IsInForce(const std::string &profile);
 
 }  // namespace TAVO::Web

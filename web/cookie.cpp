@@ -7,7 +7,7 @@ namespace TAVO::Web {
 
 namespace {
 
-/// Each value that the header has for the cookie. A cookie without "=" has an empty value.
+/// Returns all values of a cookie. A cookie without "=" has an empty value.
 std::vector<std::string> ValuesOf(const std::string &header, const std::string &name) {
     std::vector<std::string> pieces;
     boost::split(pieces, header, boost::is_any_of(";"));
@@ -26,7 +26,7 @@ std::vector<std::string> ValuesOf(const std::string &header, const std::string &
 }  // namespace
 
 std::string MakeCookie(const std::string &name, const std::string &value, const std::string &more) {
-    // Lax, not Strict: the browser comes back from the provider's site, and brings the cookie only then.
+    // Lax: with Strict, the browser would not send the cookie when the provider redirects it here.
     return name + "=" + value + "; Path=/; Secure; HttpOnly; SameSite=Lax" + more;
 }
 

@@ -10,65 +10,60 @@ namespace TAVO::Web {
 
 namespace {
 
-constexpr char kNotSetUp[] =
-    "Single sign-on is not completely set up on this device. Please ask your administrator for help.";
-constexpr char kStartAgain[] = "Your sign-in took too long, or was already completed. Please start again.";
+constexpr char kNotSetUp[] = "Single sign-on is not completely set up on this device. Contact your administrator.";
+constexpr char kStartAgain[] = "Your sign-in took too long, or was already completed. Sign in again.";
+constexpr char kStopped[] = "For your security, this sign-in was stopped. Sign in again.";
 constexpr char kNotVerified[] =
-    "This device could not verify the answer of your organisation. Please ask your administrator for help.";
-constexpr char kNotReached[] =
-    "Your organisation's sign-in service gave no usable answer. Please try again in a few minutes.";
+    "This device could not verify the response of your organisation. Contact your administrator.";
+constexpr char kNotReached[] = "Your organisation's sign-in service is not available. Try again in a few minutes.";
 constexpr char kNoName[] =
-    "Your organisation gave no name that this device can use. Please ask your administrator for help.";
-constexpr char kNotKnown[] =
-    "Something went wrong on the way. Please try again; if it happens again, tell your administrator.";
+    "Your organisation did not send a user name that this device can use. Contact your administrator.";
+constexpr char kNotKnown[] = "Something went wrong. Try again. If the problem persists, contact your administrator.";
 
 struct Description {
     const char *name;
     const char *sentence;
 };
 
-// In the order of the enumeration.
+// In the order of `Failure`.
 constexpr std::array kDescriptions = {
-    Description{"switched_off",
-                "Single sign-on is switched off on this device. Please ask your administrator for help."},
+    Description{"switched_off", "Single sign-on is switched off on this device. Contact your administrator."},
     Description{"not_set_up", kNotSetUp},
     Description{"not_permitted", kNotSetUp},
-    Description{"too_many_logins", "Too many sign-ins are under way on this device. Try again in a few minutes."},
+    Description{"too_many_logins", "Too many users are signing in to this device. Try again in a few minutes."},
     Description{"storage", kNotKnown},
     Description{"invalid_request", kNotKnown},
     Description{"other_browser",
-                "This sign-in was not started in this browser, or was already completed. Please start it here."},
+                "This sign-in was not started in this browser, or was already completed. Sign in again."},
     Description{"login_expired", kStartAgain},
-    Description{"state_changed", "For your safety this sign-in was stopped: it was changed on its way."},
-    Description{"profile_changed", "The settings of this device were changed during your sign-in. Sign in again."},
-    Description{"provider_refused",
-                "Your organisation's sign-in service did not accept this sign-in. Please try again; if it happens "
-                "again, tell your administrator."},
+    Description{"state_changed", kStopped},
+    Description{"profile_changed", "The settings of this device changed during your sign-in. Sign in again."},
+    Description{
+        "provider_refused",
+        "Your organisation rejected this sign-in. Try again. If the problem persists, contact your administrator."},
     Description{"network", kNotReached},
     Description{"certificate", kNotReached},
     Description{"invalid_response", kNotReached},
     Description{"invalid_token", kNotVerified},
-    Description{"token_expired",
-                "Your sign-in took too long. Please try again; if it happens again, the clock of this device may be "
-                "wrong."},
+    Description{
+        "token_expired",
+        "Your sign-in took too long. Try again. If the problem persists, the clock of this device may be wrong."},
     Description{"other_tenant",
-                "Your account belongs to an organisation that this device does not serve. Please ask your "
-                "administrator for help."},
+                "Your account belongs to an organisation that cannot use this device. Contact your administrator."},
     Description{"unknown_key", kNotVerified},
     Description{"invalid_signature", kNotVerified},
-    Description{"other_login", "For your safety this sign-in was stopped: the answer belongs to another one."},
+    Description{"other_login", kStopped},
     Description{"user_name", kNoName},
     Description{"unverified_email",
-                "Your organisation has not verified your e-mail address. Please ask your administrator for help."},
-    Description{"unknown_domain",
-                "Your account's domain is not known to this device. Please ask your administrator for help."},
+                "Your organisation has not verified your e-mail address. Contact your administrator."},
+    Description{"unknown_domain", "This device does not recognise your account's domain. Contact your administrator."},
     Description{"internal", kNotKnown},
 };
 static_assert(kDescriptions.size() == static_cast<std::size_t>(Failure::kInternal) + 1);
 
 const Description &Describe(Failure failure) { return kDescriptions[static_cast<std::size_t>(failure)]; }
 
-/// The row with the most specific text for a reason; null if there is none.
+/// Returns the row with the most specific text for a reason, or null.
 const FailureRow *FindRow(const std::string &reason) {
     const FailureRow *found = nullptr;
     std::size_t most = 0;
@@ -84,7 +79,7 @@ const FailureRow *FindRow(const std::string &reason) {
     return found;
 }
 
-/// A text to look up in the table. Texts that the provider chose are not looked up.
+/// Returns the text to look up in the table. The provider chooses some texts; these are not looked up.
 std::string TextInTable(const std::exception &error) {
     if (dynamic_cast<const ProviderRefusal *>(&error) != nullptr) {
         return kReturnedError;
@@ -115,7 +110,7 @@ FailedLogin FailedLoginOf(const std::exception &error) {
 FailedLogin UnusableDocuments(FailedLogin failed) {
     failed.failure = Failure::kInvalidResponse;
     failed.sentence = SentenceOf(failed.failure);
-    failed.hint = "Run `tavosso-doctor`. Check what `azure_wellknown` and the address in its \"jwks_uri\" answer.";
+    failed.hint = R"(Run `tavosso-doctor`. Check the documents at `azure_wellknown` and at its "jwks_uri".)";
     return failed;
 }
 

@@ -7,13 +7,13 @@
 
 namespace TAVO::Web {
 
-/// One sentence for the user.
+/// Returns one sentence for the user.
 std::string SentenceOf(Failure failure);
 
-/// The failed login with the cause that libcurl reports.
+/// Adds the cause that libcurl reports.
 FailedLogin FailedTransfer(FailedLogin failed, CURLcode result);
 
-/// The failed login of a discovery document or key set that is not what it must be.
+/// Adds the cause: the discovery document or key set is invalid.
 FailedLogin UnusableDocuments(FailedLogin failed);
 
 }  // namespace TAVO::Web

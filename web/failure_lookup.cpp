@@ -43,7 +43,7 @@ Pieces SplitAtPlaceholders(const std::string &ofTable) {
     return pieces;
 }
 
-/// Whether the pieces follow each other in `text`, from its beginning to its end, with anything between them.
+/// Returns whether `text` consists of the pieces in this order, with any text between them.
 bool Consists(const std::string &text, const Pieces &pieces) {
     if (pieces.size() == 1) {
         return text == pieces.front();
@@ -62,7 +62,7 @@ bool Consists(const std::string &text, const Pieces &pieces) {
     return boost::ends_with(text.substr(end), pieces.back());
 }
 
-/// libcurl 8 spells out what libcurl 7 abbreviates.
+/// Converts a text of libcurl 7 to that of libcurl 8.
 std::string InWordsOfLibcurl8(std::string text) {
     boost::replace_all(text, "Couldn't", "Could not");
     boost::replace_all(text, "host name", "hostname");

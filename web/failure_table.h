@@ -7,20 +7,20 @@
 
 #include "web/web.h"
 
-// Every failure that the library, the platform's stand-in and the front end report, with its cause and its remedy. The
-// documents and `tavosso-doctor explain` print this table, and the tests compare it with what is thrown and logged.
+// Cause and remedy of each failure that the library, the stand-in and the front end report. The tables of the documents
+// and the output of `tavosso-doctor explain` are generated from it.
 namespace TAVO::Web {
 
 enum class FailureKind {
     kLibraryLine,   // of the system log
     kPlatformLine,  // the stand-in's
     kFrontEndLine,
-    kReason,     // the front end's own reason for a failed sign-in
+    kReason,     // of the front end, for a failed sign-in
     kException,  // of the library
     kTransfer,   // libcurl's result
 };
 
-/// The table's text for an error response of the token endpoint (RFC 6749, section 5.2), which the library throws.
+/// The table's text for the exception with an error response of the token endpoint (RFC 6749, section 5.2).
 constexpr char kErrorAnswer[] = "{... \"error\": ...}";
 
 /// The table's text for an error of the authorization endpoint (RFC 6749, section 4.1.2.1).
@@ -29,13 +29,13 @@ constexpr char kReturnedError[] = "The provider refused: REASON";
 struct FailureRow {
     FailureKind kind;
 
-    /// Words in capitals are placeholders: see failure_lookup.h. Of a transfer, the name of its CURLcode. Empty where
-    /// the text is another library's.
+    /// Words in capitals are placeholders (failure_lookup.h). For a transfer, the name of its CURLcode. Empty if the
+    /// text is another library's.
     std::vector<const char *> texts;
 
-    Failure code;  // of a login that ends so
+    Failure code;  // of the failed login
 
-    const char *cause;  // a key, file, path or command is in backticks
+    const char *cause;  // keys, files, paths and commands are in backticks
     const char *remedy;
     const char *type = "";       // a line's level, or an exception's exact class
     const char *thrownBy = "";   // of an exception

@@ -36,7 +36,7 @@ void RefuseProviderError(const Parameters &parameters) {
     }
 }
 
-/// What `OIDCLogin` does, and then the checks of the claims that the library leaves to its callers.
+/// Logs in as `OIDCLogin`, then checks the claims that the library does not check.
 User SignIn(const PendingLogin &login, const std::string &code, const FinishOptions &options) {
     return SSO::WithClient<AzureClient>(login.profile, [&](SSO::SSOClient &client) {
         std::string name;
@@ -59,7 +59,7 @@ StartedLogin StartLogin(const Request &request, LoginStore &store, const std::st
         started.origin = SafeOrigin(OnlyValue(ParseQuery(request.query), "origin").value_or(""), startPage);
         RequireGet(request);
         const Json::Value settings = RequireSettings();
-        // Not `RedirectAuthEndpoint`, which writes the URL at once: the store must have its state first.
+        // Not `RedirectAuthEndpoint`, which would redirect the browser before the state is stored.
         const auto makeAddress = [&](const Json::Value &state) {
             return SSO::WithClient(settings["profile"].asString(),
                                    [&](auto &client) { return client.GetAccessTokenReqURI(state); });
@@ -82,7 +82,7 @@ FinishedLogin FinishLogin(const Request &request, LoginStore &store, const Finis
         RequireGet(request);
         const Parameters parameters = ParseQuery(request.query);
         finished.state = RequireOnly(parameters, "state");
-        // Before anything of the answer is believed, and above all before the code is used.
+        // Before any other parameter is used, above all the code.
         const PendingLogin login = EndLogin(finished.response, finished.origin, request, store, finished.state);
         RefuseProviderError(parameters);
         finished.user = SignIn(login, RequireOnly(parameters, "code"), options);

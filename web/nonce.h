@@ -6,9 +6,8 @@
 namespace TAVO::Web {
 
 /**
- * Throws `Refusal` unless the ID token was issued for the login that `state`, the state's object, belongs to (OpenID
- * Connect Core 1.0, section 3.1.3.7, number 11). A code or a token that was stolen from another login has that login's
- * nonce, of which the state has the digest.
+ * Throws `Refusal` unless the digest of the token's nonce is in the state (OpenID Connect Core 1.0, section 3.1.3.7,
+ * number 11). The nonce of a stolen code or token belongs to another login.
  */
 void RequireNonce(const Json::Value &claims, const Json::Value &state);
 

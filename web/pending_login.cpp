@@ -21,8 +21,9 @@ constexpr char kCookieSlots[] = "0123456789abcdef";
 
 std::string CookieName(char slot) { return std::string("__Host-login-") + slot; }
 
-/// A cookie that the browser does not have, so that logins in other tabs go on. Chosen by the login's random name: tabs
-/// that start at once seldom choose the same. With all names in use, one of them is replaced.
+/// Returns a cookie name that the browser does not use yet, so that logins in other tabs continue. Starts at the
+/// login's random name, so that tabs that start at once rarely choose the same. If all names are in use, returns one of
+/// them.
 std::string FreeCookieName(const std::string &cookies, const std::string &login) {
     const std::string slots = kCookieSlots;
     const std::size_t first = slots.find(login.front());
@@ -35,7 +36,7 @@ std::string FreeCookieName(const std::string &cookies, const std::string &login)
     return CookieName(login.front());
 }
 
-/// The login that a cookie's value belongs to: the first half of its SHA-256, in hexadecimal.
+/// Returns the login of a cookie's value: the first half of its SHA-256, in hexadecimal.
 std::string LoginOf(const std::string &secret) {
     unsigned char digest[EVP_MAX_MD_SIZE];
     if (EVP_Digest(secret.data(), secret.size(), digest, nullptr, EVP_sha256(), nullptr) != 1) {
@@ -44,7 +45,7 @@ std::string LoginOf(const std::string &secret) {
     return PrivateFolder::NameOf(digest);
 }
 
-/// The name of the login's cookie; empty if this browser did not start it.
+/// Returns the name of the login's cookie; empty if this browser did not start it.
 std::string CookieOf(const std::string &cookies, const std::string &login) {
     for (const char slot : std::string(kCookieSlots)) {
         const std::optional<std::string> secret = FindCookie(cookies, CookieName(slot));
@@ -55,7 +56,7 @@ std::string CookieOf(const std::string &cookies, const std::string &login) {
     return "";
 }
 
-/// An integrator's store may throw anything.
+/// Converts any exception of the store to `StoreFailure`.
 template <typename Call>
 auto CallStore(Call call) {
     try {
@@ -114,13 +115,12 @@ PendingLogin EndLogin(Response &response, std::string &origin, const Request &re
     if (StringMember(started, "format") != kFormat) {
         throw Refusal("This sign-in took too long, or was already completed.");
     }
-    // The browser's owner can write another state around their own value: with the digest of another login's nonce, for
-    // example.
+    // A user can write another state with the user's own cookie, for example with the nonce of a stolen token.
     if (state != StringMember(started, "state")) {
         throw Refusal("This sign-in was changed on its way.");
     }
     origin = StringMember(returned, "origin");
-    // The code must not go to another provider, with that provider's client secret.
+    // The code must not be sent to another provider with that provider's client secret.
     const Json::Value settings = RequireSettings();
     if (settings != started["settings"]) {
         throw Refusal("The settings of this device were changed during this sign-in.");

@@ -49,7 +49,7 @@ Descriptor OpenFolderIn(const Descriptor &parent, const std::string &name) {
             "The front end's folder cannot be opened"};
 }
 
-/// A folder on the way: only root or this user can put something else in its place.
+/// Opens a parent folder. Only root or this user may be able to replace what is in it.
 Descriptor OpenTrusted(const Descriptor &parent, const std::string &name) {
     Descriptor folder = OpenFolderIn(parent, name);
     const struct stat status = StatusOf(folder);
@@ -86,7 +86,7 @@ Descriptor OpenFolder(const std::string &path) {
     return OpenPrivate(folder, names.back());
 }
 
-/// Whether a file is one of ours: what another user has put or linked here is not.
+/// Returns whether this user created the file and no other user can access it.
 bool IsOwnFile(const struct stat &status) {
     return S_ISREG(status.st_mode) && status.st_uid == geteuid() && (status.st_mode & 077) == 0;
 }
@@ -117,10 +117,10 @@ std::string ReadAll(const Descriptor &file) {
     return text;
 }
 
-/// Not time(), which may lag behind the clock of files: a new file would be dated in the future.
+/// time() can be behind the timestamps of new files; this clock cannot.
 std::time_t Now() { return std::chrono::system_clock::to_time_t(std::chrono::system_clock::now()); }
 
-/// Whether a file has not expired. One dated in the future never would: it has.
+/// Returns whether a file has not expired. A file dated in the future counts as expired.
 bool IsAlive(const struct stat &status, std::time_t lifetime) {
     const std::time_t now = Now();
     return status.st_mtime <= now && now - status.st_mtime <= lifetime;
@@ -130,7 +130,7 @@ struct CloseDirectory {
     void operator()(DIR *directory) const { closedir(directory); }
 };
 
-/// The names of texts, also of unfinished ones. Other files are not ours to remove.
+/// Returns the names of texts, including unfinished ones. Ignores other files.
 std::vector<std::string> NamesIn(const Descriptor &folder) {
     const int reopened = openat(folder.Number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     const std::unique_ptr<DIR, CloseDirectory> directory(reopened < 0 ? nullptr : fdopendir(reopened));
@@ -207,7 +207,7 @@ bool PrivateFolder::Keep(const std::string &name, const std::string &text) {
         openat(folder.Number(), unfinished.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600),
         "The front end's file cannot be made");
     WriteAll(file, text);
-    // A link does not replace a file, as renaming would.
+    // linkat fails if the name exists; renameat would replace the file.
     const bool isKept =
         fsync(file.Number()) == 0 && linkat(folder.Number(), unfinished.c_str(), folder.Number(), name.c_str(), 0) == 0;
     const int error = errno;
@@ -247,7 +247,7 @@ std::optional<std::string> PrivateFolder::Take(const std::string &name) {
     return std::nullopt;
 }
 
-/// Counts in a file, which says when the folder was last swept, and how many texts it has had since.
+/// Counts a text in the counter file, which contains the time of the last sweep and the number of texts.
 bool PrivateFolder::CountOneMore() {
     const Descriptor counter(openat(folder.Number(), kCounter, O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0600),
                              "The front end's counter cannot be opened");
@@ -272,7 +272,7 @@ bool PrivateFolder::CountOneMore() {
     return hasRoom;
 }
 
-/// Removes what has expired, also of programs that ended while they wrote. Returns how many files remain.
+/// Removes expired files, including unfinished ones. Returns how many files remain.
 std::size_t PrivateFolder::Sweep() {
     std::size_t remaining = 0;
     for (const std::string &name : NamesIn(folder)) {

@@ -26,30 +26,28 @@ class Descriptor {
 };
 
 /**
- * Short texts under random names, each in a file that only this user can read, for a limited time. The name is the
- * secret: 128 bits from the system, given to one browser.
+ * Stores short texts under names of 128 random bits, for a limited time. Only this user can read the files.
  *
- * Refuses a folder that another user owns or can read, and a path to it that another user than root can change. Throws
- * std::system_error if the system refuses.
+ * Throws std::system_error if a call fails, if another user owns or can read the folder, or if a user other than root
+ * can change its path.
  */
 class PrivateFolder {
   public:
     static constexpr std::size_t kUnlimited = std::numeric_limits<std::size_t>::max();
 
-    /// The folder at an absolute path, created if missing. Its parent must exist; symbolic links are refused. Texts
-    /// expire `seconds` after they were kept; at most about `most` are kept at a time. Throws std::invalid_argument for
-    /// a relative path.
+    /// Opens the folder at an absolute path, or creates it in an existing parent. Rejects symbolic links. Texts expire
+    /// after `seconds`; about `most` are kept at a time. Throws std::invalid_argument for a relative path.
     PrivateFolder(const std::string &path, std::time_t seconds, std::size_t most = kUnlimited);
 
-    /// A name that cannot be guessed.
+    /// Returns a random name.
     static std::string NewName();
-    /// The name of 16 bytes: 32 hexadecimal digits.
+    /// Returns 16 bytes as 32 hexadecimal digits.
     static std::string NameOf(const unsigned char *bytes);
-    /// Keeps a text under a new name, one of `NewName` or `NameOf`. Returns false, and keeps nothing, if the folder is
-    /// full. Removes and counts expired texts once a minute, and at each call only while the folder is full.
+    /// Stores a text under a new name from `NewName` or `NameOf`. Returns false, and stores nothing, if the folder is
+    /// full. Removes expired texts at most once a minute, or at each call while the folder is full.
     [[nodiscard]] bool Keep(const std::string &name, const std::string &text);
     std::optional<std::string> Read(const std::string &name);
-    /// Reads a text and removes it. Of two that take the same text, one gets it.
+    /// Reads a text and removes it. Of two calls that take the same text, one gets it.
     std::optional<std::string> Take(const std::string &name);
 
   private:

@@ -28,7 +28,7 @@ std::size_t AppendChunk(char *data, std::size_t size, std::size_t count, void *d
     try {
         text.append(data, size * count);
     } catch (...) {
-        return 0;  // an exception must not cross libcurl's frames
+        return 0;  // an exception must not pass through libcurl
     }
     return size * count;
 }
@@ -76,7 +76,7 @@ FailedLogin FindCause(FailedLogin failed) noexcept {
             return result == CURLE_OK ? failed : FailedTransfer(failed, result);
         }
     } catch (const std::exception &) {
-        // The failure itself is worth more than why its cause cannot be found.
+        // Report the original failure.
     }
     return failed;
 }

@@ -6,11 +6,11 @@
 namespace TAVO::Web {
 
 /**
- * Finds the cause of a failure for which the library has one text: requests the address that the library could not use,
- * without secrets. `network`, `certificate`, `invalid_response` and `unknown_key` then differ.
+ * Distinguishes `network`, `certificate`, `invalid_response` and `unknown_key`, for which the library throws the same
+ * texts. Requests the address that the library could not use, without secrets.
  *
- * Each request takes at most five seconds and accepts at most 1 MB. Returns `failed` unchanged if nothing is wrong with
- * the answers. Never throws.
+ * Each request takes at most five seconds and accepts at most 1 MB. Returns `failed` unchanged if the responses are
+ * valid. Never throws.
  */
 FailedLogin FindCause(FailedLogin failed) noexcept;
 

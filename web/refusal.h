@@ -8,7 +8,7 @@
 
 namespace TAVO::Web {
 
-/// The front end rejects a login. The text is its reason for the log.
+/// The front end rejected a login. The text is the reason for the log.
 class Refusal : public std::runtime_error {
   public:
     using std::runtime_error::runtime_error;
@@ -18,21 +18,21 @@ class Refusal : public std::runtime_error {
 class ProviderRefusal : public Refusal {
   public:
     ProviderRefusal(const std::string &error, const std::string &description);
-    std::string error;  // empty if the provider named none
+    std::string error;  // empty if the provider sent none
 };
 
-/// The store of logins failed, with any exception.
+/// The store of logins threw an exception.
 class StoreFailure : public std::runtime_error {
   public:
     using std::runtime_error::runtime_error;
 };
 
-/// The reason of an exception, on one line. If its text is the provider's whole response, which may contain tokens,
-/// only the error in it.
+/// Returns the reason of an exception, on one line. If the text is the provider's whole response, which may contain
+/// tokens, returns only its error.
 std::string ReasonOf(const std::exception &failure);
 
-/// The "error" of the provider's response that is the text of an exception (RFC 6749, section 5.2), or that a
-/// `ProviderRefusal` carries. Nothing for every other exception.
+/// Returns the "error" (RFC 6749, section 5.2) of a `ProviderRefusal`, or of an exception whose text is the provider's
+/// response. Nothing for other exceptions.
 std::optional<std::string> ProviderErrorOf(const std::exception &failure);
 
 }  // namespace TAVO::Web

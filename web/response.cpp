@@ -21,7 +21,7 @@ bool IsToken(const std::string &name) {
 
 }  // namespace
 
-// The referrer policy is not "no-referrer", under which browsers send no Origin with a form.
+// With the referrer policy "no-referrer", browsers would send no Origin with a form.
 Response::Response()
     : headers{{"Cache-Control", "no-store"},
               {"Referrer-Policy", "same-origin"},

@@ -14,7 +14,7 @@ constexpr char kReplacementCharacter[] = "\xef\xbf\xbd";  // U+FFFD
 constexpr std::size_t kLongestOrigin = 512;
 static_assert(kLongestOrigin + sizeof R"({"csrf":"0123456789abcdef0123456789abcdef","origin":""})" <=
                   TAVO::SSO::kLongestState,
-              "the longest origin and the random value beside it must fit into the state");
+              "the longest origin and the random value must fit into the state");
 
 using UTF8 = boost::locale::utf::utf_traits<char>;
 using boost::locale::utf::code_point;
@@ -28,10 +28,11 @@ bool IsPrintable(code_point c) {
     return boost::locale::utf::is_valid_codepoint(c) && !isControl && !isSeparator && !isFormat;
 }
 
-// What a browser leaves as it is in a path and its query, and JSON in a string. A backslash would be a slash to it.
+// Characters that neither browsers change in a path and query nor JSON in a string. Browsers read a backslash as a
+// slash.
 bool IsPathCharacter(char c) { return c > 0x20 && c < 0x7f && c != '\\' && c != '"'; }
 
-/// Decodes the character at `at` and moves behind it, or behind one byte that does not begin a character.
+/// Decodes the character at `at` and moves past it, or past one invalid byte.
 code_point NextCharacter(std::string::const_iterator &at, std::string::const_iterator end) {
     const auto begin = at;
     const code_point character = UTF8::decode(at, end);
@@ -113,7 +114,7 @@ Json::Value ParseObject(const std::string &text) {
             return value;
         }
     } catch (const Json::Exception &) {
-        // Too deeply nested: no object that anyone here has written.
+        // Nested too deeply.
     }
     return {};
 }

@@ -1,14 +1,14 @@
-// The relay page: tells how a login or logout went, and goes on. All that it knows is the fragment of its address,
-// which anyone can write: text is shown as text, and only a path on this very site is followed.
+// The relay page: shows the result of a login or logout and continues. Its input is the fragment of its address, which
+// is untrusted: it shows text as text and follows only paths of this site.
 import {explain} from './reasons.js';
 
 const START_PAGE = '/index.cgi';
 const SIGN_IN = '/webman/sso/login.cgi?origin=';
 const LONGEST_REASON = 200;
 const LONGEST_ORIGIN = 512;
-// Controls, format characters and line separators could break the text or change its direction.
+// Control characters, format characters and line separators can break the text or change its direction.
 const UNPRINTABLE = /[\p{Cc}\p{Cf}\p{Zl}\p{Zp}]/gu;
-// A path, not a host ("//") and nothing that a browser would turn into one (backslashes, control characters).
+// A path of this site. Browsers can read "//", backslashes and control characters as the beginning of a host.
 const OWN_PATH = /^\/(?!\/)[!#-[\]-~]*$/;
 
 const ownPath = (origin) => (origin.length <= LONGEST_ORIGIN && OWN_PATH.test(origin) ? origin : START_PAGE);
@@ -16,7 +16,7 @@ const ownPath = (origin) => (origin.length <= LONGEST_ORIGIN && OWN_PATH.test(or
 function describeSuccess(origin) {
     return {
         headline: 'You are signed in',
-        explanation: 'One moment: the page that you asked for is opening.',
+        explanation: 'Opening the page that you requested.',
         reason: '',
         action: 'Continue',
         onward: ownPath(origin),
@@ -27,7 +27,7 @@ function describeSuccess(origin) {
 function describeFailure(reason, origin) {
     const shown = reason.slice(0, LONGEST_REASON).replace(UNPRINTABLE, ' ');
     return {
-        headline: 'You could not be signed in',
+        headline: 'Sign-in failed',
         explanation: explain(shown),
         reason: shown,
         action: 'Try again',
@@ -39,7 +39,7 @@ function describeFailure(reason, origin) {
 function describeLogout() {
     return {
         headline: 'You are signed out',
-        explanation: 'You have been signed out.',
+        explanation: 'You can close this page.',
         reason: '',
         action: 'Continue',
         onward: START_PAGE,
@@ -47,7 +47,7 @@ function describeLogout() {
     };
 }
 
-/** What to show for a fragment ("#..."), and where to go on to: at once where nothing has to be read. */
+/** Returns what to show for a fragment ("#..."), and where to continue; `atOnce` after a success. */
 export function describe(fragment) {
     const values = new URLSearchParams(fragment.replace(/^#/, ''));
     const origin = values.get('origin') ?? '';

@@ -59,7 +59,7 @@ test('tries again, after a failure, with an origin on this site', () => {
 
 test('explains the reasons that it knows and cuts those that are too long', () => {
     const {explanation, reason} = after({success: 'false', reason: 'TAVOWinsUserNameFqdn2Netbios failed.'});
-    assert.match(explanation, /^Your account's domain is not known to this device\./);
+    assert.match(explanation, /^This device does not recognise your account's domain\./);
     assert.equal(reason, 'TAVOWinsUserNameFqdn2Netbios failed.');
     assert.match(after({success: 'false', reason: 'id_token expired.'}).explanation, /^Your sign-in took too long\./);
     const unknown = after({success: 'false', reason: 'x'.repeat(100_000)});
@@ -84,16 +84,16 @@ test('shows each outcome with its links', () => {
     const shown = ({headline, explanation, action, onward, atOnce}) =>
         ({headline, explanation, action, onward, atOnce});
     assert.deepEqual(shown(after({success: 'true', origin: '/a'})), {
-        headline: 'You are signed in', explanation: 'One moment: the page that you asked for is opening.',
+        headline: 'You are signed in', explanation: 'Opening the page that you requested.',
         action: 'Continue', onward: '/a', atOnce: true,
     });
     assert.deepEqual(shown(after({success: 'false', reason: 'This sign-in was changed on its way.', origin: '/a'})), {
-        headline: 'You could not be signed in',
-        explanation: 'For your safety this sign-in was stopped: it was changed on its way.',
+        headline: 'Sign-in failed',
+        explanation: 'For your security, this sign-in was stopped. Sign in again.',
         action: 'Try again', onward: '/webman/sso/login.cgi?origin=%2Fa', atOnce: false,
     });
     assert.deepEqual(shown(after({})), {
-        headline: 'You are signed out', explanation: 'You have been signed out.', action: 'Continue', onward: START_PAGE,
+        headline: 'You are signed out', explanation: 'You can close this page.', action: 'Continue', onward: START_PAGE,
         atOnce: false,
     });
 });

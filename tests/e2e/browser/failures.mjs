@@ -3,7 +3,7 @@ import {it} from 'node:test';
 
 import {useProfile} from '../site/front_end.mjs';
 
-const REFUSED = /did not accept this sign-in|does not accept this device/;
+const REFUSED = /rejected this sign-in|does not accept this device/;
 
 export function defineFailures(stage) {
     it('is explained when the user cancels at the provider, without a token request', () => stage.visit(async (visitor) => {
@@ -31,7 +31,7 @@ export function defineFailures(stage) {
 
     it("is explained when the user's domain is not known", () => stage.visit(async (visitor) => {
         await visitor.tryToSignIn('carol');
-        const reason = await visitor.seesFailure(/Your account's domain is not known to this device\./);
+        const reason = await visitor.seesFailure(/This device does not recognise your account's domain\./);
         assert.equal(reason, 'TAVOWinsUserNameFqdn2Netbios failed.');
         await visitor.isSignedOut();
     }));
@@ -74,7 +74,7 @@ export function defineFailures(stage) {
                 await held.address;
                 provider.stop();
                 await held.go();
-                assert.equal(await visitor.seesFailure(/gave no usable answer/), 'parse json falied');
+                assert.equal(await visitor.seesFailure(/sign-in service is not available/), 'parse json falied');
                 await visitor.isSignedOut();
             } finally {
                 provider.stop();

@@ -61,7 +61,7 @@ const PAGES = {
     },
     'the relay page after a failure': async (visitor) => {
         await visitor.open(FAILURE);
-        await visitor.seesFailure(/Your account's domain is not known to this device\./);
+        await visitor.seesFailure(/This device does not recognise your account's domain\./);
     },
     'the relay page after a sign-out': async (visitor) => {
         await visitor.open(RELAY_PAGE);
@@ -78,7 +78,7 @@ const TITLES = {
     'the account page': 'Your account',
     'the page on the way out': 'Signing out',
     'the relay page after a success': 'You are signed in',
-    'the relay page after a failure': 'You could not be signed in',
+    'the relay page after a failure': 'Sign-in failed',
     'the relay page after a sign-out': 'You are signed out',
 };
 

@@ -8,7 +8,7 @@ import {RELAY_PAGE, RETURN_PAGE} from './visitor.mjs';
 
 const PENDING_LOGINS = '/usr/tavo/var/frontend/logins';
 const NOT_STARTED_HERE = /This sign-in was not started in this browser/;
-const STOPPED = /For your safety this sign-in was stopped/;
+const STOPPED = /For your security, this sign-in was stopped/;
 const START_PAGE = '/index.cgi';
 const {foreign} = JSON.parse(readFileSync(new URL('../../frontend/origins.json', import.meta.url)));
 
@@ -244,8 +244,8 @@ function defineLeaks(stage) {
 function defineProviderErrors(stage) {
     const errors = [
         ['access_denied', /The sign-in was cancelled/],
-        ['temporarily_unavailable', /Please try again in a few minutes/],
-        ['server_error', /Please try again in a few minutes/],
+        ['temporarily_unavailable', /Try again in a few minutes/],
+        ['server_error', /Try again in a few minutes/],
         ['something_new', /Something went wrong/],
         ['', /Something went wrong/],
     ];

@@ -84,7 +84,7 @@ export class Visitor {
 
     /** The relay page tells of a failure; gives what it says under "Details". */
     async seesFailure(explanation) {
-        await this.seesHeading('You could not be signed in');
+        await this.seesHeading('Sign-in failed');
         assert.match(await this.page.getByRole('status').textContent(), explanation);
         await this.page.getByRole('link', {name: 'Try again', exact: true}).waitFor();
         // Nothing of it is there for anyone before it is unfolded.

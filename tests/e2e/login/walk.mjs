@@ -53,7 +53,7 @@ export class Walk {
     /** Opens a return address of another browser's sign-in through the program of the README, which must refuse it. */
     async isRefusedByReadmeProgram(browser, address) {
         const view = await this.#runRelayScript(browser, await browser.open(address));
-        assert.equal(view.headline, 'You could not be signed in');
+        assert.equal(view.headline, 'Sign-in failed');
         await this.log.until(/^sso\.cgi: sign-in failed \(other_browser\): /);
         assert.equal(this.#tokenRequests(), 0, 'a token request was made');
     }
@@ -139,7 +139,7 @@ export class Walk {
 
     async #readReason(browser, relay) {
         const view = await this.#runRelayScript(browser, relay);
-        assert.equal(view.headline, 'You could not be signed in');
+        assert.equal(view.headline, 'Sign-in failed');
         const line = await this.log.until(/^return\.cgi: frontend: sign-in failed: /);
         assert.ok(line.endsWith(`: ${view.reason}`), 'the log and the page tell different reasons');
         return view.reason;
