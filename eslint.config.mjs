@@ -1,4 +1,4 @@
-// What ESLint holds the JavaScript to. Its packages are installed into build/eslint, not beside this file.
+// Rules for JavaScript. tools/install-npm-packages installs the packages of ESLint into build/eslint.
 import {createRequire} from 'node:module';
 import {pathToFileURL} from 'node:url';
 
@@ -36,6 +36,6 @@ export default [
         },
     },
     {files: ['**/*.mjs'], languageOptions: {globals: globals.node}},
-    // The browser tests hand functions to the page, where they run.
+    // The browser tests run functions in the page.
     {files: ['frontend/static/*.js', 'tests/e2e/browser/*.mjs'], languageOptions: {globals: globals.browser}},
 ];

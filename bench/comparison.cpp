@@ -16,7 +16,7 @@ namespace {
 
 struct Effort {
     int rounds;
-    double seconds;  // of each task in each round
+    double seconds;  // per task and round
 };
 constexpr Effort kThorough{61, 0.05};
 constexpr Effort kQuick{15, 0.03};
@@ -36,7 +36,7 @@ double SecondsOfChildren() {
 void Register(const std::string &name, const Comparison &comparison, const Task &task, double seconds) {
     const auto measure = [&comparison, &task](benchmark::State &state) {
         comparison.prepare();
-        bool succeeded = task();  // also does what is done only once
+        bool succeeded = task();  // includes one-time initialisation
         const double before = SecondsOfChildren();
         for (auto _ : state) {
             succeeded = task() && succeeded;
@@ -82,7 +82,7 @@ double Median(std::vector<double> values) {
     return *middle;
 }
 
-/// Compares within each round: the speed of the machine changes from one round to the next.
+/// Compares within each round, because the speed of the machine varies between rounds.
 double MedianRatio(const std::vector<double> &ours, const std::vector<double> &other) {
     std::vector<double> ratios(ours.size());
     std::transform(ours.begin(), ours.end(), other.begin(), ratios.begin(), [](double a, double b) { return a / b; });

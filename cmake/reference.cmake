@@ -17,7 +17,7 @@ set(DOXYGEN_QUIET YES)
 set(DOXYGEN_VERBATIM_HEADERS NO)
 set(DOXYGEN_HAVE_DOT NO)
 set(DOXYGEN_HTML_TIMESTAMP NO)
-# The reference shows the headers' names as programs include them.
+# Show the headers' names as programs include them.
 set(DOXYGEN_STRIP_FROM_PATH ${installed_headers})
 set(DOXYGEN_STRIP_FROM_INC_PATH ${installed_headers})
 doxygen_add_docs(reference ${installed_headers}/tavosso/sso.h ${installed_headers}/tavosso/jwt.h

@@ -1,9 +1,9 @@
 include(CheckCXXCompilerFlag)
 include(CheckPIESupported)
 
-option(TAVOSSO_HARDENING "Harden what is built: RELRO, immediate binding, PIE, stack protection, control-flow protection" ON)
+option(TAVOSSO_HARDENING "Harden binaries: RELRO, immediate binding, PIE, stack protection, control-flow protection" ON)
 option(TAVOSSO_SANITIZE "Build everything with AddressSanitizer and UndefinedBehaviorSanitizer" OFF)
-option(TAVOSSO_FUZZ "Build everything for libFuzzer (clang alone), and the fuzz targets with it" OFF)
+option(TAVOSSO_FUZZ "Build everything for libFuzzer, and the fuzz targets (clang only)" OFF)
 
 check_cxx_compiler_flag(-fcf-protection=full TAVOSSO_HAS_CF_PROTECTION)
 check_cxx_compiler_flag(-mbranch-protection=standard TAVOSSO_HAS_BRANCH_PROTECTION)
@@ -36,7 +36,7 @@ function(tavosso_options target)
 endfunction()
 
 # Sets a run path relative to the installed file, so any prefix works without environment variables. Debian packages are
-# built with CMAKE_SKIP_RPATH, because the loader searches their folders.
+# built with CMAKE_SKIP_RPATH: the loader finds their folders.
 function(tavosso_find_library_from target destination)
     file(RELATIVE_PATH to_library /${destination} /${CMAKE_INSTALL_LIBDIR})
     set_target_properties(${target} PROPERTIES INSTALL_RPATH $ORIGIN/${to_library})
@@ -50,8 +50,7 @@ function(tavosso_program_options target)
     endif()
 endfunction()
 
-# Options of a library. It exports only the names in its NAME.map. Calls between exported functions remain interposable:
-# programs may define their own.
+# Options of a library. It exports only the names in cmake/libNAME.map. Programs can replace exported functions.
 function(tavosso_library_options target)
     tavosso_options(${target})
     set(map ${PROJECT_SOURCE_DIR}/cmake/lib${target}.map)

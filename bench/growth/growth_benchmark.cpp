@@ -1,4 +1,4 @@
-// How the time grows with the size of a token, of the provider's key set and of the front end's state.
+// Measures how the time depends on the size of the token, of the key set and of the state.
 #include <json/json.h>
 
 #include <algorithm>
@@ -42,7 +42,7 @@ std::string KeySet(std::size_t size) {
     return Test::Compact(keys);
 }
 
-/// The document that httpGet, below, returns for each address but the discovery document's.
+/// httpGet, below, returns this for every address except the discovery document's.
 std::string publishedKeySet;
 
 class ClientWithToken : public TAVO::SSO::AzureSSOClient {
@@ -65,7 +65,7 @@ bool ReceiveAndParse() {
 Comparison KeySetOf(std::size_t keys, double limit = 0) {
     const auto client = std::make_shared<ClientWithToken>(MakeToken(Bench::Algorithm::kRS256, 300).compact);
     const auto verify = [client] {
-        client->VerifyIDToken();  // throws if the token is not valid
+        client->VerifyIDToken();  // throws if the token is invalid
         return true;
     };
     const std::string keySet = KeySet(keys);
@@ -88,7 +88,7 @@ Json::Value StateOf(std::size_t bytes) {
     return state;
 }
 
-/// The largest state is about what its buffer can contain once encoded.
+/// 700 bytes are close to the limit of the state.
 Comparison LargestState() {
     return {"authorization URL, state of 700 bytes", [state = StateOf(700)] { return MakesAuthorizationURL(state); },
             "state of 16 bytes", [state = StateOf(16)] { return MakesAuthorizationURL(state); }, 1.1};
@@ -98,7 +98,7 @@ Comparison LargestState() {
 
 namespace TAVO::SSO {
 
-/// Replaces the library's function: passes documents in blocks, as libcurl does, without a transfer.
+/// Replaces the library's function. Passes documents in blocks, as libcurl does, without a transfer.
 void httpGet(const std::string &url, std::string &response, bool /*verifySSL*/,
              std::size_t (*writeCallback)(char *, std::size_t, std::size_t, void *)) {
     static std::string discovery = R"({"jwks_uri": "keys"})";

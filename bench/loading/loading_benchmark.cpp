@@ -1,5 +1,4 @@
-// A process from its start to its end: a program that is linked with the library and does nothing, against the same
-// program without the library.
+// Compares the run time of an empty program with and without the library.
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>

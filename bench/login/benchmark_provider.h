@@ -8,20 +8,20 @@
 
 namespace Bench {
 
-/// A provider of both profiles, in a thread of this program. Its documents are as long as real ones.
+/// A provider for both profiles, in a thread of this program. Its documents are as long as real ones.
 class Provider {
   public:
     /// Configures the appliance for this provider.
     Provider();
 
-    /// The address that the profile's documents are under.
+    /// Returns the base address of the profile's documents.
     std::string URL(const std::string &profile) const { return server_.URL("/" + profile); }
 
   private:
     void AnswerNextConnection();
 
     std::map<std::string, std::string> answers_;  // by method and path
-    Test::Server server_;                         // ends first, since its thread reads the answers
+    Test::Server server_;                         // destroyed first: its thread reads answers_
 };
 
 }  // namespace Bench

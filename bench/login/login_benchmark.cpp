@@ -1,4 +1,4 @@
-// Whole logins over TLS: ours against the same transfers, made with libcurl and nothing else.
+// Compares whole logins over TLS with the same transfers made with libcurl only.
 #include <curl/curl.h>
 
 #include <filesystem>
@@ -29,7 +29,7 @@ std::size_t Append(char *data, std::size_t size, std::size_t count, void *answer
     return size * count;
 }
 
-/// A fresh handle with the defaults, as the library must use.
+/// Uses a new handle with the defaults, as the library must.
 bool Transfer(const std::string &url, const std::string &form = "") {
     std::string answer;
     curl_global_init(CURL_GLOBAL_ALL);
@@ -59,7 +59,7 @@ std::string ReadFile(const std::filesystem::path &path) {
     return {std::istreambuf_iterator<char>(file), {}};
 }
 
-/// Debian's certificate authorities, of which tools/private-root hides the usual file.
+/// Returns Debian's certificate authorities. tools/private-root hides the usual file.
 std::string DebianAuthorities() {
     std::string all;
     for (const auto &entry : std::filesystem::directory_iterator("/usr/share/ca-certificates/mozilla")) {

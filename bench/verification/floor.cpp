@@ -1,5 +1,5 @@
-// The floor: the calls of Boost, libcrypto and jsoncpp that a verification must make, in the library's order, on inputs
-// that are known to be good. It checks for no error, overwrites nothing and copies no text unnecessarily.
+// The floor: the calls of Boost, libcrypto and jsoncpp that a verification needs, in the library's order, for valid
+// input. It does not check for errors, overwrite secrets, or copy text unnecessarily.
 #include <alloca.h>
 #include <json/json.h>
 #include <openssl/bio.h>

@@ -23,7 +23,7 @@ bool VerifyByCjose(const SignedToken &token) {
                            : cjose_jwk_create_oct_spec(Bytes(token.key), token.key.size(), nullptr);
     cjose_jws_t *jws = cjose_jws_import(token.compact.data(), token.compact.size(), nullptr);
     const bool verified = cjose_jws_verify(jws, key, nullptr);
-    // cjose has parsed the header. Its callers parse the claims.
+    // cjose has parsed the header; its callers parse the claims.
     std::uint8_t *body = nullptr;
     std::size_t length = 0;
     cjose_jws_get_plaintext(jws, &body, &length, nullptr);

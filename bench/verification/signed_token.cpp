@@ -12,7 +12,7 @@ namespace {
 constexpr char kSecret[] = "0123456789abcdef0123456789abcdef0123456789abcdef0123456789abcdef";
 constexpr char kKeyID[] = "the provider's key of 2048 bits";
 
-/// Grows as tokens do in practice: by the groups that the user belongs to.
+/// Real tokens grow with the number of the user's groups; this one does, too.
 Json::Value Claims(std::size_t size, const std::string &issuer) {
     Json::Value claims = Test::Parse(R"({
         "aud": "9f1c2c2e-1d0e-4a3f-8b0e-5d6f7a8b9c0d", "iat": 1700000000,

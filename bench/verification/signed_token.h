@@ -10,20 +10,20 @@ namespace Bench {
 
 enum class Algorithm { kRS256, kHS256 };
 
-/// An ID token and its key, in each form that a verifier takes.
+/// An ID token and its key, in the forms that the verifiers need.
 struct SignedToken {
     Algorithm algorithm;
     std::string compact;
     std::string jwk;             // RS256: the public key as a JSON Web Key (RFC 7517)
     std::string key;             // RS256: the public key in PEM; HS256: the secret's bytes
-    mutable std::string secret;  // HS256: base64; the library takes a reference to a string that is not const
+    mutable std::string secret;  // HS256: base64; mutable, because the library takes a non-const reference
 };
 
-/// A token whose claims are about that many bytes of JSON.
+/// Returns a token with about that many bytes of claims.
 SignedToken MakeToken(Algorithm algorithm, std::size_t claimsSize,
                       const std::string &issuer = "https://idp.example/v2.0");
 
-/// The RSA key of 2048 bits that RS256 tokens are signed with, as a JSON Web Key.
+/// Returns the 2048-bit RSA key that signs RS256 tokens, as a JSON Web Key.
 Json::Value PublicKey();
 
 }  // namespace Bench

@@ -1,4 +1,4 @@
-// Verification of one ID token, with 1 KB of claims: ours against the floor and against other libraries.
+// Compares the verification of an ID token with 1 KB of claims with the floor and with other libraries.
 #include <cstdlib>
 
 #include "bench/comparison.h"
@@ -20,7 +20,7 @@ constexpr double kLimit = 1.03;
 /// Serves the documents that SciTokens fetches before its first verification.
 void PublishKey(Test::Server &server) {
     Test::TrustAuthority();
-    setenv("XDG_CACHE_HOME", "/tmp", 1);  // SciTokens keeps the key there
+    setenv("XDG_CACHE_HOME", "/tmp", 1);  // SciTokens caches the key there
     Json::Value discovery;
     discovery["issuer"] = server.URL("");
     discovery["jwks_uri"] = server.URL("/keys");

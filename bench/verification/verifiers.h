@@ -3,8 +3,7 @@
 
 #include "bench/verification/signed_token.h"
 
-// Each function verifies an ID token from its text and its key, in the form that a relying party has, parses header and
-// claims, and returns whether the token is valid.
+// Each function verifies an ID token with its key, parses header and claims, and returns whether the token is valid.
 namespace Bench {
 
 bool VerifyByLibrary(const SignedToken &token);
@@ -12,7 +11,7 @@ bool VerifyByFloor(const SignedToken &token);
 bool VerifyByCjose(const SignedToken &token);
 bool VerifyByLibjwt(const SignedToken &token);
 
-/// RS256 only. Fetches the issuer's key once and keeps it in a file.
+/// RS256 only. Fetches the issuer's key once and caches it in a file.
 bool VerifyBySciTokens(const SignedToken &token);
 
 }  // namespace Bench

@@ -49,7 +49,7 @@ export class Report {
 
     #outcome({status, heading, headers, next}) {
         if (next) {
-            return `${status}, on to ${this.#site(next)} ${this.#place(next)}`;
+            return `${status}, redirect to ${this.#site(next)} ${this.#place(next)}`;
         }
         return heading ? `${status}, "${heading}"` : `${status}, ${headers['content-type']}`;
     }

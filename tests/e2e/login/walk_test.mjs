@@ -16,15 +16,15 @@ async function walkAzure(walk, report) {
     const user = await walk.signIn(browser, 'alice');
     assert.equal(user, 'ACME\\alice');
 
-    report.title('The same answer of the provider a second time: refused before the code is used, alice stays signed in');
+    report.title('The same return a second time: rejected before the token request; alice stays signed in');
     const again = walk.goAgain(browser, walk.lastReturnAddress(browser));
     assert.equal(await walk.refusedBeforeTheTokenRequest(again), 'This sign-in was not started in this browser.');
     assert.equal(await walk.userOf(browser), user);
 
-    report.title('Profile azure: alice signs out, here and at the provider');
+    report.title('Profile azure: alice signs out of the appliance and of the provider');
     assert.equal(await walk.signOut(browser), '/webman/ssoclient/relay.html');
 
-    report.title('Profile azure: carol, whose domain the appliance does not know, is told why she cannot sign in');
+    report.title('Profile azure: carol fails to sign in, because the appliance does not know her domain');
     assert.equal(await walk.failToSignIn(walk.newBrowser(), 'carol'), 'TAVOWinsUserNameFqdn2Netbios failed.');
 
     report.title('Profile azure: a user cancels at the provider');
@@ -32,7 +32,7 @@ async function walkAzure(walk, report) {
         await walk.refusedBeforeTheTokenRequest(walk.cancel(walk.newBrowser())),
         'The provider refused: access_denied (The user cancelled.)');
 
-    report.title("Login CSRF: a victim's browser is sent to the return address of someone else's sign-in");
+    report.title("Login CSRF: a victim's browser opens the return address of another user's sign-in");
     const foreign = await walk.startSignIn(walk.newBrowser(), 'alice');
     const victim = walk.newBrowser();
     assert.equal(
@@ -40,7 +40,7 @@ async function walkAzure(walk, report) {
         'This sign-in was not started in this browser.');
     assert.equal(await walk.userOf(victim), undefined);
 
-    report.title('Forged relay addresses: the page stays on its own site');
+    report.title('Forged relay addresses: the page stays on this site');
     for (const origin of ['//evil.example', '/\\evil.example', 'https://evil.example/', 'javascript:alert(1)', '/\t/evil']) {
         report.fact(`origin ${JSON.stringify(origin)}:`);
         const fragment = new URLSearchParams({origin, success: 'true'}).toString();
@@ -86,9 +86,9 @@ async function walkEverything(running) {
 async function serve(running, profile, authorityFile) {
     useProfile(profile);
     copyFileSync(running.authority, authorityFile);
-    console.log(`\nServing with profile ${profile}, until Ctrl-C:\n\n  ${running.origin}/\n`);
-    console.log(`The browser has to trust this authority, made for this run:\n\n  ${authorityFile}\n`);
-    console.log(`or else, with Chromium or Chrome, in a profile of its own:\n`);
+    console.log(`\nServing profile ${profile} until Ctrl-C:\n\n  ${running.origin}/\n`);
+    console.log(`The browser must trust this authority, which is new for each run:\n\n  ${authorityFile}\n`);
+    console.log(`Or start Chromium or Chrome with a temporary profile:\n`);
     console.log(`  chromium --user-data-dir="$(mktemp -d)" ${running.chromiumTrust} ${running.origin}/\n\nUsers:\n`);
     for (const [login, {password, uniqueName}] of running.users) {
         console.log(`  ${login.padEnd(6)} password ${password}  (${uniqueName})`);
@@ -105,11 +105,11 @@ async function serve(running, profile, authorityFile) {
 async function walkWithDirectory(running) {
     const controller = await Controller.start();
     try {
-        running.report.title(`A domain controller of CORP.EXAMPLE.NET, NetBIOS name ACME, runs after ${controller.seconds} s`);
+        running.report.title(`A domain controller of CORP.EXAMPLE.NET, NetBIOS name ACME, started in ${controller.seconds} s`);
         writeDomains({});
-        running.report.fact('domains.conf names no domain: winbindd is asked');
+        running.report.fact('domains.conf is empty; winbindd converts the domain');
         await walkEverything(running);
-        running.report.fact('directory  CORP.EXAMPLE.NET is ACME, as winbindd told; domains.conf is empty');
+        running.report.fact('directory  winbindd converted CORP.EXAMPLE.NET to ACME');
     } finally {
         await controller.stop();
     }
@@ -126,7 +126,7 @@ try {
         await walkEverything(running);
     }
 } catch (failure) {
-    console.error(`\nFAILED: ${failure.message}\n\nThe web server's own log:\n${running.webServer.log()}`);
+    console.error(`\nFAILED: ${failure.message}\n\nThe web server's log:\n${running.webServer.log()}`);
     process.exitCode = 1;
 } finally {
     await running.stop();

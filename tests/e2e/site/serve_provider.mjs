@@ -18,11 +18,11 @@ const {values: {'redirect-uri': redirectURI, profile, etc, 'node-modules': nodeM
     'node-modules': {type: 'string'},
 }});
 if (redirectURI === undefined || !URL.canParse(redirectURI)) {
-    console.error('Name the redirect URI of your program: --redirect-uri https://localhost/sso.cgi');
+    console.error('Give the redirect URI of your program, for example --redirect-uri https://localhost/sso.cgi');
     process.exit(2);
 }
 if (!['azure', 'websphere'].includes(profile)) {
-    console.error('The profile is azure or websphere.');
+    console.error('Unknown profile. Use azure or websphere.');
     process.exit(2);
 }
 
@@ -43,7 +43,7 @@ writeSettings({provider, clients}, etc);
 useProfile(profile, true, etc);
 writeDomains({'corp.example.net': 'ACME'}, etc);
 
-console.log(`Profile ${profile}, until Ctrl-C. Each start has a new port, authority, secrets and passwords.
+console.log(`Serving profile ${profile} until Ctrl-C. Each start uses a new port, authority, secrets and passwords.
 
   issuer         ${provider.address}
   redirect URI   ${redirectURI}
