@@ -81,7 +81,8 @@ class sso_op_failed : public sso_exception {
 };
 
 /**
- * A client's settings, its requests to the provider, and the order of a login. Use an object for one login.
+ * Base class of the clients: settings, requests to the provider, and the order of a login. Use an object for one login.
+ * Derived classes implement the functions that throw `sso_not_implemented` here.
  *
  * It has no virtual destructor. Deleting a client through a pointer to this class is undefined behaviour:
  * @code
@@ -92,7 +93,7 @@ class sso_op_failed : public sso_exception {
 class SSOClient {
   public:
     /**
-     * Returns whether the client's own file enables it. Logins depend on the profile instead.
+     * Returns whether the client's file enables it. Does not affect logins.
      * @return "azure_sso_enable"; false for WebSphere, whose file has no such key
      */
     virtual bool isEnable();
@@ -120,8 +121,7 @@ class SSOClient {
     /**
      * Fetches the discovery document (OpenID Connect Discovery 1.0, section 4). Verifies certificate and host name.
      *
-     * @param out  receives the document; null if the response is not JSON; unchanged if the transfer fails or memory
-     *             runs out
+     * @param out  receives the document; null if it is not JSON; unchanged if the transfer fails or memory runs out
      *
      * Does not throw. Logs a failure at `LOG_ERR`:
      *  - "sso:LINE TEXT": libcurl's text, or "bad wellknown json format.";
@@ -147,14 +147,14 @@ class SSOClient {
     virtual void RequestTokenEndpoint(std::string &response, const std::string &body);
 
     /**
-     * Verifies the ID token. Derived classes implement it.
+     * Verifies the ID token.
      *
      * @throws sso_not_implemented  "VerifyIDToken not implemented"
      */
     virtual void VerifyIDToken();
 
     /**
-     * Returns the body of the token request (RFC 6749, section 4.1.3). Derived classes implement it.
+     * Returns the body of the token request (RFC 6749, section 4.1.3).
      *
      * @return the form-encoded body
      *
@@ -163,7 +163,7 @@ class SSOClient {
     virtual std::string GetIDTokenReqParams();
 
     /**
-     * Reads the user's name from the ID token, unverified. Derived classes implement it.
+     * Reads the user's name from the ID token, unverified.
      *
      * @param userName  receives the name; unchanged in this class
      *
@@ -172,9 +172,9 @@ class SSOClient {
     virtual void GetUserName(std::string &userName);
 
     /**
-     * Stores the ID token of a token response. Derived classes implement it.
+     * Stores the ID token of a token response.
      *
-     * @param response  the response; ignored in this class
+     * @param response  of the token endpoint; ignored in this class
      *
      * @throws sso_not_implemented  "ProcessTokenResponse not implemented"
      */
@@ -247,7 +247,7 @@ class AzureSSOClient : public SSOClient {
     void VerifyIDToken() override;
 
     /**
-     * Returns the body of the token request (RFC 6749, section 4.1.3). It contains the client secret and the code.
+     * Returns the body of the token request (RFC 6749, section 4.1.3). It contains secrets.
      *
      * @return client_id, client_secret, code, grant_type and redirect_uri, form-encoded
      */
@@ -295,8 +295,7 @@ class AzureSSOClient : public SSOClient {
      * Fetches the key set (RFC 7517, section 5). Verifies certificate and host name.
      *
      * @param uri   "jwks_uri" of the discovery document
-     * @param keys  receives the document; null if the response is not JSON; unchanged if the transfer fails or memory
-     *              runs out
+     * @param keys  receives the document; null if it is not JSON; unchanged if the transfer fails or memory runs out
      *
      * Does not throw. Logs a failure at `LOG_ERR`:
      *  - "azuresso:LINE request wellknown uri TEXT.": libcurl's text, or "bad wellknown json format.";
@@ -433,8 +432,7 @@ class SSOProfile {
     /** Returns the profile's name. @return "sso_profile": "azure", "websphere" or any other text */
     std::string GetSSOProfile();
     /**
-     * Returns the settings of the client. It cannot log in: its provider steps throw `sso_not_implemented`. Use
-     * `SSOIsEnable`, not its `isEnable`.
+     * Returns the settings of the client, as a base client, which cannot log in. Use `SSOIsEnable`, not its `isEnable`.
      *
      * @return owned by this object, never null; empty if single sign-on is off or the profile is unknown
      */
