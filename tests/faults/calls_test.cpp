@@ -146,16 +146,16 @@ std::string Read(const fs::path &path) {
     return {std::istreambuf_iterator<char>(file), {}};
 }
 
-class EachFailingCall : public ::testing::TestWithParam<Scenario> {};
+class FailingCall : public ::testing::TestWithParam<Scenario> {};
 
-TEST_P(EachFailingCall, EndsAsTheTableTells) {
+TEST_P(FailingCall, MatchesOutcomeTable) {
     const std::string table = TryEachCall(GetParam());
     const std::string file = std::string(GetParam().name) + ".txt";
     std::ofstream(TAVOSSO_OUTCOMES_FOUND "/" + file) << table;
     EXPECT_EQ(table, Read(TAVOSSO_OUTCOMES "/" + file)) << "what was found is in " TAVOSSO_OUTCOMES_FOUND "/" << file;
 }
 
-INSTANTIATE_TEST_SUITE_P(Of, EachFailingCall, ::testing::ValuesIn(Scenarios()),
+INSTANTIATE_TEST_SUITE_P(Of, FailingCall, ::testing::ValuesIn(Scenarios()),
                          [](const auto &row) { return row.param.name; });
 
 /// The names, without those of C++ and of the sanitizers, of what the built file wants from others.
@@ -174,7 +174,7 @@ std::set<std::string> UndefinedSymbols() {
     return names;
 }
 
-TEST(TheTableOfCalls, HasARowForEachCallOfTheBuiltLibrary) {
+TEST(CallTable, ListsEachFunctionTheLibraryCalls) {
     std::set<std::string> rows;
     for (const CalledFunction &function : kCalledFunctions) {
         rows.insert(function.name);
@@ -187,7 +187,7 @@ TEST(TheTableOfCalls, HasARowForEachCallOfTheBuiltLibrary) {
     EXPECT_THAT(withoutRow, ::testing::IsEmpty());
 }
 
-TEST(TheTableOfCalls, HasSeenEachCallThatCanFail) {
+TEST(CallTable, CoversEachCallThatCanFail) {
     std::set<std::string> seen;
     for (const Scenario &scenario : Scenarios()) {
         for (const auto &[function, calls] : Try(scenario).calls) {

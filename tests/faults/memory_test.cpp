@@ -63,7 +63,7 @@ struct Trial {
     bool ranOut;
 };
 
-class MemoryThatRunsOut : public ::testing::TestWithParam<std::tuple<Scenario, Of, Until>> {
+class ExhaustedMemory : public ::testing::TestWithParam<std::tuple<Scenario, Of, Until>> {
   protected:
     static Trial Try(int n) {
         const auto &[scenario, of, until] = GetParam();
@@ -81,7 +81,7 @@ class MemoryThatRunsOut : public ::testing::TestWithParam<std::tuple<Scenario, O
     }
 };
 
-TEST_P(MemoryThatRunsOut, EndsAsIsDocumentedAndLeavesTheNextUseAlone) {
+TEST_P(ExhaustedMemory, FailsAsDocumentedAndNextUseSucceeds) {
     const std::regex documented(Documented());
     const std::regex logged(LogLines());
     const std::regex failedRequest(FailedRequests());
@@ -106,13 +106,13 @@ TEST_P(MemoryThatRunsOut, EndsAsIsDocumentedAndLeavesTheNextUseAlone) {
     EXPECT_GT(n, 10);
 }
 
-std::string NameOf(const ::testing::TestParamInfo<MemoryThatRunsOut::ParamType> &row) {
+std::string NameOf(const ::testing::TestParamInfo<ExhaustedMemory::ParamType> &row) {
     return std::string(std::get<0>(row.param).name) + (std::get<2>(row.param) == Until::kNext ? "Once" : "ForGood");
 }
 
-INSTANTIATE_TEST_SUITE_P(During, MemoryThatRunsOut,
+INSTANTIATE_TEST_SUITE_P(During, ExhaustedMemory,
                          Combine(ValuesIn(Scenarios()), Values(Of::kCxx), Values(Until::kNext, Until::kEver)), NameOf);
-INSTANTIATE_TEST_SUITE_P(ForAllLibrariesDuring, MemoryThatRunsOut,
+INSTANTIATE_TEST_SUITE_P(ForAllLibrariesDuring, ExhaustedMemory,
                          Combine(ValuesIn(PlainLogins()), Values(Of::kEveryone), Values(Until::kNext, Until::kEver)),
                          NameOf);
 

@@ -50,7 +50,7 @@ rlim_t LimitOf(decltype(RLIMIT_CORE) resource) {
     return limit.rlim_max;
 }
 
-TEST_F(Program, IsEndedByAnAlarmIfItRunsTooLong) {
+TEST_F(Program, IsKilledByAlarmAfterTimeLimit) {
     const auto runTooLong = [](Response &) {
         const unsigned int seconds = alarm(0);
         if (seconds == kLongestRun) {
@@ -60,19 +60,19 @@ TEST_F(Program, IsEndedByAnAlarmIfItRunsTooLong) {
     EXPECT_EXIT(Serve("GET", runTooLong), testing::KilledBySignal(SIGALRM), "");
 }
 
-TEST_F(Program, WritesNoCoreFileAndCannotBeTraced) {
+TEST_F(Program, DisablesCoreFilesAndTracing) {
     const auto examine = [](Response &) { _exit(LimitOf(RLIMIT_CORE) == 0 && prctl(PR_GET_DUMPABLE) == 0 ? 42 : 1); };
     EXPECT_EXIT(Serve("GET", examine), ExitedWithCode(42), "");
 }
 
 #ifndef __SANITIZE_ADDRESS__
-TEST_F(Program, HasAnAddressSpaceOfOneGigabyte) {
+TEST_F(Program, LimitsAddressSpaceToOneGigabyte) {
     const auto examine = [](Response &) { _exit(LimitOf(RLIMIT_AS) == rlim_t{1} << 30 ? 42 : 1); };
     EXPECT_EXIT(Serve("GET", examine), ExitedWithCode(42), "");
 }
 #endif
 
-TEST_F(Program, RemovesVariablesThatChangeWhatIsTrusted) {
+TEST_F(Program, RemovesEnvironmentVariablesThatAffectTrust) {
     setenv("SSLKEYLOGFILE", "/tmp/keys", 1);
     setenv("OPENSSL_CONF", "/tmp/openssl.cnf", 1);
     setenv("https_proxy", "http://127.0.0.1:1", 1);
@@ -87,7 +87,7 @@ TEST_F(Program, RemovesVariablesThatChangeWhatIsTrusted) {
     }
 }
 
-TEST_F(Program, AnswersItsMethodsAlone) {
+TEST_F(Program, RejectsOtherMethods) {
     EXPECT_THAT(AnswerTo("GET", "GET, HEAD"), HasSubstr("Location: /served\n"));
     EXPECT_THAT(AnswerTo("HEAD", "GET, HEAD"), HasSubstr("Location: /served\n"));
     for (const char *method : {"POST", "PUT", "get", "GET,", "", "OPTIONS"}) {
@@ -97,7 +97,7 @@ TEST_F(Program, AnswersItsMethodsAlone) {
     }
 }
 
-TEST_F(Program, FailsIfItsAnswerCannotBeWritten) {
+TEST_F(Program, FailsIfResponseCannotBeWritten) {
     const auto answer = [](Response &out) { out.Redirect("/"); };
     const auto run = [&] {
         dup2(open("/dev/full", O_WRONLY), STDOUT_FILENO);

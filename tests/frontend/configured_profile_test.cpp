@@ -56,7 +56,7 @@ std::string FailureOfOIDCLogin() {
     });
 }
 
-TEST_F(Profile, IsRefusedAsOIDCLoginRefusesIt) {
+TEST_F(Profile, FailsLikeOIDCLogin) {
     for (const char *text :
          {"{}", "{\"sso_profile\":\"azure\"}", "{\"sso_enable\":false,\"sso_profile\":\"azure\"}",
           "{\"sso_enable\":\"true\",\"sso_profile\":\"azure\"}", "{\"sso_enable\":true,\"sso_profile\":\"Azure\"}",
@@ -67,13 +67,13 @@ TEST_F(Profile, IsRefusedAsOIDCLoginRefusesIt) {
     }
 }
 
-TEST_F(Profile, IsRefusedWhereTheFileSaysNothing) {
+TEST_F(Profile, FailsForMissingKeys) {
     EXPECT_EQ(OwnFailure(), "sso_op_failed sso does not enable.");
     Write("profile.conf", "{\"sso_enable\":true}");
     EXPECT_EQ(OwnFailure(), "sso_exception profile not support.");
 }
 
-TEST_F(Profile, ChoosesTheClient) {
+TEST_F(Profile, SelectsClient) {
     WriteClient("azure", "nothing");
     WriteClient("websphere", "nothing");
     Write("websphere.conf", "{\"websphere_client_id\":\"of websphere\"}");
@@ -83,7 +83,7 @@ TEST_F(Profile, ChoosesTheClient) {
     }
 }
 
-TEST_F(Profile, IsSetUpWhenNothingIsMissing) {
+TEST_F(Profile, IsCompleteIfNoKeyIsMissing) {
     EXPECT_EQ(HowFarSetUp(), SetUp::kOff);
     for (const std::string name : {"azure", "websphere"}) {
         Write("profile.conf", "{\"sso_enable\":true,\"sso_profile\":\"" + name + "\"}");
@@ -100,7 +100,7 @@ TEST_F(Profile, IsSetUpWhenNothingIsMissing) {
     EXPECT_EQ(HowFarSetUp(), SetUp::kIncomplete);
 }
 
-TEST_F(Profile, HasTheSettingsThatALoginDependsOn) {
+TEST_F(Profile, RequiresCompleteSettings) {
     WriteClient("websphere", "nothing");
     Write("profile.conf", "{\"sso_enable\":true,\"sso_profile\":\"websphere\"}");
     EXPECT_EQ(WriteCompact(RequireSettings()),
@@ -110,7 +110,7 @@ TEST_F(Profile, HasTheSettingsThatALoginDependsOn) {
                 testing::ThrowsMessage<Refusal>("Single sign-on is not completely set up on this device."));
 }
 
-TEST_F(Profile, NeedsADiscoveryDocumentOnlyForAzure) {
+TEST_F(Profile, RequiresDiscoveryURLOnlyForAzure) {
     for (const auto &[name, expected] :
          {std::pair("azure", SetUp::kIncomplete), std::pair("websphere", SetUp::kComplete)}) {
         Write("profile.conf", std::string("{\"sso_enable\":true,\"sso_profile\":\"") + name + "\"}");

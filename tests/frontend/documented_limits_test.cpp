@@ -21,14 +21,14 @@ std::string Read(const std::string &file) {
 
 std::string Bytes(std::size_t limit) { return std::to_string(limit) + " bytes"; }
 
-TEST(Limits, OfSecretAndStateAreDocumented) {
+TEST(DocumentedLimits, MatchSecretAndStateLimits) {
     for (const char *file : {"sso/sso.h", "docs/configuration.md", "docs/man/tavosso-websphere.conf.5"}) {
         EXPECT_THAT(Read(file), testing::HasSubstr(Bytes(TAVO::SSO::kLongestSecret))) << file;
     }
     EXPECT_THAT(Read("sso/sso.h"), testing::HasSubstr(Bytes(TAVO::SSO::kLongestState)));
 }
 
-TEST(Limits, OfTimeAreDocumented) {
+TEST(DocumentedLimits, MatchTimeLimit) {
     const std::string program = std::to_string(Frontend::kLongestRun) + " seconds";
     for (const char *file : {"frontend/lighttpd.conf", "docs/integration.md", "docs/operations.md"}) {
         EXPECT_THAT(Read(file), testing::HasSubstr(program)) << file;

@@ -34,7 +34,7 @@ TEST_F(Environment, LimitsPendingLogins) {
     EXPECT_EQ(MostPendingLogins(), 3U);
 }
 
-TEST_F(Environment, RefusesALimitThatIsNoPositiveNumber) {
+TEST_F(Environment, RejectsInvalidLimit) {
     for (const char *value : {"0", "-1", " 3", "3x", "many", "99999999999999999999999"}) {
         setenv("FRONTEND_PENDING_LOGINS", value, 1);
         EXPECT_THAT(MostPendingLogins,

@@ -13,7 +13,7 @@ namespace {
 
 FailedLogin Of(const std::string &text) { return FailedLoginOf(std::runtime_error(text)); }
 
-TEST(FailureCode, HasAStableNameOfItsOwn) {
+TEST(FailureCode, HasUniqueStableName) {
     std::set<std::string> names;
     for (int code = 0; code <= static_cast<int>(Failure::kInternal); ++code) {
         EXPECT_TRUE(names.insert(NameOf(static_cast<Failure>(code))).second);
@@ -23,7 +23,7 @@ TEST(FailureCode, HasAStableNameOfItsOwn) {
     EXPECT_EQ(NameOf(Failure::kInternal), "internal");
 }
 
-TEST(FailureCode, IsThatOfTheTextsRow) {
+TEST(FailureCode, MatchesExceptionText) {
     for (const auto &[text, code] :
          {std::pair("id_token expired.", Failure::kTokenExpired), std::pair("tenant ID invalid", Failure::kOtherTenant),
           std::pair("sso does not enable.", Failure::kSwitchedOff),
@@ -36,11 +36,11 @@ TEST(FailureCode, IsThatOfTheTextsRow) {
     }
 }
 
-TEST(FailureCode, ComesWithTheHintOfTheTable) {
+TEST(FailureCode, IncludesHintFromTable) {
     EXPECT_THAT(Of("tenant ID invalid").hint, testing::HasSubstr("azure_tenant_id"));
 }
 
-TEST(FailureCode, NamesTheProvidersError) {
+TEST(FailureCode, ReportsProviderError) {
     const FailedLogin failed = Of(R"({"error":"invalid_client","error_description":"d","id_token":"SECRET"})");
     EXPECT_EQ(failed.failure, Failure::kProviderRefused);
     EXPECT_EQ(failed.providerError, "invalid_client");
@@ -50,17 +50,17 @@ TEST(FailureCode, NamesTheProvidersError) {
     EXPECT_EQ(FailedLoginOf(ProviderRefusal("", "")).providerError, "");
 }
 
-TEST(FailureCode, IgnoresTheTableForTheProvidersWords) {
+TEST(FailureCode, IgnoresTableForProviderText) {
     EXPECT_EQ(FailedLoginOf(ProviderRefusal("x algorithm is not supported", "")).failure, Failure::kProviderRefused);
 }
 
-TEST(FailureCode, IsStorageForAStoreOfTheProgram) {
+TEST(FailureCode, IsStorageForFailureOfStore) {
     const FailedLogin failed = FailedLoginOf(StoreFailure("disk on fire"));
     EXPECT_EQ(failed.failure, Failure::kStorage);
     EXPECT_EQ(failed.reason, "disk on fire");
 }
 
-TEST(FailureCode, TellsTheNetworkFromACertificate) {
+TEST(FailureCode, DistinguishesNetworkFromCertificateErrors) {
     const FailedLogin failed = Of("parse json falied");
     EXPECT_EQ(failed.failure, Failure::kInvalidResponse);
     EXPECT_EQ(FailedTransfer(failed, CURLE_COULDNT_CONNECT).failure, Failure::kNetwork);

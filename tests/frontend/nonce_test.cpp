@@ -18,18 +18,16 @@ Json::Value StateOf(const std::string &nonce) {
 
 using Test::Parse;
 
-TEST(Nonce, IsAcceptedInATokenOfThisLogin) {
-    EXPECT_NO_THROW(RequireNonce(Parse("{\"nonce\":\"mine\"}"), StateOf("mine")));
-}
+TEST(Nonce, AcceptsTokenOfThisLogin) { EXPECT_NO_THROW(RequireNonce(Parse("{\"nonce\":\"mine\"}"), StateOf("mine"))); }
 
-TEST(Nonce, IsRefusedInATokenOfAnotherLogin) {
+TEST(Nonce, RejectsTokenOfAnotherLogin) {
     EXPECT_THROW(RequireNonce(Parse("{\"nonce\":\"yours\"}"), StateOf("mine")), Refusal);
     // The digest itself is in the state, for everyone on the way to read.
     const std::string digest = StateOf("mine")["nonce"].asString();
     EXPECT_THROW(RequireNonce(Parse("{\"nonce\":\"" + digest + "\"}"), StateOf("mine")), Refusal);
 }
 
-TEST(Nonce, IsRefusedWhereItIsMissing) {
+TEST(Nonce, RejectsMissingNonce) {
     for (const char *body : {"{}", "{\"nonce\":\"\"}", "{\"nonce\":1}", "{\"nonce\":null}", "[]", "1"}) {
         EXPECT_THROW(RequireNonce(Parse(body), StateOf("")), Refusal) << body;
     }

@@ -23,7 +23,7 @@ std::string OriginInQuery(const std::string &encoded) {
     return SafeOrigin(OnlyValue(ParseQuery("origin=" + encoded), "origin").value_or(""));
 }
 
-TEST(Origin, IsTheStartPageWhereABrowserCouldLeaveThisSite) {
+TEST(Origin, ReplacesForeignOriginWithStartPage) {
     const Json::Value foreign = Origins("foreign");
     ASSERT_GE(foreign.size(), 200U);
     for (const Json::Value &origin : foreign) {
@@ -31,7 +31,7 @@ TEST(Origin, IsTheStartPageWhereABrowserCouldLeaveThisSite) {
     }
 }
 
-TEST(Origin, IsNotMadeForeignByDecodingTheQuery) {
+TEST(Origin, StaysLocalAfterDecodingQuery) {
     for (const Json::Value &origin : Origins("foreign")) {
         // Decoded again, some become harmless paths; none a host.
         EXPECT_THAT(OriginInQuery(origin.asString()), testing::MatchesRegex("/|/[^/\\].*")) << origin;
@@ -42,7 +42,7 @@ TEST(Origin, IsNotMadeForeignByDecodingTheQuery) {
     }
 }
 
-TEST(Origin, IsKeptWhereItIsAPathOnThisSite) {
+TEST(Origin, KeepsLocalPath) {
     const Json::Value own = Origins("own");
     ASSERT_GE(own.size(), 10U);
     for (const Json::Value &origin : own) {
@@ -50,7 +50,7 @@ TEST(Origin, IsKeptWhereItIsAPathOnThisSite) {
     }
 }
 
-TEST(Origin, FitsIntoTheStateHoweverLongItIs) {
+TEST(Origin, FitsIntoStateAtMaximumLength) {
     Json::Value state;
     state["origin"] = SafeOrigin("/" + std::string(511, 'a'));
     ASSERT_EQ(state["origin"].asString().size(), 512U);

@@ -108,18 +108,18 @@ class PendingLoginTest : public testing::Test {
     std::string state;
 };
 
-TEST_F(PendingLoginTest, IsConcludedOnceByTheBrowserThatStartedIt) {
+TEST_F(PendingLoginTest, EndsOnceInBrowserThatStartedIt) {
     EXPECT_EQ(Refusal(Cookie(), state), "");
     EXPECT_EQ(Refusal(Cookie(), state), kTookTooLong);
 }
 
-TEST_F(PendingLoginTest, GivesWhatTheStateHolds) {
+TEST_F(PendingLoginTest, ReturnsMembersOfState) {
     const Json::Value object = End(Cookie(), state).state;
     EXPECT_EQ(object["origin"].asString(), "/files");
     EXPECT_EQ(object["nonce"].asString(), "digest");
 }
 
-TEST_F(PendingLoginTest, IsRefusedToAnotherBrowserAndStaysPending) {
+TEST_F(PendingLoginTest, RejectsAnotherBrowserAndStaysPending) {
     const std::string reason = "This sign-in was not started in this browser.";
     EXPECT_EQ(Refusal("", state), reason);
     EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 1) + "=" + std::string(32, '0'), state), reason);
@@ -127,12 +127,12 @@ TEST_F(PendingLoginTest, IsRefusedToAnotherBrowserAndStaysPending) {
     EXPECT_EQ(Refusal(Cookie(), state), "");
 }
 
-TEST_F(PendingLoginTest, IsRefusedToACookieMadeOfTheState) {
+TEST_F(PendingLoginTest, RejectsCookieDerivedFromState) {
     EXPECT_EQ(Refusal("__Host-login-" + Name().substr(0, 1) + "=" + Name(), state),
               "This sign-in was not started in this browser.");
 }
 
-TEST_F(PendingLoginTest, IsRefusedAfterTenMinutes) {
+TEST_F(PendingLoginTest, ExpiresAfterTenMinutes) {
     for (const auto &[age, reason] : {std::pair(598, ""), std::pair(602, kTookTooLong), std::pair(-60, kTookTooLong)}) {
         state = Start();
         const utimbuf past{std::time(nullptr) - age, std::time(nullptr) - age};
@@ -141,12 +141,12 @@ TEST_F(PendingLoginTest, IsRefusedAfterTenMinutes) {
     }
 }
 
-TEST_F(PendingLoginTest, HasACookieThatEndsWithIt) {
+TEST_F(PendingLoginTest, SetsCookieWithSameLifetime) {
     EXPECT_THAT(CookieHeader(""), testing::MatchesRegex("__Host-login-[0-9a-f]=[0-9a-f]{32}; Path=/; "
                                                         "Secure; HttpOnly; SameSite=Lax; Max-Age=600"));
 }
 
-TEST_F(PendingLoginTest, ExpiresItsCookieWhenItIsConcludedOrTooLate) {
+TEST_F(PendingLoginTest, ExpiresCookieWhenFinishedOrTooLate) {
     const utimbuf past{std::time(nullptr) - 602, std::time(nullptr) - 602};
     for (const bool isLate : {false, true}) {
         state = Start();
@@ -160,7 +160,7 @@ TEST_F(PendingLoginTest, ExpiresItsCookieWhenItIsConcludedOrTooLate) {
     }
 }
 
-TEST_F(PendingLoginTest, UsesSixteenCookieNamesAndAFreeOneFirst) {
+TEST_F(PendingLoginTest, PrefersUnusedOfSixteenCookieNames) {
     std::string cookies;
     std::set<std::string> names;
     for (int i = 0; i < 16; ++i) {
@@ -175,11 +175,11 @@ TEST_F(PendingLoginTest, UsesSixteenCookieNamesAndAFreeOneFirst) {
     }
 }
 
-TEST_F(PendingLoginTest, IsConcludedByACookieOfAnyName) {
+TEST_F(PendingLoginTest, AcceptsCookieUnderAnyName) {
     EXPECT_EQ(Refusal("__Host-login-" + std::string(Name()[0] == '0' ? "1" : "0") + "=" + Secret(), state), "");
 }
 
-TEST_F(PendingLoginTest, IsRefusedUnderAnotherProfileAndWhenSwitchedOff) {
+TEST_F(PendingLoginTest, FailsIfProfileChangesOrIsDisabled) {
     UseProfile("websphere");
     EXPECT_EQ(Refusal(Cookie(), state), "The settings of this device were changed during this sign-in.");
     state = Start();
@@ -187,7 +187,7 @@ TEST_F(PendingLoginTest, IsRefusedUnderAnotherProfileAndWhenSwitchedOff) {
     EXPECT_THROW(End(Cookie(), state), TAVO::SSO::sso_op_failed);
 }
 
-TEST_F(PendingLoginTest, IsRefusedAtAnotherTokenEndpoint) {
+TEST_F(PendingLoginTest, FailsIfTokenEndpointChanges) {
     SetUpClient("azure", "https://elsewhere.example/token");
     EXPECT_EQ(Refusal(Cookie(), state), "The settings of this device were changed during this sign-in.");
 }
@@ -198,14 +198,14 @@ class FailingStore : public LoginStore {
     std::optional<std::string> Take(const std::string &) override { throw 1; }
 };
 
-TEST_F(PendingLoginTest, FailsWithAnythingThatItsStoreThrows) {
+TEST_F(PendingLoginTest, ConvertsAnyExceptionOfStore) {
     FailingStore store;
     EXPECT_THAT([&] { BeginLogin(response, With(""), store, RequireSettings(), "/files", MakeAddress); },
                 testing::ThrowsMessage<StoreFailure>("disk on fire"));
     EXPECT_THROW(EndLogin(response, origin, With(Cookie()), store, state), StoreFailure);
 }
 
-TEST_F(PendingLoginTest, IsNotASession) {
+TEST_F(PendingLoginTest, IsNotAcceptedAsSession) {
     std::filesystem::create_directories("/usr/tavo/var/frontend/sessions");
     ASSERT_EQ(chmod("/usr/tavo/var/frontend", 0700), 0);
     ASSERT_EQ(chmod("/usr/tavo/var/frontend/sessions", 0700), 0);
@@ -213,7 +213,7 @@ TEST_F(PendingLoginTest, IsNotASession) {
     EXPECT_FALSE(FindSession(response, "__Host-session=" + Name()));
 }
 
-TEST_F(PendingLoginTest, IsRefusedBeyondTheConfiguredNumber) {
+TEST_F(PendingLoginTest, RejectsLoginsAboveLimit) {
     constexpr std::size_t kMost = 3;
     Start("", kMost);
     Start("", kMost);
@@ -223,19 +223,19 @@ TEST_F(PendingLoginTest, IsRefusedBeyondTheConfiguredNumber) {
     Start("", kMost);
 }
 
-TEST_F(PendingLoginTest, IsRefusedWithAnotherOriginThanItWasStartedWith) {
+TEST_F(PendingLoginTest, RejectsChangedOrigin) {
     Json::Value changed = DecodeState(state);
     changed["origin"] = "/elsewhere";
     EXPECT_EQ(Refusal(Cookie(), Encode(WriteCompact(changed))), "This sign-in was changed on its way.");
 }
 
-TEST_F(PendingLoginTest, IsRefusedWithTheNonceOfAnotherLogin) {
+TEST_F(PendingLoginTest, RejectsChangedNonce) {
     Json::Value changed = DecodeState(state);
     changed["nonce"] = "another digest";
     EXPECT_EQ(Refusal(Cookie(), Encode(WriteCompact(changed))), "This sign-in was changed on its way.");
 }
 
-TEST_F(PendingLoginTest, IsRefusedWithoutAStateThatCanBeRead) {
+TEST_F(PendingLoginTest, RejectsUnreadableState) {
     const std::string reason = "This sign-in was not started in this browser.";
     for (const std::string &text : {std::string(), std::string("[1]"), std::string("{\"csrf\":1}"),
                                     std::string("{\"csrf\":\"../sessions\"}"), std::string("not JSON")}) {
@@ -244,13 +244,13 @@ TEST_F(PendingLoginTest, IsRefusedWithoutAStateThatCanBeRead) {
     EXPECT_EQ(Refusal(Cookie(), "not base64"), reason);
 }
 
-TEST(State, IsReadUpToAGenerousLength) {
+TEST(State, IsReadUpToMaximumLength) {
     const std::string name(1013, 'a');
     EXPECT_EQ(DecodeState(Encode("{\"csrf\":\"" + name + "\"}"))["csrf"].asString(), name);
     EXPECT_TRUE(DecodeState(Encode("{\"csrf\":\"" + std::string(2000, 'a') + "\"}")).isNull());
 }
 
-TEST(State, IsRefusedInAnotherEncoding) {
+TEST(State, RejectsNonCanonicalBase64) {
     const std::string text = Encode("{\"a\":1}");
     EXPECT_FALSE(DecodeState(text).isNull());
     for (const std::string &other : {" " + text, text + "\n", text + "====", "=" + text, text.substr(1)}) {

@@ -71,7 +71,7 @@ class PrivateFolderTest : public testing::Test {
     }
 };
 
-TEST_F(PrivateFolderTest, KeepsATextUnderARandomNameForThisUserAlone) {
+TEST_F(PrivateFolderTest, StoresTextUnderRandomNameForOwnerOnly) {
     PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     EXPECT_THAT(name, testing::MatchesRegex("[0-9a-f]{32}"));
@@ -82,21 +82,21 @@ TEST_F(PrivateFolderTest, KeepsATextUnderARandomNameForThisUserAlone) {
     EXPECT_EQ(Mode(kFolder), 0700U);
 }
 
-TEST_F(PrivateFolderTest, GivesATextToOneTakerOnly) {
+TEST_F(PrivateFolderTest, TakesTextOnlyOnce) {
     PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     EXPECT_EQ(things.Take(name), "text");
     EXPECT_EQ(things.Take(name), std::nullopt);
 }
 
-TEST_F(PrivateFolderTest, ForgetsATextThatIsTooOld) {
+TEST_F(PrivateFolderTest, IgnoresExpiredText) {
     PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     MakeOld(name);
     EXPECT_EQ(things.Read(name), std::nullopt);
 }
 
-TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
+TEST_F(PrivateFolderTest, RemovesExpiredTextsOncePerMinute) {
     PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     std::ofstream(kFolder + std::string(32, 'a') + ".new") << "half of it";
@@ -115,7 +115,7 @@ TEST_F(PrivateFolderTest, RemovesExpiredTextsOnceAMinute) {
     EXPECT_FALSE(std::filesystem::exists(kFolder + std::string(32, 'a') + ".new"));
 }
 
-TEST_F(PrivateFolderTest, LeavesOtherFilesAlone) {
+TEST_F(PrivateFolderTest, KeepsUnrelatedFiles) {
     PrivateFolder things = OpenThings();
     for (const char *name : {"id_rsa", "0123", "id_rsa.new"}) {
         std::ofstream(std::string(kFolder) + name) << "another program's";
@@ -127,14 +127,14 @@ TEST_F(PrivateFolderTest, LeavesOtherFilesAlone) {
     }
 }
 
-TEST_F(PrivateFolderTest, RefusesOtherNamesAndRelativePaths) {
+TEST_F(PrivateFolderTest, RejectsOtherNamesAndRelativePaths) {
     PrivateFolder things = OpenThings();
     EXPECT_THROW(static_cast<void>(things.Keep("../escaped", "text")), std::invalid_argument);
     EXPECT_THROW(PrivateFolder("var/things", kLifetime), std::invalid_argument);
     EXPECT_THROW(PrivateFolder("", kLifetime), std::invalid_argument);
 }
 
-TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
+TEST_F(PrivateFolderTest, StoresNoMoreThanCapacity) {
     PrivateFolder things = OpenThings(2);
     Keep(things, "one");
     Keep(things, "two");
@@ -143,7 +143,7 @@ TEST_F(PrivateFolderTest, KeepsNoMoreThanItsCapacity) {
     EXPECT_EQ(things.Read(name), std::nullopt);
 }
 
-TEST_F(PrivateFolderTest, KeepsNoTextThatItWouldNotRead) {
+TEST_F(PrivateFolderTest, RejectsTextAboveMaximumSize) {
     PrivateFolder things = OpenThings();
     EXPECT_EQ(things.Read(Keep(things, std::string(16384, 'x'))), std::string(16384, 'x'));
     EXPECT_EQ(
@@ -151,7 +151,7 @@ TEST_F(PrivateFolderTest, KeepsNoTextThatItWouldNotRead) {
         kSystemError);
 }
 
-TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
+TEST_F(PrivateFolderTest, WritesTextAtomically) {
     PrivateFolder things = OpenThings();
     const std::string name = PrivateFolder::NewName();
     const rlimit none{0, RLIM_INFINITY};
@@ -165,7 +165,7 @@ TEST_F(PrivateFolderTest, WritesATextWholeOrNotAtAll) {
     EXPECT_EQ(things.Read(name), std::nullopt);
 }
 
-TEST_F(PrivateFolderTest, TakesNoTextThatItCannotRemove) {
+TEST_F(PrivateFolderTest, FailsToTakeTextItCannotRemove) {
     PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     unlinkError = EROFS;
@@ -176,7 +176,7 @@ TEST_F(PrivateFolderTest, TakesNoTextThatItCannotRemove) {
     EXPECT_EQ(things.Take(name), "text");
 }
 
-TEST_F(PrivateFolderTest, OfTwoTakersOneGetsTheText) {
+TEST_F(PrivateFolderTest, LetsOneOfTwoThreadsTakeText) {
     PrivateFolder things = OpenThings();
     for (int i = 0; i < 100; ++i) {
         const std::string name = Keep(things, "text");
@@ -188,7 +188,7 @@ TEST_F(PrivateFolderTest, OfTwoTakersOneGetsTheText) {
     }
 }
 
-TEST_F(PrivateFolderTest, ReadsNothingButItsOwnFiles) {
+TEST_F(PrivateFolderTest, ReadsOnlyItsOwnFiles) {
     PrivateFolder things = OpenThings();
     for (const char *name : {"", ".", "../things", "/etc/passwd", "0123456789abcdef0123456789abcdeF"}) {
         EXPECT_EQ(things.Read(name), std::nullopt);
@@ -198,7 +198,7 @@ TEST_F(PrivateFolderTest, ReadsNothingButItsOwnFiles) {
     EXPECT_EQ(FailureOf([&] { things.Read(link); }).type, kSystemError);
 }
 
-TEST_F(PrivateFolderTest, RefusesAFileThatIsNotItsOwn) {
+TEST_F(PrivateFolderTest, RejectsFileWithUnexpectedAttributes) {
     PrivateFolder things = OpenThings();
     const std::string name = Keep(things, "text");
     ASSERT_EQ(chmod((kFolder + name).c_str(), 0640), 0);
@@ -212,7 +212,7 @@ TEST_F(PrivateFolderTest, RefusesAFileThatIsNotItsOwn) {
     EXPECT_EQ(FailureOf([&] { things.Read(large); }).type, kSystemError);
 }
 
-TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
+TEST_F(PrivateFolderTest, RejectsFolderAccessibleToOthers) {
     for (const char *folder : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend"}) {
         for (const mode_t mode : {0750U, 0770U, 0701U, 0755U}) {
             OpenThings();
@@ -223,7 +223,7 @@ TEST_F(PrivateFolderTest, RefusesAFolderThatOthersMayUse) {
     }
 }
 
-TEST_F(PrivateFolderTest, RefusesAPathThatOthersCanChange) {
+TEST_F(PrivateFolderTest, RejectsPathWritableByOthers) {
     for (const mode_t mode : {0775U, 0757U, 01777U}) {
         ASSERT_EQ(chmod("/usr/tavo/var", mode), 0);
         EXPECT_EQ(FailureOf([&] { OpenThings(); }).type, kSystemError) << std::oct << mode;
@@ -232,7 +232,7 @@ TEST_F(PrivateFolderTest, RefusesAPathThatOthersCanChange) {
     OpenThings();
 }
 
-TEST_F(PrivateFolderTest, FollowsNoLinkOnItsPath) {
+TEST_F(PrivateFolderTest, RejectsSymbolicLinkInPath) {
     for (const char *name : {"/usr/tavo/var/frontend/things", "/usr/tavo/var/frontend", "/usr/tavo/var"}) {
         OpenThings();
         std::filesystem::rename(name, "/usr/tavo/elsewhere");

@@ -6,7 +6,7 @@ using namespace TAVO::Web;
 
 namespace {
 
-TEST(Query, IsPercentDecodedAndCountsAParameterOnlyWhenItIsThereOnce) {
+TEST(Query, DecodesValuesAndIgnoresRepeatedParameters) {
     const Parameters parameters = ParseQuery("a=%2Fx+y%3d&b&c=1&c=2&&d=%zz%4");
     EXPECT_EQ(OnlyValue(parameters, "a"), "/x y=");
     EXPECT_EQ(OnlyValue(parameters, "b"), "");

@@ -25,7 +25,7 @@ void ExpectProtection(const Response &response) {
                                     Not(HasSubstr("unsafe-inline"))))));
 }
 
-TEST(Response, ProtectsAPageAndARedirectAlike) {
+TEST(Response, ProtectsPagesAndRedirects) {
     Response page;
     Frontend::ShowPage(page, "200 OK", "Title", "<p>Content</p>\n");
     ExpectProtection(page);
@@ -34,7 +34,7 @@ TEST(Response, ProtectsAPageAndARedirectAlike) {
     ExpectProtection(redirect);
 }
 
-TEST(Response, RedirectsWithItsOtherHeaders) {
+TEST(Response, KeepsOtherHeadersInRedirect) {
     Response response;
     response.SetCookie("__Host-a", "b");
     response.Redirect("/index.cgi");
@@ -44,7 +44,7 @@ TEST(Response, RedirectsWithItsOtherHeaders) {
     EXPECT_EQ(response.body, "");
 }
 
-TEST(Response, RefusesAHeaderThatWouldBecomeTwo) {
+TEST(Response, RejectsLineBreaksInHeaders) {
     Response response;
     for (const char *address : {"/a\nSet-Cookie: b=c", "/a\rSet-Cookie: b=c", "/a\r\n\r\n<script>"}) {
         EXPECT_THROW(response.Redirect(address), std::invalid_argument);
@@ -53,7 +53,7 @@ TEST(Response, RefusesAHeaderThatWouldBecomeTwo) {
     }
 }
 
-TEST(Response, RefusesNamesAndCookiesWithSeparators) {
+TEST(Response, RejectsSeparatorsInNamesAndCookies) {
     Response response;
     EXPECT_THROW(response.AddHeader("A: b\nC", "d"), std::invalid_argument);
     EXPECT_THROW(response.AddHeader("", "d"), std::invalid_argument);
@@ -61,7 +61,7 @@ TEST(Response, RefusesNamesAndCookiesWithSeparators) {
     EXPECT_THROW(response.SetCookie("__Host-a=b;", "c"), std::invalid_argument);
 }
 
-TEST(Response, RedirectsToTheLastAddress) {
+TEST(Response, RedirectsToLastAddress) {
     Response response;
     response.Redirect("/first");
     response.Redirect("/last");
@@ -69,7 +69,7 @@ TEST(Response, RedirectsToTheLastAddress) {
     EXPECT_THAT(response.headers, Not(Contains(Pair("Location", "/first"))));
 }
 
-TEST(Page, ShowsATitleAsText) {
+TEST(Page, EscapesTitle) {
     Response response;
     Frontend::ShowPage(response, "200 OK", "</title><script>", "");
     EXPECT_THAT(response.body, HasSubstr("<title>&lt;/title&gt;&lt;script&gt;</title>"));

@@ -55,7 +55,7 @@ class SessionTest : public testing::Test {
     static std::string CookieOf(const std::string &header) { return header.substr(0, header.find(';')); }
 };
 
-TEST_F(SessionTest, IsFoundByItsCookieUntilItEnds) {
+TEST_F(SessionTest, IsFoundByCookieUntilItEnds) {
     const std::string cookie = CookieOf(Start("", "ACME\\alice"));
     const auto session = Find("other=1; " + cookie);
     ASSERT_TRUE(session);
@@ -68,12 +68,12 @@ TEST_F(SessionTest, IsFoundByItsCookieUntilItEnds) {
     EXPECT_FALSE(EndSession(response, cookie));
 }
 
-TEST_F(SessionTest, HasACookieThatOnlyThisSiteGetsOnlyOverTls) {
+TEST_F(SessionTest, SetsSecureHostCookie) {
     EXPECT_THAT(Start("", "alice"),
                 testing::MatchesRegex("__Host-session=[0-9a-f]{32}; Path=/; Secure; HttpOnly; SameSite=Lax"));
 }
 
-TEST_F(SessionTest, IsNeverTheOneThatWasPlantedBeforehand) {
+TEST_F(SessionTest, ReplacesPlantedSession) {
     const std::string planted = CookieOf(Start("", "attacker"));
     const std::string victim = CookieOf(Start(planted, "victim"));
     EXPECT_NE(victim, planted);
@@ -83,7 +83,7 @@ TEST_F(SessionTest, IsNeverTheOneThatWasPlantedBeforehand) {
     EXPECT_FALSE(Find(invented));
 }
 
-TEST_F(SessionTest, IsNoneWhereItsFileIsNotExactlyASession) {
+TEST_F(SessionTest, RejectsMalformedSessionFile) {
     const std::string cookie = CookieOf(Start("", "alice"));
     for (const char *text :
          {"", "{}", R"({"user": "alice", "profile": "azure"})", R"({"format": "session 1", "profile": "azure"})",
@@ -99,7 +99,7 @@ TEST_F(SessionTest, IsNoneWhereItsFileIsNotExactlyASession) {
     EXPECT_TRUE(Find(cookie));
 }
 
-TEST_F(SessionTest, EndsWhenItsProfileIsNoLongerInForce) {
+TEST_F(SessionTest, EndsWhenProfileChanges) {
     for (const char *profile : {R"({"sso_enable": true, "sso_profile": "websphere"})",
                                 R"({"sso_enable": false, "sso_profile": "azure"})", "{}"}) {
         UseProfile(R"({"sso_enable": true, "sso_profile": "azure"})");
@@ -122,7 +122,7 @@ TEST_F(SessionTest, EndsAfterEightHours) {
     }
 }
 
-TEST_F(SessionTest, CannotBeReadByAnotherUserOfTheMachine) {
+TEST_F(SessionTest, IsReadableOnlyByOwner) {
     Start("", "alice");
     struct stat status = {};
     ASSERT_EQ(stat(kFolder, &status), 0);

@@ -6,7 +6,7 @@ using namespace TAVO::Web;
 
 namespace {
 
-TEST(Line, IsPrintable) {
+TEST(Line, ReplacesUnprintableCharacters) {
     const std::string bidirectional = "a\u202eb\u2066c\u200fd";
     EXPECT_EQ(OneLine(bidirectional), "a b c d");
     EXPECT_EQ(OneLine("a\u0085b\u009bc\u2028d\u2029e\ufefff\u200bg"), "a b c d e f g");
@@ -22,6 +22,6 @@ TEST(Line, IsPrintable) {
     }
 }
 
-TEST(Html, ShowsEveryCharacterAsText) { EXPECT_EQ(EscapeHtml("<a b='\"&\">"), "&lt;a b=&#39;&quot;&amp;&quot;&gt;"); }
+TEST(Html, EscapesMarkup) { EXPECT_EQ(EscapeHtml("<a b='\"&\">"), "&lt;a b=&#39;&quot;&amp;&quot;&gt;"); }
 
 }  // namespace

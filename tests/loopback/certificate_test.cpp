@@ -58,7 +58,7 @@ std::string Text(CURLcode result) { return curl_easy_strerror(result); }
 
 std::string Token(Profile profile) { return SignedToken(TokenHeader(profile), TokenClaims(profile)); }
 
-class ServerThatShows : public ::testing::TestWithParam<CertificateCase> {
+class ServerCertificate : public ::testing::TestWithParam<CertificateCase> {
   protected:
     static void AtTheTokenEndpoint(Profile profile) {
         Server server(GetParam().credentials(), GetParam().onlyVersion);
@@ -105,7 +105,7 @@ class ServerThatShows : public ::testing::TestWithParam<CertificateCase> {
     }
 };
 
-TEST_P(ServerThatShows, IsAskedOnlyIfItIsGood) {
+TEST_P(ServerCertificate, IsVerifiedBeforeRequest) {
     for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
         SCOPED_TRACE("token endpoint, " + Name(profile));
         AtTheTokenEndpoint(profile);
@@ -227,13 +227,13 @@ std::vector<CertificateCase> Versions() {
 
 std::string NameOfCertificate(const ::testing::TestParamInfo<CertificateCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(Name, ServerThatShows, ValuesIn(Names()), NameOfCertificate);
-INSTANTIATE_TEST_SUITE_P(Issuer, ServerThatShows, ValuesIn(Issuers()), NameOfCertificate);
-INSTANTIATE_TEST_SUITE_P(Purpose, ServerThatShows, ValuesIn(Purposes()), NameOfCertificate);
-INSTANTIATE_TEST_SUITE_P(Strength, ServerThatShows, ValuesIn(Strengths()), NameOfCertificate);
-INSTANTIATE_TEST_SUITE_P(Version, ServerThatShows, ValuesIn(Versions()), NameOfCertificate);
+INSTANTIATE_TEST_SUITE_P(Name, ServerCertificate, ValuesIn(Names()), NameOfCertificate);
+INSTANTIATE_TEST_SUITE_P(Issuer, ServerCertificate, ValuesIn(Issuers()), NameOfCertificate);
+INSTANTIATE_TEST_SUITE_P(Purpose, ServerCertificate, ValuesIn(Purposes()), NameOfCertificate);
+INSTANTIATE_TEST_SUITE_P(Strength, ServerCertificate, ValuesIn(Strengths()), NameOfCertificate);
+INSTANTIATE_TEST_SUITE_P(Version, ServerCertificate, ValuesIn(Versions()), NameOfCertificate);
 
-TEST(ATokenEndpointConfiguredWithoutTLS, IsToldNothingItUnderstandsIfItSpeaksTLSAlone) {
+TEST(PlainTokenEndpoint, FailsIfServerRequiresTLS) {
     const Profile profile = Profile::kWebSphere;
     Server server(CertificateFor("IP:127.0.0.1"));
     server.Answer(HTTPAnswer(TokenResponse(Token(profile))));
@@ -243,7 +243,7 @@ TEST(ATokenEndpointConfiguredWithoutTLS, IsToldNothingItUnderstandsIfItSpeaksTLS
     EXPECT_EQ(server.Requests().size(), 0);
 }
 
-TEST(ATokenEndpointConfiguredWithTLS, IsToldNothingIfItSpeaksPlainHTTP) {
+TEST(TLSTokenEndpoint, ReceivesNoSecretOverPlainHTTP) {
     const Profile profile = Profile::kWebSphere;
     std::string received;
     {

@@ -52,7 +52,7 @@ struct AddressCase {
 
 void PrintTo(const AddressCase &row, std::ostream *stream) { *stream << row.name; }
 
-class AddressOfTheKeySet : public ::testing::TestWithParam<AddressCase> {
+class KeySetAddress : public ::testing::TestWithParam<AddressCase> {
   protected:
     std::string JwksURI() const {
         constexpr char kInside[] = "$INSIDE";
@@ -70,7 +70,7 @@ class AddressOfTheKeySet : public ::testing::TestWithParam<AddressCase> {
     Server inside_;
 };
 
-TEST_P(AddressOfTheKeySet, IsTakenAsLibcurlTakesIt) {
+TEST_P(KeySetAddress, IsPassedToLibcurl) {
     Provider provider(Profile::kAzure);
     WriteFile(kFile, KeySet());
     inside_.Answer(HTTPAnswer(KeySet()));
@@ -125,10 +125,10 @@ std::vector<AddressCase> Addresses() {
 
 std::string NameOfAddress(const ::testing::TestParamInfo<AddressCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(OfType, AddressOfTheKeySet, ValuesIn(Types()), NameOfAddress);
-INSTANTIATE_TEST_SUITE_P(Of, AddressOfTheKeySet, ValuesIn(Addresses()), NameOfAddress);
+INSTANTIATE_TEST_SUITE_P(OfType, KeySetAddress, ValuesIn(Types()), NameOfAddress);
+INSTANTIATE_TEST_SUITE_P(Of, KeySetAddress, ValuesIn(Addresses()), NameOfAddress);
 
-TEST(DiscoveryDocument, OfAnyTypeButAnObjectNamesNoKeySet) {
+TEST(DiscoveryDocument, NamesNoKeySetUnlessObject) {
     for (const char *document : {"null", "true", "5", "0.5", R"("$BASE/keys")", R"([{"jwks_uri": "$BASE/keys"}])"}) {
         Provider provider(Profile::kAzure);
         provider.Answer(TokenResponse(Token()));
@@ -157,7 +157,7 @@ std::string MembersOfTheKey() {
 
 class PublishedKeys : public ::testing::TestWithParam<KeySetCase> {};
 
-TEST_P(PublishedKeys, DecideTheLogin) {
+TEST_P(PublishedKeys, YieldExpectedOutcome) {
     std::string keySet = GetParam().keySet;
     constexpr char kKey[] = "$KEY";
     for (std::size_t at; (at = keySet.find(kKey)) != std::string::npos;) {

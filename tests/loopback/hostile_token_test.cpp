@@ -103,9 +103,9 @@ void ExpectLogin(const MemberCase &row, const ValueCase &value) {
     EXPECT_EQ(TakeSystemLog(), value.log);
 }
 
-class AnyValueOf : public ::testing::TestWithParam<MemberCase> {};
+class TokenMember : public ::testing::TestWithParam<MemberCase> {};
 
-TEST_P(AnyValueOf, DecidesTheLogin) {
+TEST_P(TokenMember, YieldsExpectedOutcome) {
     for (const ValueCase &value : GetParam().values) {
         SCOPED_TRACE(value.value.substr(0, 100));
         ExpectLogin(GetParam(), value);
@@ -316,11 +316,11 @@ std::vector<MemberCase> Headers() {
 
 std::string NameOfMember(const ::testing::TestParamInfo<MemberCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(Claim, AnyValueOf, ValuesIn(Claims()), NameOfMember);
-INSTANTIATE_TEST_SUITE_P(User, AnyValueOf, ValuesIn(Users()), NameOfMember);
-INSTANTIATE_TEST_SUITE_P(Header, AnyValueOf, ValuesIn(Headers()), NameOfMember);
+INSTANTIATE_TEST_SUITE_P(Claim, TokenMember, ValuesIn(Claims()), NameOfMember);
+INSTANTIATE_TEST_SUITE_P(User, TokenMember, ValuesIn(Users()), NameOfMember);
+INSTANTIATE_TEST_SUITE_P(Header, TokenMember, ValuesIn(Headers()), NameOfMember);
 
-class SignedText : public ::testing::TestWithParam<Profile> {
+class TokenJSON : public ::testing::TestWithParam<Profile> {
   protected:
     static void ExpectLogin(const std::string &header, const std::string &claims, const Outcome &outcome) {
         SCOPED_TRACE(header.substr(0, 100) + " . " + claims.substr(0, 100));
@@ -335,9 +335,9 @@ class SignedText : public ::testing::TestWithParam<Profile> {
     const Outcome accepted_ = LoggedIn(UserName(GetParam()));
 };
 
-INSTANTIATE_TEST_SUITE_P(With, SignedText, ValuesIn(kBoth), [](const auto &row) { return Name(row.param); });
+INSTANTIATE_TEST_SUITE_P(With, TokenJSON, ValuesIn(kBoth), [](const auto &row) { return Name(row.param); });
 
-TEST_P(SignedText, OfAnyTypeButAnObjectHasNoMembers) {
+TEST_P(TokenJSON, HasNoMembersUnlessObject) {
     const Outcome noAlgorithm = GetParam() == Profile::kAzure ? UnknownKey() : Unsupported("");
     for (const char *text : {"null", "true", "5", "0.5", R"("alg")", "[]", R"([{"alg": "HS256"}])"}) {
         ExpectLogin(text, claims_, noAlgorithm);
@@ -345,7 +345,7 @@ TEST_P(SignedText, OfAnyTypeButAnObjectHasNoMembers) {
     }
 }
 
-TEST_P(SignedText, MayHaveCommentsBlanksAndAnythingBehindIt) {
+TEST_P(TokenJSON, AllowsCommentsAndTrailingText) {
     for (const std::string &behind :
          {std::string(" \n\t"), std::string("// more"), std::string("/* more */"), std::string("}}"),
           std::string("{\"exp\": 1}"), std::string("\0{]", 3), std::string(kHuge, ' ')}) {
@@ -355,7 +355,7 @@ TEST_P(SignedText, MayHaveCommentsBlanksAndAnythingBehindIt) {
     ExpectLogin("/* less */ \n" + header_, "// less\n" + claims_, accepted_);
 }
 
-TEST_P(SignedText, IsRefusedWhereItIsNotJSON) {
+TEST_P(TokenJSON, RejectsInvalidJSON) {
     const Outcome badHeader = Refused<std::invalid_argument>("bad jwt header format!");
     const Outcome badBody = Refused<std::invalid_argument>("bad jwt body format!");
     const std::string deep = "{\"a\":" + std::string(2000, '[') + std::string(2000, ']') + ",";
@@ -366,7 +366,7 @@ TEST_P(SignedText, IsRefusedWhereItIsNotJSON) {
     }
 }
 
-TEST(AzureHeader, WithAKeyOfItsOwnIsHeldAgainstThePublishedOnes) {
+TEST(AzureHeader, IgnoresEmbeddedKey) {
     const RSAKey own;
     Json::Value header = TokenHeader(Profile::kAzure);
     header["jwk"] = own.JWK(kKeyID);
@@ -377,7 +377,7 @@ TEST(AzureHeader, WithAKeyOfItsOwnIsHeldAgainstThePublishedOnes) {
     EXPECT_THAT(TakeSystemLog(), ElementsAreArray({Error("jwt:N EVP_DigestVerifyFinal failed")}));
 }
 
-TEST(AzureHeader, WithTheAddressOfAKeySetIsNotFollowed) {
+TEST(AzureHeader, IgnoresKeySetAddress) {
     const RSAKey own;
     Server elsewhere;
     Json::Value header = TokenHeader(Profile::kAzure);

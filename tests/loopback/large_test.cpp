@@ -54,13 +54,13 @@ class TokenOfSize : public ::testing::TestWithParam<std::tuple<Profile, Size>> {
     }
 };
 
-TEST_P(TokenOfSize, LogsTheUserIn) {
+TEST_P(TokenOfSize, LogsUserIn) {
     Provider provider(profile());
     provider.AnswerLogin(Token());
     EXPECT_EQ(provider.LogIn(), LoggedIn(UserName(profile())));
 }
 
-TEST_P(TokenOfSize, IsRefusedWithItsLastCharacterOfTheBodyLost) {
+TEST_P(TokenOfSize, RejectsBodyWithoutLastCharacter) {
     std::string token = Token();
     token.erase(token.rfind('.') - 1, 1);
     Provider provider(profile());
@@ -70,7 +70,7 @@ TEST_P(TokenOfSize, IsRefusedWithItsLastCharacterOfTheBodyLost) {
     EXPECT_EQ(outcome.userName, kUserNameBefore);
 }
 
-TEST_P(TokenOfSize, IsRefusedWithOneLetterInTheMiddleOfItsBodyChanged) {
+TEST_P(TokenOfSize, RejectsChangedCharacterInBody) {
     std::string token = Token();
     // One of the letters of the long claim, or of a name, gives way to another: still JSON or no more, never trusted.
     char &letter = token[token.find('.') + BodyOf(token).size() / 2];
@@ -108,22 +108,22 @@ class HugeAnswer : public ::testing::TestWithParam<Profile> {
 INSTANTIATE_TEST_SUITE_P(Of, HugeAnswer, Values(Profile::kAzure, Profile::kWebSphere),
                          ::testing::PrintToStringParamName());
 
-TEST_P(HugeAnswer, WithAReallySignedTokenLogsTheUserIn) {
+TEST_P(HugeAnswer, LogsUserInWithSignedToken) {
     const std::string token = TokenWith(GetParam(), kHuge * 3 / 4);
     EXPECT_GE(token.size(), kHuge);
     EXPECT_EQ(LogInWithToken(token), LoggedIn(UserName(GetParam())));
 }
 
-TEST_P(HugeAnswer, WithATokenOfOnePartIsRefused) {
+TEST_P(HugeAnswer, RejectsTokenOfOnePart) {
     EXPECT_EQ(LogInWithToken(std::string(kHuge, 'A')), Refused<std::invalid_argument>("bad jwt format!"));
 }
 
-TEST_P(HugeAnswer, WithATokenOfThreeLongPartsOfGarbageIsRefused) {
+TEST_P(HugeAnswer, RejectsTokenOfThreeGarbageParts) {
     const std::string part(kHuge / 3, 'A');
     EXPECT_EQ(LogInWithToken(part + "." + part + "." + part), Refused<std::invalid_argument>("bad jwt header format!"));
 }
 
-TEST_P(HugeAnswer, WithALongSignatureIsRefused) {
+TEST_P(HugeAnswer, RejectsLongSignature) {
     std::string token = TokenWith(GetParam(), 0);
     const bool azure = GetParam() == Profile::kAzure;
     EXPECT_EQ(
@@ -131,11 +131,11 @@ TEST_P(HugeAnswer, WithALongSignatureIsRefused) {
         Refused<TAVO::JWT::jwt_verify_failed>(azure ? "verify rsa signature failed" : "verify hmac signature failed"));
 }
 
-TEST_P(HugeAnswer, OfBracketsIsRefused) {
+TEST_P(HugeAnswer, RejectsDeeplyNestedJSON) {
     EXPECT_EQ(LogInWithAnswer(std::string(kHuge, '[')), Refused<std::invalid_argument>("parse json falied"));
 }
 
-TEST_P(HugeAnswer, OfNoJSONIsRefused) {
+TEST_P(HugeAnswer, RejectsInvalidJSON) {
     EXPECT_EQ(LogInWithAnswer(std::string(kHuge, 'x')), Refused<std::invalid_argument>("parse json falied"));
 }
 

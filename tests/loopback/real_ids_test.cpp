@@ -292,7 +292,7 @@ void RunInAChild(const std::function<void()> &body) noexcept {
     EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << "status " << status << " of the child";
 }
 
-class Ownership : public ::testing::TestWithParam<std::tuple<Case, Reader>> {
+class RealIds : public ::testing::TestWithParam<std::tuple<Case, Reader>> {
   protected:
     static const Case &row() { return std::get<0>(GetParam()); }
     static const Reader &reader() { return std::get<1>(GetParam()); }
@@ -351,7 +351,7 @@ class Ownership : public ::testing::TestWithParam<std::tuple<Case, Reader>> {
     }
 };
 
-TEST_P(Ownership, IsRootsForTheReadingAndThenAsTheKernelAllows) {
+TEST_P(RealIds, AreRaisedForReadingIfKernelAllows) {
     WriteFilesThatOnlyRootMayRead(reader().profile);
     RunInAChild([] {
         ASSERT_NO_FATAL_FAILURE(BecomeTheProcess());
@@ -368,14 +368,14 @@ constexpr auto NameOfTest = [](const auto &row) {
 
 #define INSTANTIATE_OWNERSHIP(suite, cases) \
     INSTANTIATE_TEST_SUITE_P(               \
-        suite, Ownership, ::testing::Combine(::testing::ValuesIn(cases), ::testing::ValuesIn(Readers())), NameOfTest)
+        suite, RealIds, ::testing::Combine(::testing::ValuesIn(cases), ::testing::ValuesIn(Readers())), NameOfTest)
 
 INSTANTIATE_OWNERSHIP(OfTheProcess, Allowed());
 INSTANTIATE_OWNERSHIP(RefusedAtTheRaise, RefusedAtTheRaise());
 INSTANTIATE_OWNERSHIP(RefusedAtLeaving, RefusedAtLeaving());
 INSTANTIATE_OWNERSHIP(OfANamespaceWithoutRoot, OfANamespaceWithoutRoot());
 
-TEST(LogIn, ReadsTheProfileWithTheIdsThatTheProcessHas) {
+TEST(OIDCLogin, ReadsProfileWithoutRaisingIds) {
     WriteFilesThatOnlyRootMayRead("azure");
     RunInAChild([] {
         ASSERT_TRUE(Become(kUserWhoMayGoBack));

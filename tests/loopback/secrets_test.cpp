@@ -90,7 +90,7 @@ class Secrets : public ::testing::TestWithParam<Profile> {
 INSTANTIATE_TEST_SUITE_P(Of, Secrets, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
                          [](const auto &row) { return Name(row.param); });
 
-TEST_P(Secrets, AreOverwrittenBeforeTheirMemoryIsReleased) {
+TEST_P(Secrets, AreOverwrittenBeforeRelease) {
     // The file is longer than what is read of it at once, and the answer comes in pieces: texts grow, and move.
     Provider provider(GetParam(), Compact(Change({}, R"({"z": ")" + std::string(10000, ' ') + "\"}")));
     const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
@@ -106,7 +106,7 @@ TEST_P(Secrets, AreOverwrittenBeforeTheirMemoryIsReleased) {
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
-TEST_P(Secrets, AreOverwrittenWhenOthersTakeTheirPlace) {
+TEST_P(Secrets, AreOverwrittenWhenReplaced) {
     Provider provider(GetParam());
     const std::unique_ptr<TAVO::SSO::SSOClient, void (*)(TAVO::SSO::SSOClient *)> client = MakeClient(GetParam());
     // Without the first character, in whose place a cleared text has its end.
@@ -156,7 +156,7 @@ std::vector<std::string> Failures(Profile profile) {
     return answers;
 }
 
-TEST_P(Secrets, AreOverwrittenWhenALoginFails) {
+TEST_P(Secrets, AreOverwrittenWhenLoginFails) {
     for (const std::string &token : RefusedTokens(GetParam())) {
         Provider provider(GetParam());
         provider.AnswerByteByByte(HTTPAnswer(TokenResponse(token)));
@@ -169,7 +169,7 @@ TEST_P(Secrets, AreOverwrittenWhenALoginFails) {
     }
 }
 
-TEST_P(Secrets, AreOverwrittenWhenTheAnswerIsNotJSON) {
+TEST_P(Secrets, AreOverwrittenWhenAnswerIsNotJSON) {
     Provider provider(GetParam());
     const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
     provider.AnswerByteByByte(HTTPAnswer("[" + Answer(token) + ", cut off"));
@@ -180,7 +180,7 @@ TEST_P(Secrets, AreOverwrittenWhenTheAnswerIsNotJSON) {
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
-TEST_P(Secrets, AreOverwrittenWhenTheFileIsNotJSON) {
+TEST_P(Secrets, AreOverwrittenWhenFileIsNotJSON) {
     WriteFile(GetParam() == Profile::kAzure ? kAzureFile : kWebSphereFile,
               R"({"secret": ")" + std::string(kSecret) + R"(", "cut off": )" + std::string(5000, ' '));
     const std::vector<std::string> secrets = All();
@@ -190,7 +190,7 @@ TEST_P(Secrets, AreOverwrittenWhenTheFileIsNotJSON) {
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
-TEST_P(Secrets, AreOverwrittenWhenMemoryRunsOutOverTheTokenRequest) {
+TEST_P(Secrets, AreOverwrittenWhenMemoryRunsOut) {
     const Provider provider(GetParam());
     const auto client = MakeClient(GetParam());
     client->SetCode(kCode);
@@ -210,7 +210,7 @@ TEST_P(Secrets, AreOverwrittenWhenMemoryRunsOutOverTheTokenRequest) {
     EXPECT_GT(n, 10);
 }
 
-TEST(LargeParts, AreOverwrittenToTheirEnds) {
+TEST(LargeParts, AreOverwrittenCompletely) {
     const std::string filler(10000, 'x');
     const std::string endOfClaims = R"(","sub":"the last of the claims"})";
     const std::string endOfSecret = "the last of the secret";
@@ -233,7 +233,7 @@ TEST(LargeParts, AreOverwrittenToTheirEnds) {
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
-TEST_P(Secrets, AreInNoLogLineAndInNoException) {
+TEST_P(Secrets, AppearInNoLogLineOrException) {
     for (const std::string &answer : Failures(GetParam())) {
         Provider provider(GetParam());
         provider.AnswerByteByByte(HTTPAnswer(answer));

@@ -124,7 +124,7 @@ void PrintTo(const KeyCase &row, std::ostream *stream) { *stream << row.name; }
 
 class PublishedKey : public ::testing::TestWithParam<KeyCase> {};
 
-TEST_P(PublishedKey, DecidesTheLogin) {
+TEST_P(PublishedKey, YieldsExpectedOutcome) {
     const SignedKey key = GetParam().key();
     Provider provider(Profile::kAzure);
     provider.Answer(TokenResponse(SigningInputOfALogin() + "." + key.signature));

@@ -120,7 +120,7 @@ INSTANTIATE_TEST_SUITE_P(Of, Stall,
                          }),
                          [](const auto &row) { return row.param.name; });
 
-TEST_P(Stall, OfADayAtTheTokenEndpointIsWaitedFor) {
+TEST_P(Stall, IsWaitedForAtTokenEndpoint) {
     for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
         Provider provider(profile);
         StalledLogin login(provider);
@@ -134,7 +134,7 @@ TEST_P(Stall, OfADayAtTheTokenEndpointIsWaitedFor) {
     }
 }
 
-TEST_P(Stall, OfADayAtTheTokenEndpointEndsWithTheConnection) {
+TEST_P(Stall, EndsWhenTokenEndpointCloses) {
     for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
         Provider provider(profile);
         StalledLogin login(provider);
@@ -151,7 +151,7 @@ TEST_P(Stall, OfADayAtTheTokenEndpointEndsWithTheConnection) {
     }
 }
 
-TEST_P(Stall, OfADayAtTheDiscoveryDocumentIsWaitedFor) {
+TEST_P(Stall, IsWaitedForAtDiscoveryDocument) {
     Provider provider(Profile::kAzure);
     StalledLogin login(provider);
     provider.Answer(TokenResponse(Token(Profile::kAzure)));
@@ -164,7 +164,7 @@ TEST_P(Stall, OfADayAtTheDiscoveryDocumentIsWaitedFor) {
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST_P(Stall, OfADayAtTheKeySetIsWaitedFor) {
+TEST_P(Stall, IsWaitedForAtKeySet) {
     Provider provider(Profile::kAzure);
     StalledLogin login(provider);
     provider.Answer(TokenResponse(Token(Profile::kAzure)));
@@ -177,7 +177,7 @@ TEST_P(Stall, OfADayAtTheKeySetIsWaitedFor) {
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST(StallInTheHandshake, IsWaitedForAsLongAsLibcurlConnects) {
+TEST(HandshakeStall, IsWaitedForUpToConnectLimit) {
     Provider provider(Profile::kWebSphere);
     StalledLogin login(provider);
     provider.Play([&login](Connection &connection) {
@@ -192,7 +192,7 @@ TEST(StallInTheHandshake, IsWaitedForAsLongAsLibcurlConnects) {
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST(StallInTheHandshake, IsWaitedForNoLonger) {
+TEST(HandshakeStall, FailsAfterConnectLimit) {
     Provider provider(Profile::kWebSphere);
     StalledLogin login(provider);
     provider.Play([&login](Connection &connection) {
@@ -208,7 +208,7 @@ TEST(StallInTheHandshake, IsWaitedForNoLonger) {
                                                    curl_easy_strerror(CURLE_OPERATION_TIMEDOUT) + ".")));
 }
 
-TEST(Drip, OfAByteAMinuteIsWaitedFor) {
+TEST(SlowAnswer, AcceptsOneBytePerMinute) {
     Provider provider(Profile::kWebSphere);
     provider.Play([](Connection &connection) {
         connection.ReceiveRequest();

@@ -81,46 +81,46 @@ class Transfer : public ::testing::TestWithParam<Operation> {
 
 INSTANTIATE_TEST_SUITE_P(Http, Transfer, ::testing::ValuesIn(kOperations), NameOfOperation);
 
-TEST_P(Transfer, BringsTheAnswerOverPlainHTTP) {
+TEST_P(Transfer, ReturnsAnswerOverHTTP) {
     Server server;
     server.Answer(HTTPAnswer("the answer"));
     EXPECT_EQ(Perform(server.URL("/")), Arrived("the answer"));
 }
 
-TEST_P(Transfer, BringsTheAnswerOverTLSFromAServerThatATrustedAuthorityStandsBehind) {
+TEST_P(Transfer, ReturnsAnswerOfTrustedServerOverTLS) {
     Server server(CertificateFor("IP:127.0.0.1"));
     server.Answer(HTTPAnswer("the answer"));
     EXPECT_EQ(Perform(server.URL("/")), Arrived("the answer"));
 }
 
-TEST_P(Transfer, AcceptsACertificateUnderTheHostNameThatItIsFor) {
+TEST_P(Transfer, AcceptsCertificateForHostName) {
     Server server(CertificateFor("DNS:localhost"));
     server.Answer(HTTPAnswer("the answer"));
     EXPECT_EQ(Perform(server.URL("/", "localhost")), Arrived("the answer"));
 }
 
-TEST_P(Transfer, SendsNothingToAServerUnderANameThatItsCertificateIsNotFor) {
+TEST_P(Transfer, SendsNothingOnHostNameMismatch) {
     Server server(CertificateFor("DNS:localhost"));
     server.Answer(HTTPAnswer("the answer"));
     EXPECT_EQ(Perform(server.URL("/", "127.0.0.1")), Failed(CURLE_PEER_FAILED_VERIFICATION));
     EXPECT_THAT(server.Requests(), IsEmpty());
 }
 
-TEST_P(Transfer, SendsNothingToAServerWhoseCertificateHasExpired) {
+TEST_P(Transfer, SendsNothingToServerWithExpiredCertificate) {
     Server server(ExpiredCertificateFor("IP:127.0.0.1"));
     server.Answer(HTTPAnswer("the answer"));
     EXPECT_EQ(Perform(server.URL("/")), Failed(CURLE_PEER_FAILED_VERIFICATION));
     EXPECT_THAT(server.Requests(), IsEmpty());
 }
 
-TEST_P(Transfer, SendsNothingToASelfSignedServer) {
+TEST_P(Transfer, SendsNothingToSelfSignedServer) {
     Server server(SelfSignedCertificateFor("IP:127.0.0.1"));
     server.Answer(HTTPAnswer("the answer"));
     EXPECT_EQ(Perform(server.URL("/")), Failed(CURLE_PEER_FAILED_VERIFICATION));
     EXPECT_THAT(server.Requests(), IsEmpty());
 }
 
-TEST_P(Transfer, TakesAnyCertificateWhenToldNotToVerify) {
+TEST_P(Transfer, AcceptsAnyCertificateWithoutVerification) {
     for (const Credentials &credentials :
          {SelfSignedCertificateFor("IP:127.0.0.1"), ExpiredCertificateFor("IP:127.0.0.1"),
           CertificateFor("DNS:elsewhere.example")}) {
@@ -130,7 +130,7 @@ TEST_P(Transfer, TakesAnyCertificateWhenToldNotToVerify) {
     }
 }
 
-TEST_P(Transfer, OverTLSClearsTheErrorQueueOfTheThread) {
+TEST_P(Transfer, ClearsErrorQueueOverTLS) {
     Server server(CertificateFor("IP:127.0.0.1"));
     server.Answer(HTTPAnswer("the answer"));
     ERR_raise(ERR_LIB_USER, 1);
@@ -138,7 +138,7 @@ TEST_P(Transfer, OverTLSClearsTheErrorQueueOfTheThread) {
     EXPECT_THAT(TakeErrorQueue(), IsEmpty());
 }
 
-TEST_P(Transfer, BringsTheBodyOfAnErrorPageWhateverItsStatus) {
+TEST_P(Transfer, ReturnsBodyOfErrorPage) {
     for (const char *status : {"404 Not Found", "500 Internal Server Error"}) {
         Server server;
         server.Answer(HTTPAnswer("an error page", status));
@@ -155,26 +155,26 @@ TEST_P(Transfer, FollowsNoRedirect) {
     EXPECT_THAT(elsewhere.Requests(), IsEmpty());
 }
 
-TEST_P(Transfer, SucceedsWithAnEmptyAnswer) {
+TEST_P(Transfer, AcceptsEmptyAnswer) {
     Server server;
     server.Answer(HTTPAnswer(""));
     EXPECT_EQ(Perform(server.URL("/")), Arrived(""));
     EXPECT_THAT(server.Requests(), SizeIs(1));
 }
 
-TEST_P(Transfer, FailsWhereTheServerClosesWithoutAWord) {
+TEST_P(Transfer, FailsIfServerClosesWithoutAnswer) {
     Server server;
     EXPECT_EQ(Perform(server.URL("/")), Failed(CURLE_GOT_NOTHING));
     EXPECT_THAT(server.Requests(), SizeIs(1));
 }
 
-TEST_P(Transfer, FailsWhereTheAnswerIsNotHTTP) {
+TEST_P(Transfer, FailsIfAnswerIsNotHTTP) {
     Server server;
     server.Answer("220 mail.example ESMTP\r\n");
     EXPECT_EQ(Perform(server.URL("/")), Failed(CURLE_UNSUPPORTED_PROTOCOL));
 }
 
-TEST_P(Transfer, FailsHalfWayAndLeavesWhatArrived) {
+TEST_P(Transfer, KeepsPartialBodyOfFailedTransfer) {
     Server plain;
     plain.Answer(CutHTTPAnswer("the first half", 14));
     EXPECT_EQ(Perform(plain.URL("/")), Failed(CURLE_PARTIAL_FILE, "the first half"));
@@ -184,14 +184,14 @@ TEST_P(Transfer, FailsHalfWayAndLeavesWhatArrived) {
     EXPECT_EQ(Perform(tls.URL("/")), Failed(CURLE_PARTIAL_FILE, "the first half"));
 }
 
-TEST_P(Transfer, FailsWhereNobodyListens) {
+TEST_P(Transfer, FailsIfConnectionIsRefused) {
     const Port nobody;
     EXPECT_EQ(Perform("http://127.0.0.1:" + std::to_string(nobody.number()) + "/"), Failed(CURLE_COULDNT_CONNECT));
 }
 
-TEST_P(Transfer, FailsWithoutAnURL) { EXPECT_EQ(Perform(""), Failed(CURLE_URL_MALFORMAT)); }
+TEST_P(Transfer, FailsWithoutURL) { EXPECT_EQ(Perform(""), Failed(CURLE_URL_MALFORMAT)); }
 
-TEST_P(Transfer, LeavesTheResponseToTheCallbackWhichAppends) {
+TEST_P(Transfer, AppendsToResponseThroughCallback) {
     Server server;
     server.Answer(HTTPAnswer("second"));
     std::string response = "first, ";
@@ -199,7 +199,7 @@ TEST_P(Transfer, LeavesTheResponseToTheCallbackWhichAppends) {
     EXPECT_EQ(response, "first, second");
 }
 
-TEST_P(Transfer, WorksAfterOneThatFailed) {
+TEST_P(Transfer, SucceedsAfterFailedTransfer) {
     Server server;
     server.Answer("220 mail.example ESMTP\r\n");
     server.Answer(HTTPAnswer("the answer"));
@@ -207,13 +207,13 @@ TEST_P(Transfer, WorksAfterOneThatFailed) {
     EXPECT_EQ(Perform(server.URL("/")), Arrived("the answer"));
 }
 
-TEST_P(Transfer, HandsTheCallbackNULBytesAsTheyAre) {
+TEST_P(Transfer, PassesNULBytesToCallback) {
     Server server;
     server.Answer(ChunkedHTTPAnswer({std::string("ab\0cd", 5), "ef"}));
     EXPECT_EQ(Perform(server.URL("/")), Arrived(std::string("ab\0cdef", 7)));
 }
 
-TEST(Get, SendsThisRequestByteByByte) {
+TEST(Get, SendsExactRequest) {
     Server server;
     std::string response;
     server.Answer(HTTPAnswer(""));
@@ -244,18 +244,18 @@ class Post : public ::testing::Test {
     std::string host_;
 };
 
-TEST_F(Post, SendsThisRequestByteByByte) {
+TEST_F(Post, SendsExactRequest) {
     const std::string body = "a=1&b=%20+&c=\r\n%%";
     const std::string request = RequestFor(body);
     EXPECT_EQ(request, Expected(body));
 }
 
-TEST_F(Post, StaysAPostWithAnEmptyBody) {
+TEST_F(Post, SendsPostWithEmptyBody) {
     const std::string request = RequestFor("");
     EXPECT_EQ(request, Expected(""));
 }
 
-TEST_F(Post, SendsABodyUpToItsFirstNUL) {
+TEST_F(Post, SendsBodyUpToFirstNUL) {
     const std::string request = RequestFor(std::string("a=1\0b=2", 7));
     EXPECT_EQ(request, Expected("a=1"));
 }
@@ -291,21 +291,21 @@ class ProviderExchange : public ::testing::Test {
     PlainClient client_;
 };
 
-TEST_F(ProviderExchange, CutsEachChunkOfATokenAnswerAtItsFirstNULAndTakesTheNextOne) {
+TEST_F(ProviderExchange, CutsTokenResponseChunksAtFirstNUL) {
     Server server;
     server.Answer(ChunkedHTTPAnswer({std::string("ab\0cd\0", 6), "efg", std::string("\0h", 2), "i"}));
     EXPECT_EQ(client_.RequestToken(server.URL("/")), "before abefgi");
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST_F(ProviderExchange, CutsEachChunkOfADiscoveryDocumentAtItsFirstNULAndTakesTheNextOne) {
+TEST_F(ProviderExchange, CutsDiscoveryChunksAtFirstNUL) {
     Server server;
     server.Answer(ChunkedHTTPAnswer({std::string("{\"a\"\0!!", 7), ": 1}"}));
     EXPECT_EQ(client_.RequestWellknown(server.URL("/"))["a"], 1);
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST_F(ProviderExchange, RefusesAChunkThatMemoryDoesNotSufficeFor) {
+TEST_F(ProviderExchange, RejectsChunkIfMemoryRunsOut) {
     const std::string large(std::size_t{4} << 20, 'x');
     Server server;
     server.Answer(HTTPAnswer(large));
@@ -319,7 +319,7 @@ TEST_F(ProviderExchange, RefusesAChunkThatMemoryDoesNotSufficeFor) {
                 ElementsAre(Logged(std::string("request token uri ") + curl_easy_strerror(CURLE_WRITE_ERROR) + ".")));
 }
 
-TEST_F(ProviderExchange, VerifiesTheServerOfTheTokenEndpoint) {
+TEST_F(ProviderExchange, VerifiesServerOfTokenEndpoint) {
     Server server(SelfSignedCertificateFor("IP:127.0.0.1"));
     EXPECT_EQ(client_.RequestToken(server.URL("/")), "before ");
     EXPECT_THAT(server.Requests(), IsEmpty());
@@ -327,14 +327,14 @@ TEST_F(ProviderExchange, VerifiesTheServerOfTheTokenEndpoint) {
                                                     curl_easy_strerror(CURLE_PEER_FAILED_VERIFICATION) + ".")));
 }
 
-TEST_F(ProviderExchange, VerifiesTheServerOfTheDiscoveryDocument) {
+TEST_F(ProviderExchange, VerifiesServerOfDiscoveryDocument) {
     Server server(SelfSignedCertificateFor("IP:127.0.0.1"));
     EXPECT_TRUE(client_.RequestWellknown(server.URL("/")).isNull());
     EXPECT_THAT(server.Requests(), IsEmpty());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Logged(curl_easy_strerror(CURLE_PEER_FAILED_VERIFICATION))));
 }
 
-TEST_F(ProviderExchange, LogsATokenRequestThatFailedHalfWayAndKeepsWhatArrived) {
+TEST_F(ProviderExchange, LogsAndKeepsPartialTokenResponse) {
     Server server;
     server.Answer(CutHTTPAnswer("half", 4));
     EXPECT_EQ(client_.RequestToken(server.URL("/")), "before half");
@@ -342,14 +342,14 @@ TEST_F(ProviderExchange, LogsATokenRequestThatFailedHalfWayAndKeepsWhatArrived) 
                 ElementsAre(Logged(std::string("request token uri ") + curl_easy_strerror(CURLE_PARTIAL_FILE) + ".")));
 }
 
-TEST_F(ProviderExchange, LogsADiscoveryThatFailedHalfWayAndLeavesTheDocumentNull) {
+TEST_F(ProviderExchange, LogsAndDiscardsPartialDiscoveryDocument) {
     Server server;
     server.Answer(CutHTTPAnswer(R"({"jwks_uri": "a whole document"})", 4));
     EXPECT_TRUE(client_.RequestWellknown(server.URL("/")).isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Logged(curl_easy_strerror(CURLE_PARTIAL_FILE))));
 }
 
-TEST_F(ProviderExchange, LogsADiscoveryDocumentThatIsNotJSONAndLeavesItNull) {
+TEST_F(ProviderExchange, LogsAndDiscardsInvalidDiscoveryDocument) {
     for (const char *body : {"<html>", "", R"({"jwks_uri": "cut off")"}) {
         Server server;
         server.Answer(HTTPAnswer(body));
@@ -358,7 +358,7 @@ TEST_F(ProviderExchange, LogsADiscoveryDocumentThatIsNotJSONAndLeavesItNull) {
     }
 }
 
-TEST_F(ProviderExchange, LogsOneLineWhereNobodyListens) {
+TEST_F(ProviderExchange, LogsOneLineIfConnectionIsRefused) {
     const Port nobody;
     const std::string url = "https://127.0.0.1:" + std::to_string(nobody.number()) + "/";
     const std::string refused = curl_easy_strerror(CURLE_COULDNT_CONNECT);

@@ -52,7 +52,7 @@ class WholeLogin : public ::testing::TestWithParam<Profile> {};
 
 INSTANTIATE_TEST_SUITE_P(With, WholeLogin, ValuesIn(kBoth), [](const auto &row) { return Name(row.param); });
 
-TEST_P(WholeLogin, YieldsTheUserName) {
+TEST_P(WholeLogin, ReturnsUserName) {
     Provider provider(GetParam());
     provider.AnswerLogin(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam())));
     EXPECT_EQ(provider.LogIn(), LoggedIn(UserName(GetParam())));
@@ -60,7 +60,7 @@ TEST_P(WholeLogin, YieldsTheUserName) {
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST_P(WholeLogin, SendsThisTokenRequest) {
+TEST_P(WholeLogin, SendsExactTokenRequest) {
     Provider provider(GetParam());
     provider.LogIn();
     const std::string body =
@@ -73,7 +73,7 @@ TEST_P(WholeLogin, SendsThisTokenRequest) {
                                "\r\nContent-Type: application/x-www-form-urlencoded\r\n\r\n" + body);
 }
 
-TEST_P(WholeLogin, WorksAgainInTheSameProcessAfterOneThatFailed) {
+TEST_P(WholeLogin, SucceedsAfterFailedLogin) {
     Provider provider(GetParam());
     provider.AnswerByteByByte(HTTPAnswer(TokenResponse("not a token")));
     provider.AnswerLogin(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam())));
@@ -91,7 +91,7 @@ std::string DescriptorsHandedOn() {
     return descriptors;
 }
 
-TEST_P(WholeLogin, LeavesNoDescriptorToAProgramThatIsExecutedAfterIt) {
+TEST_P(WholeLogin, LeaksNoDescriptorToExecutedProgram) {
     Provider provider(GetParam());
     provider.AnswerLogin(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam())));
     const std::string before = DescriptorsHandedOn();
@@ -102,7 +102,7 @@ TEST_P(WholeLogin, LeavesNoDescriptorToAProgramThatIsExecutedAfterIt) {
     close(left);
 }
 
-TEST_P(WholeLogin, RefusesATokenWithAnEmptyPartAsAProgrammingError) {
+TEST_P(WholeLogin, ThrowsLogicErrorForEmptyTokenPart) {
     const std::string whole = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
     const std::size_t firstDot = whole.find('.');
     const std::size_t lastDot = whole.rfind('.');
@@ -145,9 +145,9 @@ struct TokenCase {
 
 void PrintTo(const TokenCase &row, std::ostream *stream) { *stream << row.name; }
 
-class AToken : public ::testing::TestWithParam<TokenCase> {};
+class TokenVerification : public ::testing::TestWithParam<TokenCase> {};
 
-TEST_P(AToken, DecidesTheLogin) {
+TEST_P(TokenVerification, YieldsExpectedOutcome) {
     const TokenCase &row = GetParam();
     Provider provider(row.profile, row.configuration);
     provider.AnswerByteByByte(HTTPAnswer(TokenResponse(row.damage(SignedToken(
@@ -204,7 +204,7 @@ std::vector<TokenCase> Malformed() {
     return rows;
 }
 
-INSTANTIATE_TEST_SUITE_P(Malformed, AToken, ValuesIn(Malformed()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(Malformed, TokenVerification, ValuesIn(Malformed()), NameOfTokenCase);
 
 std::vector<TokenCase> Expiry() {
     std::vector<TokenCase> rows;
@@ -232,7 +232,7 @@ std::vector<TokenCase> Expiry() {
     return rows;
 }
 
-INSTANTIATE_TEST_SUITE_P(Expiry, AToken, ValuesIn(Expiry()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(Expiry, TokenVerification, ValuesIn(Expiry()), NameOfTokenCase);
 
 std::vector<TokenCase> TenantAndAudience() {
     std::vector<TokenCase> rows;
@@ -260,7 +260,7 @@ std::vector<TokenCase> TenantAndAudience() {
     return rows;
 }
 
-INSTANTIATE_TEST_SUITE_P(TenantAndAudience, AToken, ValuesIn(TenantAndAudience()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(TenantAndAudience, TokenVerification, ValuesIn(TenantAndAudience()), NameOfTokenCase);
 
 std::vector<TokenCase> Algorithm() {
     std::vector<TokenCase> rows;
@@ -285,7 +285,7 @@ std::vector<TokenCase> Algorithm() {
     return rows;
 }
 
-INSTANTIATE_TEST_SUITE_P(Algorithm, AToken, ValuesIn(Algorithm()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(Algorithm, TokenVerification, ValuesIn(Algorithm()), NameOfTokenCase);
 
 std::vector<TokenCase> SigningKey() {
     std::vector<TokenCase> rows;
@@ -325,7 +325,7 @@ std::vector<TokenCase> SigningKey() {
     return rows;
 }
 
-INSTANTIATE_TEST_SUITE_P(SigningKey, AToken, ValuesIn(SigningKey()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(SigningKey, TokenVerification, ValuesIn(SigningKey()), NameOfTokenCase);
 
 std::vector<TokenCase> SignatureRows() {
     std::vector<TokenCase> rows;
@@ -360,7 +360,7 @@ std::vector<TokenCase> SignatureRows() {
     return rows;
 }
 
-INSTANTIATE_TEST_SUITE_P(Signature, AToken, ValuesIn(SignatureRows()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(Signature, TokenVerification, ValuesIn(SignatureRows()), NameOfTokenCase);
 
 std::vector<TokenCase> Secret() {
     constexpr std::size_t kLongest = 765;  // bytes whose base64 text and its NUL fit into 1024
@@ -389,7 +389,7 @@ std::vector<TokenCase> Secret() {
     };
 }
 
-INSTANTIATE_TEST_SUITE_P(Secret, AToken, ValuesIn(Secret()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(Secret, TokenVerification, ValuesIn(Secret()), NameOfTokenCase);
 
 std::vector<TokenCase> Identity() {
     const Profile azure = Profile::kAzure;
@@ -418,7 +418,7 @@ std::vector<TokenCase> Identity() {
     };
 }
 
-INSTANTIATE_TEST_SUITE_P(Identity, AToken, ValuesIn(Identity()), NameOfTokenCase);
+INSTANTIATE_TEST_SUITE_P(Identity, TokenVerification, ValuesIn(Identity()), NameOfTokenCase);
 
 /// What the Azure provider publishes, as whole answers, and what comes of a login with a good token.
 struct DocumentCase {
@@ -432,7 +432,7 @@ void PrintTo(const DocumentCase &row, std::ostream *stream) { *stream << row.nam
 
 class PublishedDocuments : public ::testing::TestWithParam<DocumentCase> {};
 
-TEST_P(PublishedDocuments, DecideTheLogin) {
+TEST_P(PublishedDocuments, YieldExpectedOutcome) {
     Provider provider(Profile::kAzure);
     provider.Answer(TokenResponse(SignedToken(TokenHeader(Profile::kAzure), TokenClaims(Profile::kAzure))));
     const std::vector<std::string> answers = GetParam().answers();
@@ -515,14 +515,14 @@ std::vector<DocumentCase> Documents() {
 INSTANTIATE_TEST_SUITE_P(Azure, PublishedDocuments, ValuesIn(Documents()),
                          [](const auto &row) { return row.param.name; });
 
-class AzureProvider : public ::testing::Test {
+class AzureLogin : public ::testing::Test {
   protected:
     static std::string Token() { return SignedToken(TokenHeader(Profile::kAzure), TokenClaims(Profile::kAzure)); }
 
     const Outcome unknownKey_ = Refused<std::invalid_argument>("kid does not exist in Azure verified kyes");
 };
 
-TEST_F(AzureProvider, WhoseDiscoveryCannotBeReachedRefusesTheLogin) {
+TEST_F(AzureLogin, FailsIfDiscoveryIsUnreachable) {
     const Port nobody;
     Provider provider(Profile::kAzure,
                       R"({"azure_wellknown": "https://127.0.0.1:)" + std::to_string(nobody.number()) + "\"}");
@@ -533,7 +533,7 @@ TEST_F(AzureProvider, WhoseDiscoveryCannotBeReachedRefusesTheLogin) {
     EXPECT_THAT(provider.RequestLines(), ElementsAre("POST /token HTTP/1.1"));
 }
 
-TEST_F(AzureProvider, WhoseKeySetCannotBeReachedRefusesTheLogin) {
+TEST_F(AzureLogin, FailsIfKeySetIsUnreachable) {
     const Port nobody;
     Provider provider(Profile::kAzure);
     provider.Answer(TokenResponse(Token()));
@@ -542,7 +542,7 @@ TEST_F(AzureProvider, WhoseKeySetCannotBeReachedRefusesTheLogin) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(KeyRequestLogged(CURLE_COULDNT_CONNECT)));
 }
 
-TEST_F(AzureProvider, WhoseKeySetComesFromAServerThatNobodyVouchesForRefusesTheLogin) {
+TEST_F(AzureLogin, FailsIfKeySetServerIsUntrusted) {
     Server impostor(SelfSignedCertificateFor("IP:127.0.0.1"));
     impostor.Answer(HTTPAnswer(KeySet()));
     Provider provider(Profile::kAzure);
@@ -552,7 +552,7 @@ TEST_F(AzureProvider, WhoseKeySetComesFromAServerThatNobodyVouchesForRefusesTheL
     EXPECT_THAT(TakeSystemLog(), ElementsAre(KeyRequestLogged(CURLE_PEER_FAILED_VERIFICATION)));
 }
 
-TEST_F(AzureProvider, WhoseKeySetIsCutOffOnTheWayRefusesTheLogin) {
+TEST_F(AzureLogin, FailsIfKeySetIsTruncated) {
     Provider provider(Profile::kAzure);
     provider.Answer(TokenResponse(Token()));
     provider.Answer(R"({"jwks_uri": "$BASE/keys"})");
@@ -561,7 +561,7 @@ TEST_F(AzureProvider, WhoseKeySetIsCutOffOnTheWayRefusesTheLogin) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(KeyRequestLogged(CURLE_PARTIAL_FILE)));
 }
 
-TEST_F(AzureProvider, MayAnswerWithAnyStatus) {
+TEST_F(AzureLogin, IgnoresHTTPStatus) {
     Provider provider(Profile::kAzure);
     provider.AnswerByteByByte(HTTPAnswer(TokenResponse(Token()), "500 Internal Server Error"));
     provider.AnswerByteByByte(HTTPAnswer(R"({"jwks_uri": ")" + provider.URL("/keys") + "\"}", "404 Not Found"));
@@ -582,7 +582,7 @@ void PrintTo(const TokenAnswerCase &row, std::ostream *stream) { *stream << row.
 
 class TokenEndpoint : public ::testing::TestWithParam<TokenAnswerCase> {};
 
-TEST_P(TokenEndpoint, EndsTheLogin) {
+TEST_P(TokenEndpoint, YieldsExpectedOutcome) {
     Provider provider(GetParam().profile);
     provider.AnswerByteByByte(GetParam().answer);
     EXPECT_EQ(provider.LogIn(), GetParam().outcome);
@@ -632,7 +632,7 @@ std::vector<TokenAnswerCase> TokenAnswers() {
 INSTANTIATE_TEST_SUITE_P(Answer, TokenEndpoint, ValuesIn(TokenAnswers()),
                          [](const auto &row) { return row.param.name; });
 
-TEST(WebSphereTokenEndpoint, MayNameAnErrorBesideAToken) {
+TEST(WebSphereTokenEndpoint, IgnoresErrorNextToToken) {
     const Profile profile = Profile::kWebSphere;
     Provider provider(profile);
     Json::Value answer = Parse(R"({"error": "ignored"})");
@@ -641,7 +641,7 @@ TEST(WebSphereTokenEndpoint, MayNameAnErrorBesideAToken) {
     EXPECT_EQ(provider.LogIn(), LoggedIn("alice"));
 }
 
-TEST_P(WholeLogin, TakesWhatArrivedOfATokenAnswerThatWasCutOffBehindIt) {
+TEST_P(WholeLogin, AcceptsCompleteTokenInTruncatedResponse) {
     Provider provider(GetParam());
     provider.AnswerByteByByte(
         CutHTTPAnswer(TokenResponse(SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()))), 9));
@@ -656,7 +656,7 @@ std::string TokenEndpointAt(Profile profile, const std::string &url) {
            "\"}";
 }
 
-TEST_P(WholeLogin, EndsWhereNobodyListensAtTheTokenEndpoint) {
+TEST_P(WholeLogin, FailsIfTokenEndpointRefusesConnection) {
     const Port nobody;
     Provider provider(GetParam(),
                       TokenEndpointAt(GetParam(), "https://127.0.0.1:" + std::to_string(nobody.number()) + "/token"));
@@ -665,7 +665,7 @@ TEST_P(WholeLogin, EndsWhereNobodyListensAtTheTokenEndpoint) {
     EXPECT_THAT(provider.Requests(), IsEmpty());
 }
 
-TEST_P(WholeLogin, SendsNeitherCodeNorSecretToAServerThatNobodyVouchesFor) {
+TEST_P(WholeLogin, SendsNothingToUntrustedServer) {
     Server impostor(SelfSignedCertificateFor("IP:127.0.0.1"));
     Provider provider(GetParam(), TokenEndpointAt(GetParam(), impostor.URL("/token")));
     EXPECT_EQ(provider.LogIn(), Refused<std::invalid_argument>("parse json falied"));
@@ -673,7 +673,7 @@ TEST_P(WholeLogin, SendsNeitherCodeNorSecretToAServerThatNobodyVouchesFor) {
     EXPECT_TRUE(impostor.Requests().empty());
 }
 
-TEST_P(WholeLogin, EndsWithoutARequestWhereTheClientIsNotConfigured) {
+TEST_P(WholeLogin, SendsNoRequestWithoutConfiguration) {
     Provider provider(GetParam());
     WriteFile(GetParam() == Profile::kAzure ? kAzureFile : kWebSphereFile, "");
     EXPECT_EQ(provider.LogIn(), Refused<std::invalid_argument>("parse json falied"));
@@ -681,7 +681,7 @@ TEST_P(WholeLogin, EndsWithoutARequestWhereTheClientIsNotConfigured) {
     EXPECT_THAT(provider.Requests(), IsEmpty());
 }
 
-TEST_P(WholeLogin, IsWhatTheHeldClientOfAProfileCannotDo) {
+TEST_P(WholeLogin, IsNotImplementedByClientOfProfile) {
     Provider provider(GetParam());
     TAVO::SSO::SSOProfile profile;
     std::string userName = kUserNameBefore;
@@ -690,7 +690,7 @@ TEST_P(WholeLogin, IsWhatTheHeldClientOfAProfileCannotDo) {
     EXPECT_THAT(provider.Requests(), IsEmpty());
 }
 
-TEST(WithoutTheNetwork, AProfileIsRead) {
+TEST(WithoutNetwork, ReadsProfile) {
     Provider provider(Profile::kAzure);
     TAVO::SSO::SSOProfile profile;
     EXPECT_TRUE(profile.SSOIsEnable());
@@ -700,7 +700,7 @@ TEST(WithoutTheNetwork, AProfileIsRead) {
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST(WithoutTheNetwork, TheLogoutAddressIsBuilt) {
+TEST(WithoutNetwork, BuildsLogoutURL) {
     Provider provider(Profile::kAzure, R"({"azure_logout_endpoint": "$BASE/logout"})");
     EXPECT_EQ(TAVO::SSO::GetAzureSSOLogoutURL(""), provider.URL("/logout"));
     EXPECT_THAT(

@@ -46,7 +46,7 @@ class AuthorizationRequest : public Library {
 using Clients = testing::Types<AzureClient, WebSphereClient>;
 TYPED_TEST_SUITE(AuthorizationRequest, Clients);
 
-TYPED_TEST(AuthorizationRequest, HasTheSixParametersInTheOrderOfTheirNames) {
+TYPED_TEST(AuthorizationRequest, SortsItsSixParametersByName) {
     EXPECT_THAT(this->URI(), testing::MatchesRegex("https://provider\\.example/authorize"
                                                    "\\?client_id=the%20id"
                                                    "&nonce=[0-9a-f-]+"
@@ -56,49 +56,49 @@ TYPED_TEST(AuthorizationRequest, HasTheSixParametersInTheOrderOfTheirNames) {
                                                    std::string(TypeParam::kScope) + "&state=[A-Za-z0-9%]+"));
 }
 
-TYPED_TEST(AuthorizationRequest, TwoOfTheSameStateDifferInNonceAndState) {
+TYPED_TEST(AuthorizationRequest, UsesNewNonceAndStateEachTime) {
     const std::string first = this->URI();
     const std::string second = this->URI();
     EXPECT_NE(Parameter(first, "nonce"), Parameter(second, "nonce"));
     EXPECT_NE(Parameter(first, "state"), Parameter(second, "state"));
 }
 
-TYPED_TEST(AuthorizationRequest, EachNonceComesFromAGeneratorOfItsOwnSeededByTheSystem) {
+TYPED_TEST(AuthorizationRequest, SeedsNewGeneratorForEachNonce) {
     this->URI();
     const int before = EntropyReads();
     this->URI();
     EXPECT_GT(EntropyReads(), before);
 }
 
-TYPED_TEST(AuthorizationRequest, WithoutADigestTheStateCarriesAnEmptyNonce) {
+TYPED_TEST(AuthorizationRequest, SendsEmptyNonceIfDigestFails) {
     FailCall("MD5");
     EXPECT_EQ(Parse(StateText(this->URI()))["nonce"], "");
     EXPECT_EQ(TakeSystemLog().size(), 1u);
 }
 
-TYPED_TEST(AuthorizationRequest, TheNonceIsAVersion4UUIDOf36Characters) {
+TYPED_TEST(AuthorizationRequest, UsesVersion4UUIDAsNonce) {
     EXPECT_TRUE(std::regex_match(Parameter(this->URI(), "nonce"),
                                  std::regex("[0-9a-f]{8}-[0-9a-f]{4}-4[0-9a-f]{3}-[89ab][0-9a-f]{3}-[0-9a-f]{12}")));
 }
 
-TYPED_TEST(AuthorizationRequest, TheStateCarriesTheDigestOfTheNonceAndNotTheNonce) {
+TYPED_TEST(AuthorizationRequest, PutsOnlyDigestOfNonceIntoState) {
     const std::string uri = this->URI();
     const std::string nonce = Parameter(uri, "nonce");
     EXPECT_EQ(Parse(StateText(uri))["nonce"].asString(), MD5Digest(nonce));
     EXPECT_THAT(StateText(uri), testing::Not(testing::HasSubstr(nonce)));
 }
 
-TYPED_TEST(AuthorizationRequest, ANullStateBecomesTheObjectWithTheDigestAndALineFeed) {
+TYPED_TEST(AuthorizationRequest, ConvertsNullStateToObjectWithDigest) {
     const std::string uri = this->URI("null");
     EXPECT_EQ(StateText(uri), R"({"nonce":")" + MD5Digest(Parameter(uri, "nonce")) + "\"}\n");
 }
 
-TYPED_TEST(AuthorizationRequest, ANonceOfTheCallerIsReplaced) {
+TYPED_TEST(AuthorizationRequest, ReplacesNonceOfCaller) {
     const std::string uri = this->URI(R"({"nonce": "mine"})");
     EXPECT_EQ(Parse(StateText(uri))["nonce"].asString(), MD5Digest(Parameter(uri, "nonce")));
 }
 
-TYPED_TEST(AuthorizationRequest, EveryOtherMemberOfTheStateComesBackUnchanged) {
+TYPED_TEST(AuthorizationRequest, PreservesOtherMembersOfState) {
     const char state[] =
         R"({"origin": "/a?b=c&d", "csrf": "x+/=", "list": [1, null, {"a": 1.5}], "text": "\u00e4\"\\"})";
     Json::Value returned = Parse(StateText(this->URI(state)));
@@ -106,14 +106,14 @@ TYPED_TEST(AuthorizationRequest, EveryOtherMemberOfTheStateComesBackUnchanged) {
     EXPECT_EQ(returned, Parse(state));
 }
 
-TYPED_TEST(AuthorizationRequest, TheCallersStateIsNotChanged) {
+TYPED_TEST(AuthorizationRequest, KeepsStateOfCallerUnchanged) {
     const Json::Value state = Parse(R"({"origin": "/"})");
     const Json::Value before = state;
     this->client.GetAccessTokenReqURI(state);
     EXPECT_EQ(state, before);
 }
 
-TYPED_TEST(AuthorizationRequest, TheRelayURLReadsTheOriginBackOutOfTheState) {
+TYPED_TEST(AuthorizationRequest, LetsRelayURLReadOriginFromState) {
     EXPECT_EQ(GetSSORelayURL(true, Parameter(this->URI(R"({"origin": "/a b"})"), "state"), ""),
               "ssoclient/relay.html#origin=%2Fa%20b&success=true");
 }
@@ -121,12 +121,12 @@ TYPED_TEST(AuthorizationRequest, TheRelayURLReadsTheOriginBackOutOfTheState) {
 /// A state whose compact JSON has this length.
 std::string StateOfLength(std::size_t length) { return R"({"origin":")" + std::string(length - 13, 'x') + "\"}"; }
 
-TYPED_TEST(AuthorizationRequest, AStateOf721BytesFitsAndOneMoreFails) {
+TYPED_TEST(AuthorizationRequest, AcceptsStateUpTo721Bytes) {
     EXPECT_EQ(Parameter(this->URI(StateOfLength(721)), "state").size(), 1020u);
     EXPECT_EQ(FailureOf([&] { this->URI(StateOfLength(722)); }), Fails<sso_op_failed>("encode base64 failed."));
 }
 
-TYPED_TEST(AuthorizationRequest, TheEncoderIsGivenAZeroedBufferOf1024BytesAndItsFlags) {
+TYPED_TEST(AuthorizationRequest, PassesZeroedBufferAndFlagsToEncoder) {
     Platform platform;
     platform.encode = [](const std::string &src, char *dst, int flag1, std::size_t size, int flag2, int flag3) {
         EXPECT_EQ(src.back(), '\n');
@@ -142,7 +142,7 @@ TYPED_TEST(AuthorizationRequest, TheEncoderIsGivenAZeroedBufferOf1024BytesAndIts
     EXPECT_EQ(Parameter(this->URI(), "state"), std::string(1024, 'x'));
 }
 
-TYPED_TEST(AuthorizationRequest, AnEmptyConfigurationIsNotDetected) {
+TYPED_TEST(AuthorizationRequest, AcceptsEmptyConfiguration) {
     this->client.authEndpoint = "";
     this->client.clientID = "";
     this->client.redirectURI = "";
@@ -150,14 +150,12 @@ TYPED_TEST(AuthorizationRequest, AnEmptyConfigurationIsNotDetected) {
     EXPECT_EQ(Parameter(this->URI(), "redirect_uri"), "");
 }
 
-TYPED_TEST(AuthorizationRequest, AnEndpointWithAQueryGetsASecondQuestionMark) {
+TYPED_TEST(AuthorizationRequest, AppendsSecondQuestionMarkToEndpointWithQuery) {
     this->client.authEndpoint = "https://provider.example/?tenant=1";
     EXPECT_THAT(this->URI(), testing::StartsWith("https://provider.example/?tenant=1?client_id="));
 }
 
-TYPED_TEST(AuthorizationRequest, AStateThatIsNeitherObjectNorNullIsTheCallersError) {
-    EXPECT_THROW(this->URI("[]"), Json::LogicError);
-}
+TYPED_TEST(AuthorizationRequest, ThrowsUnlessStateIsObjectOrNull) { EXPECT_THROW(this->URI("[]"), Json::LogicError); }
 
 /// Stands behind std::cout and counts what is done to it.
 class Output : public std::stringbuf {
@@ -182,7 +180,7 @@ class Output : public std::stringbuf {
     std::streambuf *former_;
 };
 
-TYPED_TEST(AuthorizationRequest, TheRedirectIsOneInsertionOnStandardOutputUnflushed) {
+TYPED_TEST(AuthorizationRequest, WritesRedirectAtOnceWithoutFlush) {
     Output output;
     this->client.RedirectAuthEndpoint(Parse(R"({"origin": "/"})"));
     EXPECT_THAT(output.str(),
@@ -191,7 +189,7 @@ TYPED_TEST(AuthorizationRequest, TheRedirectIsOneInsertionOnStandardOutputUnflus
     EXPECT_EQ(output.flushes, 0);
 }
 
-TYPED_TEST(AuthorizationRequest, AFailedRedirectWritesNothing) {
+TYPED_TEST(AuthorizationRequest, WritesNothingOnFailure) {
     Output output;
     EXPECT_EQ(FailureOf([&] { this->client.RedirectAuthEndpoint(Parse(StateOfLength(722))); }),
               Fails<sso_op_failed>("encode base64 failed."));

@@ -53,7 +53,7 @@ class AzureConfiguration : public Library {
     }
 };
 
-TEST_F(AzureConfiguration, EachKeyFillsItsField) {
+TEST_F(AzureConfiguration, ReadsEachKey) {
     AzureClient client = ReadFrom(kEveryKey);
     EXPECT_TRUE(client.isEnable());
     EXPECT_EQ(client.GetWellknownEndpoint(), "the wellknown");
@@ -68,9 +68,9 @@ TEST_F(AzureConfiguration, EachKeyFillsItsField) {
     EXPECT_EQ(client.GetToken(), "");
 }
 
-TEST_F(AzureConfiguration, AMissingFileLeavesTheDefaultsAndNoLine) { ExpectDefaults({}); }
+TEST_F(AzureConfiguration, KeepsDefaultsSilentlyWithoutFile) { ExpectDefaults({}); }
 
-TEST_F(AzureConfiguration, AnEmptyOrMalformedFileLeavesTheDefaultsAndNoLine) {
+TEST_F(AzureConfiguration, KeepsDefaultsSilentlyForMalformedFile) {
     ExpectDefaults(ReadFrom(""));
     ExpectDefaults(ReadFrom(R"({"azure_sso_enable": true, "azure_client_id": "the id", )"));
     ExpectDefaults(ReadFrom("[]"));
@@ -78,13 +78,13 @@ TEST_F(AzureConfiguration, AnEmptyOrMalformedFileLeavesTheDefaultsAndNoLine) {
     ExpectDefaults(ReadFrom(std::string(2000, '[')));
 }
 
-TEST_F(AzureConfiguration, EnableAsTheStringTrueIsFalseWhileTheRestIsRead) {
+TEST_F(AzureConfiguration, IgnoresEnableAsString) {
     AzureClient client = ReadFrom(R"({"azure_sso_enable": "true", "azure_client_id": "the id"})");
     EXPECT_FALSE(client.isEnable());
     EXPECT_EQ(client.GetClientID(), "the id");
 }
 
-TEST_F(AzureConfiguration, MembersOfAnotherTypeLeaveTheirFieldsEmpty) {
+TEST_F(AzureConfiguration, IgnoresMembersOfAnotherType) {
     AzureClient client = ReadFrom(R"({"azure_wellknown": 1, "azure_client_id": null, "azure_client_secret": [],
         "azure_tenant_id": 5, "azure_authorization_endpoint": {}, "azure_token_endpoint": true,
         "azure_redirect_uri": 1.5, "azure_logout_endpoint": "the logout"})");
@@ -95,7 +95,7 @@ TEST_F(AzureConfiguration, MembersOfAnotherTypeLeaveTheirFieldsEmpty) {
     EXPECT_EQ(client.GetLogoutEndpoint(), "the logout");
 }
 
-TEST_F(AzureConfiguration, TheFileIsReadOnceAtConstruction) {
+TEST_F(AzureConfiguration, ReadsFileOnceAtConstruction) {
     AzureClient client = ReadFrom(R"({"azure_client_id": "first"})");
     WriteFile(kAzureFile, R"({"azure_client_id": "second"})");
     EXPECT_EQ(client.GetClientID(), "first");
@@ -103,7 +103,7 @@ TEST_F(AzureConfiguration, TheFileIsReadOnceAtConstruction) {
 
 class AzureTokenResponse : public Library {};
 
-TEST_F(AzureTokenResponse, AnErrorThrowsTheWholeAnswerInCompactFormWithItsLineFeed) {
+TEST_F(AzureTokenResponse, ThrowsCompactResponseWithLineFeedOnError) {
     AzureClient client;
     client.token = "earlier";
     EXPECT_EQ(
@@ -114,7 +114,7 @@ TEST_F(AzureTokenResponse, AnErrorThrowsTheWholeAnswerInCompactFormWithItsLineFe
     EXPECT_EQ(client.GetToken(), "");
 }
 
-TEST_F(AzureTokenResponse, AnErrorOfAnyValueIsAnError) {
+TEST_F(AzureTokenResponse, TreatsAnyErrorMemberAsError) {
     AzureClient client;
     EXPECT_EQ(FailureOf([&] { client.ProcessTokenResponse(R"({"id_token": "h.b.s", "error": null})"); }),
               Fails<sso_err_resp>("{\"error\":null,\"id_token\":\"h.b.s\"}\n"));
@@ -167,25 +167,25 @@ const auto kExpired = Fails<std::invalid_argument>("id_token expired.");
 const auto kWrongTenant = Fails<std::invalid_argument>("tenant ID invalid");
 const auto kWrongAudience = Fails<std::invalid_argument>("client ID invalid");
 
-TEST_F(AzureVerification, ATokenOfTheProviderVerifiesAndTheDocumentsAreFetchedAfresh) {
+TEST_F(AzureVerification, FetchesBothDocumentsForEachToken) {
     EXPECT_EQ(Verify(), kVerified);
     EXPECT_EQ(Verify(), kVerified);
     EXPECT_THAT(CurrentTransport().urls, ElementsAre(kWellknown, kKeys, kWellknown, kKeys));
 }
 
-TEST_F(AzureVerification, RS384AndRS512VerifyWithTheirDigests) {
+TEST_F(AzureVerification, VerifiesRS384AndRS512) {
     header["alg"] = "RS384";
     EXPECT_EQ(Verify(EVP_sha384()), kVerified);
     header["alg"] = "RS512";
     EXPECT_EQ(Verify(EVP_sha512()), kVerified);
 }
 
-TEST_F(AzureVerification, WithoutATokenThereIsNothingToVerify) {
+TEST_F(AzureVerification, RejectsEmptyToken) {
     EXPECT_EQ(VerifyToken(""), Fails<std::invalid_argument>("token cannot be empty"));
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, AMalformedTokenIsRefusedAsMalformed) {
+TEST_F(AzureVerification, RejectsMalformedToken) {
     EXPECT_EQ(VerifyToken("a.b"), Fails<std::invalid_argument>("bad jwt format!"));
     EXPECT_EQ(VerifyToken("bm8.e30.c2ln"), Fails<std::invalid_argument>("bad jwt header format!"));
     EXPECT_EQ(VerifyToken("e30.bm8.c2ln"), Fails<std::invalid_argument>("bad jwt body format!"));
@@ -193,13 +193,13 @@ TEST_F(AzureVerification, AMalformedTokenIsRefusedAsMalformed) {
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, ATokenThatExpiresThisSecondPassesAndOneSecondEarlierFails) {
+TEST_F(AzureVerification, AcceptsTokenExpiringInThisSecond) {
     EXPECT_EQ(Verify(), kVerified);
     claims["exp"] = static_cast<Json::Int64>(kNow - 1);
     EXPECT_EQ(Verify(), kExpired);
 }
 
-TEST_F(AzureVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
+TEST_F(AzureVerification, TreatsUnreadableExpiryAsExpired) {
     for (const char *exp :
          {"null", "\"\"", "\"soon\"", "[1700000000]", "{}", "true", "-1", "\"0x7fffffff\"", "\"-1700000000\"", "0.5"}) {
         claims["exp"] = Parse(std::string("[") + exp + "]")[0];
@@ -210,7 +210,7 @@ TEST_F(AzureVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, AnExpiryIsReadAsFarAsItsLeadingDigitsGo) {
+TEST_F(AzureVerification, ReadsExpiryUpToFirstNonDigit) {
     for (const char *exp : {"1700000000", "\"01700000000\"", "\"1700000000\"", "\" 1700000000\"", "\"1700000000.9\"",
                             "1700000000.5", "\"1700000000 seconds\"", "\"99999999999999999999\""}) {
         claims["exp"] = Parse(std::string("[") + exp + "]")[0];
@@ -226,7 +226,7 @@ struct Grouping : std::numpunct<char> {
     std::string do_grouping() const override { return "\3"; }
 };
 
-TEST_F(AzureVerification, TheHostsLocaleDoesNotChangeTheExpiry) {
+TEST_F(AzureVerification, ReadsExpiryIndependentOfLocale) {
     const std::locale former = std::locale::global(std::locale(std::locale(), new Grouping));
     claims["exp"] = "1.700.000.000";
     const Failure failure = Verify();
@@ -234,7 +234,7 @@ TEST_F(AzureVerification, TheHostsLocaleDoesNotChangeTheExpiry) {
     EXPECT_EQ(failure, kExpired);
 }
 
-TEST_F(AzureVerification, ExpiryComesBeforeTenantAndTenantBeforeAudience) {
+TEST_F(AzureVerification, ChecksExpiryThenTenantThenAudience) {
     claims["aud"] = "another";
     claims["tid"] = "another";
     EXPECT_EQ(Verify(), kWrongTenant);
@@ -243,7 +243,7 @@ TEST_F(AzureVerification, ExpiryComesBeforeTenantAndTenantBeforeAudience) {
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, TheTenantIsComparedExactly) {
+TEST_F(AzureVerification, ComparesTenantExactly) {
     for (const char *tenant : {"\"The tenant\"", "\"the tenant \"", "\"\"", "null", "5", "[\"the tenant\"]"}) {
         claims["tid"] = Parse(std::string("[") + tenant + "]")[0];
         EXPECT_EQ(Verify(), kWrongTenant) << tenant;
@@ -253,7 +253,7 @@ TEST_F(AzureVerification, TheTenantIsComparedExactly) {
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, TheAudienceIsComparedExactlyAndAListIsRefused) {
+TEST_F(AzureVerification, ComparesAudienceExactlyAndRejectsList) {
     for (const char *audience : {"\"The id\"", "\"the id,other\"", "null", "[\"the id\"]", "{}"}) {
         claims["aud"] = Parse(std::string("[") + audience + "]")[0];
         EXPECT_EQ(Verify(), kWrongAudience) << audience;
@@ -261,7 +261,7 @@ TEST_F(AzureVerification, TheAudienceIsComparedExactlyAndAListIsRefused) {
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, AnUnconfiguredTenantMatchesTheEmptyTextAndNothingWithoutText) {
+TEST_F(AzureVerification, MatchesEmptyTenantWithMissingClaim) {
     client.tenantID = "";
     EXPECT_EQ(Verify(), kWrongTenant);
     claims["tid"] = Json::arrayValue;
@@ -270,14 +270,14 @@ TEST_F(AzureVerification, AnUnconfiguredTenantMatchesTheEmptyTextAndNothingWitho
     EXPECT_EQ(Verify(), kVerified) << "the comparison is the literal one";
 }
 
-TEST_F(AzureVerification, ClaimsThatAreNoObjectAreExpired) {
+TEST_F(AzureVerification, TreatsNonObjectClaimsAsExpired) {
     claims = Json::arrayValue;
     EXPECT_EQ(Verify(), kExpired);
     claims = 5;
     EXPECT_EQ(Verify(), kExpired);
 }
 
-TEST_F(AzureVerification, AnUnreachableDiscoveryDocumentIsAnUnknownKid) {
+TEST_F(AzureVerification, ReportsUnknownKidIfDiscoveryIsUnreachable) {
     CurrentTransport().answers.erase(kWellknown);
     EXPECT_EQ(Verify(), kUnknownKid);
     EXPECT_THAT(CurrentTransport().urls, ElementsAre(kWellknown, ""));
@@ -285,14 +285,14 @@ TEST_F(AzureVerification, AnUnreachableDiscoveryDocumentIsAnUnknownKid) {
                                              Error("azuresso:N request wellknown uri " + ::Test::kNotConnected + ".")));
 }
 
-TEST_F(AzureVerification, AnExpiredTokenCausesNoRequestEvenIfDiscoveryIsDown) {
+TEST_F(AzureVerification, SendsNoRequestForExpiredToken) {
     CurrentTransport().answers.erase(kWellknown);
     claims["exp"] = 1;
     EXPECT_EQ(Verify(), kExpired);
     ExpectNoRequest();
 }
 
-TEST_F(AzureVerification, ADiscoveryDocumentWithoutJwksUriIsAnUnknownKid) {
+TEST_F(AzureVerification, ReportsUnknownKidWithoutJwksUri) {
     for (const char *document : {"{}", "[]", R"({"jwks_uri": ["https://provider.example/keys"]})", "5"}) {
         CurrentTransport().answers[kWellknown] = Whole(document);
         EXPECT_EQ(Verify(), kUnknownKid) << document;
@@ -302,14 +302,14 @@ TEST_F(AzureVerification, ADiscoveryDocumentWithoutJwksUriIsAnUnknownKid) {
     }
 }
 
-TEST_F(AzureVerification, AKeySetThatIsNotJSONIsOneLineAndAnUnknownKid) {
+TEST_F(AzureVerification, LogsInvalidKeySetAndReportsUnknownKid) {
     CurrentTransport().answers[kKeys] = Whole("<html>");
     keySet = Json::Value();
     EXPECT_EQ(Verify(), kUnknownKid);
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("azuresso:N request wellknown uri bad wellknown json format..")));
 }
 
-TEST_F(AzureVerification, ATruncatedKeySetGivesNoKey) {
+TEST_F(AzureVerification, RejectsTruncatedKeySet) {
     const std::string whole = Compact(keySet);
     keySet = Json::Value();
     CurrentTransport().answers[kKeys] = Whole(whole.substr(0, whole.size() - 1));
@@ -317,7 +317,7 @@ TEST_F(AzureVerification, ATruncatedKeySetGivesNoKey) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("azuresso:N request wellknown uri bad wellknown json format..")));
 }
 
-TEST_F(AzureVerification, AKeySetWithoutKeysIsOneLineAndAnUnknownKid) {
+TEST_F(AzureVerification, LogsMissingKeysAndReportsUnknownKid) {
     for (const char *document : {"{}", "[]", "\"keys\""}) {
         keySet = Parse(std::string("[") + document + "]")[0];
         EXPECT_EQ(Verify(), kUnknownKid) << document;
@@ -325,7 +325,7 @@ TEST_F(AzureVerification, AKeySetWithoutKeysIsOneLineAndAnUnknownKid) {
     }
 }
 
-TEST_F(AzureVerification, KeysThatAreNoListHoldNoKey) {
+TEST_F(AzureVerification, IgnoresKeysUnlessList) {
     const Json::Value key = keySet["keys"][0];
     Json::Value named;
     named["a"] = key;
@@ -335,7 +335,7 @@ TEST_F(AzureVerification, KeysThatAreNoListHoldNoKey) {
     }
 }
 
-TEST_F(AzureVerification, ElementsWithoutKidAreSkipped) {
+TEST_F(AzureVerification, SkipsKeysWithoutKid) {
     Json::Value keys;
     keys.append(Json::Value());
     keys.append(5);
@@ -347,14 +347,14 @@ TEST_F(AzureVerification, ElementsWithoutKidAreSkipped) {
     EXPECT_EQ(Verify(), kVerified);
 }
 
-TEST_F(AzureVerification, TheKidIsComparedExactlyAndOneWithoutTextIsNoKeys) {
+TEST_F(AzureVerification, ComparesKidExactly) {
     for (const char *kid : {"\"Key 1\"", "\"key 1 \"", "null", "[\"key 1\"]", "{}"}) {
         header["kid"] = Parse(std::string("[") + kid + "]")[0];
         EXPECT_EQ(Verify(), kUnknownKid) << kid;
     }
 }
 
-TEST_F(AzureVerification, ATokenWithoutKidMatchesAKeyWithTheEmptyKid) {
+TEST_F(AzureVerification, MatchesMissingKidWithEmptyKid) {
     header.removeMember("kid");
     EXPECT_EQ(Verify(), kUnknownKid);
     keySet["keys"].append(Json::objectValue);
@@ -363,13 +363,13 @@ TEST_F(AzureVerification, ATokenWithoutKidMatchesAKeyWithTheEmptyKid) {
     EXPECT_EQ(Verify(), kVerified);
 }
 
-TEST_F(AzureVerification, ANumericKidIsComparedByItsText) {
+TEST_F(AzureVerification, ComparesNumericKidAsText) {
     header["kid"] = 17;
     keySet["keys"][0]["kid"] = "17";
     EXPECT_EQ(Verify(), kVerified);
 }
 
-TEST_F(AzureVerification, OfTwoKeysWithTheKidTheFirstIsUsed) {
+TEST_F(AzureVerification, UsesFirstKeyWithMatchingKid) {
     const Json::Value good = keySet["keys"][0];
     Json::Value other = good;
     other["n"] = Base64Url(std::string(256, '\x55'));
@@ -382,7 +382,7 @@ TEST_F(AzureVerification, OfTwoKeysWithTheKidTheFirstIsUsed) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("jwt:N EVP_DigestVerifyFinal failed")));
 }
 
-TEST_F(AzureVerification, AKeyNeedsAStringN) {
+TEST_F(AzureVerification, RequiresStringModulus) {
     const auto missing = Fails<std::invalid_argument>("RSA public 'n' cannot be found!");
     keySet["keys"][0]["n"] = 5;
     EXPECT_EQ(Verify(), missing);
@@ -393,7 +393,7 @@ TEST_F(AzureVerification, AKeyNeedsAStringN) {
     EXPECT_EQ(Verify(), missing) << "n is looked at before e";
 }
 
-TEST_F(AzureVerification, AKeyNeedsAStringE) {
+TEST_F(AzureVerification, RequiresStringExponent) {
     const auto missing = Fails<std::invalid_argument>("RSA public 'e' cannot be found!");
     keySet["keys"][0]["e"] = 65537;
     EXPECT_EQ(Verify(), missing);
@@ -402,33 +402,33 @@ TEST_F(AzureVerification, AKeyNeedsAStringE) {
     EXPECT_EQ(Verify(), missing) << "e is looked at before the algorithm";
 }
 
-TEST_F(AzureVerification, AnotherAlgorithmIsNotSupported) {
+TEST_F(AzureVerification, RejectsOtherAlgorithms) {
     for (const char *algorithm : {"HS256", "none", "rs256", "RS256 ", "PS256", "ES256", ""}) {
         header["alg"] = algorithm;
         EXPECT_EQ(Verify(), Fails<jwt_not_support>(std::string(algorithm) + " algorithm is not supported"));
     }
 }
 
-TEST_F(AzureVerification, AMissingAlgorithmIsNamedByABlank) {
+TEST_F(AzureVerification, ReportsMissingAlgorithmAsEmptyName) {
     header.removeMember("alg");
     EXPECT_EQ(Verify(), Fails<jwt_not_support>(" algorithm is not supported"));
     header["alg"] = Parse(R"(["RS256"])");
     EXPECT_EQ(Verify(), Fails<jwt_not_support>(" algorithm is not supported"));
 }
 
-TEST_F(AzureVerification, TheKeyIsLookedUpBeforeTheAlgorithm) {
+TEST_F(AzureVerification, LooksUpKeyBeforeCheckingAlgorithm) {
     header["alg"] = "HS256";
     header["kid"] = "unknown";
     EXPECT_EQ(Verify(), kUnknownKid);
 }
 
-TEST_F(AzureVerification, ASignatureOfAnotherKeyIsRefused) {
+TEST_F(AzureVerification, RejectsSignatureOfAnotherKey) {
     static const RSAKey other;
     EXPECT_EQ(VerifyToken(other.RS256Token(claims, "key 1")), Fails<jwt_verify_failed>("verify rsa signature failed"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("jwt:N EVP_DigestVerifyFinal failed")));
 }
 
-TEST_F(AzureVerification, ATokenMACedWithThePublicKeyIsRefused) {
+TEST_F(AzureVerification, RejectsHMACUnderPublicKey) {
     // The classic confusion of algorithms: the public modulus as the secret of an HMAC.
     header["alg"] = "HS256";
     const std::string signingInput = SigningInput(header, claims);
@@ -436,7 +436,7 @@ TEST_F(AzureVerification, ATokenMACedWithThePublicKeyIsRefused) {
               Fails<jwt_not_support>("HS256 algorithm is not supported"));
 }
 
-TEST_F(AzureVerification, OtherClaimsAreNotLookedAt) {
+TEST_F(AzureVerification, IgnoresOtherClaims) {
     claims["iss"] = "someone else";
     claims["nbf"] = static_cast<Json::Int64>(kNow + 1000);
     claims["iat"] = static_cast<Json::Int64>(kNow + 1000);
@@ -449,7 +449,7 @@ struct OwnDiscovery : AzureClient {
     void RequestWellknownInfo(Json::Value &out) override { out["jwks_uri"] = "https://elsewhere.example/keys"; }
 };
 
-TEST_F(AzureVerification, ADerivedClassMayBringItsOwnDiscoveryDocument) {
+TEST_F(AzureVerification, UsesDiscoveryDocumentOfDerivedClass) {
     OwnDiscovery derived;
     derived.clientID = "the id";
     derived.tenantID = "the tenant";
@@ -459,7 +459,7 @@ TEST_F(AzureVerification, ADerivedClassMayBringItsOwnDiscoveryDocument) {
     TakeSystemLog();
 }
 
-TEST_F(AzureVerification, TheClientIsNotChanged) {
+TEST_F(AzureVerification, KeepsClientUnchanged) {
     EXPECT_EQ(Verify(), kVerified);
     const std::string token = client.GetToken();
     client.VerifyIDToken();
@@ -472,7 +472,7 @@ class AzureKeySet : public Library {
     Json::Value keys;
 };
 
-TEST_F(AzureKeySet, ItIsFetchedVerifiedAndLibcurlCleanedUpOnceMore) {
+TEST_F(AzureKeySet, FetchesKeysAndCleansUpLibcurlTwice) {
     CurrentTransport().answers[kKeys] = Whole(R"({"keys": []})");
     client.RequestKeysInfo(kKeys, keys);
     EXPECT_EQ(keys, Parse(R"({"keys": []})"));
@@ -483,14 +483,14 @@ TEST_F(AzureKeySet, ItIsFetchedVerifiedAndLibcurlCleanedUpOnceMore) {
                             "curl_easy_perform", "curl_easy_cleanup", "curl_global_cleanup", "curl_global_cleanup"));
 }
 
-TEST_F(AzureKeySet, LibcurlIsCleanedUpOnceMoreAfterAHandledFailureToo) {
+TEST_F(AzureKeySet, CleansUpLibcurlTwiceAfterFailure) {
     client.RequestKeysInfo(kKeys, keys);
     EXPECT_TRUE(keys.isNull());
     EXPECT_EQ(std::count(CurrentTransport().calls.begin(), CurrentTransport().calls.end(), "curl_global_cleanup"), 2);
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("azuresso:N request wellknown uri " + ::Test::kNotConnected + ".")));
 }
 
-TEST_F(AzureKeySet, WithoutATransferHandleItIsOneLine) {
+TEST_F(AzureKeySet, LogsOneLineWithoutTransferHandle) {
     CurrentTransport().noHandle = true;
     client.RequestKeysInfo(kKeys, keys);
     const auto log = TakeSystemLog();
@@ -509,27 +509,27 @@ class AzureIdentity : public Identity<AzureClient> {
 
 const Failure &kNamed = kNothingThrown;
 
-TEST_F(AzureIdentity, TheNameIsNetBIOSDomainBackslashUser) {
+TEST_F(AzureIdentity, ReturnsDomainBackslashUser) {
     EXPECT_EQ(NameOf(R"({"unique_name": "alice@corp.example.net"})"), kNamed);
     EXPECT_EQ(userName, "ACME\\alice");
 }
 
-TEST_F(AzureIdentity, UniqueNameIsPreferredToEmail) {
+TEST_F(AzureIdentity, PrefersUniqueNameToEmail) {
     EXPECT_EQ(NameOf(R"({"email": "bob@corp.example.net", "unique_name": "alice@corp.example.net"})"), kNamed);
     EXPECT_EQ(userName, "ACME\\alice");
 }
 
-TEST_F(AzureIdentity, AUniqueNameThatIsNoStringFallsThroughToEmail) {
+TEST_F(AzureIdentity, UsesEmailIfUniqueNameIsNoString) {
     EXPECT_EQ(NameOf(R"({"email": "bob@corp.example.net", "unique_name": 5})"), kNamed);
     EXPECT_EQ(userName, "ACME\\bob");
 }
 
-TEST_F(AzureIdentity, AnEmptyUniqueNameIsAStringAndTaken) {
+TEST_F(AzureIdentity, PrefersEmptyUniqueNameToEmail) {
     EXPECT_EQ(NameOf(R"({"email": "bob@corp.example.net", "unique_name": ""})"),
               Fails<std::invalid_argument>("cannot get the user name!"));
 }
 
-TEST_F(AzureIdentity, WithoutAStringUniqueNameOrEmailTheNameCannotBeFound) {
+TEST_F(AzureIdentity, RequiresStringUniqueNameOrEmail) {
     const auto notFound = Fails<std::invalid_argument>("cannot find the user name!");
     for (const char *claims : {R"({"sub": "alice@corp.example.net"})", R"({"unique_name": null, "email": ["a@b"]})",
                                "[\"alice@corp.example.net\"]", "5"}) {
@@ -538,7 +538,7 @@ TEST_F(AzureIdentity, WithoutAStringUniqueNameOrEmailTheNameCannotBeFound) {
     EXPECT_EQ(userName, "before");
 }
 
-TEST_F(AzureIdentity, WithoutExactlyOneAtSignTheNameCannotBeGotAndTheUserPieceIsWritten) {
+TEST_F(AzureIdentity, RequiresOneAtSignAndStoresUserPart) {
     const auto notGot = Fails<std::invalid_argument>("cannot get the user name!");
     EXPECT_EQ(NameOf(R"({"unique_name": "alice@corp@example.net"})"), notGot);
     EXPECT_EQ(userName, "alice");
@@ -547,7 +547,7 @@ TEST_F(AzureIdentity, WithoutExactlyOneAtSignTheNameCannotBeGotAndTheUserPieceIs
     EXPECT_EQ(NameOf(R"({"unique_name": "alice@@corp.example.net"})"), notGot);
 }
 
-TEST_F(AzureIdentity, ANameOfAMillionAtSignsIsRefusedWithoutTakingItApart) {
+TEST_F(AzureIdentity, RejectsMillionAtSignsWithoutSplitting) {
     client.token = "e30." + Base64Url(R"({"email": "alice)" + std::string(1000000, '@') + "\"}") + ".";
     const MemoryLimit limit(4000000);
     EXPECT_EQ(FailureOf([this] { client.GetUserName(userName); }),
@@ -555,14 +555,14 @@ TEST_F(AzureIdentity, ANameOfAMillionAtSignsIsRefusedWithoutTakingItApart) {
     EXPECT_EQ(userName, "alice");
 }
 
-TEST_F(AzureIdentity, AnUnknownDomainFailsAndTheBackslashFormIsWritten) {
+TEST_F(AzureIdentity, StoresBackslashFormForUnknownDomain) {
     EXPECT_EQ(NameOf(R"({"unique_name": "Alice@elsewhere.example"})"),
               Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
     EXPECT_EQ(userName, "ELSEWHERE.EXAMPLE\\Alice");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(UnknownDomain("ELSEWHERE.EXAMPLE"))));
 }
 
-TEST_F(AzureIdentity, TheUserKeepsItsCaseWhileTheDomainIsUpperCased) {
+TEST_F(AzureIdentity, ConvertsOnlyDomainToUpperCase) {
     std::string asked;
     Platform platform;
     platform.fqdn2Netbios = [&](const char *src, char *dst, std::size_t size) {
@@ -583,7 +583,7 @@ struct OwnCase : std::ctype<char> {
     char do_toupper(char c) const override { return c == 'p' ? '#' : c; }
 };
 
-TEST_F(AzureIdentity, TheDomainIsUpperCasedByTheGlobalLocale) {
+TEST_F(AzureIdentity, ConvertsDomainByGlobalLocale) {
     const std::locale before = std::locale::global(std::locale(std::locale::classic(), new OwnCase));
     EXPECT_EQ(NameOf(R"({"unique_name": "pat@corp.example"})"),
               Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
@@ -592,7 +592,7 @@ TEST_F(AzureIdentity, TheDomainIsUpperCasedByTheGlobalLocale) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(UnknownDomain("cor#.exam#le"))));
 }
 
-TEST_F(AzureIdentity, AnEmptyUserIsHandedOnAsALoneBackslash) {
+TEST_F(AzureIdentity, PassesEmptyUserToConversion) {
     std::string asked;
     Platform platform;
     platform.fqdn2Netbios = [&](const char *src, char *, std::size_t) {
@@ -605,7 +605,7 @@ TEST_F(AzureIdentity, AnEmptyUserIsHandedOnAsALoneBackslash) {
     EXPECT_EQ(userName, "");
 }
 
-TEST_F(AzureIdentity, ANameThatFillsTheBufferIsReadToItsEnd) {
+TEST_F(AzureIdentity, ReadsNameThatFillsBuffer) {
     Platform platform;
     platform.fqdn2Netbios = [](const char *, char *dst, std::size_t size) {
         std::fill_n(dst, size + 1, 'x');  // no room was left for a NUL
@@ -628,27 +628,27 @@ constexpr char kLogoutToRelay[] =
     "https://provider.example/logout?post_logout_redirect_uri="
     "https%3A%2F%2Fnas.example%3A5001%2Fwebman%2Fssoclient%2Frelay.html";
 
-TEST_F(AzureLogout, AnEmptyBaseGivesTheBareEndpoint) {
+TEST_F(AzureLogout, ReturnsBareEndpointForEmptyBase) {
     EXPECT_EQ(GetAzureSSOLogoutURL(""), "https://provider.example/logout");
 }
 
-TEST_F(AzureLogout, BasesEndingInIndexInASlashAndInNeitherGiveTheSame) {
+TEST_F(AzureLogout, RemovesIndexOrSlashFromBase) {
     EXPECT_EQ(GetAzureSSOLogoutURL("https://nas.example:5001/index.cgi"), kLogoutToRelay);
     EXPECT_EQ(GetAzureSSOLogoutURL("https://nas.example:5001/"), kLogoutToRelay);
     EXPECT_EQ(GetAzureSSOLogoutURL("https://nas.example:5001"), kLogoutToRelay);
 }
 
-TEST_F(AzureLogout, OnlyOneFinalSlashIsCut) {
+TEST_F(AzureLogout, RemovesOnlyOneFinalSlash) {
     EXPECT_THAT(GetAzureSSOLogoutURL("https://nas.example//"), testing::HasSubstr("nas.example%2F%2Fwebman%2F"));
     EXPECT_THAT(GetAzureSSOLogoutURL("https://nas.example//index.cgi"), testing::HasSubstr("nas.example%2Fwebman"));
 }
 
-TEST_F(AzureLogout, ABaseOfTheSuffixAloneLeavesTheRelayPath) {
+TEST_F(AzureLogout, ReturnsRelayPathForBaseOfSuffix) {
     EXPECT_EQ(GetAzureSSOLogoutURL("/index.cgi"),
               "https://provider.example/logout?post_logout_redirect_uri=%2Fwebman%2Fssoclient%2Frelay.html");
 }
 
-TEST_F(AzureLogout, ABaseOf1To9CharactersIsOutOfRange) {
+TEST_F(AzureLogout, ThrowsOutOfRangeForShortBase) {
     for (std::size_t length = 1; length <= 9; ++length) {
         const Failure failure = FailureOf([&] { GetAzureSSOLogoutURL(std::string(length, '/')); });
         EXPECT_EQ(failure.type, Fails<std::out_of_range>("").type) << length;
@@ -656,12 +656,12 @@ TEST_F(AzureLogout, ABaseOf1To9CharactersIsOutOfRange) {
     }
 }
 
-TEST_F(AzureLogout, TheSuffixInCapitalsStays) {
+TEST_F(AzureLogout, KeepsSuffixInUpperCase) {
     EXPECT_THAT(GetAzureSSOLogoutURL("https://nas.example/INDEX.CGI"),
                 testing::EndsWith("%2FINDEX.CGI%2Fwebman%2Fssoclient%2Frelay.html"));
 }
 
-TEST_F(AzureLogout, AnEmptyEndpointAndOneWithAQueryAreUsedAsTheyAre) {
+TEST_F(AzureLogout, UsesEndpointVerbatim) {
     WriteFile(kAzureFile, R"({"azure_logout_endpoint": "https://provider.example/?a"})");
     EXPECT_THAT(GetAzureSSOLogoutURL("https://nas.example"), testing::StartsWith("https://provider.example/?a?post_"));
     WriteFile(kAzureFile, "");
@@ -669,7 +669,7 @@ TEST_F(AzureLogout, AnEmptyEndpointAndOneWithAQueryAreUsedAsTheyAre) {
     EXPECT_EQ(GetAzureSSOLogoutURL(""), "");
 }
 
-TEST_F(AzureLogout, TheEnableFlagIsNotConsulted) {
+TEST_F(AzureLogout, IgnoresEnableFlag) {
     WriteFile(kAzureFile, R"({"azure_sso_enable": false, "azure_logout_endpoint": "l"})");
     EXPECT_EQ(GetAzureSSOLogoutURL(""), "l");
 }

@@ -30,7 +30,7 @@ bool OIDCLoginIsCaughtAs(const char *profile) {
 constexpr char kUnknownProfile[] = R"({"sso_enable": true, "sso_profile": "Azure"})";
 constexpr char kSwitchedOff[] = R"({"sso_enable": false, "sso_profile": "azure"})";
 
-TEST_F(Errors, EverySSOFailureIsCaughtAsSSOException) {
+TEST_F(Errors, DeriveFromSSOException) {
     EXPECT_TRUE(OIDCLoginIsCaughtAs<SSO::sso_exception>(kUnknownProfile));
     EXPECT_TRUE(OIDCLoginIsCaughtAs<SSO::sso_exception>(kSwitchedOff));
     EXPECT_TRUE((std::is_base_of_v<SSO::sso_exception, SSO::sso_err_resp>));
@@ -38,12 +38,12 @@ TEST_F(Errors, EverySSOFailureIsCaughtAsSSOException) {
     EXPECT_TRUE((std::is_base_of_v<SSO::sso_exception, SSO::sso_op_failed>));
 }
 
-TEST_F(Errors, CatchingSSOOpFailedMissesTheUnsupportedProfile) {
+TEST_F(Errors, ExcludeUnsupportedProfileFromSSOOpFailed) {
     EXPECT_FALSE(OIDCLoginIsCaughtAs<SSO::sso_op_failed>(kUnknownProfile));
     EXPECT_TRUE(OIDCLoginIsCaughtAs<SSO::sso_op_failed>(kSwitchedOff));
 }
 
-TEST_F(Errors, BothFamiliesAreCaughtAsRuntimeError) {
+TEST_F(Errors, DeriveFromRuntimeError) {
     EXPECT_TRUE(OIDCLoginIsCaughtAs<std::runtime_error>(kSwitchedOff));
     JWT::Jwt jwt("header.body.signature");
     std::string empty;
@@ -52,12 +52,12 @@ TEST_F(Errors, BothFamiliesAreCaughtAsRuntimeError) {
     EXPECT_TRUE((std::is_base_of_v<JWT::jwt_exception, JWT::jwt_verify_failed>));
 }
 
-TEST_F(Errors, TheTokenFamilyIsNoPartOfTheSSOFamily) {
+TEST_F(Errors, KeepTokenAndSSOClassesUnrelated) {
     EXPECT_FALSE((std::is_base_of_v<SSO::sso_exception, JWT::jwt_exception>));
     EXPECT_FALSE((std::is_base_of_v<JWT::jwt_exception, SSO::sso_exception>));
 }
 
-TEST_F(Errors, WhatIsTheMessageWithAndWithoutFullStop) {
+TEST_F(Errors, ReturnMessageVerbatim) {
     EXPECT_STREQ(SSO::sso_exception("profile not support.").what(), "profile not support.");
     EXPECT_STREQ(SSO::sso_err_resp("no full stop").what(), "no full stop");
     EXPECT_STREQ(SSO::sso_not_implemented("GetUserName not implemented").what(), "GetUserName not implemented");
@@ -67,7 +67,7 @@ TEST_F(Errors, WhatIsTheMessageWithAndWithoutFullStop) {
     EXPECT_STREQ(JWT::jwt_verify_failed("verify rsa signature failed").what(), "verify rsa signature failed");
 }
 
-TEST_F(Errors, NoneAddsFieldsToRuntimeError) {
+TEST_F(Errors, AddNoFieldsToRuntimeError) {
     EXPECT_EQ(sizeof(SSO::sso_exception), sizeof(std::runtime_error));
     EXPECT_EQ(sizeof(SSO::sso_err_resp), sizeof(std::runtime_error));
     EXPECT_EQ(sizeof(SSO::sso_not_implemented), sizeof(std::runtime_error));

@@ -115,9 +115,9 @@ Slots Eighteen(const std::string &hooks) {
 
 class Interface : public Library {};
 
-TEST_F(Interface, TheBaseHasItsEighteenSlotsAndNoDestructorBehindThem) { EXPECT_EQ(SlotsOf(kBase), Eighteen(kBase)); }
+TEST_F(Interface, BaseHasEighteenSlotsAndNoDestructor) { EXPECT_EQ(SlotsOf(kBase), Eighteen(kBase)); }
 
-TEST_F(Interface, EachClientOverridesFourAndHasItsDestructorBehindTheEighteenth) {
+TEST_F(Interface, ClientsOverrideFourSlotsAndAppendDestructor) {
     for (const std::string client : {"N4TAVO3SSO14AzureSSOClientE", "N4TAVO3SSO18WebSphereSSOClientE"}) {
         Slots expected = Eighteen(client);
         expected.push_back(Function(client, "D1Ev"));
@@ -130,7 +130,7 @@ TEST_F(Interface, EachClientOverridesFourAndHasItsDestructorBehindTheEighteenth)
     }
 }
 
-TEST_F(Interface, TheProfileHasItsDestructorAlone) {
+TEST_F(Interface, ProfileHasOnlyDestructor) {
     Slots found = SlotsOf("N4TAVO3SSO10SSOProfileE");
     ASSERT_EQ(found.size(), 2u);
     EXPECT_EQ(found[1], "_ZN4TAVO3SSO10SSOProfileD0Ev");
@@ -151,7 +151,7 @@ struct BaseFields : SSO::SSOClient {
     }
 };
 
-TEST_F(Interface, TheBaseIsOffAndEmptyAtFirst) {
+TEST_F(Interface, BaseStartsDisabledAndEmpty) {
     SSO::SSOClient client;
     EXPECT_FALSE(client.isEnable());
     EXPECT_EQ(client.GetClientID() + client.GetClientSecret() + client.GetRedirectURI() + client.GetToken() +
@@ -160,7 +160,7 @@ TEST_F(Interface, TheBaseIsOffAndEmptyAtFirst) {
               "");
 }
 
-TEST_F(Interface, TheFieldsOfTheBaseLieInTheirOrder) {
+TEST_F(Interface, BaseKeepsOrderOfFields) {
     constexpr std::ptrdiff_t string = sizeof(std::string);
     BaseFields fields;
     EXPECT_THAT(fields.Offsets(),
@@ -168,12 +168,12 @@ TEST_F(Interface, TheFieldsOfTheBaseLieInTheirOrder) {
                                      16 + 5 * string, 16 + 6 * string, 16 + 7 * string, 16 + 8 * string));
 }
 
-TEST_F(Interface, AzureAddsTheTenant) {
+TEST_F(Interface, AzureAppendsTenant) {
     AzureClient client;
     EXPECT_EQ(Offset(client, client.tenantID), static_cast<std::ptrdiff_t>(sizeof(SSO::SSOClient)));
 }
 
-TEST_F(Interface, TheProfileHoldsFlagNameAndClientInThisOrder) {
+TEST_F(Interface, ProfileKeepsOrderOfFields) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure"})");
     SSO::SSOProfile profile;
     char *start = reinterpret_cast<char *>(&profile);
@@ -182,7 +182,7 @@ TEST_F(Interface, TheProfileHoldsFlagNameAndClientInThisOrder) {
     EXPECT_EQ(Offset(profile, *profile.GetSSOClient()), static_cast<std::ptrdiff_t>(16 + sizeof(std::string)));
 }
 
-TEST_F(Interface, ATokenHoldsHeaderBodyAndSignatureInThisOrder) {
+TEST_F(Interface, TokenKeepsOrderOfFields) {
     JWT::Jwt jwt("header.body.signature");
     const auto *parts = reinterpret_cast<std::string *>(&jwt);
     EXPECT_EQ(parts[0], "header");
@@ -190,7 +190,7 @@ TEST_F(Interface, ATokenHoldsHeaderBodyAndSignatureInThisOrder) {
     EXPECT_EQ(parts[2], "signature");
 }
 
-TEST_F(Interface, EachExceptionsTypeInformationIsTheLibrarys) {
+TEST_F(Interface, LibraryDefinesTypeInformationOfExceptions) {
     for (const std::type_info *type :
          {&typeid(SSO::sso_exception), &typeid(SSO::sso_err_resp), &typeid(SSO::sso_not_implemented),
           &typeid(SSO::sso_op_failed), &typeid(JWT::jwt_exception), &typeid(JWT::jwt_not_support),

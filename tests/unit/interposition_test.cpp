@@ -38,18 +38,18 @@ using ::Test::LogLine;
 using ::Test::TakeSystemLog;
 using ::Test::TakeSystemLogWithOwnTexts;
 
-TEST(Interposition, URLEncodeIsFoundByTheFunctionsThatUseIt) {
+TEST(Interposition, ReplacesURLEncode) {
     EXPECT_EQ(WebSphereSSOClient().GetIDTokenReqParams(),
               "client_id=<>&client_secret=<>&code=<>&grant_type=<authorization_code>&redirect_uri=<>");
 }
 
-TEST(Interposition, MD5DigestIsFoundByTheAuthorizationRequest) {
+TEST(Interposition, ReplacesMD5Digest) {
     // {"nonce":"digest"} and a line feed
     EXPECT_THAT(AzureSSOClient().GetAccessTokenReqURI(Json::Value()),
                 testing::HasSubstr("state=<eyJub25jZSI6ImRpZ2VzdCJ9Cg==>"));
 }
 
-TEST(Interposition, HttpGetIsFoundByDiscoveryAndKeySet) {
+TEST(Interposition, ReplacesHttpGet) {
     transfer = [](std::string &response) { response = R"({"keys": "from httpGet"})"; };
     AzureSSOClient client;
     Json::Value wellknown;
@@ -60,7 +60,7 @@ TEST(Interposition, HttpGetIsFoundByDiscoveryAndKeySet) {
     EXPECT_EQ(keys["keys"], "from httpGet");
 }
 
-TEST(Interposition, HttpPostIsFoundByTheTokenRequest) {
+TEST(Interposition, ReplacesHttpPost) {
     transfer = [](std::string &response) { response = R"({"id_token": "from httpPost"})"; };
     AzureSSOClient client;
     std::string response;
@@ -99,14 +99,14 @@ class FailingExchange : public testing::TestWithParam<Exchange> {
     AzureSSOClient client;
 };
 
-TEST_P(FailingExchange, AnInvalidArgumentIsOneLineAndGoesNoFurther) {
+TEST_P(FailingExchange, CatchesAndLogsInvalidArgument) {
     transfer = [](std::string &) { throw std::invalid_argument("the reason"); };
     GetParam().run(client);
     EXPECT_THAT(TakeSystemLogWithOwnTexts(),
                 testing::ElementsAre(LogLine{LOG_ERR, std::string(GetParam().source) + ":N the reason"}));
 }
 
-TEST_P(FailingExchange, AnyOtherExceptionGoesThroughUnlogged) {
+TEST_P(FailingExchange, PropagatesOtherExceptionsUnlogged) {
     transfer = [](std::string &) { throw std::domain_error("the reason"); };
     EXPECT_THROW(GetParam().run(client), std::domain_error);
     transfer = [](std::string &) { throw std::runtime_error("the reason"); };
@@ -119,6 +119,6 @@ TEST_P(FailingExchange, AnyOtherExceptionGoesThroughUnlogged) {
 INSTANTIATE_TEST_SUITE_P(, FailingExchange, testing::ValuesIn(kExchanges),
                          [](const auto &exchange) { return exchange.param.name; });
 
-TEST(Interposition, AGetterIsFoundByTheLogoutURL) { EXPECT_EQ(GetAzureSSOLogoutURL(""), "logout"); }
+TEST(Interposition, ReplacesGetter) { EXPECT_EQ(GetAzureSSOLogoutURL(""), "logout"); }
 
 }  // namespace

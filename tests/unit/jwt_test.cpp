@@ -30,42 +30,42 @@ const auto kRSAFailed = Fails<jwt_verify_failed>("verify rsa signature failed");
 const auto kHMACFailed = Fails<jwt_verify_failed>("verify hmac signature failed");
 const Failure &kVerified = kNothingThrown;
 
-class Parts : public Library {
+class JwtParsing : public Library {
   protected:
     static Json::Value HeaderOf(const std::string &part) { return Jwt(part + ".e30.c2ln").GetHeader(); }
     static Json::Value BodyOf(const std::string &part) { return Jwt("e30." + part + ".c2ln").GetBody(); }
 };
 
-TEST_F(Parts, ATokenOfOtherThanThreePartsIsRefused) {
+TEST_F(JwtParsing, RejectsTokenUnlessThreeParts) {
     for (const char *token : {"", "a", "a.b", "a.b.c.d", "...", "."}) {
         EXPECT_EQ(FailureOf([&] { Jwt jwt(token); }), kBadFormat) << token;
     }
 }
 
-TEST_F(Parts, ATokenOfAMillionPartsIsRefusedWithoutTakingItApart) {
+TEST_F(JwtParsing, RejectsMillionPartsWithoutSplitting) {
     const std::string token(1000000, '.');
     const MemoryLimit limit(2000000);
     EXPECT_EQ(FailureOf([&] { Jwt jwt(token); }), kBadFormat);
 }
 
-TEST_F(Parts, EmptyPartsAreAcceptedByTheConstructor) {
+TEST_F(JwtParsing, AcceptsEmptyPartsInConstructor) {
     EXPECT_EQ(Jwt("a..c").GetSignature(), "c");
     EXPECT_EQ(Jwt(".b.c").GetSignature(), "c");
     EXPECT_EQ(Jwt("a.b.").GetSignature(), "");
     EXPECT_EQ(Jwt("..").GetSignature(), "");
 }
 
-TEST_F(Parts, CharactersAreNotCheckedByTheConstructor) { EXPECT_EQ(Jwt("?!.\xff.\n ").GetSignature(), "\n "); }
+TEST_F(JwtParsing, AcceptsAnyCharactersInConstructor) { EXPECT_EQ(Jwt("?!.\xff.\n ").GetSignature(), "\n "); }
 
-TEST_F(Parts, TheSignatureIsHandedOutUndecoded) { EXPECT_EQ(Jwt("e30.e30.c2ln-_=").GetSignature(), "c2ln-_="); }
+TEST_F(JwtParsing, ReturnsSignatureUndecoded) { EXPECT_EQ(Jwt("e30.e30.c2ln-_=").GetSignature(), "c2ln-_="); }
 
-TEST_F(Parts, HeaderAndBodyAreDecodedAndParsed) {
+TEST_F(JwtParsing, DecodesHeaderAndBody) {
     Jwt jwt(Base64Url(R"({"alg": "RS256"})") + "." + Base64Url(R"({"sub": "alice"})") + ".");
     EXPECT_EQ(jwt.GetHeader(), Parse(R"({"alg": "RS256"})"));
     EXPECT_EQ(jwt.GetBody(), Parse(R"({"sub": "alice"})"));
 }
 
-TEST_F(Parts, AHeaderInBase64UrlAndInStandardBase64DecodesTheSame) {
+TEST_F(JwtParsing, AcceptsBase64AndBase64Url) {
     // {"a":"???>>~"} and a trailing blank: both special characters, and padding
     EXPECT_EQ(HeaderOf("eyJhIjoiPz8_Pj5-In0g"), Parse(R"({"a": "???>>~"})"));
     EXPECT_EQ(HeaderOf("eyJhIjoiPz8/Pj5+In0g"), Parse(R"({"a": "???>>~"})"));
@@ -73,39 +73,39 @@ TEST_F(Parts, AHeaderInBase64UrlAndInStandardBase64DecodesTheSame) {
     EXPECT_EQ(HeaderOf("eyJhIjoxfQ=="), Parse(R"({"a": 1})"));
 }
 
-TEST_F(Parts, AnyJSONValueIsReturned) {
+TEST_F(JwtParsing, ReturnsAnyJSONValue) {
     EXPECT_EQ(HeaderOf(Base64Url("[1, 2]")), Parse("[1, 2]"));
     EXPECT_EQ(HeaderOf(Base64Url("17")), Json::Value(17));
     EXPECT_EQ(BodyOf(Base64Url("\"text\"")), Json::Value("text"));
 }
 
-TEST_F(Parts, WhatIsNotJSONIsRefused) {
+TEST_F(JwtParsing, RejectsInvalidJSON) {
     for (const char *text : {"no JSON", "{", "{\"a\": 1", "\x01"}) {
         EXPECT_EQ(FailureOf([&] { HeaderOf(Base64Url(text)); }), kBadHeader) << text;
         EXPECT_EQ(FailureOf([&] { BodyOf(Base64Url(text)); }), kBadBody) << text;
     }
 }
 
-TEST_F(Parts, WhatIsNotBase64DecodesToNothingAndIsNotJSON) {
+TEST_F(JwtParsing, RejectsInvalidBase64AsInvalidJSON) {
     for (const char *part : {"!!!!", "A", "####", "\xff"}) {
         EXPECT_EQ(FailureOf([&] { HeaderOf(part); }), kBadHeader) << part;
         EXPECT_EQ(FailureOf([&] { BodyOf(part); }), kBadBody) << part;
     }
 }
 
-TEST_F(Parts, JSONNestedTooDeeplyIsNotJSON) {
+TEST_F(JwtParsing, RejectsDeeplyNestedJSON) {
     EXPECT_EQ(FailureOf([] { HeaderOf(Base64Url(std::string(2000, '['))); }), kBadHeader);
     EXPECT_EQ(FailureOf([] { BodyOf(Base64Url(std::string(2000, '['))); }), kBadBody);
 }
 
-TEST_F(Parts, AnEmptyPartIsAStandardLogicErrorAndNotTheFormatMessage) {
+TEST_F(JwtParsing, ThrowsLogicErrorForEmptyPart) {
     const std::string logicError = typeid(std::logic_error).name();
     EXPECT_EQ(FailureOf([] { HeaderOf(""); }).type, logicError);
     EXPECT_EQ(FailureOf([] { BodyOf(""); }).type, logicError);
     EXPECT_NE(FailureOf([] { HeaderOf(""); }).text, kBadHeader.text);
 }
 
-TEST_F(Parts, APartThatCannotBeDecodedForWantOfMemoryIsAStandardLogicError) {
+TEST_F(JwtParsing, ThrowsLogicErrorIfMemoryRunsOut) {
     for (const char *call : {"BIO_new", "BIO_new_mem_buf", "BIO_ctrl"}) {
         FailCall(call);
         EXPECT_EQ(FailureOf([] { HeaderOf("e30"); }).type, typeid(std::logic_error).name()) << call;
@@ -116,36 +116,36 @@ TEST_F(Parts, APartThatCannotBeDecodedForWantOfMemoryIsAStandardLogicError) {
     EXPECT_EQ(FailureOf([] { HeaderOf("e30"); }), kBadHeader);
 }
 
-TEST_F(Parts, DecodedBytesBehindANULAreIgnored) {
+TEST_F(JwtParsing, IgnoresDecodedBytesAfterNUL) {
     EXPECT_EQ(BodyOf(Base64Url(std::string("{\"a\": 1}\0 no JSON", 17))), Parse(R"({"a": 1})"));
     EXPECT_EQ(FailureOf([] { BodyOf(Base64Url(std::string("\0{}", 3))); }), kBadBody);
 }
 
-TEST_F(Parts, ANULInsideATextIsNotJSON) {
+TEST_F(JwtParsing, RejectsNULInsideString) {
     const std::string part = Base64Url(std::string("{\"a\": \"b\0c\"}", 12));
     EXPECT_EQ(FailureOf([&] { HeaderOf(part); }), kBadHeader);
     EXPECT_EQ(FailureOf([&] { BodyOf(part); }), kBadBody);
 }
 
-TEST_F(Parts, APartIsReadUpToItsNUL) {
+TEST_F(JwtParsing, ReadsPartUpToNUL) {
     EXPECT_EQ(HeaderOf(std::string("e30\0rest", 8)), Json::Value(Json::objectValue));
 }
 
-TEST_F(Parts, ReadingTwiceGivesEqualValues) {
+TEST_F(JwtParsing, ReturnsEqualValuesWhenReadTwice) {
     Jwt jwt("eyJhIjoxfQ.eyJiIjoyfQ.c2ln");
     EXPECT_EQ(jwt.GetHeader(), jwt.GetHeader());
     EXPECT_EQ(jwt.GetBody(), jwt.GetBody());
 }
 
-TEST_F(Parts, CommentsAreCollected) { EXPECT_TRUE(HeaderOf(Base64Url("// why\n{}")).hasComment(Json::commentBefore)); }
+TEST_F(JwtParsing, CollectsComments) { EXPECT_TRUE(HeaderOf(Base64Url("// why\n{}")).hasComment(Json::commentBefore)); }
 
-TEST_F(Parts, PartsOfEveryLengthAroundTheScratchSpaceAreReadWhole) {
+TEST_F(JwtParsing, ReadsPartsAroundBufferSize) {
     for (std::size_t size = 3040; size < 3090; ++size) {
         EXPECT_EQ(BodyOf(Base64Url("\"" + std::string(size, 'x') + "\"")), Json::Value(std::string(size, 'x')));
     }
 }
 
-TEST_F(Parts, LargePartsAreReadWhole) {
+TEST_F(JwtParsing, ReadsLargeParts) {
     for (const std::size_t size : {500u, 1024u, 3000u, 4092u, 100000u}) {
         Json::Value value;
         value["filler"] = std::string(size, 'x');
@@ -180,12 +180,12 @@ TEST_F(RSASignature, VerifiesWithItsKeyAndDigest) {
     EXPECT_EQ(e, eBefore);
 }
 
-TEST_F(RSASignature, FailsWithAnotherDigestAndOneLine) {
+TEST_F(RSASignature, LogsOneLineForAnotherDigest) {
     EXPECT_EQ(Verify(token, EVP_sha384()), kRSAFailed);
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(kFinalFailed)));
 }
 
-TEST_F(RSASignature, FailsWhenAnyCharacterOfHeaderOrBodyIsChanged) {
+TEST_F(RSASignature, FailsIfAnyCharacterChanges) {
     const std::size_t length = token.rfind('.');
     int tried = 0;
     for (std::size_t i = 0; i < length; ++i) {
@@ -200,7 +200,7 @@ TEST_F(RSASignature, FailsWhenAnyCharacterOfHeaderOrBodyIsChanged) {
     EXPECT_EQ(TakeSystemLog().size(), static_cast<std::size_t>(tried));
 }
 
-TEST_F(RSASignature, FailsWithoutALineWhenAPartDoesNotDecode) {
+TEST_F(RSASignature, FailsSilentlyIfPartIsNotBase64) {
     const std::string good = n;
     for (const char *part : {"", "!!!!", "####AQAB"}) {
         n = part;
@@ -214,7 +214,7 @@ TEST_F(RSASignature, FailsWithoutALineWhenAPartDoesNotDecode) {
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
-TEST_F(RSASignature, FailsWithOneLineForKeysThatAreNoKeys) {
+TEST_F(RSASignature, LogsOneLineForInvalidKey) {
     for (const auto &[modulus, exponent] : std::vector<std::pair<std::string, std::string>>{
              {"AQ", "AQAB"}, {"AA", "AQAB"}, {n, "AA"}, {n, "AQ"}, {n, "Ag"}, {n, n}, {n + n, "AQAB"}}) {
         EXPECT_EQ(FailureOf([&, m = modulus, x = exponent]() mutable { Jwt(token).JwtRSAVerify(m, x, EVP_sha256()); }),
@@ -223,13 +223,13 @@ TEST_F(RSASignature, FailsWithOneLineForKeysThatAreNoKeys) {
     }
 }
 
-TEST_F(RSASignature, EachPartIsReadUpToItsNUL) {
+TEST_F(RSASignature, ReadsEachPartUpToNUL) {
     const std::size_t dot = token.rfind('.');
     const std::string junk("\0junk", 5);
     EXPECT_EQ(Verify(token.substr(0, dot) + junk + token.substr(dot) + junk), kVerified);
 }
 
-TEST_F(RSASignature, PaddingOfTheSignaturePartIsAccepted) { EXPECT_EQ(Verify(token + "=="), kVerified); }
+TEST_F(RSASignature, AcceptsPadding) { EXPECT_EQ(Verify(token + "=="), kVerified); }
 
 struct FailingCall {
     const char *function;
@@ -244,7 +244,7 @@ std::string Named(const testing::TestParamInfo<FailingCall> &info) { return test
 
 class FailingRSACall : public RSASignature, public testing::WithParamInterface<FailingCall> {};
 
-TEST_P(FailingRSACall, FailsTheCheckAndLogsAsTold) {
+TEST_P(FailingRSACall, FailsVerificationAndLogsExpectedLine) {
     FailCall(GetParam().function, GetParam().call);
     EXPECT_EQ(Verify(token), kRSAFailed);
     if (GetParam().line != nullptr) {
@@ -291,24 +291,24 @@ class HMACSignature : public Library {
     static inline const std::string kSigningInput = "eyJhbGciOiJIUzI1NiJ9.eyJzdWIiOiJhbGljZSJ9";
 };
 
-TEST_F(HMACSignature, VerifiesUnderItsKeyWithEachDigest) {
+TEST_F(HMACSignature, VerifiesWithKeyAndEachDigest) {
     EXPECT_EQ(Verify(Sign("key"), "a2V5"), kVerified);
     EXPECT_EQ(Verify(Sign("key", EVP_sha384()), "a2V5", EVP_sha384()), kVerified);
     EXPECT_EQ(Verify(Sign("key", EVP_sha512()), "a2V5", EVP_sha512()), kVerified);
 }
 
-TEST_F(HMACSignature, TheKeyIsNotChanged) {
+TEST_F(HMACSignature, KeepsKeyUnchanged) {
     std::string key = "a2V5";
     Jwt(Sign("key")).JwtHMACVerify(key, EVP_sha256());
     EXPECT_EQ(key, "a2V5");
 }
 
-TEST_F(HMACSignature, FailsUnderAnotherKeyOrDigest) {
+TEST_F(HMACSignature, FailsWithAnotherKeyOrDigest) {
     EXPECT_EQ(Verify(Sign("key"), "a2V6"), kHMACFailed);
     EXPECT_EQ(Verify(Sign("key"), "a2V5", EVP_sha384()), kHMACFailed);
 }
 
-TEST_F(HMACSignature, FailsWhenAnyCharacterOfTheTokenIsChanged) {
+TEST_F(HMACSignature, FailsIfAnyCharacterChanges) {
     const std::string token = Sign("key");
     for (std::size_t i = 0; i < token.size(); ++i) {
         if (token[i] != '.') {
@@ -319,7 +319,7 @@ TEST_F(HMACSignature, FailsWhenAnyCharacterOfTheTokenIsChanged) {
     }
 }
 
-TEST_F(HMACSignature, FailsWithPaddingOrInStandardBase64) {
+TEST_F(HMACSignature, FailsWithPaddingOrStandardBase64) {
     EXPECT_EQ(Verify(Sign("key") + "=", "a2V5"), kHMACFailed);
     std::string standard;
     for (int i = 0; standard.empty(); ++i) {  // a signature in which both special characters stand
@@ -335,26 +335,26 @@ TEST_F(HMACSignature, FailsWithPaddingOrInStandardBase64) {
     }
 }
 
-TEST_F(HMACSignature, EachPartIsReadUpToItsNUL) {
+TEST_F(HMACSignature, ReadsEachPartUpToNUL) {
     const std::string token = Sign("key");
     const std::size_t dot = token.rfind('.');
     const std::string junk("\0junk", 5);
     EXPECT_EQ(Verify(token.substr(0, dot) + junk + token.substr(dot) + junk, "a2V5"), kVerified);
 }
 
-TEST_F(HMACSignature, FailsWithAnEmptyOrCutSignature) {
+TEST_F(HMACSignature, FailsIfEmptyOrTruncated) {
     EXPECT_EQ(Verify(kSigningInput + ".", "a2V5"), kHMACFailed);
     const std::string token = Sign("key");
     EXPECT_EQ(Verify(token.substr(0, token.size() - 1), "a2V5"), kHMACFailed);
 }
 
-TEST_F(HMACSignature, AKeyInStandardBase64AndInBase64UrlIsTheSame) {
+TEST_F(HMACSignature, AcceptsBase64AndBase64UrlKey) {
     const std::string secret = "\xfb\xff\xbf?>";
     EXPECT_EQ(Verify(Sign(secret), "+/+/Pz4="), kVerified);
     EXPECT_EQ(Verify(Sign(secret), "-_-_Pz4"), kVerified);
 }
 
-TEST_F(HMACSignature, AnEmptyKeyAndOneThatIsNotBase64AreRefused) {
+TEST_F(HMACSignature, RejectsEmptyOrUndecodableKey) {
     // Signed under the empty key, as anyone can.
     for (const char *key : {"", "!!!!", "!", "####a2V5"}) {
         EXPECT_EQ(Verify(Sign(""), key), kHMACFailed) << key;
@@ -363,7 +363,7 @@ TEST_F(HMACSignature, AnEmptyKeyAndOneThatIsNotBase64AreRefused) {
 
 class FailingHMACCall : public HMACSignature, public testing::WithParamInterface<FailingCall> {};
 
-TEST_P(FailingHMACCall, FailsTheCheckSilently) {
+TEST_P(FailingHMACCall, FailsVerificationSilently) {
     const std::string token = Sign("key");
     FailCall(GetParam().function, GetParam().call);
     EXPECT_EQ(Verify(token, "a2V5"), kHMACFailed);
@@ -383,7 +383,7 @@ INSTANTIATE_TEST_SUITE_P(, FailingHMACCall,
                                          FailingCall{"BIO_read", 2, nullptr}),
                          Named);
 
-TEST_F(RSASignature, LeavesTheHostsErrorQueueAsItWas) {
+TEST_F(RSASignature, KeepsErrorQueueOfHost) {
     TakeErrorQueue();
     ERR_raise(ERR_LIB_USER, 17);
     const std::string other = RSAKey().RS256Token(Parse("{}"), "key 1");
@@ -418,7 +418,7 @@ class PublishedVectors : public Library, public testing::WithParamInterface<Json
     }
 };
 
-TEST_P(PublishedVectors, VerifiesAsPrintedAndNotWithAChangedBody) {
+TEST_P(PublishedVectors, VerifyUnlessBodyChanges) {
     const std::string token = GetParam()["token"].asString();
     EXPECT_EQ(Verify(token), kVerified);
     EXPECT_EQ(Jwt(token).GetHeader()["alg"], GetParam()["alg"]);

@@ -28,17 +28,17 @@ class LoginEntry : public Library {
     std::string userName = "before";
 };
 
-TEST_F(LoginEntry, WithoutAProfileFileItCannotBeRead) {
+TEST_F(LoginEntry, FailsWithoutProfileFile) {
     EXPECT_EQ(Login(), Fails<sso_op_failed>("read profile file failed."));
     EXPECT_EQ(userName, "before");
 }
 
-TEST_F(LoginEntry, AProfileFileThatIsNotJSONCannotBeRead) {
+TEST_F(LoginEntry, FailsIfProfileFileIsNotJSON) {
     EXPECT_EQ(LoginWith("sso_enable=yes"), Fails<sso_op_failed>("read profile file failed."));
     EXPECT_EQ(LoginWith(""), Fails<sso_op_failed>("read profile file failed."));
 }
 
-TEST_F(LoginEntry, WithoutABooleanTrueSSOIsNotEnabled) {
+TEST_F(LoginEntry, RequiresEnableAsBooleanTrue) {
     const auto notEnabled = Fails<sso_op_failed>("sso does not enable.");
     EXPECT_EQ(LoginWith(R"({"sso_profile": "azure"})"), notEnabled);
     EXPECT_EQ(LoginWith(R"({"sso_enable": false, "sso_profile": "azure"})"), notEnabled);
@@ -47,14 +47,14 @@ TEST_F(LoginEntry, WithoutABooleanTrueSSOIsNotEnabled) {
     EXPECT_EQ(LoginWith(R"([true])"), notEnabled) << "a document that is no object has no members";
 }
 
-TEST_F(LoginEntry, WithoutAStringAsProfileNoneIsSpecified) {
+TEST_F(LoginEntry, RequiresProfileAsString) {
     const auto notSpecified = Fails<sso_op_failed>("not specify sso profile");
     EXPECT_EQ(LoginWith(R"({"sso_enable": true})"), notSpecified);
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": 5})"), notSpecified);
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": null})"), notSpecified);
 }
 
-TEST_F(LoginEntry, AnUnknownProfileIsThePlainSSOException) {
+TEST_F(LoginEntry, ThrowsPlainSSOExceptionForUnknownProfile) {
     const auto notSupported = Fails<sso_exception>("profile not support.");
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "Azure"})"), notSupported);
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": ""})"), notSupported);
@@ -62,13 +62,13 @@ TEST_F(LoginEntry, AnUnknownProfileIsThePlainSSOException) {
     EXPECT_EQ(LoginWith(R"({"sso_enable": true, "sso_profile": "azure\u0000"})"), notSupported);
 }
 
-TEST_F(LoginEntry, TheProfileIsReadWithTheIdsThatTheProcessHas) {
+TEST_F(LoginEntry, ReadsProfileWithoutRaisingIds) {
     SetEffectiveIDs(1024, 100);
     EXPECT_EQ(Login(), Fails<sso_op_failed>("read profile file failed."));
     EXPECT_THAT(TakeSetIDCalls(), testing::IsEmpty());
 }
 
-TEST_F(LoginEntry, TheProfileChoosesTheClientThatLogsIn) {
+TEST_F(LoginEntry, SelectsClientByProfile) {
     WriteFile(kAzureFile, R"({"azure_token_endpoint": "https://azure.example/token"})");
     WriteFile(kWebSphereFile, R"({"websphere_token_endpoint": "https://websphere.example/token"})");
     const auto noAnswer = Fails<std::invalid_argument>("parse json falied");
@@ -83,7 +83,7 @@ TEST_F(LoginEntry, TheProfileChoosesTheClientThatLogsIn) {
     EXPECT_EQ(userName, "before");
 }
 
-TEST_F(LoginEntry, TheCodeIsSentToTheTokenEndpoint) {
+TEST_F(LoginEntry, SendsCodeToTokenEndpoint) {
     LoginWith(R"({"sso_enable": true, "sso_profile": "azure"})");
     EXPECT_EQ(CurrentTransport().form,
               "client_id=&client_secret=&code=abc&grant_type=authorization_code&redirect_uri=");
@@ -94,52 +94,52 @@ class RelayURL : public Library {};
 
 constexpr char kPlainSuccess[] = "ssoclient/relay.html#success=true";
 
-TEST_F(RelayURL, SuccessWithoutStateAndReason) { EXPECT_EQ(GetSSORelayURL(true, "", ""), kPlainSuccess); }
+TEST_F(RelayURL, ReportsSuccessWithoutStateAndReason) { EXPECT_EQ(GetSSORelayURL(true, "", ""), kPlainSuccess); }
 
-TEST_F(RelayURL, SuccessDoesNotShowAReason) { EXPECT_EQ(GetSSORelayURL(true, "", "reason"), kPlainSuccess); }
+TEST_F(RelayURL, OmitsReasonOnSuccess) { EXPECT_EQ(GetSSORelayURL(true, "", "reason"), kPlainSuccess); }
 
-TEST_F(RelayURL, SuccessCarriesTheEncodedOrigin) {
+TEST_F(RelayURL, EncodesOriginOnSuccess) {
     EXPECT_EQ(GetSSORelayURL(true, Base64(R"({"origin": "/a page?b=c&d"})"), ""),
               "ssoclient/relay.html#origin=%2Fa%20page%3Fb%3Dc%26d&success=true");
 }
 
-TEST_F(RelayURL, AnEmptyOriginIsCarried) {
+TEST_F(RelayURL, IncludesEmptyOrigin) {
     EXPECT_EQ(GetSSORelayURL(true, Base64(R"({"origin": ""})"), ""), "ssoclient/relay.html#origin=&success=true");
 }
 
-TEST_F(RelayURL, AnOriginThatIsNoStringIsLeftOut) {
+TEST_F(RelayURL, OmitsNonStringOrigin) {
     for (const char *state : {R"({"origin": null})", R"({"origin": 5})", R"({"origin": ["/"]})", R"({})"}) {
         EXPECT_EQ(GetSSORelayURL(true, Base64(state), ""), kPlainSuccess) << state;
     }
 }
 
-TEST_F(RelayURL, AStateThatIsNoJSONObjectIsLeftOut) {
+TEST_F(RelayURL, IgnoresStateUnlessJSONObject) {
     for (const char *state : {"not JSON", "[]", "5", "\"text\"", R"({"origin": "/", )", "[[[[["}) {
         EXPECT_EQ(GetSSORelayURL(true, Base64(state), ""), kPlainSuccess) << state;
     }
 }
 
-TEST_F(RelayURL, AStateThatIsNotBase64IsLeftOut) {
+TEST_F(RelayURL, IgnoresStateUnlessBase64) {
     EXPECT_EQ(GetSSORelayURL(true, "{\"origin\": \"/\"}", ""), kPlainSuccess);
     EXPECT_EQ(GetSSORelayURL(true, "!!!!", ""), kPlainSuccess);
 }
 
-TEST_F(RelayURL, AStateThatDecodesToMoreThanTheBufferHoldsIsLeftOut) {
+TEST_F(RelayURL, IgnoresStateLargerThanBuffer) {
     EXPECT_EQ(GetSSORelayURL(true, Base64(R"({"origin": "/"})" + std::string(1010, ' ')), ""), kPlainSuccess);
 }
 
-TEST_F(RelayURL, AStateThatFillsTheBufferToItsLastByteIsReadNoFurther) {
+TEST_F(RelayURL, ReadsStateThatFillsBuffer) {
     const std::string state = R"({"origin": "/"})";
     EXPECT_EQ(GetSSORelayURL(true, Base64(state + std::string(1024 - state.size(), ' ')), ""),
               "ssoclient/relay.html#origin=%2F&success=true");
 }
 
-TEST_F(RelayURL, TheStateIsReadUpToItsFirstNUL) {
+TEST_F(RelayURL, ReadsStateUpToFirstNUL) {
     EXPECT_EQ(GetSSORelayURL(true, Base64(std::string("{\"origin\": \"/\"}\0no JSON", 23)), ""),
               "ssoclient/relay.html#origin=%2F&success=true");
 }
 
-TEST_F(RelayURL, TheDecoderIsGivenAZeroedBufferOf1024Bytes) {
+TEST_F(RelayURL, PassesZeroedBufferToDecoder) {
     Platform platform;
     platform.decode = [](const std::string &src, char *dst, std::size_t *length) {
         EXPECT_EQ(src, "the state");
@@ -154,12 +154,12 @@ TEST_F(RelayURL, TheDecoderIsGivenAZeroedBufferOf1024Bytes) {
     EXPECT_EQ(GetSSORelayURL(true, "the state", ""), "ssoclient/relay.html#origin=%2Fhere&success=true");
 }
 
-TEST_F(RelayURL, FailureWithoutReasonIsTheSameWhateverTheState) {
+TEST_F(RelayURL, IgnoresStateOnFailure) {
     EXPECT_EQ(GetSSORelayURL(false, "", ""), "ssoclient/relay.html#success=false");
     EXPECT_EQ(GetSSORelayURL(false, Base64(R"({"origin": "/"})"), ""), "ssoclient/relay.html#success=false");
 }
 
-TEST_F(RelayURL, AfterAFailureTheStateIsNotDecoded) {
+TEST_F(RelayURL, DoesNotDecodeStateOnFailure) {
     Platform platform;
     platform.decode = [](const std::string &, char *, std::size_t *) {
         ADD_FAILURE() << "decoded";
@@ -169,7 +169,7 @@ TEST_F(RelayURL, AfterAFailureTheStateIsNotDecoded) {
     GetSSORelayURL(false, "c3RhdGU=", "reason");
 }
 
-TEST_F(RelayURL, AReasonIsCopiedAsItStands) {
+TEST_F(RelayURL, CopiesReasonVerbatim) {
     EXPECT_EQ(GetSSORelayURL(false, "", "a & b # c%20d"), "ssoclient/relay.html#reason=a & b # c%20d&success=false");
 }
 

@@ -32,7 +32,7 @@ struct Buffer {
     std::vector<char> bytes;
 };
 
-TEST(PercentEncoding, LeavesUnreservedCharactersAndEscapesAllOthersInUpperCase) {
+TEST(PercentEncoding, EscapesAllButUnreservedCharacters) {
     for (int byte = 1; byte < 256; ++byte) {
         const char text[] = {static_cast<char>(byte), '\0'};
         Buffer buffer(3);
@@ -45,7 +45,7 @@ TEST(PercentEncoding, LeavesUnreservedCharactersAndEscapesAllOthersInUpperCase) 
     }
 }
 
-TEST(PercentEncoding, FillsTheUsableSizeAndNoMore) {
+TEST(PercentEncoding, WritesUpToUsableSize) {
     Buffer exact(6);
     EXPECT_EQ(TavoCgiURLEncode("a&bc", exact.bytes.data(), 6), 0);
     EXPECT_EQ(exact.Text(), "a%26bc");
@@ -55,14 +55,14 @@ TEST(PercentEncoding, FillsTheUsableSizeAndNoMore) {
     EXPECT_TRUE(small.Untouched());
 }
 
-TEST(PercentEncoding, OfTheEmptyTextIsEmpty) {
+TEST(PercentEncoding, AcceptsEmptyText) {
     Buffer buffer(0);
     EXPECT_EQ(TavoCgiURLEncode("", buffer.bytes.data(), 0), 0);
     EXPECT_EQ(buffer.Text(), "");
     EXPECT_TRUE(buffer.UntouchedFrom(1));
 }
 
-TEST(PercentEncoding, RefusesNullPointers) {
+TEST(PercentEncoding, RejectsNullPointers) {
     char byte = 0;
     EXPECT_NE(TavoCgiURLEncode(nullptr, &byte, 1), 0);
     EXPECT_NE(TavoCgiURLEncode("a", nullptr, 1), 0);
@@ -72,7 +72,7 @@ int Encode(const std::string &bytes, char *dst, std::size_t size) {
     return TLIBCBase64SzEncodeFull(bytes.data(), bytes.size(), dst, 1, size, 0, 1);
 }
 
-TEST(Base64, EncodesAsOpenSSLDoesOnOneLine) {
+TEST(Base64, EncodesLikeOpenSSLOnOneLine) {
     std::string bytes;
     for (int i = 0; i < 300; ++i) {
         std::string expected(4 * ((bytes.size() + 2) / 3), '\0');
@@ -85,7 +85,7 @@ TEST(Base64, EncodesAsOpenSSLDoesOnOneLine) {
     }
 }
 
-TEST(Base64, NeedsRoomForItsNUL) {
+TEST(Base64, RequiresRoomForNUL) {
     Buffer buffer(8);
     EXPECT_EQ(Encode("four", buffer.bytes.data(), 8), 0);
     EXPECT_TRUE(buffer.Untouched());
@@ -94,7 +94,7 @@ TEST(Base64, NeedsRoomForItsNUL) {
     EXPECT_TRUE(buffer.UntouchedFrom(9));
 }
 
-TEST(Base64, EncodingRefusesBadArguments) {
+TEST(Base64, RejectsInvalidArgumentsWhenEncoding) {
     char byte = 0;
     EXPECT_EQ(TLIBCBase64SzEncodeFull(nullptr, 1, &byte, 1, 1, 0, 1), 0);
     EXPECT_EQ(TLIBCBase64SzEncodeFull("", 0, nullptr, 1, 1, 0, 1), 0);
@@ -125,7 +125,7 @@ TEST(Base64, DecodesWhatItEncodes) {
     }
 }
 
-TEST(Base64, RefusesWhatIsNotTheOneTextOfItsBytes) {
+TEST(Base64, RejectsNonCanonicalText) {
     for (const std::string text : {"Zm9v\n", "Zm 9v", " Zm9v", "Zm9v ", "Zm9", "Zm8", "Zm8=Zm8=", "Zm9=", "Zh==",
                                    "====", "=", "Z===", "Zm8==", "Zm9v====", "Zm-_", "Zm9!", "Zm\xff=", "Zm9vZm9"}) {
         EXPECT_EQ(Decode(text), "refused") << text;
@@ -133,13 +133,13 @@ TEST(Base64, RefusesWhatIsNotTheOneTextOfItsBytes) {
     EXPECT_EQ(Decode(std::string("Zm9v\0Zm9", 8)), "refused");
 }
 
-TEST(Base64, DecodesIntoExactlyTheRoomThatThereIs) {
+TEST(Base64, DecodesIntoExactlySizedBuffer) {
     EXPECT_EQ(Decode("Zm9v", 3), "foo");
     EXPECT_EQ(Decode("Zm9v", 2), "refused");
     EXPECT_EQ(Decode("", 0), "");
 }
 
-TEST(Base64, DecodingRefusesBadArguments) {
+TEST(Base64, RejectsInvalidArgumentsWhenDecoding) {
     char byte = 0;
     std::size_t length = 1;
     EXPECT_EQ(TLIBCBase64Decode(nullptr, 4, &byte, &length), 0);
@@ -178,31 +178,31 @@ class DomainConversion : public testing::Test {
     }
 };
 
-TEST_F(DomainConversion, PutsTheNetBIOSNameInThePlaceOfTheDNSNameWithoutRegardToCase) {
+TEST_F(DomainConversion, ReplacesDNSNameIgnoringCase) {
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice"), "ACME\\alice");
     EXPECT_EQ(Convert("corp.Example.net\\Alice"), "ACME\\Alice");
     EXPECT_EQ(Convert("LAB.EXAMPLE.NET\\bob"), "LAB\\bob");
 }
 
-TEST_F(DomainConversion, KeepsTheUserAsItIs) {
+TEST_F(DomainConversion, KeepsUserUnchanged) {
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\a\\b c"), "ACME\\a\\b c");
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\\\"), "ACME\\\\");
 }
 
-TEST_F(DomainConversion, RefusesWhatTheTableDoesNotName) {
+TEST_F(DomainConversion, RejectsDomainMissingFromTable) {
     for (const char *domain :
          {"ELSEWHERE.EXAMPLE", "CORP", "CORP.EXAMPLE.NET.", "CORP.EXAMPLE.NET ", "NUMBER", "EMPTY"}) {
         EXPECT_EQ(Refusal(std::string(domain) + "\\alice"), UnknownDomain(domain));
     }
 }
 
-TEST_F(DomainConversion, RefusesANameWithoutADomainAndOneWithoutAUser) {
+TEST_F(DomainConversion, RequiresDomainAndUser) {
     EXPECT_EQ(Refusal("alice"), "platform:N name without a domain");
     EXPECT_EQ(Refusal(""), "platform:N name without a domain");
     EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\"), "platform:N name of domain 'CORP.EXAMPLE.NET' without a user");
 }
 
-TEST_F(DomainConversion, RefusesEverythingWithoutATable) {
+TEST_F(DomainConversion, RejectsAllNamesWithoutTable) {
     for (const char *table : {"", "[]", "{\"corp.example.net\": \"ACME\"", "5", "[5]"}) {
         WriteFile(kDomainTable, table);
         EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), UnknownDomain("CORP.EXAMPLE.NET")) << table;
@@ -213,18 +213,18 @@ TEST_F(DomainConversion, RefusesEverythingWithoutATable) {
     EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), UnknownDomain("CORP.EXAMPLE.NET")) << "a directory";
 }
 
-TEST_F(DomainConversion, RefusesEverythingWithATableThatIsNestedTooDeeply) {
+TEST_F(DomainConversion, RejectsAllNamesIfTableNestsTooDeeply) {
     WriteFile(kDomainTable, std::string(5000, '['));
     EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice"), "platform:N memory ran out, or domains.conf is nested too deeply");
 }
 
-TEST_F(DomainConversion, FillsTheUsableSizeAndNoMore) {
+TEST_F(DomainConversion, WritesUpToUsableSize) {
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice", 10), "ACME\\alice");
     EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice", 9), "platform:N name is too long for its buffer");
     EXPECT_EQ(Refusal("CORP.EXAMPLE.NET\\alice", 0), "platform:N name is too long for its buffer");
 }
 
-TEST_F(DomainConversion, RefusesNullPointers) {
+TEST_F(DomainConversion, RejectsNullPointers) {
     char byte = 0;
     EXPECT_LT(TAVOWinsUserNameFqdn2Netbios(nullptr, &byte, 1), 0);
     EXPECT_LT(TAVOWinsUserNameFqdn2Netbios("CORP.EXAMPLE.NET\\alice", nullptr, 1), 0);
@@ -232,12 +232,12 @@ TEST_F(DomainConversion, RefusesNullPointers) {
     EXPECT_THAT(TakeSystemLog(), testing::ElementsAre(line, line));
 }
 
-TEST_F(DomainConversion, LogsADomainOnOneLineWhateverItHolds) {
+TEST_F(DomainConversion, LogsAnyDomainOnOneLine) {
     EXPECT_EQ(Refusal("%s%n\n\t\x7f\xc3\xa9\\alice"), UnknownDomain("%s%n???\xc3\xa9"));
     EXPECT_EQ(Refusal(std::string(3000, 'a') + "\\alice"), UnknownDomain(std::string(255, 'a')));
 }
 
-TEST_F(DomainConversion, IsRefusedWhereMemoryRunsOut) {
+TEST_F(DomainConversion, FailsIfMemoryRunsOut) {
     const std::string name = "CORP.EXAMPLE.NET\\alice";
     int n = 1;
     for (bool ranOut = true; ranOut; ++n) {

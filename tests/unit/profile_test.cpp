@@ -33,14 +33,14 @@ class Profile : public Library {
     }
 };
 
-TEST_F(Profile, WithoutAFileItIsOffAndEmpty) {
+TEST_F(Profile, IsDisabledAndEmptyWithoutFile) {
     SSOProfile profile;
     EXPECT_FALSE(profile.SSOIsEnable());
     EXPECT_EQ(profile.GetSSOProfile(), "");
     ExpectEmptyClient(profile);
 }
 
-TEST_F(Profile, WithAMalformedFileItIsOffAndEmpty) {
+TEST_F(Profile, IsDisabledAndEmptyWithMalformedFile) {
     for (const char *file : {"", "{", "sso_enable", R"({"sso_enable": true, "sso_profile": "azure")", "[]", "true"}) {
         WriteFile(kProfileFile, file);
         SSOProfile profile;
@@ -50,7 +50,7 @@ TEST_F(Profile, WithAMalformedFileItIsOffAndEmpty) {
     }
 }
 
-TEST_F(Profile, EnableAsTheStringTrueIsFalse) {
+TEST_F(Profile, IgnoresEnableAsString) {
     WriteFile(kProfileFile, R"({"sso_enable": "true", "sso_profile": "azure"})");
     SSOProfile profile;
     EXPECT_FALSE(profile.SSOIsEnable());
@@ -58,7 +58,7 @@ TEST_F(Profile, EnableAsTheStringTrueIsFalse) {
     ExpectEmptyClient(profile);
 }
 
-TEST_F(Profile, AProfileThatIsNoStringIsEmptyAndNotSupported) {
+TEST_F(Profile, LogsNonStringProfileAsUnsupported) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": 1})");
     SSOProfile profile;
     EXPECT_TRUE(profile.SSOIsEnable());
@@ -66,7 +66,7 @@ TEST_F(Profile, AProfileThatIsNoStringIsEmptyAndNotSupported) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("profile:N Profile '' not support")));
 }
 
-TEST_F(Profile, ProfileNamesAreComparedExactly) {
+TEST_F(Profile, ComparesNamesExactly) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "Azure"})");
     SSOProfile profile;
     EXPECT_TRUE(profile.SSOIsEnable());
@@ -75,7 +75,7 @@ TEST_F(Profile, ProfileNamesAreComparedExactly) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("profile:N Profile 'Azure' not support")));
 }
 
-TEST_F(Profile, SwitchedOffNoClientIsConstructed) {
+TEST_F(Profile, ConstructsNoClientIfDisabled) {
     WriteFile(kProfileFile, R"({"sso_enable": false, "sso_profile": "azure"})");
     SetEffectiveIDs(0, 100);
     SSOProfile profile;
@@ -86,7 +86,7 @@ TEST_F(Profile, SwitchedOffNoClientIsConstructed) {
         << "the client's own file must not be read";
 }
 
-TEST_F(Profile, TheAzureProfileCarriesThatClientsSettings) {
+TEST_F(Profile, CopiesSettingsOfAzureClient) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure", "other": {}})");
     SSOProfile profile;
     EXPECT_TRUE(profile.SSOIsEnable());
@@ -103,7 +103,7 @@ TEST_F(Profile, TheAzureProfileCarriesThatClientsSettings) {
     EXPECT_EQ(client->GetToken(), "");
 }
 
-TEST_F(Profile, TheWebSphereProfileCarriesThatClientsSettingsSwitchedOff) {
+TEST_F(Profile, CopiesSettingsOfDisabledWebSphereClient) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "websphere"})");
     SSOProfile profile;
     EXPECT_TRUE(profile.SSOIsEnable());
@@ -111,7 +111,7 @@ TEST_F(Profile, TheWebSphereProfileCarriesThatClientsSettingsSwitchedOff) {
     EXPECT_FALSE(profile.GetSSOClient()->isEnable());
 }
 
-TEST_F(Profile, ItsClientCannotLogIn) {
+TEST_F(Profile, ReturnsClientThatCannotLogIn) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure"})");
     SSOProfile profile;
     std::string userName;
@@ -119,7 +119,7 @@ TEST_F(Profile, ItsClientCannotLogIn) {
               Fails<sso_not_implemented>("GetIDTokenReqParams not implemented"));
 }
 
-TEST_F(Profile, TheFileIsReadOnceAtConstruction) {
+TEST_F(Profile, ReadsFileOnceAtConstruction) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure"})");
     SSOProfile profile;
     WriteFile(kProfileFile, R"({"sso_enable": false})");
@@ -127,14 +127,14 @@ TEST_F(Profile, TheFileIsReadOnceAtConstruction) {
     EXPECT_EQ(profile.GetSSOProfile(), "azure");
 }
 
-TEST_F(Profile, AnExceptionOfTheClientsConstructorPassesThrough) {
+TEST_F(Profile, PropagatesExceptionOfClientConstructor) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "websphere"})");
     WriteFile(kWebSphereFile, R"({"websphere_client_id": ")" + std::string(100000, 'x') + "\"}");
     const MemoryLimit limit(50000);
     EXPECT_THROW(SSOProfile(), std::bad_alloc);
 }
 
-TEST_F(Profile, ItsClientIsAlwaysTheSameAndItsOwn) {
+TEST_F(Profile, AlwaysReturnsSameClient) {
     SSOProfile profile;
     EXPECT_NE(profile.GetSSOClient(), nullptr);
     EXPECT_EQ(profile.GetSSOClient(), profile.GetSSOClient());

@@ -36,14 +36,14 @@ class RootPrivilege : public Library {
     int errno_ = 0;
 };
 
-TEST_F(RootPrivilege, ARootProcessMakesNoCallAndWritesNoLine) {
+TEST_F(RootPrivilege, ChangesAndLogsNothingAsRoot) {
     ReadAs(0, 0);
     EXPECT_THAT(TakeSetIDCalls(), IsEmpty());
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
     EXPECT_EQ(errno_, 0);
 }
 
-TEST_F(RootPrivilege, Group100OfUserRootIsRaisedWithOneWarningAndRestoredWithNone) {
+TEST_F(RootPrivilege, LogsRaiseButNotRestoreOfGroup) {
     ReadAs(0, 100);
     EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresgid(-1, 100, -1)"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)")));
@@ -51,7 +51,7 @@ TEST_F(RootPrivilege, Group100OfUserRootIsRaisedWithOneWarningAndRestoredWithNon
     EXPECT_EQ(errno_, 0);
 }
 
-TEST_F(RootPrivilege, User1024Group100IsRaisedGroupFirstAndRestoredByWayOfUser0) {
+TEST_F(RootPrivilege, RaisesGroupFirstAndRestoresThroughUser0) {
     ReadAs(1024, 100);
     EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)",
                                               "setresgid(-1, 100, -1)", "setresuid(-1, 1024, -1)"));
@@ -63,14 +63,14 @@ TEST_F(RootPrivilege, User1024Group100IsRaisedGroupFirstAndRestoredByWayOfUser0)
     EXPECT_EQ(errno_, 0);
 }
 
-TEST_F(RootPrivilege, User1024OfGroup0IsRaisedAndRestoredWithoutTouchingTheGroup) {
+TEST_F(RootPrivilege, KeepsGroup0WhenRaisingUser) {
     ReadAs(1024, 0);
     EXPECT_THAT(TakeSetIDCalls(),
                 ElementsAre("setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 1024, -1)"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresuid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)")));
 }
 
-TEST_F(RootPrivilege, WhenTheGroupCannotBeRaisedTheUserIsNotTriedAndErrnoIs1) {
+TEST_F(RootPrivilege, KeepsUserIfGroupCannotBeRaised) {
     ReadAs(1024, 100, 1);
     EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthError("setresgid(-1, 0, -1) [Operation not permitted]"),
@@ -79,7 +79,7 @@ TEST_F(RootPrivilege, WhenTheGroupCannotBeRaisedTheUserIsNotTriedAndErrnoIs1) {
     EXPECT_EQ(errno_, 0) << "nothing had changed, so there was nothing to restore";
 }
 
-TEST_F(RootPrivilege, WhenTheUserCannotBeRaisedTheGroupIsRestored) {
+TEST_F(RootPrivilege, RestoresGroupIfUserCannotBeRaised) {
     ReadAs(1024, 100, 2);
     EXPECT_THAT(TakeSetIDCalls(),
                 ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresgid(-1, 100, -1)"));
@@ -90,7 +90,7 @@ TEST_F(RootPrivilege, WhenTheUserCannotBeRaisedTheGroupIsRestored) {
     EXPECT_EQ(EffectiveGID(), 100u);
 }
 
-TEST_F(RootPrivilege, WhenTheReturnToUser0FailsNothingIsRestored) {
+TEST_F(RootPrivilege, RestoresNothingIfReturnToUser0Fails) {
     ReadAs(1024, 100, 3);
     EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)"),
@@ -99,7 +99,7 @@ TEST_F(RootPrivilege, WhenTheReturnToUser0FailsNothingIsRestored) {
     EXPECT_EQ(errno_, 1);
 }
 
-TEST_F(RootPrivilege, WhenTheGroupCannotBeRestoredTheUserIsNotTried) {
+TEST_F(RootPrivilege, KeepsUserIfGroupCannotBeRestored) {
     ReadAs(1024, 100, 4);
     EXPECT_THAT(TakeSetIDCalls(), ElementsAre("setresgid(-1, 0, -1)", "setresuid(-1, 0, -1)", "setresuid(-1, 0, -1)",
                                               "setresgid(-1, 100, -1)"));
@@ -110,7 +110,7 @@ TEST_F(RootPrivilege, WhenTheGroupCannotBeRestoredTheUserIsNotTried) {
     EXPECT_EQ(errno_, 1);
 }
 
-TEST_F(RootPrivilege, WhenTheUserCannotBeRestoredTheLineTellsItsId) {
+TEST_F(RootPrivilege, LogsIdIfUserCannotBeRestored) {
     ReadAs(1024, 100, 5);
     EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthWarning("setresgid(-1, 0, -1)"), AuthWarning("setresuid(-1, 0, -1)"),
                                              AuthWarning("setresuid(-1, 0, -1)"),
@@ -119,7 +119,7 @@ TEST_F(RootPrivilege, WhenTheUserCannotBeRestoredTheLineTellsItsId) {
     EXPECT_EQ(errno_, 1);
 }
 
-TEST_F(RootPrivilege, AnErrorOfWhichTheSystemHasNoTextIsToldByItsNumber) {
+TEST_F(RootPrivilege, LogsNumberOfUnknownError) {
     WriteFile(kAzureFile, "{}");
     SetEffectiveIDs(0, 100);
     FailSetID(1, 9999);
@@ -128,7 +128,7 @@ TEST_F(RootPrivilege, AnErrorOfWhichTheSystemHasNoTextIsToldByItsNumber) {
                 ElementsAre(AuthError("setresgid(-1, 0, -1) [Unknown error 9999]"), AuthError("ENTERCriticalSection")));
 }
 
-TEST_F(RootPrivilege, TheFileIsOpenedForThisProcessAloneAndClosed) {
+TEST_F(RootPrivilege, ClosesFileAndSetsCloseOnExec) {
     const auto openFiles = [] {
         const std::filesystem::directory_iterator files("/proc/self/fd");
         return std::distance(begin(files), end(files));
@@ -140,7 +140,7 @@ TEST_F(RootPrivilege, TheFileIsOpenedForThisProcessAloneAndClosed) {
     EXPECT_EQ(ModeAtOpen(), "re") << "a program that the caller executes must not inherit the secrets";
 }
 
-TEST_F(RootPrivilege, WhatWasReadIsOverwritten) {
+TEST_F(RootPrivilege, OverwritesBuffersAfterReading) {
     TakeCleansed();
     ReadAs(0, 0);
     const std::vector<std::string> cleansed = TakeCleansed();
@@ -150,7 +150,7 @@ TEST_F(RootPrivilege, WhatWasReadIsOverwritten) {
         << "the buffer it was read by";
 }
 
-TEST_F(RootPrivilege, WantOfMemoryInTheReadPassesThroughAfterTheIdsAreRestored) {
+TEST_F(RootPrivilege, RestoresIdsIfMemoryRunsOut) {
     WriteFile(kAzureFile, R"({"azure_client_id": ")" + std::string(100000, 'x') + "\"}");
     SetEffectiveIDs(1024, 100);
     {
@@ -162,7 +162,7 @@ TEST_F(RootPrivilege, WantOfMemoryInTheReadPassesThroughAfterTheIdsAreRestored) 
     EXPECT_EQ(TakeSystemLog().size(), 3u);
 }
 
-TEST_F(RootPrivilege, TheLinesCarryTheNameOfTheSourceThatReads) {
+TEST_F(RootPrivilege, LogsNameOfReadingSource) {
     const auto sourceOf = [](auto construct) {
         SetEffectiveIDs(0, 100);
         construct();

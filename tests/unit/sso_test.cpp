@@ -73,7 +73,7 @@ struct SteppingClient : SSOClient {
     std::size_t failingStep = 0;
 };
 
-TEST_F(ClientBase, StartsSwitchedOffAndEmpty) {
+TEST_F(ClientBase, StartsDisabledAndEmpty) {
     Client fresh;
     EXPECT_FALSE(fresh.isEnable());
     for (const std::string &text : {fresh.GetClientID(), fresh.GetClientSecret(), fresh.GetRedirectURI(),
@@ -83,7 +83,7 @@ TEST_F(ClientBase, StartsSwitchedOffAndEmpty) {
     }
 }
 
-TEST_F(ClientBase, EachGetterGivesItsField) {
+TEST_F(ClientBase, ReturnsEachFieldFromItsGetter) {
     client.enable = true;
     client.clientID = "id";
     client.clientSecret = "made-up";
@@ -104,14 +104,14 @@ TEST_F(ClientBase, EachGetterGivesItsField) {
     EXPECT_EQ(client.GetLogoutEndpoint(), "logout");
 }
 
-TEST_F(ClientBase, TheSettersSetTheirFields) {
+TEST_F(ClientBase, StoresValuesOfSetters) {
     client.SetRedirectURI("elsewhere");
     client.SetCode("abc");
     EXPECT_EQ(client.GetRedirectURI(), "elsewhere");
     EXPECT_EQ(client.code, "abc");
 }
 
-TEST_F(ClientBase, TheDiscoveryDocumentIsFetchedVerifiedAndParsed) {
+TEST_F(ClientBase, FetchesAndParsesDiscoveryDocument) {
     CurrentTransport().answers[kWellknown] = {CURLE_OK, {R"({"jwks_uri":)", R"( "keys" /* a comment */})"}};
     client.RequestWellknownInfo(out);
     EXPECT_EQ(out["jwks_uri"].asString(), "keys");
@@ -121,14 +121,14 @@ TEST_F(ClientBase, TheDiscoveryDocumentIsFetchedVerifiedAndParsed) {
     }
 }
 
-TEST_F(ClientBase, AnUnreachableDiscoveryURLIsOneLineAndLeavesOutNull) {
+TEST_F(ClientBase, ReturnsNullIfDiscoveryIsUnreachable) {
     client.wellknownEndpoint = "https://nobody.example/";
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N " + ::Test::kNotConnected)));
 }
 
-TEST_F(ClientBase, ADiscoveryDocumentThatIsNotJSONIsOneLineAndLeavesOutNull) {
+TEST_F(ClientBase, ReturnsNullIfDiscoveryIsNotJSON) {
     CurrentTransport().answers[kWellknown] = Whole("<html>not found</html>");
     out["jwks_uri"] = "of another time";
     client.RequestWellknownInfo(out);
@@ -136,21 +136,21 @@ TEST_F(ClientBase, ADiscoveryDocumentThatIsNotJSONIsOneLineAndLeavesOutNull) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N bad wellknown json format.")));
 }
 
-TEST_F(ClientBase, ATruncatedDiscoveryDocumentGivesNoEndpoint) {
+TEST_F(ClientBase, ReturnsNullIfDiscoveryIsTruncated) {
     CurrentTransport().answers[kWellknown] = Whole(R"({"jwks_uri": "https://provider.example/keys", "iss)");
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N bad wellknown json format.")));
 }
 
-TEST_F(ClientBase, ADiscoveryDocumentNestedTooDeeplyHasFailedToParse) {
+TEST_F(ClientBase, ReturnsNullIfDiscoveryIsNestedTooDeeply) {
     CurrentTransport().answers[kWellknown] = Whole(std::string(100000, '['));
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N bad wellknown json format.")));
 }
 
-TEST_F(ClientBase, DiscoveryWithoutATransferHandleIsOneLine) {
+TEST_F(ClientBase, LogsOneLineForDiscoveryWithoutTransferHandle) {
     CurrentTransport().noHandle = true;
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
@@ -160,7 +160,7 @@ TEST_F(ClientBase, DiscoveryWithoutATransferHandleIsOneLine) {
     EXPECT_THAT(log[0].text, testing::StartsWith("sso:N bad_alloc. "));
 }
 
-TEST_F(ClientBase, WhereverMemoryRunsOutTheDiscoveryDocumentIsThereWholeOrNotAtAll) {
+TEST_F(ClientBase, KeepsNoPartialDiscoveryIfMemoryRunsOut) {
     const std::string document = R"({"a": {"b": [1, 2]}, "jwks_uri": "https://provider.example/keys", "z": true})";
     CurrentTransport().answers[kWellknown] = Whole(document);
     const Json::Value whole = Parse(document);
@@ -177,7 +177,7 @@ TEST_F(ClientBase, WhereverMemoryRunsOutTheDiscoveryDocumentIsThereWholeOrNotAtA
     EXPECT_THAT(TakeSystemLog(), testing::Each(testing::Field(&LogLine::text, testing::StartsWith("sso:N "))));
 }
 
-TEST_F(ClientBase, TheRequestsBodyIsOverwrittenAfterALogin) {
+TEST_F(ClientBase, OverwritesRequestBodyAfterLogin) {
     struct SecretClient : SteppingClient {
         std::string GetIDTokenReqParams() override { return "client_secret=a+secret+that+is+long+enough"; }
     } stepping;
@@ -187,14 +187,14 @@ TEST_F(ClientBase, TheRequestsBodyIsOverwrittenAfterALogin) {
     EXPECT_THAT(TakeCleansed(), testing::Contains("client_secret=a+secret+that+is+long+enough"));
 }
 
-TEST_F(ClientBase, AnEarlierCodeIsOverwritten) {
+TEST_F(ClientBase, OverwritesEarlierCode) {
     client.SetCode("the first of two codes");
     TakeCleansed();
     client.SetCode("the second of two codes");
     EXPECT_THAT(TakeCleansed(), testing::Contains("the first of two codes"));
 }
 
-TEST_F(ClientBase, TheTokenRequestIsPostedAndItsAnswerAppended) {
+TEST_F(ClientBase, PostsTokenRequestAndAppendsAnswer) {
     CurrentTransport().answers[kToken] = {CURLE_OK, {"one ", "two"}};
     response = "earlier ";
     client.RequestTokenEndpoint(response, "a=b");
@@ -202,21 +202,21 @@ TEST_F(ClientBase, TheTokenRequestIsPostedAndItsAnswerAppended) {
     EXPECT_EQ(CurrentTransport().form, "a=b");
 }
 
-TEST_F(ClientBase, AFailedTokenRequestIsOneLineAndReturnsWithWhatArrived) {
+TEST_F(ClientBase, LogsFailedTokenRequestAndKeepsPartialAnswer) {
     CurrentTransport().answers[kToken] = {CURLE_PARTIAL_FILE, {"half an ans"}};
     client.RequestTokenEndpoint(response, "a=b");
     EXPECT_EQ(response, "half an ans");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N request token uri Transferred a partial file.")));
 }
 
-TEST_F(ClientBase, AnUnreachableTokenEndpointReturnsWithAnEmptyResponse) {
+TEST_F(ClientBase, ReturnsEmptyResponseIfTokenEndpointIsUnreachable) {
     client.tokenEndpoint = "https://nobody.example/";
     client.RequestTokenEndpoint(response, "a=b");
     EXPECT_EQ(response, "");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N request token uri " + ::Test::kNotConnected + ".")));
 }
 
-TEST_F(ClientBase, ATokenRequestWithoutATransferHandleIsOneLine) {
+TEST_F(ClientBase, LogsOneLineForTokenRequestWithoutHandle) {
     CurrentTransport().noHandle = true;
     client.RequestTokenEndpoint(response, "a=b");
     const auto log = TakeSystemLog();
@@ -225,13 +225,13 @@ TEST_F(ClientBase, ATokenRequestWithoutATransferHandleIsOneLine) {
     EXPECT_THAT(log[0].text, testing::StartsWith("sso:N bad_alloc. "));
 }
 
-TEST_F(ClientBase, AChunkIsCutAtItsNULWhileTheWholeOfItIsTaken) {
+TEST_F(ClientBase, CutsEachChunkAtFirstNUL) {
     CurrentTransport().answers[kToken] = {CURLE_OK, {std::string("ab\0cd", 5), "ef", std::string("\0gh", 3), "i"}};
     client.RequestTokenEndpoint(response, "a=b");
     EXPECT_EQ(response, "abefi");
 }
 
-TEST_F(ClientBase, TheBaseStepsAreNotImplemented) {
+TEST_F(ClientBase, ThrowsNotImplementedFromBaseSteps) {
     std::string userName = "before";
     EXPECT_EQ(FailureOf([&] { client.VerifyIDToken(); }), Fails<sso_not_implemented>("VerifyIDToken not implemented"));
     EXPECT_EQ(FailureOf([&] { client.GetIDTokenReqParams(); }),
@@ -243,7 +243,7 @@ TEST_F(ClientBase, TheBaseStepsAreNotImplemented) {
     EXPECT_EQ(userName, "before");
 }
 
-TEST_F(ClientBase, ALoginOnThePlainBaseStoresTheCodeAndFailsAtTheRequest) {
+TEST_F(ClientBase, FailsLoginAfterStoringCode) {
     std::string userName = "before";
     EXPECT_EQ(FailureOf([&] { client.OpenIDConnectLogin("abc", userName); }),
               Fails<sso_not_implemented>("GetIDTokenReqParams not implemented"));
@@ -252,7 +252,7 @@ TEST_F(ClientBase, ALoginOnThePlainBaseStoresTheCodeAndFailsAtTheRequest) {
     EXPECT_THAT(CurrentTransport().calls, testing::IsEmpty());
 }
 
-TEST_F(ClientBase, ALoginRunsItsSixStepsInTheirOrder) {
+TEST_F(ClientBase, RunsSixStepsOfLoginInOrder) {
     SteppingClient stepping;
     std::string userName = "before";
     stepping.OpenIDConnectLogin("abc", userName);
@@ -261,7 +261,7 @@ TEST_F(ClientBase, ALoginRunsItsSixStepsInTheirOrder) {
     EXPECT_EQ(userName, "the user");
 }
 
-TEST_F(ClientBase, AnExceptionOfAStepEndsTheLoginUnchanged) {
+TEST_F(ClientBase, KeepsUserNameIfStepThrows) {
     for (std::size_t failing = 1; failing <= 6; ++failing) {
         SteppingClient stepping;
         stepping.failingStep = failing;

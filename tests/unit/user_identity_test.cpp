@@ -26,25 +26,25 @@ class UserIdentity : public Identity<Client> {
 using Clients = testing::Types<AzureClient, WebSphereClient>;
 TYPED_TEST_SUITE(UserIdentity, Clients);
 
-TYPED_TEST(UserIdentity, WithoutATokenThereIsNone) {
+TYPED_TEST(UserIdentity, RequiresToken) {
     EXPECT_THAT(this->FailuresOf(""), testing::Each(Fails<std::invalid_argument>("please request a id_token first.")));
 }
 
-TYPED_TEST(UserIdentity, ATokenOfOtherThanThreePartsIsRefused) {
+TYPED_TEST(UserIdentity, RejectsTokenUnlessThreeParts) {
     EXPECT_THAT(this->FailuresOf("a.b"), testing::Each(Fails<std::invalid_argument>("bad jwt format!")));
 }
 
-TYPED_TEST(UserIdentity, ABodyThatIsNotJSONIsRefused) {
+TYPED_TEST(UserIdentity, RejectsBodyUnlessJSON) {
     EXPECT_THAT(this->FailuresOf("e30." + Base64Url("no JSON") + ".c2ln"),
                 testing::Each(Fails<std::invalid_argument>("bad jwt body format!")));
 }
 
-TYPED_TEST(UserIdentity, AnEmptyBodyIsAStandardLogicError) {
+TYPED_TEST(UserIdentity, ThrowsLogicErrorForEmptyBody) {
     EXPECT_THAT(this->FailuresOf("e30..c2ln"),
                 testing::Each(testing::Field(&Failure::type, typeid(std::logic_error).name())));
 }
 
-TYPED_TEST(UserIdentity, AllClaimsAreTheDecodedBodyUnverified) {
+TYPED_TEST(UserIdentity, ReturnsAllClaimsUnverified) {
     this->client.token = "no header." + Base64Url(R"({"sub": "1", "exp": 1, "list": [1]})") + ".no signature";
     Json::Value claims;
     this->client.GetUserInfo(claims);

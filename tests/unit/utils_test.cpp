@@ -29,7 +29,7 @@ std::size_t Append(char *data, std::size_t size, std::size_t count, void *respon
 
 class Transfer : public Library {};
 
-TEST_F(Transfer, AGetSetsURLFunctionAndDataInThisOrderAndNothingElse) {
+TEST_F(Transfer, SetsExactOptionsForGet) {
     CurrentTransport().answers[kURL] = Whole("answer");
     std::string response;
     httpGet(kURL, response, true, Append);
@@ -41,7 +41,7 @@ TEST_F(Transfer, AGetSetsURLFunctionAndDataInThisOrderAndNothingElse) {
                     "curl_easy_cleanup", "curl_global_cleanup"));
 }
 
-TEST_F(Transfer, APostSetsURLFieldsFunctionAndDataInThisOrderAndNothingElse) {
+TEST_F(Transfer, SetsExactOptionsForPost) {
     CurrentTransport().answers[kURL] = Whole("answer");
     std::string response;
     httpPost(kURL, "a=b&c=%20", response, true, Append);
@@ -54,14 +54,14 @@ TEST_F(Transfer, APostSetsURLFieldsFunctionAndDataInThisOrderAndNothingElse) {
                     "curl_global_cleanup"));
 }
 
-TEST_F(Transfer, AnEmptyBodyIsStillAPost) {
+TEST_F(Transfer, SetsEmptyBodyForPost) {
     CurrentTransport().answers[kURL] = Whole("");
     std::string response;
     httpPost(kURL, "", response, true, Append);
     EXPECT_THAT(CurrentTransport().calls, testing::Contains("curl_easy_setopt CURLOPT_POSTFIELDS "));
 }
 
-TEST_F(Transfer, WithoutVerificationTheHostCheckGoesBeforeThePeerCheckAndBehindTheRest) {
+TEST_F(Transfer, DisablesHostCheckBeforePeerCheck) {
     CurrentTransport().answers[kURL] = Whole("");
     std::string response;
     httpGet(kURL, response, false, Append);
@@ -78,7 +78,7 @@ TEST_F(Transfer, WithoutVerificationTheHostCheckGoesBeforeThePeerCheckAndBehindT
                                                                  "curl_easy_setopt CURLOPT_SSL_VERIFYPEER 0"}));
 }
 
-TEST_F(Transfer, AFailedTransferThrowsLibcurlsTextAfterCleaningUp) {
+TEST_F(Transfer, ThrowsLibcurlTextAfterCleanup) {
     CurrentTransport().answers[kURL] = {CURLE_PEER_FAILED_VERIFICATION, {}};
     std::string response;
     EXPECT_EQ(FailureOf([&] { httpGet(kURL, response, true, Append); }),
@@ -90,7 +90,7 @@ TEST_F(Transfer, AFailedTransferThrowsLibcurlsTextAfterCleaningUp) {
               (std::vector<std::string>{"curl_easy_perform", "curl_easy_cleanup", "curl_global_cleanup"}));
 }
 
-TEST_F(Transfer, WithoutAHandleBadAllocIsThrownAndLibcurlCleanedUp) {
+TEST_F(Transfer, ThrowsBadAllocWithoutHandleAfterCleanup) {
     CurrentTransport().noHandle = true;
     std::string response;
     EXPECT_THROW(httpGet(kURL, response, true, Append), std::bad_alloc);
@@ -100,7 +100,7 @@ TEST_F(Transfer, WithoutAHandleBadAllocIsThrownAndLibcurlCleanedUp) {
                             "curl_global_init 3", "curl_easy_init", "curl_easy_cleanup", "curl_global_cleanup"));
 }
 
-TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
+TEST_F(Transfer, LeavesResponseToCallback) {
     CurrentTransport().answers[kURL] = Whole("answer");
     std::string response = "earlier ";
     httpGet(kURL, response, true, Append);
@@ -109,15 +109,15 @@ TEST_F(Transfer, TheResponseIsTheCallbacksAffair) {
 
 class Encoding : public Library {};
 
-TEST_F(Encoding, URLEncodePercentEncodesWhatIsNotUnreserved) {
+TEST_F(Encoding, EscapesAllButUnreservedCharacters) {
     EXPECT_EQ(URLEncode("https://a.example/b?c=d e&f"), "https%3A%2F%2Fa.example%2Fb%3Fc%3Dd%20e%26f");
     EXPECT_EQ(URLEncode("A-z_0.9~"), "A-z_0.9~");
     EXPECT_EQ(URLEncode(""), "");
 }
 
-TEST_F(Encoding, AValueOfWhichEveryByteIsEscapedFits) { EXPECT_EQ(URLEncode("&=\xc3\xa4"), "%26%3D%C3%A4"); }
+TEST_F(Encoding, EscapesEveryByteOfValue) { EXPECT_EQ(URLEncode("&=\xc3\xa4"), "%26%3D%C3%A4"); }
 
-TEST_F(Encoding, TheEncoderIsGivenThreeTimesTheLengthAsUsableSize) {
+TEST_F(Encoding, PassesThreeTimesTheLengthToEncoder) {
     Platform platform;
     platform.urlEncode = [](const char *src, char *dst, std::size_t size) {
         EXPECT_EQ(size, 3 * std::strlen(src));
@@ -130,7 +130,7 @@ TEST_F(Encoding, TheEncoderIsGivenThreeTimesTheLengthAsUsableSize) {
     EXPECT_EQ(URLEncode(std::string(1000, 'a')), std::string(3000, 'x'));
 }
 
-TEST_F(Encoding, AValueThatTheEncoderRefusesStaysAsItIs) {
+TEST_F(Encoding, ReturnsValueUnchangedIfEncoderFails) {
     Platform platform;
     platform.urlEncode = [](const char *, char *dst, std::size_t) {
         *dst = 'x';
@@ -140,37 +140,37 @@ TEST_F(Encoding, AValueThatTheEncoderRefusesStaysAsItIs) {
     EXPECT_EQ(URLEncode("a b"), "a b");
 }
 
-TEST_F(Encoding, WithoutMemoryTheValueStaysAsItIs) {
+TEST_F(Encoding, ReturnsValueUnchangedWithoutMemory) {
     FailCall("calloc");
     EXPECT_EQ(URLEncode("a b"), "a b");
 }
 
-TEST_F(Encoding, AnyResultOfTheEncoderButZeroIsAFailure) {
+TEST_F(Encoding, TreatsNonZeroResultOfEncoderAsFailure) {
     Platform platform;
     platform.urlEncode = [](const char *, char *, std::size_t) { return 1; };
     ReplacePlatform(platform);
     EXPECT_EQ(URLEncode("a b"), "a b");
 }
 
-TEST_F(Encoding, URLEncodeSeesTheTextUpToItsNUL) { EXPECT_EQ(URLEncode(std::string("a b\0c d", 7)), "a%20b"); }
+TEST_F(Encoding, EncodesUpToFirstNUL) { EXPECT_EQ(URLEncode(std::string("a b\0c d", 7)), "a%20b"); }
 
-TEST_F(Encoding, TheEncodedTextIsOverwrittenBeforeItsMemoryIsReleased) {
+TEST_F(Encoding, OverwritesEncodedTextBeforeRelease) {
     TakeCleansed();
     URLEncode("a secret");
     EXPECT_THAT(TakeCleansed(), Contains(testing::StartsWith("a%20secret")));
 }
 
-TEST_F(Encoding, TheMD5DigestOfTheEmptyStringIsTheStandardOne) {
+TEST_F(Encoding, ComputesStandardMD5Digests) {
     EXPECT_EQ(MD5Digest(""), "d41d8cd98f00b204e9800998ecf8427e");
     EXPECT_EQ(MD5Digest("message digest"), "f96b697d7cb7938d525a2f31aaf161d0");
 }
 
-TEST_F(Encoding, TheMD5DigestIsOverTheBytesBehindANULToo) {
+TEST_F(Encoding, IncludesBytesAfterNULInMD5) {
     EXPECT_EQ(MD5Digest(std::string("\0", 1)), "93b885adfe0da089cdf634904fd59f71");
     EXPECT_NE(MD5Digest(std::string("a\0b", 3)), MD5Digest("a"));
 }
 
-TEST_F(Encoding, MD5DigestLeavesTheHostsErrorQueueAsItWas) {
+TEST_F(Encoding, KeepsErrorQueueOfHostInMD5) {
     const auto hostFails = [] { ERR_raise(ERR_LIB_USER, 1); };
     ERR_clear_error();
     hostFails();
@@ -180,7 +180,7 @@ TEST_F(Encoding, MD5DigestLeavesTheHostsErrorQueueAsItWas) {
     EXPECT_EQ(TakeErrorQueue(), before);
 }
 
-TEST_F(Encoding, AFailedMD5GivesTheEmptyStringAndOneLine) {
+TEST_F(Encoding, LogsFailedMD5AndReturnsEmptyString) {
     ERR_clear_error();
     FailCall("MD5");
     errno = EPERM;
@@ -189,7 +189,7 @@ TEST_F(Encoding, AFailedMD5GivesTheEmptyStringAndOneLine) {
     EXPECT_EQ(TakeErrorQueue(), std::vector<std::string>());
 }
 
-TEST_F(Encoding, WithoutMemoryMD5DigestGivesTheEmptyStringAndOneLine) {
+TEST_F(Encoding, LogsFailedAllocationInMD5) {
     FailCall("calloc");
     EXPECT_EQ(MD5Digest("text"), "");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("utils:N calloc failed. Cannot allocate memory")));

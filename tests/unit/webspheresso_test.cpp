@@ -34,7 +34,7 @@ class WebSphereConfiguration : public Library {
     }
 };
 
-TEST_F(WebSphereConfiguration, EachKeyFillsItsFieldAndNoneSwitchesItOn) {
+TEST_F(WebSphereConfiguration, ReadsEachKeyAndStaysDisabled) {
     WebSphereClient client = ReadFrom(R"({
         "websphere_wellknown": "the wellknown",
         "websphere_client_id": "the id",
@@ -56,26 +56,26 @@ TEST_F(WebSphereConfiguration, EachKeyFillsItsFieldAndNoneSwitchesItOn) {
     EXPECT_EQ(client.GetToken(), "");
 }
 
-TEST_F(WebSphereConfiguration, AClientIDThatIsANumberStaysEmptyWhileTheRestIsRead) {
+TEST_F(WebSphereConfiguration, IgnoresNumericClientID) {
     WebSphereClient client = ReadFrom(R"({"websphere_client_id": 5, "websphere_redirect_uri": "the redirect"})");
     EXPECT_EQ(client.GetClientID(), "");
     EXPECT_EQ(client.GetRedirectURI(), "the redirect");
 }
 
-TEST_F(WebSphereConfiguration, AMissingOrMalformedFileLeavesAllEmptyAndNoLine) {
+TEST_F(WebSphereConfiguration, StaysEmptySilentlyForMalformedFile) {
     EXPECT_EQ(AllFieldsOf({}), "");
     for (const char *file : {"", "{", "[]", "5", R"({"websphere_client_id": "the id")"}) {
         EXPECT_EQ(AllFieldsOf(ReadFrom(file)), "") << file;
     }
 }
 
-TEST_F(WebSphereConfiguration, ARootProcessChangesNoIds) {
+TEST_F(WebSphereConfiguration, ChangesNoIdsAsRoot) {
     SetEffectiveIDs(0, 0);
     ReadFrom("{}");
     EXPECT_THAT(TakeSetIDCalls(), testing::IsEmpty());
 }
 
-TEST_F(WebSphereConfiguration, TheFileIsReadOnceAtConstruction) {
+TEST_F(WebSphereConfiguration, ReadsFileOnceAtConstruction) {
     WebSphereClient client = ReadFrom(R"({"websphere_client_id": "first"})");
     WriteFile(kWebSphereFile, R"({"websphere_client_id": "second"})");
     EXPECT_EQ(client.GetClientID(), "first");
@@ -83,7 +83,7 @@ TEST_F(WebSphereConfiguration, TheFileIsReadOnceAtConstruction) {
 
 class WebSphereTokenResponse : public Library {};
 
-TEST_F(WebSphereTokenResponse, AnErrorAnswerIsReportedByTheMissingTokenAlone) {
+TEST_F(WebSphereTokenResponse, ReportsErrorOnlyAsMissingToken) {
     WebSphereClient client;
     client.token = "earlier";
     EXPECT_EQ(FailureOf([&] { client.ProcessTokenResponse(R"({"error": "invalid_grant"})"); }),
@@ -91,7 +91,7 @@ TEST_F(WebSphereTokenResponse, AnErrorAnswerIsReportedByTheMissingTokenAlone) {
     EXPECT_EQ(client.GetToken(), "");
 }
 
-TEST_F(WebSphereTokenResponse, AnErrorBesideATokenIsIgnored) {
+TEST_F(WebSphereTokenResponse, IgnoresErrorNextToToken) {
     WebSphereClient client;
     client.ProcessTokenResponse(R"({"error": "invalid_grant", "id_token": "h.b.s"})");
     EXPECT_EQ(client.GetToken(), "h.b.s");
@@ -137,12 +137,12 @@ class WebSphereVerification : public Library {
     Json::Value claims;
 };
 
-TEST_F(WebSphereVerification, ATokenUnderTheSecretVerifiesAgainAndAgain) {
+TEST_F(WebSphereVerification, VerifiesSameTokenTwice) {
     EXPECT_EQ(Verify(), kVerified);
     EXPECT_EQ(FailureOf([this] { client.VerifyIDToken(); }), kVerified);
 }
 
-TEST_F(WebSphereVerification, HS384AndHS512VerifyWithTheirDigests) {
+TEST_F(WebSphereVerification, VerifiesHS384AndHS512) {
     header["alg"] = "HS384";
     EXPECT_EQ(Verify(EVP_sha384()), kVerified);
     header["alg"] = "HS512";
@@ -150,24 +150,24 @@ TEST_F(WebSphereVerification, HS384AndHS512VerifyWithTheirDigests) {
     EXPECT_EQ(Verify(EVP_sha256()), kBadSignature);
 }
 
-TEST_F(WebSphereVerification, WithoutATokenThereIsNothingToVerify) {
+TEST_F(WebSphereVerification, RejectsEmptyToken) {
     EXPECT_EQ(VerifyToken(""), Fails<std::invalid_argument>("token cannot be empty"));
 }
 
-TEST_F(WebSphereVerification, AMalformedTokenIsRefusedAsMalformed) {
+TEST_F(WebSphereVerification, RejectsMalformedToken) {
     EXPECT_EQ(VerifyToken("a.b.c.d"), Fails<std::invalid_argument>("bad jwt format!"));
     EXPECT_EQ(VerifyToken("bm8.e30.c2ln"), Fails<std::invalid_argument>("bad jwt header format!"));
     EXPECT_EQ(VerifyToken("e30.bm8.c2ln"), Fails<std::invalid_argument>("bad jwt body format!"));
     EXPECT_EQ(VerifyToken("e30..c2ln").type, typeid(std::logic_error).name());
 }
 
-TEST_F(WebSphereVerification, ATokenThatExpiresThisSecondPassesAndOneSecondEarlierFails) {
+TEST_F(WebSphereVerification, AcceptsTokenExpiringInThisSecond) {
     EXPECT_EQ(Verify(), kVerified);
     claims["exp"] = static_cast<Json::Int64>(kNow - 1);
     EXPECT_EQ(Verify(), kExpired);
 }
 
-TEST_F(WebSphereVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
+TEST_F(WebSphereVerification, TreatsUnreadableExpiryAsExpired) {
     for (const char *exp : {"null", "\"\"", "\"soon\"", "[1700000000]", "{}", "-1"}) {
         claims["exp"] = Parse(std::string("[") + exp + "]")[0];
         EXPECT_EQ(Verify(), kExpired) << exp;
@@ -176,7 +176,7 @@ TEST_F(WebSphereVerification, AnExpiryThatIsMissingOrUnreadableIsPast) {
     EXPECT_EQ(Verify(), kExpired);
 }
 
-TEST_F(WebSphereVerification, ExpiryComesBeforeAudienceAndAudienceBeforeAlgorithm) {
+TEST_F(WebSphereVerification, ChecksExpiryThenAudienceThenAlgorithm) {
     claims["aud"] = "another";
     header["alg"] = "none";
     EXPECT_EQ(Verify(), kWrongAudience);
@@ -184,7 +184,7 @@ TEST_F(WebSphereVerification, ExpiryComesBeforeAudienceAndAudienceBeforeAlgorith
     EXPECT_EQ(Verify(), kExpired);
 }
 
-TEST_F(WebSphereVerification, TheAudienceIsComparedExactlyAndAListIsRefused) {
+TEST_F(WebSphereVerification, ComparesAudienceExactlyAndRejectsList) {
     for (const char *audience : {"\"The id\"", "\"the id \"", "null", "[\"the id\"]", "{\"the id\": 1}"}) {
         claims["aud"] = Parse(std::string("[") + audience + "]")[0];
         EXPECT_EQ(Verify(), kWrongAudience) << audience;
@@ -194,48 +194,48 @@ TEST_F(WebSphereVerification, TheAudienceIsComparedExactlyAndAListIsRefused) {
     EXPECT_EQ(Verify(), kWrongAudience) << "a list is no empty text";
 }
 
-TEST_F(WebSphereVerification, AnotherAlgorithmIsNotSupported) {
+TEST_F(WebSphereVerification, RejectsOtherAlgorithms) {
     for (const char *algorithm : {"RS256", "none", "hs256", "HS256 ", "HS1", ""}) {
         header["alg"] = algorithm;
         EXPECT_EQ(Verify(), Fails<jwt_not_support>(std::string(algorithm) + " algorithm is not supported"));
     }
 }
 
-TEST_F(WebSphereVerification, AMissingAlgorithmIsNamedByABlank) {
+TEST_F(WebSphereVerification, ReportsMissingAlgorithmAsEmptyName) {
     header.removeMember("alg");
     EXPECT_EQ(Verify(), Fails<jwt_not_support>(" algorithm is not supported"));
 }
 
-TEST_F(WebSphereVerification, TheAlgorithmIsLookedAtBeforeTheSecret) {
+TEST_F(WebSphereVerification, ChecksAlgorithmBeforeSecret) {
     client.clientSecret = std::string(766, 'x');
     header["alg"] = "none";
     EXPECT_EQ(Verify(), Fails<jwt_not_support>("none algorithm is not supported"));
 }
 
-TEST_F(WebSphereVerification, AnotherSecretIsABadSignature) {
+TEST_F(WebSphereVerification, RejectsAnotherSecret) {
     client.clientSecret = "another";
     EXPECT_EQ(Verify(), kBadSignature);
 }
 
-TEST_F(WebSphereVerification, AnEmptySecretIsABadSignatureEvenForATokenSignedUnderIt) {
+TEST_F(WebSphereVerification, RejectsTokenSignedWithEmptySecret) {
     client.clientSecret = "";
     EXPECT_EQ(Verify(EVP_sha256(), ""), kBadSignature);
 }
 
-TEST_F(WebSphereVerification, ASecretOf765BytesFitsAndOneMoreFails) {
+TEST_F(WebSphereVerification, AcceptsSecretUpTo765Bytes) {
     client.clientSecret = std::string(765, '\xff');
     EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kVerified);
     client.clientSecret += '\xff';
     EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kNotEncoded);
 }
 
-TEST_F(WebSphereVerification, TheSecretsBytesAreTheKeyNULIncluded) {
+TEST_F(WebSphereVerification, UsesAllBytesOfSecretAsKey) {
     client.clientSecret = std::string("a\0b", 3);
     EXPECT_EQ(Verify(EVP_sha256(), client.clientSecret), kVerified);
     EXPECT_EQ(Verify(EVP_sha256(), "a"), kBadSignature);
 }
 
-TEST_F(WebSphereVerification, TheEncoderIsGivenAZeroedBufferOf1024BytesAndItsFlags) {
+TEST_F(WebSphereVerification, PassesZeroedBufferAndFlagsToEncoder) {
     Platform platform;
     platform.encode = [](const std::string &src, char *dst, int flag1, std::size_t size, int flag2, int flag3) {
         EXPECT_EQ(src.size(), 7u);
@@ -268,7 +268,7 @@ INSTANTIATE_TEST_SUITE_P(, WebSphereSecret,
                                     (std::get<1>(row.param) ? "GoodSignature" : "BadSignature");
                          });
 
-TEST_P(WebSphereSecret, IsOverwrittenInEachFormWhateverTheSignature) {
+TEST_P(WebSphereSecret, IsOverwrittenInEachForm) {
     const auto &[algorithm, isGood] = GetParam();
     client.clientSecret = "a secret that is long enough";
     header["alg"] = algorithm;
@@ -290,7 +290,7 @@ TEST_P(WebSphereSecret, IsOverwrittenInEachFormWhateverTheSignature) {
     EXPECT_THAT(cleansed, testing::Contains(testing::StartsWith(signature))) << "the text of the MAC";
 }
 
-TEST_F(WebSphereVerification, ATokenWithAKidNeedsNoKeySet) {
+TEST_F(WebSphereVerification, IgnoresKid) {
     header["kid"] = "key 1";
     EXPECT_EQ(Verify(), kVerified);
 }
@@ -299,17 +299,17 @@ class WebSphereIdentity : public Identity<WebSphereClient> {};
 
 const Failure &kNamed = kNothingThrown;
 
-TEST_F(WebSphereIdentity, TheNameIsTheSubjectUnchangedAndEmailIsNotConsulted) {
+TEST_F(WebSphereIdentity, ReturnsSubjectUnchangedAndIgnoresEmail) {
     EXPECT_EQ(NameOf(R"({"sub": " Alice@Corp ", "email": "bob@corp.example.net"})"), kNamed);
     EXPECT_EQ(userName, " Alice@Corp ");
 }
 
-TEST_F(WebSphereIdentity, AnEmptySubjectIsAccepted) {
+TEST_F(WebSphereIdentity, AcceptsEmptySubject) {
     EXPECT_EQ(NameOf(R"({"sub": ""})"), kNamed);
     EXPECT_EQ(userName, "");
 }
 
-TEST_F(WebSphereIdentity, WithoutAStringSubjectTheNameCannotBeFoundAndIsUnchanged) {
+TEST_F(WebSphereIdentity, RequiresStringSubject) {
     const auto notFound = Fails<std::invalid_argument>("cannot find the user name!");
     for (const char *claims : {R"({"sub": 5})", R"({"sub": null})", R"({"email": "bob@corp"})", "[\"sub\"]", "5"}) {
         EXPECT_EQ(NameOf(claims), notFound) << claims;

@@ -88,7 +88,7 @@ class Disposition {
     struct sigaction before_ = {};
 };
 
-class Question : public testing::Test {
+class WinbindLookup : public testing::Test {
   protected:
     void SetUp() override {
         RemoveFiles();
@@ -123,20 +123,20 @@ class Question : public testing::Test {
     std::ptrdiff_t descriptors_ = 0;
 };
 
-TEST_F(Question, GivesTheNameAsTheDirectorySpellsIt) {
+TEST_F(WinbindLookup, ReturnsNameInSpellingOfDirectory) {
     EXPECT_EQ(Convert(), "ACME\\alice");
     EXPECT_EQ(Convert("Corp.Example.Net"), "ACME\\alice");
     EXPECT_EQ(forks, 2);
 }
 
-TEST_F(Question, IsNotAskedAboutADomainOfTheTableNorAboutNone) {
+TEST_F(WinbindLookup, SkipsDomainsInTableAndEmptyDomain) {
     WriteFile(kDomainTable, R"({"corp.example.net": "TABLE"})");
     EXPECT_EQ(Convert(), "TABLE\\alice");
     EXPECT_EQ(Convert(""), "does not know it");
     EXPECT_EQ(forks, 0);
 }
 
-TEST_F(Question, TakesTheAnswerForTheDNSNameThatWasAskedForAlone) {
+TEST_F(WinbindLookup, RequiresAnswerForRequestedDNSName) {
     EXPECT_EQ(Convert("ACME"), "does not know it");
     EXPECT_EQ(Convert("CORP"), "does not know it");
     answer = [](const char *domain, struct wbcDomainInfo &information) {
@@ -153,7 +153,7 @@ TEST_F(Question, TakesTheAnswerForTheDNSNameThatWasAskedForAlone) {
     EXPECT_EQ(Convert(), "does not know it");
 }
 
-TEST_F(Question, TakesNoAnswerWithoutANameOrWithOneThatIsNone) {
+TEST_F(WinbindLookup, RejectsAnswerWithEmptyOrOverlongName) {
     answer = [](const char *domain, struct wbcDomainInfo &information) {
         AnswerACME(domain, information);
         shortName[0] = '\0';
@@ -174,7 +174,7 @@ TEST_F(Question, TakesNoAnswerWithoutANameOrWithOneThatIsNone) {
     EXPECT_EQ(Convert(std::string(255, 'a')), "does not know it");
 }
 
-TEST_F(Question, TellsEachFailureOfLibwbclient) {
+TEST_F(WinbindLookup, LogsEachFailureOfLibwbclient) {
     answer = [](const char *, struct wbcDomainInfo &) { return WBC_ERR_DOMAIN_NOT_FOUND; };
     EXPECT_EQ(Convert(), "does not know it");
     answer = [](const char *, struct wbcDomainInfo &) { return WBC_ERR_WINBIND_NOT_AVAILABLE; };
@@ -183,7 +183,7 @@ TEST_F(Question, TellsEachFailureOfLibwbclient) {
     EXPECT_EQ(Convert(), "cannot be asked: WBC_ERR_NO_MEMORY");
 }
 
-TEST_F(Question, FailsWithoutAPipeOrAChildAndTellsWhy) {
+TEST_F(WinbindLookup, LogsFailureOfPipeAndFork) {
     pipeError = EMFILE;
     EXPECT_EQ(Convert(), "cannot be asked: Too many open files");
     EXPECT_EQ(forks, 0);
@@ -192,7 +192,7 @@ TEST_F(Question, FailsWithoutAPipeOrAChildAndTellsWhy) {
     EXPECT_EQ(Convert(), "cannot be asked: Resource temporarily unavailable");
 }
 
-TEST_F(Question, EndsUnansweredWhereTheChildCrashes) {
+TEST_F(WinbindLookup, FailsIfChildCrashes) {
     answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { _exit(0); };
     EXPECT_EQ(Convert(), "does not answer");
     answer = [](const char *, struct wbcDomainInfo &) -> wbcErr {
@@ -204,12 +204,12 @@ TEST_F(Question, EndsUnansweredWhereTheChildCrashes) {
 
 // No clock is looked at in these: without its alarm the child would wait for ever, and the test with it.
 
-TEST_F(Question, EndsByTheChildsAlarm) {
+TEST_F(WinbindLookup, FailsAfterAlarmOfChild) {
     answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForEver(); };
     EXPECT_EQ(Convert(), "does not answer");
 }
 
-TEST_F(Question, EndsByTheChildsAlarmWhereTheHostCatchesAndBlocksItsOwn) {
+TEST_F(WinbindLookup, FailsAfterAlarmEvenIfHostBlocksSignal) {
     const Disposition caught(SIGALRM, Ignore);
     sigset_t alarms;
     sigset_t before;
@@ -221,13 +221,13 @@ TEST_F(Question, EndsByTheChildsAlarmWhereTheHostCatchesAndBlocksItsOwn) {
     pthread_sigmask(SIG_SETMASK, &before, nullptr);
 }
 
-TEST_F(Question, LeavesTheHostsOwnAlarmAlone) {
+TEST_F(WinbindLookup, KeepsAlarmOfHost) {
     alarm(1000);
     EXPECT_EQ(Convert(), "ACME\\alice");
     EXPECT_GT(alarm(0), 0U);
 }
 
-TEST_F(Question, IsAnsweredWhereTheHostHasItsChildrenCollected) {
+TEST_F(WinbindLookup, SucceedsIfHostReapsChildren) {
     {
         const Disposition ignored(SIGCHLD, SIG_IGN);
         EXPECT_EQ(Convert(), "ACME\\alice");
@@ -241,7 +241,7 @@ TEST_F(Question, IsAnsweredWhereTheHostHasItsChildrenCollected) {
     }
 }
 
-TEST_F(Question, IsAnsweredWhereTheHostIsInterruptedWhileItWaits) {
+TEST_F(WinbindLookup, SucceedsIfSignalsInterruptHost) {
     const Disposition caught(SIGUSR1, Ignore);
     answer = [](const char *domain, struct wbcDomainInfo &information) {
         for (int i = 0; i < 20; ++i) {
@@ -252,7 +252,7 @@ TEST_F(Question, IsAnsweredWhereTheHostIsInterruptedWhileItWaits) {
     EXPECT_EQ(Convert(), "ACME\\alice");
 }
 
-TEST_F(Question, IsNotTurnedByTheEnvironment) {
+TEST_F(WinbindLookup, IgnoresEnvironment) {
     setenv("_NO_WINBINDD", "1", 1);
     answer = [](const char *domain, struct wbcDomainInfo &information) {
         return std::getenv("_NO_WINBINDD") == nullptr && std::getenv("PATH") == nullptr
@@ -264,7 +264,7 @@ TEST_F(Question, IsNotTurnedByTheEnvironment) {
     unsetenv("_NO_WINBINDD");
 }
 
-TEST_F(Question, LeavesNoDescriptorToAProgramThatTheHostStarts) {
+TEST_F(WinbindLookup, LeaksNoDescriptorToProgramsOfHost) {
     static std::ptrdiff_t before;
     before = DescriptorsForPrograms();
     answer = [](const char *domain, struct wbcDomainInfo &information) {
@@ -273,7 +273,7 @@ TEST_F(Question, LeavesNoDescriptorToAProgramThatTheHostStarts) {
     EXPECT_EQ(Convert(), "ACME\\alice");
 }
 
-TEST_F(Question, RunsNothingOfTheHostsEndInTheChild) {
+TEST_F(WinbindLookup, RunsNoExitHandlersInChild) {
     static pid_t host;
     host = getpid();
     std::atexit([] {

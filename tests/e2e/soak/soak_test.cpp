@@ -140,7 +140,7 @@ void Print(const Figures &first, const Figures &last) {
           static_cast<double>(*last.Descriptors().rbegin()));
 }
 
-TEST_F(Soak, LeavesTheHostAsItWas) {
+TEST_F(Soak, LeavesHostUnchanged) {
     for (int n = 0; n < kWarmUp; ++n) {
         LogIn(n);
         ASSERT_FALSE(HasFailure()) << "login " << n << " of the warm-up";

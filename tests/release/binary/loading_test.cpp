@@ -65,7 +65,7 @@ std::ptrdiff_t CountFiles() {
 
 std::size_t HeapInUse() { return mallinfo2().uordblks; }
 
-TEST(Loading, AThousandTimesLeavesNothingBehind) {
+TEST(Loading, LeaksNothingInThousandRounds) {
     // Loaded and unloaded by itself, libcurl loses 50 bytes each time.
     ASSERT_NE(dlopen("libcurl.so.4", RTLD_NOW), nullptr);
     // The dynamic loader's own tables have grown to their size after some loadings.
@@ -100,7 +100,7 @@ TEST(Loading, WritesNothing) {
     EXPECT_EQ(WEXITSTATUS(status), EXIT_SUCCESS);
 }
 
-TEST(Loading, WouldHaveEndedHadItWrittenAnything) {
+TEST(Loading, IsKilledOnWrite) {
     for (auto *write : {
              +[] { std::ofstream("/tmp/file") << "text" << std::flush; },
              +[] { std::ofstream("/dev/null", std::ios::app); },

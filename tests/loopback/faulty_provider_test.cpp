@@ -47,7 +47,7 @@ Outcome UnknownKey() { return Refused<std::invalid_argument>("kid does not exist
 
 LogLine KeyRequestLogged(const std::string &text) { return Error("azuresso:N request wellknown uri " + text + "."); }
 
-class SickProvider : public ::testing::TestWithParam<IllnessCase> {
+class FaultyProvider : public ::testing::TestWithParam<IllnessCase> {
   protected:
     static void PlaySick(Provider &provider, const std::string &document) {
         provider.Play([document](Connection &connection) { GetParam().illness(connection, document); });
@@ -97,7 +97,7 @@ class SickProvider : public ::testing::TestWithParam<IllnessCase> {
     }
 };
 
-TEST_P(SickProvider, DecidesTheLogin) {
+TEST_P(FaultyProvider, YieldsExpectedOutcome) {
     for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
         SCOPED_TRACE("token endpoint, " + Name(profile));
         FallIllAtTheTokenEndpoint(profile);
@@ -321,12 +321,12 @@ std::vector<IllnessCase> Codings() {
 
 std::string NameOfIllness(const ::testing::TestParamInfo<IllnessCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(Connection, SickProvider, ValuesIn(Connections()), NameOfIllness);
-INSTANTIATE_TEST_SUITE_P(Length, SickProvider, ValuesIn(Lengths()), NameOfIllness);
-INSTANTIATE_TEST_SUITE_P(Header, SickProvider, ValuesIn(Headers()), NameOfIllness);
-INSTANTIATE_TEST_SUITE_P(Coding, SickProvider, ValuesIn(Codings()), NameOfIllness);
+INSTANTIATE_TEST_SUITE_P(Connection, FaultyProvider, ValuesIn(Connections()), NameOfIllness);
+INSTANTIATE_TEST_SUITE_P(Length, FaultyProvider, ValuesIn(Lengths()), NameOfIllness);
+INSTANTIATE_TEST_SUITE_P(Header, FaultyProvider, ValuesIn(Headers()), NameOfIllness);
+INSTANTIATE_TEST_SUITE_P(Coding, FaultyProvider, ValuesIn(Codings()), NameOfIllness);
 
-TEST(AChunk, CountsUpToItsFirstNULWhereverThatIs) {
+TEST(ChunkedAnswer, ReadsEachChunkUpToFirstNUL) {
     Provider provider(Profile::kAzure);
     const std::string document = R"({"jwks_uri": ")" + provider.URL("/keys") + "\"}";
     for (std::size_t i = 0; i <= document.size(); ++i) {
@@ -338,7 +338,7 @@ TEST(AChunk, CountsUpToItsFirstNULWhereverThatIs) {
     }
 }
 
-TEST(AnAnswer, MayBe200MBLong) {
+TEST(LargeAnswer, Accepts200MB) {
     constexpr std::size_t kBlanks = std::size_t{200} << 20;
     Provider provider(Profile::kWebSphere);
     const std::string document = TokenResponse(Token(Profile::kWebSphere));
@@ -383,16 +383,16 @@ class Redirect : public ::testing::Test {
     Provider provider_{Profile::kAzure};
 };
 
-TEST_F(Redirect, OfTheTokenEndpointIsNotFollowed) {
+TEST_F(Redirect, IsNotFollowedAtTokenEndpoint) {
     ExpectNotFollowed({}, Refused<std::invalid_argument>("parse json falied"), {});
 }
 
-TEST_F(Redirect, OfTheDiscoveryDocumentIsNotFollowed) {
+TEST_F(Redirect, IsNotFollowedAtDiscoveryDocument) {
     ExpectNotFollowed({token_}, UnknownKey(),
                       {Error("sso:N bad wellknown json format."), KeyRequestLogged(TextOf(CURLE_URL_MALFORMAT))});
 }
 
-TEST_F(Redirect, OfTheKeySetIsNotFollowed) {
+TEST_F(Redirect, IsNotFollowedAtKeySet) {
     ExpectNotFollowed({token_, R"({"jwks_uri": "$BASE/keys"})"}, UnknownKey(),
                       {KeyRequestLogged("bad wellknown json format.")});
 }
