@@ -1,4 +1,4 @@
-// What the relay page makes of its address.
+// The script of the relay page.
 //
 //   node relay_test.mjs DOCTOR
 import assert from 'node:assert/strict';
@@ -13,29 +13,29 @@ const START_PAGE = '/index.cgi';
 const SITE = 'https://appliance.example';
 const {foreign, own} = JSON.parse(readFileSync(new URL('origins.json', import.meta.url)));
 
-// The table of failures. These rows are not reasons as they are: of a provider's error answer the front end shows the
-// error, and some of these errors have a sentence.
+// Rows of the failure table that are not shown verbatim: the front end shows the error of a provider's answer, and some
+// errors have a sentence.
 const ALTERED = ['{... "error": ...}', 'The provider refused: REASON', 'a text of another library'];
 const failures = JSON.parse(execFileSync(process.argv[2], ['explain', '--list', '--json'], {encoding: 'utf8'}))
     .explanations.filter(({table}) => ['exceptions of the library', 'reasons of the front end'].includes(table));
 
 const after = (values) => describe(`#${new URLSearchParams(values)}`);
 
-test('leads to the start page where a browser could leave this site', () => {
+test('replaces foreign origins with the start page', () => {
     assert.ok(foreign.length >= 200);
     for (const origin of foreign) {
         assert.equal(after({origin, success: 'true'}).onward, START_PAGE, JSON.stringify(origin));
     }
 });
 
-test('stays on this site with an origin that is written into the fragment as it stands', () => {
+test('stays on this site with unencoded origins', () => {
     for (const origin of foreign) {
         const {onward} = describe(`#origin=${origin}&success=true`);
         assert.equal(new URL(onward, SITE).origin, SITE, JSON.stringify(origin));
     }
 });
 
-test('leads back to a path on this site', () => {
+test('returns to a local path', () => {
     assert.ok(own.length >= 10);
     for (const origin of own) {
         const {onward} = after({origin, success: 'true'});
@@ -44,7 +44,7 @@ test('leads back to a path on this site', () => {
     }
 });
 
-test('tries again, after a failure, with an origin on this site', () => {
+test('keeps local origins for another try', () => {
     const tryAgain = (origin) => new URL(after({origin, success: 'false'}).onward, SITE);
     const signIn = `${SITE}/webman/sso/login.cgi`;
     for (const origin of foreign) {
@@ -57,7 +57,7 @@ test('tries again, after a failure, with an origin on this site', () => {
     }
 });
 
-test('explains the reasons that it knows and cuts those that are too long', () => {
+test('explains known reasons and cuts long ones', () => {
     const {explanation, reason} = after({success: 'false', reason: 'TAVOWinsUserNameFqdn2Netbios failed.'});
     assert.match(explanation, /^This device does not recognise your account's domain\./);
     assert.equal(reason, 'TAVOWinsUserNameFqdn2Netbios failed.');
@@ -68,14 +68,14 @@ test('explains the reasons that it knows and cuts those that are too long', () =
     assert.equal(after({success: 'false'}).reason, '');
 });
 
-test('explains nothing by a known text within a description of the provider', () => {
+test('ignores known texts in descriptions of the provider', () => {
     for (const known of ['id_token expired.', 'This sign-in took too long', 'The provider refused: access_denied']) {
         const {explanation} = after({success: 'false', reason: `The provider refused: other (${known})`});
         assert.match(explanation, /^Something went wrong/, known);
     }
 });
 
-test('shows printable text only', () => {
+test('replaces unprintable characters', () => {
     const {reason} = after({success: 'false', reason: 'a\u009bb\u202ec\u2028d\u200be\nf'});
     assert.equal(reason, 'a b c d e f');
 });
@@ -98,14 +98,14 @@ test('shows each outcome with its links', () => {
     });
 });
 
-test('explains an unknown algorithm whatever the token calls it', () => {
+test('explains every unsupported algorithm', () => {
     for (const name of ['none', 'HS256', '', 'an odd one']) {
         const {explanation} = after({success: 'false', reason: `${name} algorithm is not supported`});
         assert.match(explanation, /^This device could not verify/, name);
     }
 });
 
-const UNEXPLAINED = [ // on purpose: only an administrator can act on them
+const UNEXPLAINED = [ // intentionally: only an administrator can fix them
     'A header must be one printable line.', 'FRONTEND_PENDING_LOGINS must be a number above 0.',
     "The provider's answer has no single NAME.", 'This request cannot start or complete a sign-in.',
     'unexpected failure', 'The digest of a cookie cannot be computed.',
@@ -114,13 +114,13 @@ const OF_SESSIONS = 'Too many users are signed in.';
 const isUnexplained = ({about, 'thrown by': thrownBy = 'a login'}) =>
     about.endsWith(': SYSTEM') || !thrownBy.includes('login') || UNEXPLAINED.includes(about) || ALTERED.includes(about);
 
-test('explains each text of the table of failures that a login ends with', () => {
+test('explains each login failure of the failure table', () => {
     const texts = failures.filter((failure) => !isUnexplained(failure)).map(({about}) => about);
     assert.ok(texts.length >= 30, `${texts.length} texts`);
     for (const text of texts) {
         assert.doesNotMatch(after({success: 'false', reason: text}).explanation, /^Something went wrong/, text);
     }
-    // A program without the relay page shows the same sentences: <tavosso/web.h>.
+    // <tavosso/web.h> provides the same sentences.
     const ofLogins = failures.filter((failure) => !isUnexplained(failure) && failure.about !== OF_SESSIONS);
     for (const {about, sentence} of ofLogins) {
         assert.equal(after({success: 'false', reason: about}).explanation, sentence, about);
@@ -131,7 +131,7 @@ test('explains each text of the table of failures that a login ends with', () =>
     }
 });
 
-test('explains no text that the table of failures lacks', () => {
+test('explains only texts of the failure table', () => {
     const isOf = (beginning) => ({about}) => about.startsWith(beginning) ||
         (about.endsWith(': REASON') && beginning.startsWith(about.slice(0, -'REASON'.length)));
     for (const beginning of EXPLANATIONS.keys()) {
@@ -139,13 +139,13 @@ test('explains no text that the table of failures lacks', () => {
     }
 });
 
-test('finds no explanation in what every object has', () => {
+test('ignores names of object members', () => {
     for (const reason of ['constructor', '__proto__', 'toString']) {
         assert.match(after({success: 'false', reason}).explanation, /^Something went wrong/);
     }
 });
 
-test('weighs less than 20 KB in all', () => {
+test('is smaller than 20 KB', () => {
     const size = (file) => readFileSync(new URL(`../../frontend/static/${file}`, import.meta.url)).length;
     const sizes = ['relay.html', 'relay.js', 'reasons.js', 'style.css', 'mark.svg'].map(size);
     assert.ok(sizes.reduce((sum, each) => sum + each, 0) < 20_000);

@@ -1,4 +1,4 @@
-// What every test plays on: the site, and one Chromium that trusts the site's certificates and no others.
+// The site, and a Chromium that trusts only the site's certificates.
 import assert from 'node:assert/strict';
 import {readFileSync} from 'node:fs';
 import path from 'node:path';
@@ -24,7 +24,7 @@ class Stage {
         this.origin = this.site.origin;
     }
 
-    /** A working site with the given profile. */
+    /** Restores a working site with this profile. */
     reset(profile = 'azure') {
         useProfile(profile);
         writeSettings(this.site);
@@ -33,25 +33,25 @@ class Stage {
         this.logged.splice(0);
     }
 
-    /** Leaves the appliance with other settings of the clients than the provider has, or with another provider. */
+    /** Gives the appliance other client settings or another provider. */
     misconfigure({changes = {}, provider = this.site.provider}) {
         writeSettings({provider, clients: this.site.clients.map((client) => ({...client, ...changes}))});
     }
 
-    /** Whether an address is the appliance's or, all of them having one host, a provider's. */
+    /** Whether an address belongs to the appliance or a provider; providers share a host. */
     isOfTheSite(url) {
         return url.protocol === 'data:' || url.origin === this.origin || url.hostname === '127.0.0.1';
     }
 
-    /** How often the appliance asked the provider for a token. */
+    /** The number of token requests. */
     tokenRequests() {
         return this.asked.filter(({path: asked}) => asked === '/token').length;
     }
 
     /**
-     * Lets visitors with a browser context of their own act, then holds against each that the pages logged an error or
-     * asked another site for something, or that the appliance logged a code. `options` are Playwright's, and `expects`,
-     * a pattern of errors that belong to the test.
+     * Runs `act` with visitors, each with its own browser context. Then requires that their pages logged no errors and
+     * sent no requests to other sites, and that the appliance logged no code. `options` are Playwright's, and
+     * `expects`, a pattern of expected errors.
      */
     async visit(act, options = {}) {
         const visitors = [];
@@ -60,16 +60,16 @@ class Stage {
         }
         try {
             await act(...visitors);
-            visitors.forEach((visitor) => this.#holdAgainst(visitor));
+            visitors.forEach((visitor) => this.#expectNoComplaints(visitor));
         } finally {
             await Promise.all(visitors.map((visitor) => visitor.leave()));
         }
     }
 
-    #holdAgainst({complaints, codes}) {
+    #expectNoComplaints({complaints, codes}) {
         assert.deepEqual(complaints, []);
-        const told = [...codes].filter((code) => this.logged.some((line) => line.includes(code)));
-        assert.equal(told.length, 0, 'a code was logged');
+        const logged = [...codes].filter((code) => this.logged.some((line) => line.includes(code)));
+        assert.equal(logged.length, 0, 'a code was logged');
     }
 
     async stop() {

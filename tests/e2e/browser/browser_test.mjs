@@ -1,4 +1,4 @@
-// Runs as root of private namespaces; see `run`.
+// Runs as root of private namespaces; see `run_browser_test`.
 import {after, beforeEach, describe} from 'node:test';
 
 import {defineAttacks} from './refusals.mjs';
@@ -13,8 +13,8 @@ const stage = await startStage({webroot, siteModules, browserModules, pictures})
 describe('The front end in a browser', () => {
     beforeEach(() => stage.reset());
     after(() => stage.stop());
-    describe('Signing in and out', () => defineSignIns(stage));
-    describe('A sign-in that fails', () => defineFailures(stage));
-    describe('What is refused', () => defineAttacks(stage));
-    describe('Every page', () => definePages(stage));
+    describe('A sign-in', () => defineSignIns(stage));
+    describe('A failed sign-in', () => defineFailures(stage));
+    describe('The front end rejects', () => defineAttacks(stage));
+    describe('A page', () => definePages(stage));
 });

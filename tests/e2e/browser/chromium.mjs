@@ -1,4 +1,4 @@
-// Debian's Chromium, which asks nobody for anything on its own account.
+// Starts Debian's Chromium without background requests.
 import path from 'node:path';
 import {pathToFileURL} from 'node:url';
 
@@ -7,7 +7,7 @@ const SWITCHES = [
     '--disable-sync', '--no-first-run',
 ];
 
-/** `browserModules` is where the packages of this folder are installed; what it keeps is in `folder`. */
+/** `browserModules` is the folder with the npm packages, `folder` that of the browser's files. */
 export async function startChromium({browserModules, folder, switches = []}) {
     const {chromium} = await import(pathToFileURL(path.join(browserModules, 'playwright-core/index.mjs')));
     return chromium.launch({

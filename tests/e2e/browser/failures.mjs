@@ -6,7 +6,7 @@ import {useProfile} from '../site/front_end.mjs';
 const REFUSED = /rejected this sign-in|does not accept this device/;
 
 export function defineFailures(stage) {
-    it('is explained when the user cancels at the provider, without a token request', () => stage.visit(async (visitor) => {
+    it('is explained if the user cancels', () => stage.visit(async (visitor) => {
         await visitor.goToProvider();
         await visitor.press('Cancel');
         const reason = await visitor.seesFailure(/The sign-in was cancelled/);
@@ -15,7 +15,7 @@ export function defineFailures(stage) {
         await visitor.isSignedOut();
     }));
 
-    it('is explained when the user does not consent, and can be tried again', () => stage.visit(async (visitor) => {
+    it('is explained if the user denies consent, and can be repeated', () => stage.visit(async (visitor) => {
         await visitor.open('/account.cgi');
         await visitor.followSignIn();
         await visitor.giveNameAndPassword('dora');
@@ -29,7 +29,7 @@ export function defineFailures(stage) {
         await visitor.seesHeading('Your account');
     }));
 
-    it("is explained when the user's domain is not known", () => stage.visit(async (visitor) => {
+    it('is explained if the domain is unknown', () => stage.visit(async (visitor) => {
         await visitor.tryToSignIn('carol');
         const reason = await visitor.seesFailure(/This device does not recognise your account's domain\./);
         assert.equal(reason, 'TAVOWinsUserNameFqdn2Netbios failed.');
@@ -37,9 +37,9 @@ export function defineFailures(stage) {
     }));
 
     for (const profile of ['azure', 'websphere']) {
-        const under = (what) => `${what}, under profile ${profile}`;
+        const under = (what) => `${what} (${profile})`;
 
-        it(under('is explained when the code has expired'), () => stage.visit(async (visitor) => {
+        it(under('is explained if the code has expired'), () => stage.visit(async (visitor) => {
             stage.reset(profile);
             stage.site.provider.lifetimes.code = -1;
             await visitor.tryToSignIn('alice');
@@ -48,7 +48,7 @@ export function defineFailures(stage) {
             await visitor.isSignedOut();
         }));
 
-        it(under("is explained when the clock is past the token's expiry"), () => stage.visit(async (visitor) => {
+        it(under('is explained if the token has expired'), () => stage.visit(async (visitor) => {
             stage.reset(profile);
             stage.site.provider.lifetimes.idToken = -1;
             await visitor.tryToSignIn('alice');
@@ -56,7 +56,7 @@ export function defineFailures(stage) {
             await visitor.isSignedOut();
         }));
 
-        it(under('is explained when the client secret is wrong'), () => stage.visit(async (visitor) => {
+        it(under('is explained if the client secret is wrong'), () => stage.visit(async (visitor) => {
             stage.reset(profile);
             stage.misconfigure({changes: {secret: 'another secret'}});
             await visitor.tryToSignIn('alice');
@@ -64,7 +64,7 @@ export function defineFailures(stage) {
             await visitor.isSignedOut();
         }));
 
-        it(under('is explained when the provider stops in the middle'), () => stage.visit(async (visitor) => {
+        it(under('is explained if the provider stops'), () => stage.visit(async (visitor) => {
             stage.reset(profile);
             const provider = await stage.site.startAnotherProvider();
             try {
@@ -82,7 +82,7 @@ export function defineFailures(stage) {
         }));
     }
 
-    it('is explained when single sign-on was switched off in the middle', () => stage.visit(async (visitor) => {
+    it('is explained if single sign-on is switched off meanwhile', () => stage.visit(async (visitor) => {
         const held = await visitor.holdReturn();
         await visitor.tryToSignIn('alice');
         await held.address;

@@ -1,4 +1,4 @@
-// A token endpoint that answers an error with more in it than the error, as some do.
+// A token endpoint whose error answers also contain tokens.
 import {once} from 'node:events';
 import https from 'node:https';
 

@@ -19,7 +19,7 @@ const PROTECTION = {
         "base-uri 'none'; form-action 'self'; frame-ancestors 'none'",
 };
 
-// Each opens a page, and leaves the visitor there.
+// Functions that open each page.
 const PAGES = {
     'the start page': async (visitor) => {
         await visitor.isSignedOut();
@@ -47,7 +47,7 @@ const PAGES = {
         await visitor.page.getByRole('link', {name: 'Your account', exact: true}).click();
         await visitor.seesHeading('Your account');
     },
-    'the page on the way out': async (visitor, stage) => {
+    'the sign-out page': async (visitor, stage) => {
         await visitor.signIn('alice');
         await stayOn(visitor, `${stage.site.provider.address}/**`);
         await visitor.press('Sign out');
@@ -55,7 +55,7 @@ const PAGES = {
     },
     'the relay page after a success': async (visitor, stage) => {
         await stayOn(visitor, stage.origin + DEEP_LINK);
-        // It goes on before it has loaded.
+        // The page redirects before it has loaded.
         await visitor.open(SUCCESS, {waitUntil: 'commit'});
         await visitor.seesHeading('You are signed in');
     },
@@ -76,25 +76,25 @@ const TITLES = {
     "the provider's form": 'Example organisation',
     'the start page, signed in': 'Signed in',
     'the account page': 'Your account',
-    'the page on the way out': 'Signing out',
+    'the sign-out page': 'Signing out',
     'the relay page after a success': 'You are signed in',
     'the relay page after a failure': 'Sign-in failed',
     'the relay page after a sign-out': 'You are signed out',
 };
 
-// An answer without content leaves the browser where it is.
+// Blocks navigation: the browser stays on its page after an answer without content.
 function stayOn(visitor, elsewhere) {
     return visitor.page.route(elsewhere, (route) => route.fulfill({status: 204}));
 }
 
-async function findBarriers(page) {
+async function findViolations(page) {
     const {violations} = await page.evaluate(() => globalThis.axe.run());
     return violations.map(({id, nodes}) => `${id}: ${nodes.map(({html}) => html).join(' ')}`);
 }
 
 function defineAccessibility(stage) {
     for (const [name, open] of Object.entries(PAGES)) {
-        it(`has no barriers, on a phone and a desktop, in light and dark: ${name}`, () => stage.visit(async (visitor) => {
+        it(`is accessible on all screens: ${name}`, () => stage.visit(async (visitor) => {
             const {page} = visitor;
             await open(visitor, stage);
             assert.equal(await page.title(), TITLES[name]);
@@ -102,7 +102,7 @@ function defineAccessibility(stage) {
             for (const {width, colorScheme} of SCREENS) {
                 await page.setViewportSize({width, height: 800});
                 await page.emulateMedia({colorScheme});
-                assert.deepEqual(await findBarriers(page), [], `${width} pixels wide, ${colorScheme}`);
+                assert.deepEqual(await findViolations(page), [], `${width} pixels wide, ${colorScheme}`);
                 const overhang = await page.evaluate(() => document.documentElement.scrollWidth - innerWidth);
                 assert.ok(overhang <= 0, `${overhang} pixels beyond the right edge of ${width}`);
             }
@@ -116,7 +116,7 @@ function defineHeaders(stage) {
         ...['relay.html', 'relay.js', 'reasons.js', 'style.css', 'mark.svg'].map((file) => `/webman/ssoclient/${file}`),
         '/webman/ssoclient/', '/nowhere', '/nowhere.cgi',
     ];
-    it('is protected by its headers', () => stage.visit(async (visitor) => {
+    it('has security headers', () => stage.visit(async (visitor) => {
         const seen = [];
         visitor.page.on('response', (response) => {
             if (response.url().startsWith(stage.origin)) {
@@ -130,13 +130,13 @@ function defineHeaders(stage) {
         for (const response of seen) {
             const headers = await response.headersArray();
             for (const [name, value] of Object.entries(PROTECTION)) {
-                const told = headers.filter((header) => header.name.toLowerCase() === name);
-                assert.deepEqual(told.map((header) => header.value), [value], `${name} of ${response.url()}`);
+                const found = headers.filter((header) => header.name.toLowerCase() === name);
+                assert.deepEqual(found.map((header) => header.value), [value], `${name} of ${response.url()}`);
             }
         }
     }, {expects: /status of 40[345]/}));
 
-    it('cannot be put into a frame', () => stage.visit(async (visitor) => {
+    it('cannot be framed', () => stage.visit(async (visitor) => {
         await visitor.goToProvider();
         const frame = await visitor.page.evaluate(async (address) => {
             const element = document.createElement('iframe');
@@ -162,7 +162,7 @@ function definePictures(stage) {
         failure: 'the relay page after a failure',
     };
     for (const [file, name] of Object.entries(pictures)) {
-        it(`has its picture taken: ${name}`, () => stage.visit(async (visitor) => {
+        it(`is captured: ${name}`, () => stage.visit(async (visitor) => {
             await PAGES[name](visitor, stage);
             const picture = await visitor.page.screenshot({path: path.join(stage.pictures, `${file}.png`)});
             assert.ok(picture.length > 0);

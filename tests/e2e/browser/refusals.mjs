@@ -28,7 +28,7 @@ function makePendingLoginsOld() {
 }
 
 function defineLoginCsrf(stage) {
-    it('login CSRF: a state of another browser', () => stage.visit(async (attacker, victim) => {
+    it('a state of another browser (login CSRF)', () => stage.visit(async (attacker, victim) => {
         const address = await attacker.stopBeforeReturn('bob');
         await victim.goToProvider();
         await victim.open(address);
@@ -37,7 +37,7 @@ function defineLoginCsrf(stage) {
         await victim.isSignedOut();
     }));
 
-    it('login CSRF: no state, and two', () => stage.visit(async (attacker, victim) => {
+    it('a missing or repeated state (login CSRF)', () => stage.visit(async (attacker, victim) => {
         const address = await attacker.stopBeforeReturn('bob');
         const own = stateOf(await victim.stopBeforeReturn('alice'));
         const code = codeOf(address);
@@ -49,14 +49,14 @@ function defineLoginCsrf(stage) {
         await victim.isSignedOut();
     }));
 
-    it('login CSRF: a state that was used', () => stage.visit(async (visitor) => {
+    it('a used state (login CSRF)', () => stage.visit(async (visitor) => {
         const address = await visitor.stopBeforeReturn('alice');
         const cookies = await visitor.context.cookies();
         await visitor.open(address);
         await visitor.seesHeading('Welcome');
         await visitor.press('Sign out');
         await visitor.seesHeading('Sign out of Example organisation?');
-        // Even to a browser that brings the cookie again.
+        // The cookie alone must not suffice.
         await visitor.context.addCookies(cookies);
         await visitor.open(address);
         await visitor.seesFailure(/took too long, or was already completed/);
@@ -64,7 +64,7 @@ function defineLoginCsrf(stage) {
         await visitor.isSignedOut();
     }));
 
-    it('login CSRF: a state that has expired', () => stage.visit(async (visitor) => {
+    it('an expired state (login CSRF)', () => stage.visit(async (visitor) => {
         const address = await visitor.stopBeforeReturn('alice');
         makePendingLoginsOld();
         await visitor.open(address);
@@ -76,7 +76,7 @@ function defineLoginCsrf(stage) {
 
 function defineStolenTokens(stage) {
     for (const profile of ['azure', 'websphere']) {
-        it(`a stolen code, and so the ID token of another sign-in, under profile ${profile}`, () =>
+        it(`a stolen code (${profile})`, () =>
             stage.visit(async (victim, attacker) => {
                 stage.reset(profile);
                 const stolen = await victim.stopBeforeReturn('alice');
@@ -88,7 +88,7 @@ function defineStolenTokens(stage) {
             }));
     }
 
-    it('a stolen code, with the digest of its nonce written into a state of the attacker', () =>
+    it('a stolen code with a forged nonce in the state', () =>
         stage.visit(async (victim, attacker) => {
             const stolen = await victim.stopBeforeReturn('alice');
             const own = readState(stateOf(await attacker.stopBeforeReturn('bob')));
@@ -101,7 +101,7 @@ function defineStolenTokens(stage) {
 }
 
 function defineOpenRedirects(stage) {
-    it('open redirects: what the relay page makes of the foreign origins, as the browser reads it', () =>
+    it('foreign origins in the relay script', () =>
         stage.visit(async (visitor) => {
             assert.ok(foreign.length >= 200);
             await visitor.open(RELAY_PAGE);
@@ -115,7 +115,7 @@ function defineOpenRedirects(stage) {
             assert.deepEqual(onward, foreign.map(() => stage.origin + START_PAGE));
         }));
 
-    it('open redirects: the relay page, sent to foreign origins of every kind', () => stage.visit(async (visitor) => {
+    it('foreign origins on the relay page', () => stage.visit(async (visitor) => {
         for (const origin of foreign.filter((each, index) => index % 12 === 0)) {
             await visitor.open(relayWith({origin, success: 'true'}));
             await visitor.page.waitForURL((url) => url.pathname !== RELAY_PAGE);
@@ -123,7 +123,7 @@ function defineOpenRedirects(stage) {
         }
     }));
 
-    it('open redirects: a whole sign-in, started with a foreign origin', () => stage.visit(async (visitor) => {
+    it('foreign origins of a sign-in', () => stage.visit(async (visitor) => {
         for (const origin of ['//evil.example', 'https:evil.example', '/\\evil.example', 'javascript:alert(1)', '%2F%2Fevil.example']) {
             await visitor.context.clearCookies();
             await visitor.open(`/webman/sso/login.cgi?${new URLSearchParams({origin})}`);
@@ -137,7 +137,7 @@ function defineOpenRedirects(stage) {
 function defineInjections(stage) {
     const html = '"><img src=x onerror=alert(1)><script>alert(1)</script>';
 
-    it('HTML and scripts in the reason: shown as text, and not at length', () => stage.visit(async (visitor) => {
+    it('HTML and overlong text in the reason', () => stage.visit(async (visitor) => {
         await visitor.open(relayWith({success: 'false', reason: html + 'x'.repeat(50_000)}));
         const reason = await visitor.seesFailure(/Something went wrong/);
         assert.equal(reason.length, 200);
@@ -145,7 +145,7 @@ function defineInjections(stage) {
         assert.equal(await visitor.page.getByRole('img').count(), 0);
     }));
 
-    it("HTML and scripts in the user's name: shown as text", () => stage.visit(async (visitor) => {
+    it("HTML in the user's name", () => stage.visit(async (visitor) => {
         await visitor.signIn(HTML_LOGIN);
         await visitor.isSignedInAs(`ACME\\${HTML_LOGIN}`);
         assert.equal(await visitor.page.getByRole('img').count(), 0);
@@ -154,7 +154,7 @@ function defineInjections(stage) {
         assert.equal(await visitor.page.getByRole('img').count(), 0);
     }));
 
-    it('HTML and scripts in the origin: stay in the address that they belong to', () => stage.visit(async (visitor) => {
+    it('HTML in the origin', () => stage.visit(async (visitor) => {
         for (const origin of [`/account.cgi?${html}`, "/account.cgi?'><script>alert(1)</script>"]) {
             await visitor.open(`/index.cgi?${new URLSearchParams({origin})}`);
             await visitor.seesHeading('Sign in');
@@ -163,7 +163,7 @@ function defineInjections(stage) {
         }
     }));
 
-    it('headers, HTML and scripts in code and state: a failure, no header', () => stage.visit(async (visitor) => {
+    it('headers and HTML in code and state', () => stage.visit(async (visitor) => {
         const address = await visitor.stopBeforeReturn('alice');
         await visitor.open(returnWith({code: codeOf(address), state: html}));
         await visitor.seesFailure(NOT_STARTED_HERE);
@@ -179,7 +179,7 @@ function defineInjections(stage) {
 }
 
 function defineSessionAttacks(stage) {
-    it('session fixation: a session that was planted before the sign-in', () => stage.visit(async (attacker, victim) => {
+    it('a planted session (session fixation)', () => stage.visit(async (attacker, victim) => {
         await attacker.signIn('bob');
         const planted = await sessionOf(attacker);
         await victim.context.addCookies([planted]);
@@ -191,7 +191,7 @@ function defineSessionAttacks(stage) {
         await attacker.isSignedOut();
     }));
 
-    it('a session cookie that scripts, other sites or plain HTTP could use', () => stage.visit(async (visitor) => {
+    it('access to the session cookie by scripts or other sites', () => stage.visit(async (visitor) => {
         await visitor.signIn('alice');
         const {secure, httpOnly, sameSite, path, expires, domain} = await sessionOf(visitor);
         assert.deepEqual(
@@ -200,7 +200,7 @@ function defineSessionAttacks(stage) {
         assert.equal(await visitor.page.evaluate(() => document.cookie), '');
     }));
 
-    it('a code that is sent twice: the provider refuses it, and the first session stays', () =>
+    it('a repeated code, and keeps the first session', () =>
         stage.visit(async (visitor) => {
             const first = await visitor.stopBeforeReturn('alice');
             await visitor.open(first);
@@ -218,7 +218,7 @@ function defineSessionAttacks(stage) {
 }
 
 function defineLeaks(stage) {
-    it("the provider's whole answer: of an error only its name and description are told", () =>
+    it("secrets in the provider's error answer", () =>
         stage.visit(async (visitor) => {
             const leaky = await startLeakyEndpoint(stage.site.providerCertificate);
             try {
@@ -230,10 +230,10 @@ function defineLeaks(stage) {
                 await held.go();
                 const reason = await visitor.seesFailure(/Your sign-in took too long/);
                 assert.match(reason, /^The provider refused: invalid_grant \(used {2}Set-Cookie: leaked=1/);
-                const told = [...stage.logged, visitor.page.url(), await visitor.page.content()].join('\n');
-                assert.match(told, /frontend: sign-in failed: The provider refused: invalid_grant/);
+                const shown = [...stage.logged, visitor.page.url(), await visitor.page.content()].join('\n');
+                assert.match(shown, /frontend: sign-in failed: The provider refused: invalid_grant/);
                 for (const secret of [TOKEN, code, stage.site.clients[0].secret]) {
-                    assert.ok(!told.includes(secret), 'a secret was told');
+                    assert.ok(!shown.includes(secret), 'a secret was disclosed');
                 }
             } finally {
                 leaky.stop();
@@ -250,7 +250,7 @@ function defineProviderErrors(stage) {
         ['', /Something went wrong/],
     ];
     for (const [error, explanation] of errors) {
-        it(`an error of the provider, ${error || 'nameless'}: no token request, even with a code beside it`, () =>
+        it(`a code next to the error ${error || 'without a name'}`, () =>
             stage.visit(async (visitor) => {
                 const address = await visitor.stopBeforeReturn('alice');
                 await visitor.open(returnWith({error, code: codeOf(address), state: stateOf(address)}));

@@ -6,7 +6,7 @@ const DEEP_LINK = '/account.cgi?view=all&name=%C3%A4%22';
 
 export function defineSignIns(stage) {
     for (const [profile, alice, bob] of PROFILES) {
-        it(`signs in under profile ${profile}`, () => stage.visit(async (visitor) => {
+        it(`succeeds (${profile})`, () => stage.visit(async (visitor) => {
             stage.reset(profile);
             await visitor.isSignedOut();
             await visitor.signIn('alice');
@@ -15,7 +15,7 @@ export function defineSignIns(stage) {
             assert.equal(stage.tokenRequests(), 1);
         }));
 
-        it(`comes back to the page that was asked for, under profile ${profile}`, () => stage.visit(async (visitor) => {
+        it(`returns to the requested page (${profile})`, () => stage.visit(async (visitor) => {
             stage.reset(profile);
             await visitor.open(DEEP_LINK);
             await visitor.seesHeading('Sign in');
@@ -26,7 +26,7 @@ export function defineSignIns(stage) {
             assert.equal(await visitor.page.getByRole('definition').first().textContent(), alice);
         }));
 
-        it(`keeps two users apart under profile ${profile}`, () => stage.visit(async (first, second) => {
+        it(`separates two users (${profile})`, () => stage.visit(async (first, second) => {
             stage.reset(profile);
             await Promise.all([first.goToProvider(), second.goToProvider()]);
             await Promise.all([first.giveNameAndPassword('alice'), second.giveNameAndPassword('bob')]);
@@ -36,7 +36,7 @@ export function defineSignIns(stage) {
         }));
     }
 
-    it('signs in by keyboard alone', () => stage.visit(async ({page, ...visitor}) => {
+    it('works with the keyboard only', () => stage.visit(async ({page, ...visitor}) => {
         const {keyboard} = page;
         await page.goto(stage.origin);
         await keyboard.press('Tab');
@@ -53,7 +53,7 @@ export function defineSignIns(stage) {
         assert.equal(await page.evaluate(() => document.activeElement.textContent), 'Sign out');
     }));
 
-    it('signs out at the appliance and at the provider, back to the relay page', () => stage.visit(async (visitor) => {
+    it('ends by signing out at the appliance and the provider', () => stage.visit(async (visitor) => {
         await visitor.signIn('alice');
         await visitor.press('Sign out');
         await visitor.seesHeading('Sign out of Example organisation?');
@@ -64,7 +64,7 @@ export function defineSignIns(stage) {
         await visitor.followSignIn();
     }));
 
-    it('signs out under a profile whose provider has no page for it', () => stage.visit(async (visitor) => {
+    it('ends by signing out without a page of the provider', () => stage.visit(async (visitor) => {
         stage.reset('websphere');
         await visitor.signIn('bob');
         await visitor.press('Sign out');
@@ -72,7 +72,7 @@ export function defineSignIns(stage) {
         await visitor.isSignedOut();
     }));
 
-    it('signs in from two tabs at once', () => stage.visit(async (visitor) => {
+    it('works in two tabs at once', () => stage.visit(async (visitor) => {
         const tab = await visitor.openTab();
         await visitor.goToProvider();
         await tab.goToProvider();
@@ -83,9 +83,9 @@ export function defineSignIns(stage) {
         await visitor.isSignedInAs('ACME\\alice');
     }));
 
-    it('stays signed in when the user goes back', () => stage.visit(async (visitor) => {
+    it('persists when the user goes back', () => stage.visit(async (visitor) => {
         await visitor.signIn('alice');
-        // The form at the provider has been used; neither the relay page nor the return address is in the history.
+        // The provider's form is used up; relay page and return address are not in the history.
         await visitor.page.goBack();
         await visitor.seesHeading('This sign-in has ended');
         await visitor.page.goBack();
@@ -93,7 +93,7 @@ export function defineSignIns(stage) {
         assert.equal(stage.tokenRequests(), 1);
     }, {expects: /status of 400/}));
 
-    it('asks a user who decides alone, and signs in when they allow it', () => stage.visit(async (visitor) => {
+    it('asks for consent if the provider requires it', () => stage.visit(async (visitor) => {
         await visitor.tryToSignIn('dora');
         await visitor.seesHeading('May the appliance know who you are?');
         await visitor.press('Allow');

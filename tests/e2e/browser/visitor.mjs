@@ -1,4 +1,4 @@
-// A person with a browser: what they see, by the roles and names that a screen reader tells, and what they do.
+// A user with a browser. Pages are read by the roles and names that screen readers use.
 import assert from 'node:assert/strict';
 
 const PATIENCE = 15_000;
@@ -7,7 +7,7 @@ export const RELAY_PAGE = '/webman/ssoclient/relay.html';
 
 export class Visitor {
     complaints = [];
-    /** The codes with which the browser came back. */
+    /** The codes in return addresses. */
     codes = new Set();
 
     static async arrive(stage, {expects, ...options}) {
@@ -61,7 +61,7 @@ export class Visitor {
         return this.page.goto(new URL(address, this.stage.origin).href, options);
     }
 
-    // What is there.
+    // Expectations.
 
     async seesHeading(name) {
         await this.page.getByRole('heading', {level: 1, name, exact: true}).waitFor();
@@ -82,12 +82,12 @@ export class Visitor {
         await this.seesHeading('Sign in');
     }
 
-    /** The relay page tells of a failure; gives what it says under "Details". */
+    /** Expects a failure on the relay page. Returns the text of "Details". */
     async seesFailure(explanation) {
         await this.seesHeading('Sign-in failed');
         assert.match(await this.page.getByRole('status').textContent(), explanation);
         await this.page.getByRole('link', {name: 'Try again', exact: true}).waitFor();
-        // Nothing of it is there for anyone before it is unfolded.
+        // Hidden from screen readers until unfolded.
         const reason = this.page.getByRole('group').getByRole('paragraph');
         assert.equal(await reason.count(), 0);
         await this.page.getByText('Details', {exact: true}).click();
@@ -99,7 +99,7 @@ export class Visitor {
         return pathname + search;
     }
 
-    // What they do.
+    // Actions.
 
     async goToProvider() {
         await this.open('/index.cgi');
@@ -114,11 +114,11 @@ export class Visitor {
     async giveNameAndPassword(login) {
         await this.page.getByRole('textbox', {name: 'Name', exact: true}).fill(login);
         await this.page.getByLabel('Password').fill(this.stage.site.users.get(login).password);
-        // Not waiting for where it leads: it may be held.
+        // The next page may be held.
         await this.page.getByRole('button', {name: 'Sign in', exact: true}).click({noWaitAfter: true});
     }
 
-    /** Tries to sign in, and does not wait for how it ends. */
+    /** Submits name and password, and does not wait for the result. */
     async tryToSignIn(login) {
         await this.goToProvider();
         await this.giveNameAndPassword(login);
@@ -133,7 +133,7 @@ export class Visitor {
         await this.page.getByRole('button', {name, exact: true}).click();
     }
 
-    /** Signs in at the provider and stops before the appliance is asked; gives the return address. */
+    /** Signs in at the provider. Returns the return address, without opening it. */
     async stopBeforeReturn(login) {
         const held = await this.holdReturn();
         await this.tryToSignIn(login);
@@ -142,7 +142,7 @@ export class Visitor {
         return new URL(address);
     }
 
-    /** Halts the browser on its way back from the provider: redirects too, which Playwright's routes never see. */
+    /** Holds the return to the appliance. Playwright's routes do not see redirects. */
     async holdReturn() {
         const session = await this.context.newCDPSession(this.page);
         const pattern = `${this.stage.origin}${RETURN_PAGE}*`;
@@ -158,7 +158,7 @@ export class Visitor {
         return {
             address: paused.then(({request}) => request.url),
             go: finish('Fetch.continueRequest'),
-            // No page follows an answer without one: the form stays.
+            // An answer without content leaves the form on the screen.
             drop: finish('Fetch.fulfillRequest', {responseCode: 204}),
         };
     }

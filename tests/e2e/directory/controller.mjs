@@ -1,5 +1,5 @@
-// The domain controller of an Active Directory with its winbindd, for a run: Samba, provisioned anew. Runs as root of
-// private namespaces, whose /run is its own: programs find winbindd where they find that of a machine.
+// An Active Directory domain controller with winbindd: Samba, provisioned for each run. Runs as root of private
+// namespaces with their own /run, so programs find winbindd at its usual place.
 import {execFile, spawn} from 'node:child_process';
 import {once} from 'node:events';
 import {mkdirSync, mkdtempSync, readdirSync, readFileSync} from 'node:fs';
@@ -11,7 +11,7 @@ const run = promisify(execFile);
 const PROVISION = fileURLToPath(new URL('provision.py', import.meta.url));
 const TRUSTED_DOMAIN = 'LAB.EXAMPLE.NET';
 
-/** A server in the foreground. */
+/** A server process in the foreground. */
 class Server {
     #ended;
 
@@ -52,10 +52,10 @@ export class Controller {
         this.#settings = `--configfile=${folder}/smb.conf`;
     }
 
-    /** `seconds` is what it took. */
+    /** Starts the controller. `seconds` is the duration of the start. */
     static async start() {
         const began = performance.now();
-        const controller = new Controller(mkdtempSync('/tmp/dc-')); // a socket lies in it: its name cannot be long
+        const controller = new Controller(mkdtempSync('/tmp/dc-')); // contains a socket, whose path must be short
         await run('/usr/bin/python3', [PROVISION, controller.#folder]);
         mkdirSync('/run/samba', {mode: 0o755});
         controller.#samba = new Server('samba', controller.#settings);
@@ -65,11 +65,11 @@ export class Controller {
     }
 
     async startWinbindd() {
-        // It would refuse to run beside a domain controller: there, it is samba that starts it, with this option.
+        // On a domain controller, winbindd starts only with this option.
         this.#winbindd = new Server('winbindd', this.#settings, `--log-basename=${this.#folder}`,
             '--option=server role check:inhibit=yes');
         await this.#until(() => run('wbinfo', ['--ping']));
-        // The first question about another domain takes as long as looking for its controllers.
+        // The first query for another domain is slow, because it looks for its controllers.
         await run('wbinfo', [`--domain-info=${TRUSTED_DOMAIN}`]);
     }
 
@@ -92,12 +92,12 @@ export class Controller {
             .map((name) => readFileSync(path.join(this.#folder, name), 'utf8')).join('\n');
     }
 
-    /** As a crash ends it. */
+    /** Simulates a crash. */
     async killWinbindd() {
         await this.#winbindd.end('SIGKILL');
     }
 
-    /** It stays there and takes connections, and answers nobody. */
+    /** Makes winbindd accept connections without answering. */
     async stopWinbindd() {
         this.#winbindd.process.kill('SIGSTOP');
         while (!this.isWinbinddStopped) {

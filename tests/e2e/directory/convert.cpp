@@ -1,7 +1,7 @@
-// Converts the names on its standard input, one on each line, and tells in a line of JSON what came of each: the name,
-// or null, and the lines that were logged.
+// Converts the names on standard input, one per line. Prints a line of JSON for each: the name or null, and the log
+// lines.
 //
-//   convert [UID]      as an ordinary user, where one is told
+//   convert [UID]      UID: runs as this user
 #include <unistd.h>
 
 #include <cerrno>
@@ -21,18 +21,18 @@ constexpr char kMark = '#';
 Json::Value Convert(const std::string &name) {
     std::string buffer(1024, kMark);
     const std::string untouched = buffer;
-    const int result = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.data(), buffer.size() - 1);
-    Json::Value told;
-    if (result >= 0) {
-        told["name"] = buffer.c_str();
+    const int status = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.data(), buffer.size() - 1);
+    Json::Value result;
+    if (status >= 0) {
+        result["name"] = buffer.c_str();
     } else {
-        told["name"] = buffer == untouched ? Json::Value() : Json::Value("the buffer is not as it was");
+        result["name"] = buffer == untouched ? Json::Value() : Json::Value("the buffer was changed");
     }
-    told["log"] = Json::Value(Json::arrayValue);
+    result["log"] = Json::Value(Json::arrayValue);
     for (const Test::LogLine &line : Test::TakeSystemLog()) {
-        told["log"].append(line.text);
+        result["log"].append(line.text);
     }
-    return told;
+    return result;
 }
 
 }  // namespace

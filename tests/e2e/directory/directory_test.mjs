@@ -1,5 +1,5 @@
-// The stand-in's conversion of domain names, and logins that rest on it, against a real domain controller of
-// CORP.EXAMPLE.NET, NetBIOS name ACME. Runs as root of private namespaces.
+// The stand-in's conversion of domain names, and logins that use it, with a real domain controller for CORP.EXAMPLE.NET
+// (NetBIOS name ACME). Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {spawn} from 'node:child_process';
 import {once} from 'node:events';
@@ -14,12 +14,12 @@ import {Controller} from './controller.mjs';
 const [webroot, nodeModules, convertProgram] = process.argv.slice(2);
 const NOBODY = 65534;
 const NOT_CONVERTED = 'TAVOWinsUserNameFqdn2Netbios failed.';
-// Ids of others can be taken on where all of them are mapped: not by an ordinary user of the machine.
-const mayBeAnyone = / 4294967295$/m.test(readFileSync('/proc/self/uid_map', 'utf8'));
+// Other ids are available only if the namespace maps all of them, which needs root.
+const hasAllIds = / 4294967295$/m.test(readFileSync('/proc/self/uid_map', 'utf8'));
 
 const silent = {title() {}, fact() {}, browserAsked() {}, applianceAsked() {}, logged() {}, nameSite() {}};
 
-/** A program that converts one name after the other. */
+/** A process of the program `convert`. */
 class Converter {
     constructor({environment = {}, args = []} = {}) {
         this.process = spawn(convertProgram, args, {
@@ -35,7 +35,7 @@ class Converter {
         return JSON.parse(value);
     }
 
-    /** Ends it with the test, also with one that has failed: it would keep this program waiting. */
+    /** Ends the process with the test, even after a failure, because this program would wait for it. */
     static forTest(context, options) {
         const converter = new Converter(options);
         context.after(() => converter.end());
@@ -54,7 +54,7 @@ let converter;
 
 before(async () => {
     controller = await Controller.start();
-    console.log(`a domain controller, provisioned and started: ${controller.seconds} s`);
+    console.log(`domain controller started in ${controller.seconds} s`);
 });
 after(() => controller.stop());
 
@@ -73,19 +73,19 @@ async function expectRefused(domain, why) {
     assert.deepEqual(await converter.convert(`${domain}\\alice`), {name: null, log: [line]});
 }
 
-describe('The directory', () => {
-    test('tells the NetBIOS name of its own domain, as it spells it, for the DNS name in any case', async () => {
+describe('Domain lookup', () => {
+    test('converts the DNS name of its domain, ignoring case', async () => {
         for (const domain of ['CORP.EXAMPLE.NET', 'corp.example.net', 'Corp.Example.Net']) {
             await expectConverted(`${domain}\\alice`, 'ACME\\alice');
         }
     });
 
-    test('tells that of a domain that it trusts', async () => {
+    test('converts the DNS name of a trusted domain', async () => {
         await expectConverted('LAB.EXAMPLE.NET\\bob', 'LABOR\\bob');
         await expectConverted('lab.Example.net\\bob', 'LABOR\\bob');
     });
 
-    test('knows no other domain, and no part of its own', async () => {
+    test('rejects unknown domains and parts of known ones', async () => {
         for (const domain of [
             'ELSEWHERE.EXAMPLE.ORG', 'CORP', 'EXAMPLE.NET', 'CORP.EXAMPLE.NET.', 'CORP.EXAMPLE.NET ', ' ', 'C\u00d6RP',
             'LAB', '%s%n', 'x'.repeat(255),
@@ -94,26 +94,26 @@ describe('The directory', () => {
         }
     });
 
-    test('is not believed about names that are none of the DNS', async () => {
+    test('rejects names that are not DNS names', async () => {
         for (const domain of ['ACME', 'acme', 'LABOR', 'BUILTIN', 'DC1', 'NT AUTHORITY']) {
             await expectRefused(domain, 'does not know it');
         }
     });
 
-    test('comes behind the table, for the domains that the table names', async () => {
+    test('prefers the table to the directory', async () => {
         writeDomains({'corp.example.net': 'TABLE', 'elsewhere.example.org': 'ELSEWHERE', 'lab.example.net': ''});
         await expectConverted('CORP.EXAMPLE.NET\\alice', 'TABLE\\alice');
         await expectConverted('ELSEWHERE.EXAMPLE.ORG\\carol', 'ELSEWHERE\\carol');
         await expectConverted('LAB.EXAMPLE.NET\\bob', 'LABOR\\bob');
     });
 
-    test('is asked whatever the environment says', async (context) => {
+    test('ignores environment variables', async (context) => {
         const environment = {_NO_WINBINDD: '1', SELFTEST_WINBINDD_SOCKET_DIR: '/tmp'};
         const other = Converter.forTest(context, {environment});
         await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice', other);
     });
 
-    test('answers an ordinary user as it does root', {skip: !mayBeAnyone && 'not run: needs the ids of other users'},
+    test('works for an ordinary user', {skip: !hasAllIds && 'not run: needs the ids of other users'},
         async (context) => {
             const other = Converter.forTest(context, {args: [String(NOBODY)]});
             await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice', other);
@@ -121,8 +121,8 @@ describe('The directory', () => {
         });
 });
 
-describe('A program that converts names', () => {
-    test('is told of a winbindd that hangs while it hangs', async () => {
+describe('A running program', () => {
+    test('reports a hanging winbindd and recovers', async () => {
         await controller.stopWinbindd();
         try {
             const began = performance.now();
@@ -135,7 +135,7 @@ describe('A program that converts names', () => {
         await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice');
     });
 
-    test('is told of a winbindd that is gone, and is answered by the next one', async () => {
+    test('reports a missing winbindd and recovers', async () => {
         await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice');
         await controller.killWinbindd();
         await expectRefused('CORP.EXAMPLE.NET', 'is not available');
@@ -159,22 +159,22 @@ describe('An Azure login', () => {
         const logged = await site.log.until(/^return\.cgi: platform:\d+ /);
         assert.match(logged, line);
         assert.equal(await reason, NOT_CONVERTED);
-        site.asked.splice(0); // the walk counts the requests of the login that it walks
+        site.asked.splice(0); // the walk expects only the requests of its own login
     }
 
-    test('ends under the NetBIOS name that the directory tells', async () => {
+    test('uses the NetBIOS name from the directory', async () => {
         assert.equal(await walk.signIn(walk.newBrowser(), 'alice'), 'ACME\\alice');
     });
 
-    test('ends under the name of the table where that has the domain', async () => {
+    test('prefers the name in the table', async () => {
         writeDomains({'corp.example.net': 'TABLE'});
         assert.equal(await walk.signIn(walk.newBrowser(), 'alice'), 'TABLE\\alice');
     });
 
-    test('is refused where neither knows the domain', () =>
+    test('fails if neither knows the domain', () =>
         expectFailing('carol', /domain 'ELSEWHERE\.EXAMPLE\.ORG' is .* winbindd does not know it$/));
 
-    test('ends while winbindd hangs', async () => {
+    test('fails while winbindd hangs', async () => {
         await controller.stopWinbindd();
         try {
             const began = performance.now();
@@ -187,7 +187,7 @@ describe('An Azure login', () => {
         assert.equal(await walk.signIn(walk.newBrowser(), 'alice'), 'ACME\\alice');
     });
 
-    test('is refused without a winbindd, and succeeds again with the next one', async () => {
+    test('fails without winbindd and recovers', async () => {
         await controller.killWinbindd();
         await expectFailing('alice', /domain 'CORP\.EXAMPLE\.NET' is .* winbindd is not available$/);
         await controller.startWinbindd();

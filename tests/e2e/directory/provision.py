@@ -1,10 +1,9 @@
-"""Provisions the domain controller of an Active Directory, for one run: realm CORP.EXAMPLE.NET, NetBIOS name ACME.
+"""Provisions an Active Directory domain controller: realm CORP.EXAMPLE.NET, NetBIOS name ACME.
 
     /usr/bin/python3 provision.py FOLDER
 
-All of its files lie in FOLDER, smb.conf too. The directory trusts a second domain, LAB.EXAMPLE.NET, whose NetBIOS name
-is LABOR. That trust is an entry in the directory, as the domain's administrators would make it; no controller of that
-domain runs.
+All its files, including smb.conf, are in FOLDER. The directory trusts a second domain, LAB.EXAMPLE.NET, with the
+NetBIOS name LABOR. Only the trust entry exists, as administrators would add it; no controller of that domain runs.
 """
 import logging
 import os
@@ -31,7 +30,7 @@ SETTINGS = f"""
     realm = {REALM}
     workgroup = {NETBIOS_NAME}
     server role = active directory domain controller
-    # winbindd is started beside it, so that a test can end it; logins do not come for files.
+    # winbindd is started separately, so that a test can end it. No file services.
     server services = rpc, ldap, cldap, kdc
     rpc start on demand helpers = no
     interfaces = lo
@@ -55,7 +54,7 @@ SETTINGS = f"""
 
 
 def trust(database):
-    """Enters the trusted domain."""
+    """Adds the trusted domain."""
     secret = ndr_pack(make_secret())
     name = TRUSTED
     database.add({
@@ -72,7 +71,7 @@ def trust(database):
 
 
 def make_secret():
-    """What both domains would know, had the second a controller."""
+    """Returns a random trust secret."""
     password = ''.join(random.SystemRandom().choices(string.ascii_letters, k=24)).encode('utf-16-le')
     clear = drsblobs.AuthInfoClear()
     clear.size = len(password)

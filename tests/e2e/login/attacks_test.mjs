@@ -1,4 +1,4 @@
-// Attacks on the running site, without a browser's help. Runs as root of private namespaces.
+// Attacks on the running site. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {copyFileSync, readFileSync, readdirSync, rmSync, truncateSync} from 'node:fs';
@@ -13,7 +13,7 @@ import {Browser} from './browser.mjs';
 const FRONT_END = '/usr/tavo/var/frontend';
 const SESSION_COOKIE = '__Host-session';
 const PROGRAMS = ['/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi'];
-// Of syslog: facility and levels.
+// The facility and levels of syslog.
 const [AUTH, ERR, WARNING, INFO] = [32, 3, 4, 6];
 const LOGOUT = '/webman/sso/logout.cgi';
 const RETURN = '/webman/sso/return.cgi';
@@ -70,14 +70,14 @@ describe('An attacker', () => {
     const at = (path) => new URL(path, site.origin);
     const cookiesOf = (browser) => browser.cookies.for(at('/')).map(({name}) => name);
 
-    /** A sign-in up to the address at which the browser comes back, which is not opened. */
+    /** Signs in at the provider. Returns the return address, without opening it. */
     async function stopBeforeReturn(browser, login) {
         const form = await browser.open(at('/webman/sso/login.cgi'));
         const isReturn = (url) => url.pathname === RETURN;
         return (await browser.submit(form, {login, password: site.users.get(login).password}, isReturn)).next;
     }
 
-    /** The parameters of the relay page. */
+    /** Opens an address. Returns the parameters of the relay page. */
     async function comeBack(browser, address) {
         const relay = await browser.open(address);
         return Object.fromEntries(new URLSearchParams(relay.url.hash.slice(1)));
@@ -99,7 +99,7 @@ describe('An attacker', () => {
         assert.equal(await isSignedIn(victim), false);
     });
 
-    test('cannot fill the requests of a browser by starting logins from another site', async () => {
+    test('cannot fill the cookie header with many logins', async () => {
         const browser = newBrowser();
         for (let i = 0; i < 150; ++i) {
             assert.equal((await browser.request('GET', at('/webman/sso/login.cgi'))).status, 302);
@@ -108,7 +108,7 @@ describe('An attacker', () => {
         assert.equal((await browser.request('GET', at('/index.cgi'))).status, 200);
     });
 
-    test('gets no program to answer another method than its own', async () => {
+    test('cannot use other request methods', async () => {
         for (const program of PROGRAMS) {
             for (const method of ['POST', 'PUT', 'DELETE', 'OPTIONS']) {
                 const {status, headers} = await newBrowser().request(method, at(program));
@@ -121,7 +121,7 @@ describe('An attacker', () => {
         }
     });
 
-    test('starts and completes no login by HEAD', async () => {
+    test('cannot start or finish a login with HEAD', async () => {
         const browser = newBrowser();
         const {next} = await browser.request('HEAD', at('/webman/sso/login.cgi'));
         assert.equal(next.pathname, '/index.cgi');
@@ -137,21 +137,21 @@ describe('An attacker', () => {
         ['reversed', "The provider's name for this user cannot be used."],
         ['chosen', "The provider has not verified this user's e-mail address."],
     ]) {
-        test(`does not sign in as another user by the claims of ${login}`, async () => {
+        test(`cannot sign in with the claims of ${login}`, async () => {
             const browser = newBrowser();
             assert.deepEqual(await signIn(browser, login), {reason, origin: '/index.cgi', success: 'false'});
             assert.equal(await isSignedIn(browser), false);
         });
     }
 
-    test('does not hinder a user whose e-mail address the provider has verified', async () => {
+    test('does not affect users with a verified e-mail address', async () => {
         const browser = newBrowser();
         assert.equal((await signIn(browser, 'verified')).success, 'true');
         wasLogged(AUTH | INFO, 'return.cgi: frontend: signed in: ACME\\alice');
         assert.match((await browser.open(at('/account.cgi'))).text, /<dd>ACME\\alice<\/dd>/);
     });
 
-    test('gains no session by truncating its file', async () => {
+    test('cannot use a truncated session file', async () => {
         const browser = newBrowser();
         await signIn(browser, 'alice');
         assert.match((await browser.open(at('/account.cgi'))).text, /<dt>Name<\/dt>\n<dd>Alice Example<\/dd>/);
@@ -168,7 +168,7 @@ describe('An attacker', () => {
         assert.equal(await isSignedIn(browser), false);
     });
 
-    test('gets no code sent to another provider by a change of the profile', async () => {
+    test('gets no code after a change of the profile', async () => {
         const browser = newBrowser();
         const address = await stopBeforeReturn(browser, 'alice');
         useProfile('websphere');
@@ -177,8 +177,8 @@ describe('An attacker', () => {
         assert.equal(tokenRequests, 0);
     });
 
-    for (const [change, profile, enable] of [['another profile', 'websphere', true], ['no single sign-on', 'azure', false]]) {
-        test(`keeps no session under ${change}`, async () => {
+    for (const [change, profile, enable] of [['another profile', 'websphere', true], ['single sign-on disabled', 'azure', false]]) {
+        test(`loses the session with ${change}`, async () => {
             const browser = newBrowser();
             await signIn(browser, 'alice');
             assert.equal(await isSignedIn(browser), true);
@@ -189,7 +189,7 @@ describe('An attacker', () => {
         });
     }
 
-    test('writes nothing but printable lines to the log', async () => {
+    test('cannot write unprintable characters to the log', async () => {
         const browser = newBrowser();
         const {next} = await browser.request('GET', at('/webman/sso/login.cgi'));
         const returned = at(RETURN);
@@ -201,7 +201,7 @@ describe('An attacker', () => {
         wasLogged(AUTH | WARNING, `return.cgi: frontend: sign-in failed: ${reason}`);
     });
 
-    test('has an error believed only with the state of a login of this browser', async () => {
+    test('cannot report an error with a foreign state', async () => {
         const browser = newBrowser();
         const own = (await browser.request('GET', at('/webman/sso/login.cgi'))).next.searchParams.get('state');
         const foreign = (await newBrowser().request('GET', at('/webman/sso/login.cgi'))).next.searchParams.get('state');
@@ -211,7 +211,7 @@ describe('An attacker', () => {
     });
 
     for (const scheme of ['http', 'gopher', 'dict', 'ftp']) {
-        test(`reaches no internal service by a key set at ${scheme}:`, async () => {
+        test(`cannot reach an internal service through ${scheme}:`, async () => {
             let connections = 0;
             const internal = net.createServer((connection) => {
                 ++connections;

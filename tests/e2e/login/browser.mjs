@@ -1,4 +1,4 @@
-// As much of a browser as a login needs: cookies, redirects, forms, TLS under the authority given.
+// A minimal browser: cookies, redirects, forms, and TLS with the given authority.
 import https from 'node:https';
 
 const PATIENCE = 30_000;
@@ -17,12 +17,12 @@ function attributes(tag) {
 function parseCookie(header) {
     const [pair, ...rest] = header.split(/; */);
     const [name, ...value] = pair.split('=');
-    const told = Object.fromEntries(rest.map((item) => item.split('=')).map(([key, text]) => [key.toLowerCase(), text]));
-    return {name, value: value.join('='), path: told.path ?? '/', told};
+    const options = Object.fromEntries(rest.map((item) => item.split('=')).map(([key, text]) => [key.toLowerCase(), text]));
+    return {name, value: value.join('='), path: options.path ?? '/', options};
 }
 
-function hasEnded({told}) {
-    return told['max-age'] ? Number(told['max-age']) <= 0 : Date.parse(told.expires) <= Date.now();
+function hasEnded({options}) {
+    return options['max-age'] ? Number(options['max-age']) <= 0 : Date.parse(options.expires) <= Date.now();
 }
 
 class CookieJar {
@@ -30,9 +30,9 @@ class CookieJar {
 
     store(url, header) {
         const cookie = {host: url.hostname, ...parseCookie(header)};
-        const {name, path, told} = cookie;
-        if (name.startsWith('__Host-') && !('secure' in told && path === '/' && !('domain' in told))) {
-            throw new Error(`a browser refuses the cookie ${name}`);
+        const {name, path, options} = cookie;
+        if (name.startsWith('__Host-') && !('secure' in options && path === '/' && !('domain' in options))) {
+            throw new Error(`a browser rejects the cookie ${name}`);
         }
         this.#cookies = this.#cookies.filter(
             (other) => other.host !== cookie.host || other.name !== name || other.path !== path);
@@ -47,7 +47,7 @@ class CookieJar {
     }
 }
 
-/** An answer: `heading` is that of its page, `next` where it sends the browser, if anywhere. */
+/** An answer. `heading` is the heading of its page, `next` the address of a redirect. */
 class Answer {
     constructor(url, response, text) {
         this.url = url;
@@ -85,13 +85,13 @@ export class Browser {
     cookies = new CookieJar();
     history = [];
 
-    /** `report` gets each exchange: method, address, the form's names, the answer. */
+    /** `report` is called for each exchange: method, address, names of form fields, answer. */
     constructor(authority, report) {
         this.#authority = authority;
         this.#report = report;
     }
 
-    /** One request and its answer; no redirect is followed. */
+    /** Sends a request. Does not follow redirects. */
     async request(method, url, form) {
         const body = form && new URLSearchParams(form).toString();
         const headers = {Cookie: this.cookies.for(url).map(({name, value}) => `${name}=${value}`).join('; ')};
@@ -107,7 +107,7 @@ export class Browser {
         return answer;
     }
 
-    /** Opens an address and goes where the answers send it, up to a page or to an address that `stop` accepts. */
+    /** Opens an address and follows redirects up to a page or an address that `stop` accepts. */
     async open(url, stop = () => false) {
         return this.#follow(await this.request('GET', new URL(url)), stop);
     }

@@ -8,14 +8,14 @@ import {FRONT_END_SETTINGS} from '../site/front_end.mjs';
 
 export const LIMIT = /"read-timeout" => (\d+)/;
 
-/** The front end's settings, with a limit that a test can wait for. */
+/** The front end's settings with a shorter time limit. */
 export function withLimitOf(seconds, folder) {
     const file = path.join(folder, 'front_end.conf');
     writeFileSync(file, readFileSync(FRONT_END_SETTINGS, 'utf8').replace(LIMIT, `"read-timeout" => ${seconds}`));
     return file;
 }
 
-/** The kernel's description of a process; empty once it has ended. */
+/** The status file of a process; empty if it has ended. */
 export function processStatus(pid) {
     try {
         return readFileSync(`/proc/${pid}/status`, 'utf8');

@@ -1,5 +1,5 @@
-// The doctor beside a real OpenID provider: healthy sites of both profiles, a walk through a login, and what
-// administrators do to their sites. Prints what the doctor says. Runs as root of private namespaces.
+// The doctor with a real OpenID provider: healthy sites of both profiles, a login with its help, and mistakes of
+// administrators. Prints the output of the doctor. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {spawn, spawnSync} from 'node:child_process';
 import {chmodSync, copyFileSync, mkdtempSync, readFileSync, rmSync, writeFileSync} from 'node:fs';
@@ -27,12 +27,12 @@ function rename(settings, from, to) {
     return {...others, [to]: value};
 }
 
-/** What an administrator does to a site of a profile, and the check that finds it. */
-const MISHAPS = [
+/** Mistakes of an administrator, and the check that finds each. */
+const MISTAKES = [
     ['removes the profile file', 'azure', 'profile.file', () => rmSync(`${SETTINGS}/profile.conf`)],
-    ['leaves a comma behind the last key', 'azure', 'profile.file',
+    ['leaves a comma after the last key', 'azure', 'profile.file',
         () => writeFileSync(`${SETTINGS}/profile.conf`, '{\n    "sso_enable": true,\n    "sso_profile": "azure",\n}\n')],
-    ['writes a text in the place of a boolean', 'azure', 'profile.sso_enable',
+    ['writes a string instead of a boolean', 'azure', 'profile.sso_enable',
         () => change('profile', (settings) => ({...settings, sso_enable: 'true'}))],
     ['writes the profile with a capital', 'azure', 'profile.sso_profile',
         () => change('profile', (settings) => ({...settings, sso_profile: 'Azure'}))],
@@ -64,12 +64,12 @@ describe('The doctor', () => {
     after(() => site.stop());
     beforeEach(() => {
         copyFileSync(site.authority, SYSTEM_BUNDLE);
-        rmSync('/usr/tavo/etc', {recursive: true}); // with the rights of its files
+        rmSync('/usr/tavo/etc', {recursive: true}); // including the permissions of its files
         writeDomains({'corp.example.net': 'ACME'});
         writeSettings(site);
     });
 
-    // Not waited for as Node waits for `spawnSync`: the provider is in this process.
+    // Not `spawnSync`, because the provider runs in this process.
     async function ask(args = [], talk = () => {}) {
         const child = spawn(doctor, args);
         let printed = '';
@@ -89,7 +89,7 @@ describe('The doctor', () => {
     }
 
     for (const profile of ['azure', 'websphere']) {
-        test(`finds nothing on a healthy site of profile ${profile}`, async () => {
+        test(`reports no findings on a healthy site (${profile})`, async () => {
             useProfile(profile);
             const {status, printed} = await ask(['--domain', 'corp.example.net']);
             console.log(`\n== Healthy, ${profile}\n${printed}`);
@@ -98,12 +98,12 @@ describe('The doctor', () => {
         });
     }
 
-    for (const [mishap, profile, id, happen] of MISHAPS) {
-        test(`finds by ${id} that an administrator ${mishap} (${profile})`, async () => {
+    for (const [mistake, profile, id, happen] of MISTAKES) {
+        test(`${id}: an administrator ${mistake} (${profile})`, async () => {
             useProfile(profile);
             happen();
             const {status, printed} = await ask();
-            console.log(`\n== An administrator ${mishap} (${profile})\n${printed}`);
+            console.log(`\n== An administrator ${mistake} (${profile})\n${printed}`);
             assert.equal(status, 1);
             const {checks} = JSON.parse((await ask(['--json'])).printed);
             assert.equal(checks.find(({mark}) => mark === 'finding').id, id);
@@ -119,7 +119,7 @@ describe('The doctor', () => {
     }
 
     for (const [profile, login, name] of [['azure', 'alice', 'ACME\\alice'], ['websphere', 'bob', 'bob']]) {
-        test(`walks ${login} through a login of profile ${profile}`, async () => {
+        test(`guides ${login} through a login (${profile})`, async () => {
             useProfile(profile);
             let address;
             const {status, printed} = await ask(['login'], (text, stdin) => {
@@ -136,7 +136,7 @@ describe('The doctor', () => {
         });
     }
 
-    test('is one program, which says which', () => {
+    test('prints its version', () => {
         assert.match(spawnSync(doctor, ['--version'], {encoding: 'utf8'}).stdout, /^tavosso-doctor \d+\.\d+\.\d+\n$/);
     });
 });

@@ -1,4 +1,4 @@
-// A provider whose answer never ends. Runs as root of private namespaces.
+// A provider that sends an endless answer. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {readFileSync} from 'node:fs';
@@ -11,11 +11,11 @@ import {makeUsers, startSite} from '../site/site.mjs';
 import {Browser} from './browser.mjs';
 
 const CHUNK = Buffer.alloc(1 << 20, 'x');
-const MOST = 2 ** 31; // bytes: a program that takes as many has no limit
+const MOST = 2 ** 31; // bytes; more would mean that the program has no limit
 
 const [webroot, nodeModules] = process.argv.slice(2);
 
-/** Sends chunks until the other side closes the connection. Returns how many bytes it sent. */
+/** Sends chunks until the client closes the connection. Returns the number of bytes. */
 async function sendWithoutEnd(response) {
     let sent = 0;
     function* chunks() {
@@ -35,7 +35,7 @@ describe('An endless answer', () => {
     });
     after(() => site.stop());
 
-    test('ends the sign-in and not the memory of the machine', async () => {
+    test('ends the sign-in without exhausting memory', async () => {
         let sent;
         const endless = https.createServer(site.providerCertificate, (request, response) => {
             sent = sendWithoutEnd(response);
@@ -49,7 +49,7 @@ describe('An endless answer', () => {
             const form = await browser.open(`${site.origin}/webman/sso/login.cgi`);
             const relay = await browser.submit(form, {login: 'alice', password: site.users.get('alice').password});
             assert.match(relay.url.hash, /success=false$/);
-            assert.ok(await sent < MOST, `the program took ${await sent} bytes`);
+            assert.ok(await sent < MOST, `the program received ${await sent} bytes`);
         } finally {
             endless.close();
             endless.closeAllConnections();

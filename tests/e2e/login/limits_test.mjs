@@ -1,5 +1,4 @@
-// A provider that keeps a sign-in waiting: the library waits with it, and the web server ends that. Runs as root of
-// private namespaces.
+// A slow provider: the library waits, and the web server ends the sign-in. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {copyFileSync, mkdtempSync, readdirSync, readFileSync} from 'node:fs';
@@ -20,12 +19,12 @@ const SECOND = 1000;
 
 const [webroot] = process.argv.slice(2);
 
-/** It takes requests; what it answers, if anything, is the test's business. */
+/** Accepts requests. The test answers them. */
 class SlowProvider {
     constructor(server) {
         this.server = server;
         server.on('request', (request, response) => {
-            // Whether it ends with a goodbye or is reset: a program that is ended has no time for manners.
+            // A killed program closes the connection without a TLS close_notify.
             const closed = new Promise((resolve) => request.socket.once('close', resolve));
             request.resume().on('end', () => this.asked({path: request.url, closed, response}));
         });
@@ -48,7 +47,7 @@ class SlowProvider {
         };
     }
 
-    /** The next request, when it is there as a whole. */
+    /** The next request, once complete. */
     nextRequest() {
         return new Promise((resolve) => {
             this.asked = resolve;
@@ -98,7 +97,7 @@ async function startEverything() {
     };
 }
 
-/** A browser that is back from the provider with a code: its address, not opened yet, and its cookies. */
+/** The return address with a code, and the cookies of the browser. */
 async function comeBack({newBrowser}, {origin}) {
     const browser = newBrowser();
     const start = await browser.request('GET', new URL(`${origin}/webman/sso/login.cgi`));
@@ -114,7 +113,7 @@ async function open({authority, ...stage}, server) {
     return {socket, answer: once(request, 'response').then(([response]) => response.resume())};
 }
 
-describe('A sign-in whose provider keeps it waiting', () => {
+describe('A sign-in with a slow provider', () => {
     let stage;
     before(async () => {
         stage = await startEverything();
@@ -122,7 +121,7 @@ describe('A sign-in whose provider keeps it waiting', () => {
     after(() => stage.stop());
     beforeEach(() => useProfile('websphere'));
 
-    // Up to where the program waits for the provider.
+    // Starts a sign-in until the program waits for the provider.
     async function startWaiting(server) {
         const request = stage.provider.nextRequest();
         const opened = await open(stage, server);
@@ -134,7 +133,7 @@ describe('A sign-in whose provider keeps it waiting', () => {
 
     async function expectProgramEnded(closed) {
         await closed;
-        // The provider's end of the connection closes a little before the program has ended altogether.
+        // The connection closes shortly before the program ends.
         await until(() => runningPrograms().length === 0);
     }
 
@@ -146,17 +145,17 @@ describe('A sign-in whose provider keeps it waiting', () => {
         await expectProgramEnded(closed);
     }
 
-    test('is ended by the web server where the provider never answers', async () => {
+    test('times out if the provider never answers', async () => {
         await expectEnded(await startWaiting(stage.servers.impatient));
     });
 
-    test('waits for as long as the web server lets it', async () => {
+    test('waits until the time limit', async () => {
         const {response, answer} = await startWaiting(stage.servers.shipped);
         response.end('{"error": "gone"}');
         assert.match((await answer).headers.location, /success=false$/);
     });
 
-    test('is ended by the web server where the provider drips its answer', async () => {
+    test('times out if the provider answers slowly', async () => {
         const waiting = await startWaiting(stage.servers.impatient);
         waiting.response.writeHead(200, {'Content-Length': 1000});
         waiting.response.flushHeaders();
@@ -168,14 +167,14 @@ describe('A sign-in whose provider keeps it waiting', () => {
         }
     });
 
-    test('ends with its browser', async () => {
+    test('ends when the browser disconnects', async () => {
         const {socket, answer, closed} = await startWaiting(stage.servers.shipped);
         socket.destroy();
         await assert.rejects(answer);
         await expectProgramEnded(closed);
     });
 
-    test('is bounded by the settings that are shipped', () => {
+    test('has a limit in the shipped settings', () => {
         const [, seconds] = LIMIT.exec(readFileSync(FRONT_END_SETTINGS, 'utf8'));
         assert.ok(Number(seconds) > 0 && Number(seconds) <= 60, `a limit of ${seconds} s`);
     });

@@ -1,4 +1,4 @@
-// What a walk needs: a site, users, and who reports what they do.
+// The site, users and report of a walk.
 import {readFileSync} from 'node:fs';
 
 import {makeUsers, startSite} from '../site/site.mjs';

@@ -1,5 +1,4 @@
-// The README's program with the provider that `./demo provider` serves: it signs users in and resists attacks.
-// Runs as root of private namespaces.
+// The README's program with the provider of `./demo provider`. Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {spawn, spawnSync} from 'node:child_process';
 import {once} from 'node:events';
@@ -18,7 +17,7 @@ const PROVIDER = fileURLToPath(new URL('../site/serve_provider.mjs', import.meta
 const REDIRECT_URI = 'https://localhost/webman/sso/sso.cgi';
 const SYSTEM_BUNDLE = '/etc/ssl/certs/ca-certificates.crt';
 
-/** Starts the provider; gives its process, its authority's certificate, and the users' passwords, as it prints them. */
+/** Starts the provider. Returns its process, the certificate of its authority, and the passwords that it prints. */
 async function startProvider(profile) {
     const server = spawn('node', [PROVIDER, '--node-modules', nodeModules, '--redirect-uri', REDIRECT_URI,
         '--profile', profile, '--etc', '/usr/tavo/etc'], {stdio: ['ignore', 'pipe', 'inherit']});
@@ -33,11 +32,11 @@ async function startProvider(profile) {
         }
     }
     copyFileSync(authority, SYSTEM_BUNDLE);
-    mkdirSync('/usr/tavo/var', {recursive: true}); // the program makes its folder in it
+    mkdirSync('/usr/tavo/var', {recursive: true}); // the program creates its folder here
     return {server, passwords, authority: readFileSync(authority)};
 }
 
-/** The headers of the program's answer to a request. */
+/** Runs the program. Returns the headers of its answer. */
 function ask(query, cookie = '') {
     const {stdout} = spawnSync(PROGRAM, {
         encoding: 'utf8', env: {REQUEST_METHOD: 'GET', QUERY_STRING: query, HTTP_COOKIE: cookie},
@@ -56,7 +55,7 @@ describe('The README\'s program', async () => {
     after(() => log.stop());
     afterEach(() => provider.server.kill('SIGINT'));
 
-    /** Signs a user in at the provider; gives the query and the cookies with which the browser comes back. */
+    /** Signs a user in at the provider. Returns the query and cookie of the return address. */
     async function signIn(login) {
         const browser = new Browser(provider.authority, () => {});
         const start = ask('');
@@ -71,7 +70,7 @@ describe('The README\'s program', async () => {
     }
 
     for (const profile of ['azure', 'websphere']) {
-        test(`signs users in under profile ${profile}, and withstands attacks`, async () => {
+        test(`signs users in and resists attacks (${profile})`, async () => {
             provider = await startProvider(profile);
             const alice = await signIn('alice');
             const bob = await signIn('bob');
@@ -87,7 +86,7 @@ describe('The README\'s program', async () => {
         });
     }
 
-    test('tells the network from a certificate', async () => {
+    test('distinguishes network from certificate errors', async () => {
         provider = await startProvider('azure');
         const first = await signIn('alice');
         const second = await signIn('alice');
@@ -99,14 +98,14 @@ describe('The README\'s program', async () => {
         await isRefused(second.query, second.cookie, 'network');
     });
 
-    test('starts again with the page to return to', async () => {
+    test('keeps the page to return to', async () => {
         provider = await startProvider('azure');
         const {Location: address} = ask('origin=%2Ffiles');
         const state = new URL(address).searchParams.get('state');
         assert.equal(JSON.parse(Buffer.from(state, 'base64').toString()).origin, '/files');
     });
 
-    test('reports what is not set up', async () => {
+    test('reports missing configuration', async () => {
         provider = await startProvider('azure');
         const alice = await signIn('alice');
         rmSync('/usr/tavo/etc/ssoclient/azure.conf');

@@ -1,4 +1,4 @@
-// What happens, one readable line each. Names of parameters only: values may be secrets, codes and tokens.
+// Prints each step on one line. Shows only names of parameters, because values may be secrets, codes or tokens.
 
 const names = (list) => (list.length > 0 ? `(${[...new Set(list)].join(', ')})` : '');
 const withNames = (text, list) => [text, names(list)].filter(Boolean).join(' ');
@@ -39,7 +39,7 @@ export class Report {
         return this.#sites.get(url.origin) ?? 'elsewhere';
     }
 
-    // The provider's paths name the one login that they belong to: that name is nobody's business.
+    // The provider's paths contain the id of the login.
     #place(url) {
         const path = url.pathname.replace(/^(\/(?:auth|sign-in))\/.*/, '$1/...');
         const place = withNames(path, [...url.searchParams.keys()]);

@@ -1,4 +1,4 @@
-// The walk: what a user and a browser do at the appliance and at the provider, each step checked.
+// Steps of a user at the appliance and at the provider. Each step is verified.
 import assert from 'node:assert/strict';
 
 import {Browser} from './browser.mjs';
@@ -12,8 +12,8 @@ const COOKIE = /^__Host-[\w-]+=[0-9a-f]*; Path=\/; Secure; HttpOnly; SameSite=La
 
 export class Walk {
     /**
-     * `origin` is the appliance's address, `provider` the provider's, `passwords` those of the users, `authority` the
-     * certificate to trust, `asked` the list that the appliance's requests to the provider are added to.
+     * `origin` is the address of the appliance, `provider` that of the provider, `passwords` those of the users,
+     * `authority` the trusted certificate, `asked` the list of the appliance's requests to the provider.
      */
     constructor({origin, provider, passwords, authority, asked, log, report}) {
         Object.assign(this, {origin, provider, passwords, authority, asked, log, report});
@@ -28,7 +28,7 @@ export class Walk {
         });
     }
 
-    /** Signs a user in and gives the name under which the appliance knows them. */
+    /** Signs a user in. Returns the name on the appliance. */
     async signIn(browser, login) {
         const relay = await this.#goToRelayPage(browser, login);
         const view = await this.#runRelayScript(browser, relay);
@@ -39,7 +39,7 @@ export class Walk {
         return this.userOf(browser);
     }
 
-    /** The same through the program of the README, which opens no session: the log tells the name. */
+    /** The same through the README's program. It opens no session, so the name is read from the log. */
     async signInThroughReadmeProgram(browser, login) {
         const form = await browser.open(this.origin + README_PROGRAM);
         const relay = await browser.submit(form, {login, password: this.passwords.get(login)});
@@ -50,7 +50,7 @@ export class Walk {
         return line.replace('sso.cgi: signed in: ', '');
     }
 
-    /** Opens a return address of another browser's sign-in through the program of the README, which must refuse it. */
+    /** Opens a foreign return address, which the README's program must reject. */
     async isRefusedByReadmeProgram(browser, address) {
         const view = await this.#runRelayScript(browser, await browser.open(address));
         assert.equal(view.headline, 'Sign-in failed');
@@ -58,43 +58,43 @@ export class Walk {
         assert.equal(this.#tokenRequests(), 0, 'a token request was made');
     }
 
-    /** The site's bare address, which is what a user types. */
+    /** Opens the address without a path, as a user types it. */
     async openSite(browser) {
         const site = await browser.open(`${this.origin}/`);
         const start = await browser.open(this.origin + START_PAGE);
         assert.equal(site.url.href, `${this.origin}/`);
-        assert.equal(site.text, start.text, 'the bare address shows another page than the start page');
+        assert.equal(site.text, start.text, 'the address without a path does not show the start page');
     }
 
-    /** The user whom the start page names. */
+    /** The user that the start page shows. */
     async userOf(browser) {
         const start = await browser.open(this.origin + START_PAGE);
         return /<strong>(.*)<\/strong>/.exec(start.text)?.[1];
     }
 
-    /** A sign-in that fails after the provider's page; gives the reason that the user reads. */
+    /** Fails to sign in after the provider's page. Returns the reason that the user reads. */
     async failToSignIn(browser, login) {
         const relay = await this.#goToRelayPage(browser, login);
         return this.#readReason(browser, relay);
     }
 
-    /** The user changes their mind at the provider. */
+    /** Cancels at the provider. */
     async cancel(browser) {
         const form = await this.#openSignInForm(browser);
         return this.#readReason(browser, await browser.submit(form, {action: 'cancel'}));
     }
 
-    /** Goes to an address that the provider sent some browser to before. */
+    /** Opens a return address again. */
     async goAgain(browser, address) {
         return this.#readReason(browser, await browser.open(address));
     }
 
-    /** The return address of the browser's last login, as its history holds it. */
+    /** The return address of the last login in the browser's history. */
     lastReturnAddress(browser, page = RETURN_PAGE) {
         return browser.history.findLast(({url}) => url.pathname === page && url.searchParams.has('state')).url;
     }
 
-    /** A login in progress, up to the return address, which is not followed. */
+    /** Signs in at the provider. Returns the return address, without opening it. */
     async startSignIn(browser, login) {
         const form = await this.#openSignInForm(browser);
         const isReturn = (url) => url.pathname === RETURN_PAGE;
@@ -116,7 +116,7 @@ export class Walk {
         return page.url.pathname;
     }
 
-    /** Since the last time that it was asked. */
+    /** The number of token requests since the last call. */
     #tokenRequests() {
         return this.asked.splice(0).filter(({path}) => path === '/token').length;
     }
@@ -141,35 +141,35 @@ export class Walk {
         const view = await this.#runRelayScript(browser, relay);
         assert.equal(view.headline, 'Sign-in failed');
         const line = await this.log.until(/^return\.cgi: frontend: sign-in failed: /);
-        assert.ok(line.endsWith(`: ${view.reason}`), 'the log and the page tell different reasons');
+        assert.ok(line.endsWith(`: ${view.reason}`), 'the log and the page show different reasons');
         return view.reason;
     }
 
-    async refusedBeforeTheTokenRequest(refusal) {
+    async expectNoTokenRequest(refusal) {
         this.#tokenRequests();
         const reason = await refusal;
         assert.equal(this.#tokenRequests(), 0, 'a token request was made');
         return reason;
     }
 
-    /** What the relay page makes of a fragment that the appliance did not write. */
+    /** The target of the relay page for a forged fragment. */
     async followForgedFragment(browser, fragment) {
         const page = await browser.open(`${this.origin}${RELAY_PAGE}#${fragment}`);
         return (await this.#runRelayScript(browser, page)).onward;
     }
 
-    // Runs the script that was served, as the page would.
+    // Runs the served script.
     async #runRelayScript(browser, page) {
         assert.equal(page.url.origin + page.url.pathname, this.origin + RELAY_PAGE);
         const source = /<script type="module" src="([^"]+)"><\/script>/.exec(page.text)[1];
         const {describe} = await import(await this.#fetchModule(browser, new URL(source, page.url)));
         const view = describe(page.url.hash);
-        const details = view.reason && `, in its details "${view.reason}"`;
-        this.report.fact(`the relay page says "${view.headline}. ${view.explanation}"${details}; it leads to ${view.onward}`);
+        const details = view.reason && `, details "${view.reason}"`;
+        this.report.fact(`the relay page shows "${view.headline}. ${view.explanation}"${details}; it links to ${view.onward}`);
         return view;
     }
 
-    // As an address that holds it, with what it imports.
+    // A data URL of the module and its imports.
     async #fetchModule(browser, url) {
         const script = await browser.open(url);
         assert.match(script.headers['content-type'], /^text\/javascript/);
@@ -187,7 +187,7 @@ export class Walk {
         assert.equal(headers['x-content-type-options'], 'nosniff');
         assert.match(headers['content-security-policy'], /^default-src 'none';.* frame-ancestors 'none'$/);
         for (const cookie of headers['set-cookie'] ?? []) {
-            assert.match(cookie, COOKIE, 'a cookie without its protection');
+            assert.match(cookie, COOKIE, 'unprotected cookie');
         }
     }
 }

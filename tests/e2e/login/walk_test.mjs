@@ -1,5 +1,5 @@
-// Signs users in at a real OpenID provider through the front end, or serves both until it is ended. Runs as root of
-// private namespaces; see `run`.
+// Signs users in at a real OpenID provider through the front end, or serves both until interrupted. Runs as root of
+// private namespaces; see `walk_logins`.
 import assert from 'node:assert/strict';
 import {copyFileSync, rmSync} from 'node:fs';
 
@@ -18,7 +18,7 @@ async function walkAzure(walk, report) {
 
     report.title('The same return a second time: rejected before the token request; alice stays signed in');
     const again = walk.goAgain(browser, walk.lastReturnAddress(browser));
-    assert.equal(await walk.refusedBeforeTheTokenRequest(again), 'This sign-in was not started in this browser.');
+    assert.equal(await walk.expectNoTokenRequest(again), 'This sign-in was not started in this browser.');
     assert.equal(await walk.userOf(browser), user);
 
     report.title('Profile azure: alice signs out of the appliance and of the provider');
@@ -29,14 +29,14 @@ async function walkAzure(walk, report) {
 
     report.title('Profile azure: a user cancels at the provider');
     assert.equal(
-        await walk.refusedBeforeTheTokenRequest(walk.cancel(walk.newBrowser())),
+        await walk.expectNoTokenRequest(walk.cancel(walk.newBrowser())),
         'The provider refused: access_denied (The user cancelled.)');
 
     report.title("Login CSRF: a victim's browser opens the return address of another user's sign-in");
     const foreign = await walk.startSignIn(walk.newBrowser(), 'alice');
     const victim = walk.newBrowser();
     assert.equal(
-        await walk.refusedBeforeTheTokenRequest(walk.goAgain(victim, foreign)),
+        await walk.expectNoTokenRequest(walk.goAgain(victim, foreign)),
         'This sign-in was not started in this browser.');
     assert.equal(await walk.userOf(victim), undefined);
 
@@ -101,7 +101,7 @@ async function serve(running, profile, authorityFile) {
     rmSync(authorityFile);
 }
 
-/** The same walk, on a machine whose domain is known to its directory and to no file. */
+/** The same walk with an empty domains.conf: the directory knows the domain. */
 async function walkWithDirectory(running) {
     const controller = await Controller.start();
     try {

@@ -1,5 +1,5 @@
-// Attacks on the web server of the running site: request bodies, other paths, missing headers, header injection and
-// variables of the programs. Runs as root of private namespaces.
+// Attacks on the web server: request bodies, other paths, missing headers, header injection and environment variables.
+// Runs as root of private namespaces.
 import assert from 'node:assert/strict';
 import {once} from 'node:events';
 import {cpSync, mkdtempSync, readdirSync, readFileSync, watch, writeFileSync} from 'node:fs';
@@ -72,7 +72,7 @@ async function startSite() {
     return {origin, authority: readFileSync(authority.file), ...server};
 }
 
-/** Every line end counts, also one that only some clients accept. */
+/** Splits at every line end that some client accepts. */
 function parseAnswer(text) {
     const [head, ...body] = text.split('\r\n\r\n');
     const [statusLine, ...lines] = head.split(/\r\n|\r|\n/);
@@ -103,7 +103,7 @@ describe('The web server', () => {
     });
     after(() => site.stop());
 
-    /** The answer to a request that is sent byte for byte, up to where the server ends the connection. */
+    /** The answer to a request that is sent byte for byte. */
     async function send(bytes) {
         const socket = await connect(site.authority, site);
         socket.setTimeout(PATIENCE, () => socket.destroy(new Error('the server does not answer')));
@@ -115,7 +115,7 @@ describe('The web server', () => {
         return parseAnswer(text);
     }
 
-    /** The status of an answer over HTTP/2 to a request whose body does not end. */
+    /** The status of the answer to an HTTP/2 request with an unfinished body. */
     async function statusOverHttp2(headers, body) {
         const address = `https://127.0.0.1:${new URL(site.origin).port}`;
         const session = http2.connect(address, {ca: site.authority, servername: 'localhost'});
@@ -174,7 +174,7 @@ describe('The web server', () => {
         }
     });
 
-    describe('refuses', () => {
+    describe('rejects', () => {
         const encode = (name) => encodeURIComponent(name).replaceAll('%2F', '/');
         const others = [
             // Path info.
@@ -196,27 +196,27 @@ describe('The web server', () => {
         }
     });
 
-    describe('protects its answer by headers', () => {
+    describe('sends security headers', () => {
         const huge = {'Content-Length': '1000000000000'};
         const post = (headers, body) => request('/index.cgi', {method: 'POST', headers, body});
         const answers = [
             [200, 'a page', request('/index.cgi')],
             [200, 'a file', request('/webman/ssoclient/relay.html')],
-            [200, 'a range that the file does not have',
+            [200, 'a range beyond the file',
                 request('/webman/ssoclient/relay.html', {headers: {Range: 'bytes=1000000-'}})],
             [302, 'a sign-in', request(LOGIN_PAGE)],
-            [400, 'no request', 'nonsense\r\n\r\n'],
+            [400, 'an invalid request', 'nonsense\r\n\r\n'],
             [400, 'no host', 'GET / HTTP/1.1\r\n\r\n'],
-            [400, 'a host that is none', request('/', {headers: {Host: 'local<host'}})],
+            [400, 'an invalid host', request('/', {headers: {Host: 'local<host'}})],
             [400, 'a control character in a header', request('/', {headers: {Cookie: 'a\x01b'}})],
-            [400, 'a chunk that is none', post({'Transfer-Encoding': 'chunked'}, 'nonsense\r\n')],
+            [400, 'an invalid chunk', post({'Transfer-Encoding': 'chunked'}, 'nonsense\r\n')],
             [403, 'a path that is not served', request('/webman/sso/core')],
-            [403, 'such a path, not modified', request('/webman/sso/core', {headers: {'If-None-Match': '*'}})],
-            [404, 'a program that is not there', request('/webman/sso/nowhere.cgi')],
-            [405, 'a method that the program refuses', request('/webman/sso/logout.cgi')],
+            [403, 'a path that is not served, not modified', request('/webman/sso/core', {headers: {'If-None-Match': '*'}})],
+            [404, 'a missing program', request('/webman/sso/nowhere.cgi')],
+            [405, 'a method that the program rejects', request('/webman/sso/logout.cgi')],
             [411, 'a body without a length', post({})],
             [413, 'a large body', post(huge)],
-            [413, 'a large body that waits', post({...huge, Expect: '100-continue'})],
+            [413, 'a large body with Expect', post({...huge, Expect: '100-continue'})],
             [431, 'a long address', request(`/index.cgi?${'x'.repeat(10_000)}`)],
             [431, 'a long header', request('/index.cgi', {headers: {Cookie: 'x'.repeat(10_000)}})],
             [501, 'an unknown method', request('/index.cgi', {method: 'NONSENSE'})],
@@ -233,7 +233,7 @@ describe('The web server', () => {
         }
     });
 
-    describe('lets no line break become a header', () => {
+    describe('prevents header injection', () => {
         const injected = 'Injected: yes';
         const breaks = {
             '%0D%0A': 'CR LF',
@@ -269,7 +269,7 @@ describe('The web server', () => {
             assert.deepEqual(valuesOf(answer, 'injected'), []);
         });
 
-        test("CR LF in the provider's error: the relay page shows it", async () => {
+        test("CR LF in the provider's error", async () => {
             const browser = new Browser(site.authority, () => {});
             const {next} = await browser.request('GET', new URL(site.origin + LOGIN_PAGE));
             const query = new URLSearchParams({
@@ -290,7 +290,7 @@ describe('The web server', () => {
         });
     });
 
-    test("sets no variable but HTTP_* from a client's headers", async () => {
+    test('maps client headers only to HTTP_* variables', async () => {
         const variables = async (headers) => {
             const {status, body} = await send(request('/webman/sso/environment.cgi', {headers}));
             assert.equal(status, 200);

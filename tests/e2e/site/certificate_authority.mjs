@@ -1,4 +1,4 @@
-// A certificate authority for one run.
+// A certificate authority for each run.
 import {execFileSync} from 'node:child_process';
 import {createHash, X509Certificate} from 'node:crypto';
 import {readFileSync, writeFileSync} from 'node:fs';
@@ -9,13 +9,16 @@ const EXTENSIONS = {
     server: 'basicConstraints = critical, CA:FALSE\nextendedKeyUsage = serverAuth',
 };
 
-// Of its public key: Chromium trusts a server by it.
+// The fingerprint of the public key, by which Chromium can trust a server.
 function fingerprint(certificate) {
     const key = new X509Certificate(certificate).publicKey.export({type: 'spki', format: 'der'});
     return createHash('sha256').update(key).digest('base64');
 }
 
-/** Makes the authority in `folder`; gives its file and what issues a server's certificate for "DNS:..." or "IP:...". */
+/**
+ * Makes the authority in `folder`. Returns its file, and a function that issues a server certificate for "DNS:..." or
+ * "IP:...".
+ */
 export function makeAuthority(folder) {
     const make = (name, extensions, ...options) => {
         const file = (suffix) => path.join(folder, name + suffix);

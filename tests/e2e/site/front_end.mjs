@@ -1,4 +1,4 @@
-// The appliance: its configuration files and a web server with the front end.
+// The appliance: configuration files, and a web server with the front end.
 import {spawn} from 'node:child_process';
 import {once} from 'node:events';
 import {mkdirSync, readFileSync, writeFileSync} from 'node:fs';
@@ -7,7 +7,7 @@ import path from 'node:path';
 import {fileURLToPath} from 'node:url';
 
 const ETC = '/usr/tavo/etc';
-// Where the front end is installed and enabled, the web server's own settings say what is served.
+// If the front end is installed, the settings of the system's web server are used.
 const INSTALLED_SETTINGS = process.env.INSTALLED_LIGHTTPD_CONF;
 export const FRONT_END_SETTINGS = fileURLToPath(new URL('../../../frontend/lighttpd.conf', import.meta.url));
 
@@ -15,13 +15,13 @@ function writeJson(file, settings, mode) {
     writeFileSync(file, `${JSON.stringify(settings, null, 4)}\n`, {mode});
 }
 
-/** The platform's domains: DNS name to NetBIOS name. */
+/** The platform's domain table: DNS names and NetBIOS names. */
 export function writeDomains(domains, etc = ETC) {
     mkdirSync(`${etc}/ssoclient`, {recursive: true, mode: 0o755});
     writeJson(`${etc}/domains.conf`, domains, 0o644);
 }
 
-/** The settings of both profiles' clients. */
+/** The configuration files of both clients. */
 export function writeSettings({provider, clients}, etc = ETC) {
     const [azure, websphere] = clients;
     writeJson(`${etc}/ssoclient/azure.conf`, {
@@ -50,23 +50,25 @@ export function useProfile(name, enable = true, etc = ETC) {
     writeJson(`${etc}/ssoclient/profile.conf`, {sso_enable: enable, sso_profile: name}, 0o644);
 }
 
-/** A listening socket on a port of the kernel's choice, for `startWebServer`: its port is known before the server. */
+/**
+ * A listening socket for `startWebServer`. The kernel chooses the port, which must be known before the server starts.
+ */
 export async function listen() {
     const socket = net.createServer();
     socket.listen(0, '127.0.0.1');
     await once(socket, 'listening');
-    // Or a run whose site fails to start behind this would hang, and not say why.
+    // Otherwise a failed start would keep the process alive.
     socket.unref();
     return socket;
 }
 
-/** `frontEndSettings` is the file of the front end's own settings. */
+/** `frontEndSettings` is the path of the front end's settings. */
 export function startWebServer({socket, webroot, certificate, folder, frontEndSettings = FRONT_END_SETTINGS}) {
     const settings = path.join(folder, 'lighttpd.conf');
     const log = path.join(folder, 'lighttpd.log');
     const uploads = path.join(folder, 'uploads');
     mkdirSync(uploads);
-    mkdirSync('/usr/tavo/var', {recursive: true}); // the front end makes its own folder in it
+    mkdirSync('/usr/tavo/var', {recursive: true}); // the front end creates its folder here
     const served = INSTALLED_SETTINGS
         ? `include "${INSTALLED_SETTINGS}"`
         : `server.document-root = "${webroot}"\ninclude "${frontEndSettings}"`;
@@ -86,8 +88,8 @@ ssl.openssl.ssl-conf-cmd := ( "MinProtocol" => "TLSv1.2" )
 ssl.pemfile := "${certificate.certFile}"
 ssl.privkey := "${certificate.keyFile}"
 `);
-    // The server takes the socket over when it is told its own process id, which the shell knows before it becomes it.
-    // Node has no other name for a listening socket's descriptor.
+    // Socket activation needs the server's process id, which the shell knows before exec. Node has no public name for
+    // the descriptor of a listening socket.
     const server = spawn('sh', ['-c', 'LISTEN_FDS=1 LISTEN_PID=$$ exec /usr/sbin/lighttpd -D -f "$0"', settings], {
         stdio: ['ignore', 'inherit', 'inherit', socket._handle.fd],
     });

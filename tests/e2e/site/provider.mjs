@@ -1,4 +1,4 @@
-// The OpenID provider: a certified implementation over TLS, with users of its own and a sign-in page of its own.
+// The OpenID provider: a certified implementation with TLS, test users and a sign-in page.
 import {generateKeyPairSync, randomBytes} from 'node:crypto';
 import {once} from 'node:events';
 import https from 'node:https';
@@ -29,7 +29,7 @@ function registration({id, secret, algorithm, redirectURI, otherRedirectURI, log
 
 function configuration({MemoryAdapter, clients, users, tenant, lifetimes}) {
     return {
-        // Nothing outlives the run; under a name of our own the provider does not warn of that.
+        // In memory only. The subclass avoids the provider's warning about it.
         adapter: class extends MemoryAdapter {},
         clients: clients.map(registration),
         enabledJWA: {idTokenSigningAlgValues: ['RS256', 'HS256']},
@@ -64,7 +64,7 @@ function configuration({MemoryAdapter, clients, users, tenant, lifetimes}) {
     };
 }
 
-// The appliance belongs to the organisation: its users are not asked whether they trust it, unless marked so.
+// Consent is granted automatically, except for users with `decidesAlone`.
 async function findGrant({provider, client, session, result}, users) {
     if (users.get(session.accountId).decidesAlone) {
         const agreed = result?.consent?.grantId ?? session.grantIdFor(client.clientId);
@@ -164,15 +164,14 @@ async function askForPassword({users, uid, form, isAsked, response, finish}) {
     }
 }
 
-// Directory providers send the browser back after a logout without asking which client it comes from; this one wants to
-// know.
+// Directory providers do not require the client id for a logout; this one does.
 function signOut(clientID, request, response) {
     const {searchParams} = new URL(request.url, 'https://provider');
     searchParams.set('client_id', clientID);
     response.writeHead(303, {Location: `/session/end?${searchParams}`}).end();
 }
 
-// What the appliance, not the browser, asks; told before the answer goes out.
+// Reports the requests of the appliance, before the answer is sent.
 function reporting(report) {
     return async (context, next) => {
         await next();
@@ -188,12 +187,11 @@ function reporting(report) {
 }
 
 /**
- * Starts the provider on a port of the kernel's choice.
+ * Starts the provider on a port that the kernel chooses.
  *
- * `users` is a map from login to {password, uniqueName} and, for one who is asked for consent, `decidesAlone`, for one
- * with other claims in the ID token, `claims`; `report`
- * is called for each request of an appliance. What it gives holds the lifetimes of codes and ID tokens in seconds, to
- * be changed at will: with a negative one they have expired when they are issued.
+ * `users` maps logins to {password, uniqueName}, with optional `decidesAlone` (asked for consent) and `claims`
+ * (additional claims of the ID token). `report` is called for each request of an appliance. The returned `lifetimes` of
+ * codes and ID tokens, in seconds, can be changed; negative values make them expired when issued.
  */
 export async function startProvider({nodeModules, certificate, users, tenant, clients, report}) {
     const load = (file) => import(pathToFileURL(path.join(nodeModules, 'oidc-provider/lib', file)));

@@ -1,4 +1,4 @@
-// Serves only the OpenID provider, for the reader's own program, until Ctrl-C: see ../../../demo.
+// Serves only the OpenID provider until Ctrl-C, for a program of the reader: see ../../../demo.
 import {mkdirSync, mkdtempSync, rmSync} from 'node:fs';
 import {tmpdir} from 'node:os';
 import path from 'node:path';
@@ -56,7 +56,7 @@ Install the configuration files and the authority:
   sudo cp ${authority.file} /usr/local/share/ca-certificates/tavosso-provider.crt
   sudo update-ca-certificates
 
-The browser must trust the authority, too. Users:
+Make the browser trust the authority, too. Users:
 `);
 for (const [login, {password, uniqueName}] of users) {
     console.log(`  ${login.padEnd(6)} password ${password}  (${uniqueName})`);

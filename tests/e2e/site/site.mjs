@@ -1,5 +1,5 @@
-// A whole site for a run: the appliance with the front end, a real OpenID provider, users, and an authority that both
-// trust. Runs as root of private namespaces.
+// A complete site: the appliance with the front end, a real OpenID provider, users, and an authority that both trust.
+// Runs as root of private namespaces.
 import {randomBytes, randomUUID} from 'node:crypto';
 import {copyFileSync, mkdtempSync} from 'node:fs';
 
@@ -14,13 +14,13 @@ const DOMAINS = {'corp.example.net': 'ACME'};
 const randomSecret = () => randomBytes(24).toString('base64url');
 const randomPassword = () => randomBytes(9).toString('base64url');
 
-/** Users by login, each with a password of this run; `named` tells their names at the provider. */
+/** Users by login, with random passwords. `named` maps logins to names at the provider. */
 export function makeUsers(named) {
     return new Map(Object.entries(named).map(
         ([login, uniqueName]) => [login, {uniqueName, password: randomPassword()}]));
 }
 
-/** The clients of both profiles, as they are registered at the provider; `addresses` are those of the appliance. */
+/** The clients of both profiles, as registered at the provider, with the addresses of the appliance. */
 export function makeClients(addresses) {
     return [
         {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant: randomUUID(), ...addresses},
@@ -29,8 +29,8 @@ export function makeClients(addresses) {
 }
 
 /**
- * `onRequest` gets each request of the appliance to a provider, `onLog` each line of the system's log. Of what it
- * gives, `chromiumTrust` is the switch by which Chromium trusts the certificates of this run and no others.
+ * Calls `onRequest` for each request of the appliance to a provider and `onLog` for each log line. The returned
+ * `chromiumTrust` is a switch that makes Chromium trust only the certificates of this run.
  */
 export async function startSite({webroot, nodeModules, users, onRequest, onLog}) {
     const folder = mkdtempSync('/tmp/site-');
@@ -41,7 +41,7 @@ export async function startSite({webroot, nodeModules, users, onRequest, onLog})
     const origin = `https://localhost:${socket.address().port}`;
     const clients = makeClients({
         redirectURI: `${origin}/webman/sso/return.cgi`,
-        otherRedirectURI: `${origin}/webman/sso/sso.cgi`, // the program of the README
+        otherRedirectURI: `${origin}/webman/sso/sso.cgi`, // the README's program
         logoutURI: `${origin}/webman/ssoclient/relay.html`,
     });
     const [{tenant}] = clients;

@@ -1,10 +1,10 @@
-// The system's log: programs write to /dev/log, and each line is handed on as it arrives.
+// Reads the log lines that programs write to /dev/log.
 import {once} from 'node:events';
 import net from 'node:net';
 
 const PATIENCE = 20_000;
 
-/** Collects the log; `report` gets each line without date, and its priority as a number (RFC 3164, section 4.1.1). */
+/** Collects the log. Calls `report` with each line without its date, and its priority (RFC 3164, section 4.1.1). */
 export async function collectSystemLog(report) {
     let unread = [];
     let lookForAwaited = () => {};
@@ -15,7 +15,7 @@ export async function collectSystemLog(report) {
         unread.push(line);
         lookForAwaited();
     };
-    // A stream, on which the C library ends each record with a NUL; Node has no datagrams between processes.
+    // Node has no Unix datagram sockets. On a stream, the C library terminates each record with a NUL.
     const server = net.createServer((connection) => {
         let unparsed = Buffer.alloc(0);
         connection.on('data', (chunk) => {
@@ -29,7 +29,7 @@ export async function collectSystemLog(report) {
     server.listen('/dev/log');
     await once(server, 'listening');
     return {
-        /** Waits for a line and forgets it and all before it. */
+        /** Waits for a line. Discards it and all earlier lines. */
         until(pattern) {
             return new Promise((resolve, reject) => {
                 const patience = setTimeout(() => reject(new Error(`no log line ${pattern}`)), PATIENCE);

@@ -17,7 +17,7 @@ std::size_t HeapInUse() {
     return heap.uordblks + heap.hblkhd;
 }
 
-/// Bytes of that name in the sum of all mappings.
+/// Bytes of this kind in all mappings.
 std::size_t Mapped(const std::string &name) {
     std::ifstream mappings("/proc/self/smaps_rollup");
     for (std::string word; mappings >> word;) {
@@ -31,7 +31,7 @@ std::size_t Mapped(const std::string &name) {
 
 std::ptrdiff_t OpenDescriptors() {
     namespace fs = std::filesystem;
-    return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator()) - 1;  // its own
+    return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator()) - 1;  // the iterator's
 }
 
 }  // namespace
@@ -39,7 +39,7 @@ std::ptrdiff_t OpenDescriptors() {
 void Figures::Note() {
     ++moments_;
     heap_ += static_cast<double>(HeapInUse());
-    resident_ += static_cast<double>(Mapped("Anonymous:") + Mapped("Swap:"));  // it has only gone out for now
+    resident_ += static_cast<double>(Mapped("Anonymous:") + Mapped("Swap:"));  // swapped out memory also counts
     descriptors_.insert(OpenDescriptors());
 }
 

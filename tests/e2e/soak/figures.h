@@ -6,19 +6,19 @@
 
 namespace Test {
 
-/// What this process holds, over some moments.
+/// Resource use of this process, averaged over several measurements.
 class Figures {
   public:
-    /// One more moment: now.
+    /// Adds a measurement.
     void Note();
 
-    /// Bytes that malloc has given out, on average.
+    /// Average of bytes allocated with malloc.
     double Heap() const { return heap_ / moments_; }
 
-    /// Bytes in main memory that belong to no file, on average: those of files come and go as the kernel likes.
+    /// Average of bytes of private memory. File mappings are excluded, because the kernel evicts and loads them.
     double Resident() const { return resident_ / moments_; }
 
-    /// How many descriptors were open.
+    /// The numbers of open descriptors.
     const std::set<std::ptrdiff_t> &Descriptors() const { return descriptors_; }
 
   private:

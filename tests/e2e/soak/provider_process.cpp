@@ -24,7 +24,7 @@ void Require(bool condition, const char *what) {
     }
 }
 
-/// What the request with that text in it is answered.
+/// The answers to requests that contain a text.
 using Answers = std::map<std::string, std::string>;
 
 std::string Form(const char *code) { return std::string("&code=") + code + "&"; }
@@ -54,7 +54,7 @@ std::string Find(const Answers &answers, const std::string &request) {
     return HTTPAnswer("", "404 Not Found");
 }
 
-/// The next connection, and when it comes the one after it.
+/// Answers the next connection, and adds the script for the one after it.
 void AnswerEachConnection(Provider &provider, const Answers &answers) {
     provider.Play([&provider, &answers](Connection &connection) {
         AnswerEachConnection(provider, answers);
@@ -66,10 +66,10 @@ std::string AuthorizationEndpointOf(const char *prefix) {
     return std::string("{\"") + prefix + R"(_authorization_endpoint": ")" + kAuthorizationEndpoint + "\"}";
 }
 
-/// Until the other end of the socket is closed.
+/// Serves until the other end of the socket is closed.
 void Provide(int life) {
     Provider azure(Profile::kAzure, AuthorizationEndpointOf("azure"));
-    // The next one takes all files for its own.
+    // The next provider removes all files.
     const std::filesystem::path kept = "/tmp/azure.conf";
     std::filesystem::copy(kAzureFile, kept);
     Provider webSphere(Profile::kWebSphere, AuthorizationEndpointOf("websphere"));

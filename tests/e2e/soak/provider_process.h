@@ -5,17 +5,15 @@
 
 namespace Test {
 
-/// The codes that the providers know, and what each is exchanged for.
+/// The codes that the providers accept.
 constexpr char kGoodCode[] = "good";        // a token
-constexpr char kForgedCode[] = "forged";    // a token with another's signature
+constexpr char kForgedCode[] = "forged";    // a token with a signature of another key
 constexpr char kRefusedCode[] = "refused";  // no token
 
-/// Where both providers send the browser.
 constexpr char kAuthorizationEndpoint[] = "https://idp.example/authorize";
 
-/// A provider of each profile, in a process of their own: they keep each request that they get, and OpenSSL keeps
-/// things for servers, which would all count as memory that the library under test takes. The appliance is configured
-/// for both, but for the profile in force.
+/// A provider of each profile, in a separate process: memory of recorded requests and of TLS servers would count for
+/// the library. Writes the configuration of both clients, but not the profile.
 class ProviderProcess {
   public:
     ProviderProcess();
@@ -25,7 +23,7 @@ class ProviderProcess {
 
   private:
     pid_t process_;
-    int life_;  // a pipe's end: the process ends when it is closed
+    int life_;  // the process ends when this socket is closed
 };
 
 }  // namespace Test

@@ -19,7 +19,7 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// What a program that lives for long and loads the library is left with after many logins: nothing.
+// Verifies that many logins in one process leak nothing.
 namespace Test {
 
 namespace {
@@ -29,9 +29,9 @@ using ::testing::HasSubstr;
 using ::testing::SizeIs;
 using ::testing::StartsWith;
 
-constexpr int kWarmUp = 500;  // what is made once is made by then
+constexpr int kWarmUp = 500;  // until one-time allocations are done
 constexpr int kLogins = 20'000;
-constexpr int kCompared = 1'000;  // at the beginning, and at the end
+constexpr int kCompared = 1'000;  // first and last logins compared
 constexpr double kGrowth = 0.01;
 
 constexpr uid_t kUser = 1024;
@@ -44,14 +44,14 @@ std::vector<unsigned int> CurrentIDs() {
     return ids;
 }
 
-/// A host that runs under ids of its own and may go back to root's, and that has its own use for OpenSSL.
+/// A process with other effective ids than root's, which also uses OpenSSL.
 class Soak : public ::testing::Test {
   protected:
     Soak() {
         SetClock(kNow);
-        setenv("no_proxy", "*", 1);  // a proxy that the environment names does not know this machine's loopback
+        setenv("no_proxy", "*", 1);  // a proxy from the environment cannot reach the loopback
         WriteFile(kProfileFile, "");
-        // All but the clients' secrets is the user's.
+        // The user may read all files except those of the clients.
         for (const char *file : {kProfileFile, kDomainTable, kTrustedAuthorities}) {
             otherIDs_ = otherIDs_ && chown(file, kUser, kGroup) == 0;
         }
@@ -64,7 +64,7 @@ class Soak : public ::testing::Test {
         EXPECT_EQ(setegid(0), 0);
     }
 
-    /// One use of the library, which has to leave everything to its host as it was.
+    /// Uses the library and verifies ids, error queue and log.
     void Use(Profile profile, const std::vector<LogLine> &logged, const std::function<void()> &use) {
         const std::vector<unsigned int> ids = CurrentIDs();
         use();
@@ -101,7 +101,7 @@ class Soak : public ::testing::Test {
         });
     }
 
-    /// The n-th login, and what goes with it.
+    /// The n-th login. Every tenth is followed by failed logins and an authorization URL.
     void LogIn(int n) {
         const Profile profile = n % 2 == 0 ? Profile::kAzure : Profile::kWebSphere;
         LogIn(profile, kGoodCode, LoggedIn(UserName(profile)));
@@ -113,7 +113,7 @@ class Soak : public ::testing::Test {
     }
 
   private:
-    /// Of a configuration file that only root may read.
+    /// The lines of reading a configuration file of root.
     std::vector<LogLine> LinesOfAReading(Profile profile) const {
         if (!otherIDs_) {
             return {};
@@ -125,7 +125,7 @@ class Soak : public ::testing::Test {
     }
 
     ProviderProcess providers_;
-    bool otherIDs_ = true;  // which only the machine's root can have
+    bool otherIDs_ = true;  // needs root
 };
 
 void Print(const char *name, double first, double last) {

@@ -1,4 +1,4 @@
-// The documents of the project, taken apart.
+// Reads the documents of the project.
 import {spawnSync} from 'node:child_process';
 import {readFileSync} from 'node:fs';
 import path from 'node:path';
@@ -10,27 +10,27 @@ export function read(file) {
     return readFileSync(path.join(PROJECT, file), 'utf8');
 }
 
-/** Files that are ours and match: those under version control, and new ones that git does not ignore. */
+/** Matching files of the project: tracked ones, and new ones that git does not ignore. */
 export function filesMatching(...patterns) {
     const listing = spawnSync('git', ['ls-files', '--cached', '--others', '--exclude-standard', '--', ...patterns],
         {cwd: PROJECT, encoding: 'utf8', stdio: ['ignore', 'pipe', 'inherit']});
     if (listing.status !== 0) {
-        throw new Error('this is no clone of the repository');
+        throw new Error('not a clone of the repository');
     }
     const files = listing.stdout.split('\n').filter(Boolean);
     if (files.length === 0) {
-        throw new Error(`there is no ${patterns}`);
+        throw new Error(`no file matches ${patterns}`);
     }
     return files;
 }
 
 export const documents = filesMatching('*.md');
 
-/** Our files and their folders: what else lies here lies in no other clone. */
+/** The files of the project and their folders. */
 export const filesAndFolders = new Set(filesMatching('*').flatMap((file) =>
     file.split('/').map((_, end, parts) => parts.slice(0, end + 1).join('/'))));
 
-/** Fenced blocks of a document: language, text, and the line that the text begins in. */
+/** The fenced blocks of a document: language, text, and the line where the text begins. */
 export function blocks(document) {
     const found = [];
     let open;
@@ -46,12 +46,12 @@ export function blocks(document) {
         }
     });
     if (open) {
-        throw new Error(`${document}:${open.line}: the block has no end`);
+        throw new Error(`${document}:${open.line}: the block is not closed`);
     }
     return found;
 }
 
-/** The document without its fenced blocks, line by line. */
+/** The lines of a document; those of fenced blocks are empty. */
 export function proseLines(document) {
     let inside = false;
     return read(document).split('\n').map((text, index) => {

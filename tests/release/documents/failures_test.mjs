@@ -1,7 +1,7 @@
-// The tables of failures in the documents are those that `tavosso-doctor explain --list --markdown` prints. Each of
-// their texts is in a source, and the doctor explains each line of log that a document shows.
+// Verifies that the failure tables in the documents are those of `tavosso-doctor explain --list --markdown`, that their
+// texts are in the sources, and that the doctor explains the log lines in the documents.
 //
-//   node failures_test.mjs DOCTOR            fails where they differ
+//   node failures_test.mjs DOCTOR            fails if they differ
 //   node failures_test.mjs DOCTOR --update   writes the tables into the documents
 import assert from 'node:assert/strict';
 import {execFileSync} from 'node:child_process';
@@ -36,11 +36,11 @@ const isSource = (file) => !/^(?:bench|doctor|examples|tests)\//.test(file);
 const sources = filesMatching('*.cpp', '*.h').filter(isSource).map(read).join('\n').replaceAll('\\"', '"');
 const {explanations} = JSON.parse(explain('--json'));
 const FOREIGN = ['CURL', 'a text of another library', 'std::bad_alloc', '{... "error": ...}'];
-// From "set%s(%d, %d, %d)", and from two texts. Unit tests compare these lines.
-const isPutTogether = (about) => /setres[ug]id|\.\.$/.test(about);
+// Composed of several texts; unit tests compare these lines.
+const isComposed = (about) => /setres[ug]id|\.\.$/.test(about);
 const texts = explanations.filter(({about, table}) =>
-    table !== 'results of libcurl' && !FOREIGN.includes(about) && !isPutTogether(about)).map(({about}) => about);
-/** Whether a source contains what is between the placeholders. "%s:%d" logs the source of a line. */
+    table !== 'results of libcurl' && !FOREIGN.includes(about) && !isComposed(about)).map(({about}) => about);
+/** Whether the sources contain the text between the placeholders. The prefix is composed from "%s:%d". */
 const isInSource = (about) => about.replace(/^\w+:N /, '').split(/\b[A-Z]{3,6}\b/)
     .every((piece) => sources.includes(piece.replace(/: $/, '')));
 assert.ok(texts.length > 80, `${texts.length} texts`);
@@ -50,6 +50,6 @@ const examples = documents.flatMap(blocks).filter(({language}) => language === '
     .flatMap(({text}) => text.match(/^\S+\[\d+\]: .*$/gm) ?? []);
 assert.ok(examples.length > 1);
 for (const line of examples) {
-    execFileSync(doctor, ['explain', line]); // fails where it does not know the line
+    execFileSync(doctor, ['explain', line]); // fails if it does not explain the line
 }
 console.log(`${shown.length} tables, ${texts.length} texts`);

@@ -1,4 +1,4 @@
-// The commands of the quick start work as written, on a bare Debian, for a user who may use sudo.
+// Runs the commands of the quick start verbatim on a bare Debian, as a user with sudo.
 import assert from 'node:assert/strict';
 import {execFileSync, spawnSync} from 'node:child_process';
 import {mkdtempSync, rmSync, writeFileSync} from 'node:fs';
@@ -10,7 +10,7 @@ import {blocks, PROJECT} from './documents.mjs';
 
 const DOCUMENT = 'docs/quick-start.md';
 
-/** Each block of commands with the lines that the next block, if it is text, shows as its output. */
+/** The command blocks, each with the output that the next text block shows. */
 function commandsWithOutput() {
     const all = blocks(DOCUMENT);
     return all.flatMap(({language, line, text}, index) => {
@@ -21,13 +21,13 @@ function commandsWithOutput() {
 
 const quoted = (text) => `'${text.replaceAll('\'', '\'\\\'\'')}'`;
 
-/** A pattern for grep, in which "..." is any text. */
+/** A grep pattern; "..." matches any text. */
 const pattern = (text) => text.replace(/[.*[\]^$\\]/g, '\\$&').replaceAll('\\.\\.\\.', '.*');
 
 function script(commands) {
     const run = commands.map(({line, text, output}) => [
         `echo "${DOCUMENT}:${line}"`,
-        // apt asks before it installs.
+        // apt asks for confirmation.
         `bash -e -o pipefail -c ${quoted(text)} >../log 2>&1 < <(yes | head -n 100) || { tail -n 40 ../log; exit 1; }`,
         ...output.split('\n').filter(Boolean).map((expected) =>
             `grep -x ${quoted(pattern(expected))} ../log >/dev/null || { echo "missing: "${quoted(expected)}; exit 1; }`),
