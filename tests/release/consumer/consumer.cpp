@@ -1,4 +1,4 @@
-// Uses the installed headers and library as somebody else's program does, and catches its exceptions by type.
+// Uses the installed headers and library like an external program, and catches exceptions by type.
 #include <tavosso/jwt.h>
 #include <tavosso/sso.h>
 
@@ -27,7 +27,7 @@ bool SignatureIsRefused() {
     return false;
 }
 
-/// A client of the program's own: what it overrides is called by the library.
+/// A client whose overrides the library calls.
 struct OwnClient : TAVO::SSO::SSOClient {
     std::string GetIDTokenReqParams() override { return "own"; }
     void RequestTokenEndpoint(std::string &response, const std::string &body) override { response = body; }
