@@ -3,16 +3,16 @@
 
 namespace Test {
 
-/// A function of another library, with C linkage, that the library under test calls.
+/// A C function of another library that the library calls.
 struct CalledFunction {
     const char *name;
-    const char *whyItCannotFail;  // null: it can, and every call of it is made to
+    const char *whyItCannotFail;  // null: it can fail; the tests make every call fail
 };
 
 constexpr char kNoResult[] = "has no result";
-constexpr char kOnlyMemory[] = "works on memory that is there";
+constexpr char kOnlyMemory[] = "uses existing memory";
 constexpr char kConstant[] = "returns a constant";
-constexpr char kRuntime[] = "belongs to the compiler's run time; memory running out is swept over";
+constexpr char kRuntime[] = "compiler run time; memory_test.cpp covers exhausted memory";
 
 constexpr CalledFunction kCalledFunctions[] = {
     // libc
@@ -29,8 +29,8 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"free", kNoResult},
     {"getegid", "always succeeds"},
     {"geteuid", "always succeeds"},
-    // Boost 1.74 leaks the nonce's engine if this fails: the constructor at boost/uuid/random_generator.hpp:104 throws
-    // from its seed() after `new self_contained_impl()`.
+    // If this fails, Boost 1.74 leaks the engine of the nonce: the constructor in boost/uuid/random_generator.hpp:104
+    // throws from seed() after `new self_contained_impl()`.
     {"getrandom", nullptr},
     {"malloc", nullptr},
     {"memchr", kOnlyMemory},
@@ -40,7 +40,7 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"memset", kOnlyMemory},
     {"setresgid", nullptr},
     {"setresuid", nullptr},
-    {"snprintf", "writes two digits of a byte"},
+    {"snprintf", "formats one byte"},
     {"strcmp", kOnlyMemory},
     {"strerror_r", "has a text for every number"},
     {"strlen", kOnlyMemory},
@@ -51,11 +51,11 @@ constexpr CalledFunction kCalledFunctions[] = {
 
     // libc, built with _FORTIFY_SOURCE
     {"__explicit_bzero_chk", kNoResult},
-    {"__fread_chk", "is counted, and made to fail, as fread"},
+    {"__fread_chk", "counted as fread"},
     {"__memcpy_chk", kOnlyMemory},
     {"__memmove_chk", kOnlyMemory},
     {"__memset_chk", kOnlyMemory},
-    {"__snprintf_chk", "writes two digits of a byte"},
+    {"__snprintf_chk", "formats one byte"},
     {"__syslog_chk", kNoResult},
 
     // libcurl
@@ -73,15 +73,15 @@ constexpr CalledFunction kCalledFunctions[] = {
     {"BIO_free_all", kNoResult},
     {"BIO_new", nullptr},
     {"BIO_new_mem_buf", nullptr},
-    {"BIO_push", "links two that are there"},
+    {"BIO_push", "links existing objects"},
     {"BIO_read", nullptr},
     {"BIO_s_mem", kConstant},
     {"BIO_set_flags", kNoResult},
     {"BIO_write", nullptr},
     {"BN_bin2bn", nullptr},
     {"BN_free", kNoResult},
-    {"ERR_pop_to_mark", "tells of a queue without a mark, which is then empty"},
-    {"ERR_set_mark", "tells of an empty queue, in which nothing has to be marked"},
+    {"ERR_pop_to_mark", "fails only if there is no mark"},
+    {"ERR_set_mark", "fails only if the queue is empty"},
     {"EVP_DigestUpdate", nullptr},
     {"EVP_DigestVerifyFinal", nullptr},
     {"EVP_DigestVerifyInit", nullptr},

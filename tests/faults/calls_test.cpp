@@ -27,9 +27,9 @@
 #include "tests/support/interposed/process.h"
 #include "tests/support/system_log.h"
 
-// Lets each call that the library makes fail, one at a time, and compares what comes of it with a table.
+// Makes each call of the library fail, one at a time, and compares the outcome with a table.
 
-/// For LeakSanitizer: Boost 1.74's own leak, which call_table.h documents at getrandom.
+/// A leak of Boost 1.74, documented in call_table.h at getrandom.
 extern "C" const char *__lsan_default_suppressions() { return "leak:boost::uuids::basic_random_generator"; }
 
 namespace Test {
@@ -38,7 +38,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// What one use of the library does when nothing, or the n-th call of one function, fails.
+/// The outcome of one use of the library, without a failure or with one failing call.
 struct Trial {
     std::string ending;
     std::vector<LogLine> log;
@@ -53,7 +53,7 @@ std::string DescribeIDs() {
 }
 
 Trial Try(const Scenario &scenario, const std::string &function = "", int n = 0) {
-    const Use use = scenario.makeReady();
+    const Use use = scenario.prepare();
     Ending ending{scenario.before, nullptr};
     SetEffectiveIDs(kUser, kGroup);
     FailNothing();
@@ -92,19 +92,19 @@ std::string Describe(const Trial &trial, const std::vector<LogLine> &usualLog) {
     return NumberTransferErrors(text.str());
 }
 
-/// Every open descriptor; the one that looks at them is always there.
+/// Includes the descriptor of this directory iterator.
 std::ptrdiff_t OpenDescriptors() {
     return std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator());
 }
 
 void ExpectEverythingReleased(const Trial &trial, const std::string &failing) {
     std::map<std::string, int> calls = trial.calls;
-    EXPECT_EQ(calls["curl_easy_init"], calls["curl_easy_cleanup"]);  // called with a null handle, too
+    EXPECT_EQ(calls["curl_easy_init"], calls["curl_easy_cleanup"]);  // also called with a null handle
     EXPECT_EQ(calls["fopen"] - (failing == "fopen" ? 1 : 0), calls["fclose"]);
-    EXPECT_EQ(ERR_peek_error(), 0UL) << "something is left in OpenSSL's error queue";
+    EXPECT_EQ(ERR_peek_error(), 0UL) << "OpenSSL's error queue is not empty";
 }
 
-/// Lets one call fail, and then tries again with none failing.
+/// Makes one call fail, and then repeats the use without failure.
 std::string TryOne(const Scenario &scenario, const Trial &healthy, const std::string &function, int n) {
     SCOPED_TRACE(function + " " + std::to_string(n));
     const std::ptrdiff_t descriptors = OpenDescriptors();
@@ -117,13 +117,13 @@ std::string TryOne(const Scenario &scenario, const Trial &healthy, const std::st
     return Describe(trial, healthy.log);
 }
 
-/// "FUNCTION N: outcome" for each call that is made when none fails, and "FUNCTION N to M" where several end alike.
+/// Lines "FUNCTION N: outcome"; "FUNCTION N to M" for consecutive calls with the same outcome.
 std::string TryEachCall(const Scenario &scenario) {
     const Trial healthy = Try(scenario);
     std::string table = "nothing: " + Describe(healthy, {});
     for (const auto &[function, calls] : healthy.calls) {
         if (function == "curl_easy_cleanup" || function == "curl_global_cleanup") {
-            continue;  // counted, but with no result that could tell of a failure
+            continue;  // counted only; has no result
         }
         std::vector<std::string> outcomes;
         for (int n = 1; n <= calls; ++n) {
@@ -152,13 +152,14 @@ TEST_P(FailingCall, MatchesOutcomeTable) {
     const std::string table = TryEachCall(GetParam());
     const std::string file = std::string(GetParam().name) + ".txt";
     std::ofstream(TAVOSSO_OUTCOMES_FOUND "/" + file) << table;
-    EXPECT_EQ(table, Read(TAVOSSO_OUTCOMES "/" + file)) << "what was found is in " TAVOSSO_OUTCOMES_FOUND "/" << file;
+    EXPECT_EQ(table, Read(TAVOSSO_OUTCOMES "/" + file))
+        << "the actual outcomes are in " TAVOSSO_OUTCOMES_FOUND "/" << file;
 }
 
 INSTANTIATE_TEST_SUITE_P(Of, FailingCall, ::testing::ValuesIn(Scenarios()),
                          [](const auto &row) { return row.param.name; });
 
-/// The names, without those of C++ and of the sanitizers, of what the built file wants from others.
+/// The undefined symbols of the library, without those of C++ and of sanitizers.
 std::set<std::string> UndefinedSymbols() {
     Dl_info library;
     EXPECT_NE(dladdr(reinterpret_cast<void *>(TAVO::SSO::OIDCLogin), &library), 0);

@@ -1,5 +1,4 @@
-// The libcurl calls of the library under test: the real ones, unless one is to fail. See
-// tests/support/interposed/calls.h.
+// libcurl functions that can fail. See tests/support/interposed/calls.h.
 #include <curl/curl.h>
 
 #include <cerrno>
@@ -7,9 +6,9 @@
 
 #include "tests/support/interposed/calls.h"
 
-#undef curl_easy_setopt  // a macro that checks types, in front of the function
+#undef curl_easy_setopt  // a type-checking macro
 
-// libcurl itself puts an enumeration in front of the "...", and clang holds that against whoever defines the function.
+// libcurl declares an enumeration before "...". clang warns about the definition.
 #pragma GCC diagnostic ignored "-Wvarargs"
 
 using Test::Next;
@@ -46,7 +45,7 @@ CURLcode curl_easy_setopt(CURL *handle, CURLoption option, ...) {
     }
     std::va_list arguments;
     va_start(arguments, option);
-    void *argument = va_arg(arguments, void *);  // all that the library sets is of this size
+    void *argument = va_arg(arguments, void *);  // all options of the library have this size
     va_end(arguments);
     return Next(curl_easy_setopt, "curl_easy_setopt")(handle, option, argument);
 }

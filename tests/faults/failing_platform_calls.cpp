@@ -1,5 +1,4 @@
-// The platform calls of the library under test: the stand-in's, unless one is to fail. See
-// tests/support/interposed/calls.h.
+// Platform functions that can fail. See tests/support/interposed/calls.h.
 #include "platform/platform.h"
 #include "tests/support/interposed/calls.h"
 

@@ -15,8 +15,7 @@
 #include "tests/faults/scenario.h"
 #include "tests/support/system_log.h"
 
-// Lets memory run out at each request for it that one use of the library makes, its own requests and those of the
-// libraries that it calls.
+// Makes each request for memory fail during one use of the library, including those of other libraries.
 namespace Test {
 
 namespace {
@@ -33,9 +32,9 @@ constexpr char kFailures[] =
     R"(|std::invalid_argument: (parse json falied|kid does not exist in Azure verified kyes))"
     R"(|TAVO::SSO::sso_op_failed: (read profile file|encode base64|TAVOWinsUserNameFqdn2Netbios) failed\.)"
     R"(|TAVO::JWT::jwt_verify_failed: verify (rsa|hmac) signature failed))"
-    R"((, the result is (Alice|CORP\.EXAMPLE\\Alice|on, ))?)";  // written step by step
+    R"((, the result is (Alice|CORP\.EXAMPLE\\Alice|on, ))?)";  // userName is changed in steps
 
-/// The results of transfers that run out of memory, as a regular expression of libcurl's texts.
+/// libcurl's texts for transfers that run out of memory, as a regular expression.
 std::string TransferFailures() {
     std::string texts;
     for (const CURLcode result :
@@ -45,7 +44,7 @@ std::string TransferFailures() {
     return "(" + texts + ")";
 }
 
-/// Answers that could not be had. No answer that arrived is called malformed because memory ran out.
+/// Failed requests. A received answer is never reported as malformed because memory ran out.
 std::string FailedRequests() {
     return R"(sso:N (bad_alloc\. .*|(request token uri )?)" + TransferFailures() + R"(\.?))" +
            R"(|azuresso:N (curl_easy_init failed\. .*|request wellknown uri )" + TransferFailures() + R"(\.))";
@@ -67,7 +66,7 @@ class ExhaustedMemory : public ::testing::TestWithParam<std::tuple<Scenario, Of,
   protected:
     static Trial Try(int n) {
         const auto &[scenario, of, until] = GetParam();
-        const Use use = scenario.makeReady();
+        const Use use = scenario.prepare();
         Ending ending{scenario.before, nullptr};
         FailingAllocation failing(n, of, until);
         ::Test::Run(use, ending);

@@ -21,7 +21,7 @@ constexpr char kAzureEndpoints[] = R"({"azure_authorization_endpoint": "https://
                                        "azure_logout_endpoint": "https://idp.example/logout"})";
 constexpr char kWebSphereEndpoints[] = R"({"websphere_authorization_endpoint": "https://idp.example/authorize"})";
 
-/// Values that cannot be encoded stand as they are; a file that cannot be read leaves the settings empty.
+/// Values that cannot be encoded are sent verbatim; an unreadable file leaves the settings empty.
 constexpr char kAuthorizationURL[] =
     R"re((https://idp\.example/authorize)?\?client_id=(the( |%20)client)?&nonce=NONCE&redirect_uri=(https.*)?)re"
     R"re(&response_type=code&scope=openid( profile email|%20profile%20email)?)re"
@@ -30,7 +30,7 @@ constexpr char kAuthorizationURL[] =
 /// {"origin":"/desk top"}
 constexpr char kState[] = "eyJvcmlnaW4iOiIvZGVzayB0b3AifQ==";
 
-Use MakeReady(Profile profile, std::function<void(std::string &)> call) {
+Use Prepare(Profile profile, std::function<void(std::string &)> call) {
     return {std::make_unique<Provider>(profile, profile == Profile::kAzure ? kAzureEndpoints : kWebSphereEndpoints),
             nullptr, std::move(call)};
 }
@@ -38,21 +38,21 @@ Use MakeReady(Profile profile, std::function<void(std::string &)> call) {
 void LogIn(std::string &userName) { TAVO::SSO::OIDCLogin("code/1", userName); }
 
 template <Profile profile>
-Use MakeReadyToLogIn() {
+Use PrepareToLogIn() {
     static const std::string token = SignedToken(TokenHeader(profile), TokenClaims(profile));
-    Use use = MakeReady(profile, LogIn);
+    Use use = Prepare(profile, LogIn);
     use.provider->AnswerLogin(token);
     return use;
 }
 
-/// Signed with a key and under a secret that are not the provider's.
+/// Signed with another key or secret.
 std::string Forge(Profile profile) {
     static const RSAKey otherKey;
     return profile == Profile::kAzure ? otherKey.RS256Token(TokenClaims(profile), kKeyID)
                                       : HS256Token(TokenClaims(profile), "another secret");
 }
 
-Use MakeReadyToLogInWithoutTLS(Profile profile, const std::string &token) {
+Use PrepareToLogInWithoutTLS(Profile profile, const std::string &token) {
     auto server = std::make_unique<Server>();
     Json::Value endpoints;
     endpoints["azure_wellknown"] = server->URL("/discovery");
@@ -64,15 +64,15 @@ Use MakeReadyToLogInWithoutTLS(Profile profile, const std::string &token) {
 }
 
 template <Profile profile>
-Use MakeReadyForAToken() {
+Use PrepareToken() {
     static const std::string token = SignedToken(TokenHeader(profile), TokenClaims(profile));
-    return MakeReadyToLogInWithoutTLS(profile, token);
+    return PrepareToLogInWithoutTLS(profile, token);
 }
 
 template <Profile profile>
-Use MakeReadyForAForgery() {
+Use PrepareForgery() {
     static const std::string token = Forge(profile);
-    return MakeReadyToLogInWithoutTLS(profile, token);
+    return PrepareToLogInWithoutTLS(profile, token);
 }
 
 void ReadProfile(std::string &result) {
@@ -102,7 +102,7 @@ std::string MD5Of(const std::string &text) {
     return hexadecimal.str();
 }
 
-/// Shows what is inside of the state, and hides what is new in every URL.
+/// Decodes the state and replaces random values.
 std::string Readable(std::string url) {
     std::smatch match;
     if (std::regex_search(url, match, std::regex("&state=([^&]*)"))) {
@@ -123,31 +123,31 @@ void PrintTo(const Scenario &scenario, std::ostream *stream) { *stream << scenar
 
 const std::vector<Scenario> &Scenarios() {
     static const std::vector<Scenario> scenarios{
-        {"AzureLogin", kUserNameBefore, R"(CORP\\Alice)", MakeReadyToLogIn<Profile::kAzure>},
-        {"WebSphereLogin", kUserNameBefore, "alice", MakeReadyToLogIn<Profile::kWebSphere>},
+        {"AzureLogin", kUserNameBefore, R"(CORP\\Alice)", PrepareToLogIn<Profile::kAzure>},
+        {"WebSphereLogin", kUserNameBefore, "alice", PrepareToLogIn<Profile::kWebSphere>},
         {"AzureProfile", "", "off, , client ''|on, azure, client '(the client)?'",
-         [] { return MakeReady(Profile::kAzure, ReadProfile); }},
+         [] { return Prepare(Profile::kAzure, ReadProfile); }},
         {"WebSphereProfile", "", "off, , client ''|on, websphere, client '(the client)?'",
-         [] { return MakeReady(Profile::kWebSphere, ReadProfile); }},
+         [] { return Prepare(Profile::kWebSphere, ReadProfile); }},
         {"AzureAuthorizationURL", "", kAuthorizationURL,
-         [] { return MakeReady(Profile::kAzure, BuildAuthorizationURL<TAVO::SSO::AzureSSOClient>); }},
+         [] { return Prepare(Profile::kAzure, BuildAuthorizationURL<TAVO::SSO::AzureSSOClient>); }},
         {"WebSphereAuthorizationURL", "", kAuthorizationURL,
-         [] { return MakeReady(Profile::kWebSphere, BuildAuthorizationURL<TAVO::SSO::WebSphereSSOClient>); }},
+         [] { return Prepare(Profile::kWebSphere, BuildAuthorizationURL<TAVO::SSO::WebSphereSSOClient>); }},
         {"RelayURL", "", R"(ssoclient/relay\.html#(origin=(%2Fdesk%20|/desk )top&)?success=true)",
-         [] { return MakeReady(Profile::kAzure, BuildRelayURL); }},
+         [] { return Prepare(Profile::kAzure, BuildRelayURL); }},
         {"LogoutURL", "",
          R"((https://idp\.example/logout)?\?post_logout_redirect_uri=https(:|%3A).*nas\.example.*relay\.html)",
-         [] { return MakeReady(Profile::kAzure, BuildLogoutURL); }},
+         [] { return Prepare(Profile::kAzure, BuildLogoutURL); }},
     };
     return scenarios;
 }
 
 const std::vector<Scenario> &PlainLogins() {
     static const std::vector<Scenario> scenarios{
-        {"PlainAzureLogin", kUserNameBefore, R"(CORP\\Alice)", MakeReadyForAToken<Profile::kAzure>},
-        {"PlainWebSphereLogin", kUserNameBefore, "alice", MakeReadyForAToken<Profile::kWebSphere>},
-        {"ForgedAzureLogin", kUserNameBefore, nullptr, MakeReadyForAForgery<Profile::kAzure>},
-        {"ForgedWebSphereLogin", kUserNameBefore, nullptr, MakeReadyForAForgery<Profile::kWebSphere>},
+        {"PlainAzureLogin", kUserNameBefore, R"(CORP\\Alice)", PrepareToken<Profile::kAzure>},
+        {"PlainWebSphereLogin", kUserNameBefore, "alice", PrepareToken<Profile::kWebSphere>},
+        {"ForgedAzureLogin", kUserNameBefore, nullptr, PrepareForgery<Profile::kAzure>},
+        {"ForgedWebSphereLogin", kUserNameBefore, nullptr, PrepareForgery<Profile::kWebSphere>},
     };
     return scenarios;
 }

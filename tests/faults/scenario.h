@@ -10,11 +10,11 @@
 
 #include "tests/loopback/loopback_provider.h"
 
-// What a front end has the library do, each as a whole: against real servers, with files of their own, in a process
-// whose effective ids are not root's.
+// Complete uses of the library by a front end: with real servers and files, in a process with other effective ids than
+// root's.
 namespace Test {
 
-/// One use of the library, made ready: nothing is left to do but to call it.
+/// A prepared use of the library; only `call` is left.
 struct Use {
     std::unique_ptr<Provider> provider;
     std::unique_ptr<Server> plainServer;
@@ -23,19 +23,19 @@ struct Use {
 
 struct Scenario {
     const char *name;
-    const char *before;     // what the result is before the call
-    const char *mayReturn;  // all that it may be after one that returns, whatever fails; null: it must not return
-    Use (*makeReady)();
+    const char *before;     // result before the call
+    const char *mayReturn;  // allowed results if it returns, as a regular expression; null: it must throw
+    Use (*prepare)();
 };
 
 void PrintTo(const Scenario &scenario, std::ostream *stream);
 
 const std::vector<Scenario> &Scenarios();
 
-/// Logins over HTTP without TLS, also with tokens whose signature is not the provider's.
+/// Logins over HTTP without TLS, including forged tokens.
 const std::vector<Scenario> &PlainLogins();
 
-/// How it ended. Kept as it came: to look at it takes memory, of which there may be none at that moment.
+/// The ending, unformatted, because formatting needs memory.
 struct Ending {
     std::string result;
     std::exception_ptr failure;
@@ -43,11 +43,11 @@ struct Ending {
 
 void Run(const Use &use, Ending &ending);
 
-/// "returns RESULT", or "throws CLASS: TEXT" with what has become of the result, if it has changed. Random values are
-/// shown as NONCE and, where it is the digest of that nonce, DIGEST.
+/// "returns RESULT" or "throws CLASS: TEXT", with the result if it changed. Random values are shown as NONCE and
+/// DIGEST.
 std::string Describe(const Scenario &scenario, const Ending &ending);
 
-/// The ids that the process has in every scenario.
+/// The effective ids in every scenario.
 constexpr unsigned int kUser = 1024;
 constexpr unsigned int kGroup = 100;
 

@@ -18,13 +18,13 @@ using testing::StartsWith;
 
 namespace {
 
-/// Each program runs in a child process: it limits its process.
+/// Each program runs in a child process, because it sets process limits.
 class Program : public testing::Test {
   protected:
     Program() { setenv("REQUEST_METHOD", "GET", 1); }
     ~Program() override { unsetenv("REQUEST_METHOD"); }
 
-    /// What a program with these methods answers to a request.
+    /// The output of a program that accepts `methods`, for a request.
     static std::string AnswerTo(const char *method, const char *methods) {
         setenv("REQUEST_METHOD", method, 1);
         int ends[2];

@@ -34,7 +34,7 @@ class Profile : public testing::Test {
     }
 };
 
-/// What `choose` throws: the exception's class and text, empty when nothing.
+/// The class and text of the exception that `choose` throws; empty if none.
 template <typename Choose>
 std::string Failure(Choose choose) {
     try {

@@ -6,10 +6,10 @@
 
 #include "frontend/cgi_program.h"
 
-// The limits that documents state are those of the sources.
+// Compares the limits in the documents with the sources.
 namespace {
 
-/// A file of the project, with each line break as a blank.
+/// A file of the project, with line breaks replaced by blanks.
 std::string Read(const std::string &file) {
     std::ifstream stream(TAVOSSO_SOURCES "/" + file);
     std::ostringstream text;

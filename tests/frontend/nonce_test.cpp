@@ -22,7 +22,7 @@ TEST(Nonce, AcceptsTokenOfThisLogin) { EXPECT_NO_THROW(RequireNonce(Parse("{\"no
 
 TEST(Nonce, RejectsTokenOfAnotherLogin) {
     EXPECT_THROW(RequireNonce(Parse("{\"nonce\":\"yours\"}"), StateOf("mine")), Refusal);
-    // The digest itself is in the state, for everyone on the way to read.
+    // The digest is readable in the state.
     const std::string digest = StateOf("mine")["nonce"].asString();
     EXPECT_THROW(RequireNonce(Parse("{\"nonce\":\"" + digest + "\"}"), StateOf("mine")), Refusal);
 }

@@ -11,7 +11,7 @@ using namespace TAVO::Web;
 
 namespace {
 
-/// The texts that the relay page's script is held to as well.
+/// The test of the relay page's script uses the same texts.
 Json::Value Origins(const char *kind) {
     std::ifstream file(TAVOSSO_TEST_ORIGINS);
     std::ostringstream text;
@@ -33,7 +33,7 @@ TEST(Origin, ReplacesForeignOriginWithStartPage) {
 
 TEST(Origin, StaysLocalAfterDecodingQuery) {
     for (const Json::Value &origin : Origins("foreign")) {
-        // Decoded again, some become harmless paths; none a host.
+        // Decoding twice makes some of them harmless paths, and none a host.
         EXPECT_THAT(OriginInQuery(origin.asString()), testing::MatchesRegex("/|/[^/\\].*")) << origin;
     }
     for (const char *encoded :

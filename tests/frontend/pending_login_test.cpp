@@ -30,7 +30,7 @@ std::string Encode(const std::string &text) {
     return buffer;
 }
 
-// As the clients do, with a nonce of its own.
+// Like GetAccessTokenReqURI, with a fixed nonce.
 std::string MakeAddress(Json::Value state) {
     state["nonce"] = "digest";
     return "https://provider.example/auth?scope=openid&state=" + TAVO::SSO::URLEncode(Encode(WriteCompact(state)));

@@ -25,7 +25,7 @@ using ::Test::FailureOf;
 
 const std::string kSystemError = typeid(std::system_error).name();
 
-int unlinkError = 0;  // what the next calls of unlinkat fail with
+int unlinkError = 0;  // errno of the next calls of unlinkat
 
 }  // namespace
 
@@ -42,7 +42,6 @@ namespace {
 constexpr char kFolder[] = "/usr/tavo/var/frontend/things/";
 constexpr std::time_t kLifetime = 60;
 
-/// A private folder within a private folder.
 PrivateFolder OpenThings(std::size_t most = PrivateFolder::kUnlimited) {
     const PrivateFolder parent("/usr/tavo/var/frontend", kLifetime);
     return {"/usr/tavo/var/frontend/things", kLifetime, most};
@@ -104,7 +103,7 @@ TEST_F(PrivateFolderTest, RemovesExpiredTextsOncePerMinute) {
     MakeOld(std::string(32, 'a') + ".new");
     Keep(things, "another");
     EXPECT_TRUE(std::filesystem::exists(kFolder + name));
-    for (const char *swept : {"1", "4102444800", "\"now\""}) {  // long ago, in the future, never
+    for (const char *swept : {"1", "4102444800", "\"now\""}) {  // long ago, in the future, invalid
         const std::string late = Keep(things, "text");
         MakeOld(late);
         std::ofstream(std::string(kFolder) + "counter") << "{\"count\": 1, \"swept\": " << swept << "}";
@@ -170,7 +169,7 @@ TEST_F(PrivateFolderTest, FailsToTakeTextItCannotRemove) {
     const std::string name = Keep(things, "text");
     unlinkError = EROFS;
     EXPECT_EQ(FailureOf([&] { things.Take(name); }).type, kSystemError);
-    unlinkError = ENOENT;  // another taker was faster
+    unlinkError = ENOENT;  // another process was faster
     EXPECT_EQ(things.Take(name), std::nullopt);
     unlinkError = 0;
     EXPECT_EQ(things.Take(name), "text");

@@ -38,14 +38,14 @@ class SessionTest : public testing::Test {
         return FindSession(response, cookies);
     }
 
-    /// Replaces the text of the session of this cookie.
+    /// Replaces the content of this cookie's session file.
     static void Overwrite(const std::string &cookie, const std::string &text) {
         const std::string file = kFolder + std::string("/") + cookie.substr(cookie.find('=') + 1);
         std::ofstream(file) << text;
         ASSERT_EQ(chmod(file.c_str(), 0600), 0);
     }
 
-    /// The cookie with which a session starts in a browser that has `cookies`.
+    /// The cookie of a session that starts in a browser with `cookies`.
     static std::string Start(const std::string &cookies, const std::string &user) {
         Response response;
         StartSession(response, cookies, {user, "Alice Example", "azure"});

@@ -1,5 +1,5 @@
-// The check of an Azure ID token: the lines of an input are the discovery document, the key set and the token. It is
-// good when the token may be trusted.
+// Verification of an Azure ID token. Input lines: the discovery document, the key set and the token. An input is
+// accepted if the token is trusted.
 #include <stdexcept>
 
 #include "jwt/jwt.h"
@@ -32,7 +32,7 @@ struct Client : TAVO::SSO::AzureSSOClient {
     }
 };
 
-/// The same check, and what it asks for and logs, by the told order.
+/// The expected verification, requests and log lines.
 class Expected {
   public:
     Expected(const std::string &discovery, const std::string &keys) : discovery_(discovery), keys_(keys) {}
@@ -128,24 +128,24 @@ bool IsVerificationLine(const Test::LogLine &line) {
            line == Test::Error("jwt:N EVP_DigestVerifyFinal failed");
 }
 
-/// The lines of the two requests, and behind them at most one of a wrong signature's.
-void RequireToldLog(std::vector<Test::LogLine> log, const std::vector<std::string> &told,
-                    const Test::Failure &failure) {
+/// Requires the log lines of the two requests, and at most one line of a wrong signature after them.
+void RequireExpectedLog(std::vector<Test::LogLine> log, const std::vector<std::string> &expected,
+                        const Test::Failure &failure) {
     const bool isWrong = failure.type == typeid(TAVO::JWT::jwt_verify_failed).name();
-    if (isWrong && log.size() == told.size() + 1 && IsVerificationLine(log.back())) {
+    if (isWrong && log.size() == expected.size() + 1 && IsVerificationLine(log.back())) {
         log.pop_back();
     }
     std::vector<Test::LogLine> lines;
-    for (const std::string &text : told) {
+    for (const std::string &text : expected) {
         lines.push_back(Test::Error(text));
     }
-    Require(log == lines, "it logs what is told");
+    Require(log == lines, "unexpected log lines");
 }
 
 void RequireVerifiedPeers() {
     for (const std::string &call : Test::CurrentTransport().calls) {
-        // Not anywhere in it: an address of the provider's choice may hold that name.
-        Require(call.rfind("curl_easy_setopt CURLOPT_SSL_VERIFY", 0) != 0, "the provider's certificate is verified");
+        // Only at the beginning: a URL from the provider may contain the name.
+        Require(call.rfind("curl_easy_setopt CURLOPT_SSL_VERIFY", 0) != 0, "certificate verification is disabled");
     }
 }
 
@@ -161,16 +161,16 @@ bool Accepts(const std::string &input) {
     const Test::Failure failure = FailureOf([&] { client.VerifyIDToken(); });
 
     Expected expected(lines[0], lines[1]);
-    const Test::Failure told = Test::FailureOf([&] { expected.Verify(token); });
-    RequireVerdict(failure, told, expected.certain, Reasons());
+    const Test::Failure expectedFailure = Test::FailureOf([&] { expected.Verify(token); });
+    RequireVerdict(failure, expectedFailure, expected.certain, Reasons());
     RequireVerifiedPeers();
     const std::vector<Test::LogLine> log = Test::TakeSystemLog();
     RequireNotIn(log, {kClientSecret, token});
     if (expected.certain) {
-        Require(Test::CurrentTransport().urls == expected.urls, "it asks for what it needs, and for nothing else");
-        RequireToldLog(log, expected.log, failure);
+        Require(Test::CurrentTransport().urls == expected.urls, "unexpected requests");
+        RequireExpectedLog(log, expected.log, failure);
     }
-    Require(client.GetToken() == token, "the client is unchanged");
+    Require(client.GetToken() == token, "the client has changed");
     return failure == Test::kNothingThrown;
 }
 

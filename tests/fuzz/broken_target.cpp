@@ -1,4 +1,4 @@
-// No target but a proof: each of its seeds is a mistake that has to be caught, and names what it is caught as.
+// Tests the error detection: each seed names an error and the report that must detect it.
 #include <functional>
 #include <limits>
 #include <map>
@@ -10,11 +10,11 @@ namespace Fuzz {
 
 namespace {
 
-// Volatile, so that the compiler neither sees the mistakes nor does without them.
+// Volatile prevents the compiler from removing the errors.
 volatile int one = 1;
 volatile std::size_t size = 8;
 
-void ReadBehindTheBuffer() {
+void ReadBeyondBuffer() {
     const std::vector<char> buffer(size);
     const volatile char *bytes = buffer.data();
     static_cast<void>(bytes[size]);
@@ -32,30 +32,30 @@ void Leak() {
     kept = nullptr;
 }
 
-void IndexBehindTheEnd() {
+void IndexBeyondEnd() {
     const std::vector<char> buffer(size);
     static_cast<void>(buffer[size]);
 }
 
-void TakeAllMemory() { const std::vector<char> buffer(size << 28); }
+void ExhaustMemory() { const std::vector<char> buffer(size << 28); }
 
-void LetAnUnknownExceptionOut() { throw std::exception(); }
+void ThrowUnknownException() { throw std::exception(); }
 
 }  // namespace
 
 bool Accepts(const std::string &input) {
-    const std::map<std::string, std::function<void()>> mistakes = {
-        {"heap-buffer-overflow", ReadBehindTheBuffer},
+    const std::map<std::string, std::function<void()>> errors = {
+        {"heap-buffer-overflow", ReadBeyondBuffer},
         {"signed-integer-overflow", Overflow},
         {"detected-memory-leaks", Leak},
-        {"Assertion", IndexBehindTheEnd},
-        {"out-of-memory", TakeAllMemory},
-        {"terminate-called", LetAnUnknownExceptionOut},
-        {"Broken-promise", [] { Require(false, "nothing is ever false"); }},
+        {"Assertion", IndexBeyondEnd},
+        {"out-of-memory", ExhaustMemory},
+        {"terminate-called", ThrowUnknownException},
+        {"Violated-property", [] { Require(false, "always false"); }},
     };
-    const auto mistake = mistakes.find(input);
-    if (mistake != mistakes.end()) {
-        mistake->second();
+    const auto error = errors.find(input);
+    if (error != errors.end()) {
+        error->second();
     }
     return false;
 }

@@ -1,5 +1,5 @@
-// A configuration file: the first line of an input names it, the rest is its content. It is good when a client takes a
-// setting from it, or the profile when it names a provider that is on.
+// A configuration file. The first input line is its name, the rest its content. An input is accepted if a client reads
+// a setting from it, or if the profile is enabled and names a provider.
 #include <optional>
 #include <stdexcept>
 
@@ -40,24 +40,24 @@ bool Configures(const char *file, const std::string &content) {
     std::optional<Client> client;
     RequireSame(FailureOf([&] { client.emplace(); }), Test::kNothingThrown);
     RequireLog({});
-    Require(client->GetToken().empty(), "no token is configured");
+    Require(client->GetToken().empty(), "a token was read from the file");
     const bool isConfigured = client->HasSetting();
-    Require(!isConfigured || ParseJson(content), "settings come from JSON alone");
+    Require(!isConfigured || ParseJson(content), "settings were read from invalid JSON");
     return isConfigured;
 }
 
-/// Nobody answers: even a login under a supported profile fails.
-void RequireRefusedLogin(bool asksProvider) {
+/// No server answers, so every login fails.
+void RequireRefusedLogin(bool sendsRequest) {
     Test::ResetTransport();
-    std::string userName = "as it was";
+    std::string userName = "unchanged";
     RequireOneOf(FailureOf([&] { TAVO::SSO::OIDCLogin("code-of-this-login", userName); }),
                  {Test::Fails<TAVO::SSO::sso_op_failed>("read profile file failed."),
                   Test::Fails<TAVO::SSO::sso_op_failed>("sso does not enable."),
                   Test::Fails<TAVO::SSO::sso_op_failed>("not specify sso profile"),
                   Test::Fails<TAVO::SSO::sso_exception>("profile not support."),
                   Test::Fails<std::invalid_argument>("parse json falied")});
-    Require(userName == "as it was", "a failed login names no user");
-    Require(Test::CurrentTransport().urls.size() == (asksProvider ? 1U : 0U), "the provider of the profile is asked");
+    Require(userName == "unchanged", "a failed login changed the user name");
+    Require(Test::CurrentTransport().urls.size() == (sendsRequest ? 1U : 0U), "unexpected number of requests");
 }
 
 bool ChoosesProfile(const std::string &content) {
@@ -69,12 +69,12 @@ bool ChoosesProfile(const std::string &content) {
     Test::TakeSystemLog();
 
     const std::string name = profile->GetSSOProfile();
-    const bool isInForce = profile->SSOIsEnable() && (name == "azure" || name == "websphere");
-    Require(profile->GetSSOClient()->GetClientID() == (isInForce ? name + "-client" : ""),
-            "the settings are those of the profile's client");
-    RequireRefusedLogin(isInForce);
+    const bool isEnabled = profile->SSOIsEnable() && (name == "azure" || name == "websphere");
+    Require(profile->GetSSOClient()->GetClientID() == (isEnabled ? name + "-client" : ""),
+            "the settings are not those of the profile's client");
+    RequireRefusedLogin(isEnabled);
     Test::TakeSystemLog();
-    return isInForce;
+    return isEnabled;
 }
 
 }  // namespace

@@ -24,7 +24,7 @@ std::optional<std::string> NetBIOSName(const std::string &domain) {
     return strcasecmp(domain.c_str(), "lab.example") == 0 ? std::optional("LAB") : std::nullopt;
 }
 
-/// As a log line shows it.
+/// As shown in a log line.
 std::string Shown(std::string domain) {
     domain.resize(std::min<std::size_t>(domain.size(), 255));
     for (char &c : domain) {

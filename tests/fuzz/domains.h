@@ -5,19 +5,19 @@
 #include <string>
 #include <vector>
 
-// The domains that the platform's stand-in knows in these programs.
+// The domain table of the platform's stand-in.
 namespace Fuzz {
 
 void WriteDomainTable();
 
-/// What must come of DOMAIN\user: a name, or the line that tells why not, also for want of room.
+/// The expected conversion of DOMAIN\user: a name, or the log line of the failure.
 struct Conversion {
     std::optional<std::string> name;
     std::optional<std::string> line;
 };
 Conversion ToNetBIOS(const std::string &name, std::size_t longest);
 
-/// For RequireLog.
+/// The expected log lines, for RequireLog.
 std::vector<std::string> Lines(const Conversion &conversion);
 
 }  // namespace Fuzz

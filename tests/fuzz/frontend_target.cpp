@@ -1,5 +1,5 @@
-// What reaches the front end from outside: the lines of an input are the query, the Cookie header and any other text.
-// It is good when it concludes the login that was started, with a code.
+// Input of the front end. Input lines: the query, the Cookie header and any other text. An input is accepted if it
+// finishes the pending login with a code.
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
@@ -21,7 +21,7 @@ namespace {
 
 constexpr char kLogin[] = "3eb1bd439947eb762998e566ccc2e099";  // the first half of the SHA-256 of kSecret
 constexpr char kSecret[] = "0123456789abcdef0123456789abcdef";
-constexpr char kLoginCookie[] = "__Host-login-";  // and a hexadecimal digit
+constexpr char kLoginCookie[] = "__Host-login-";  // followed by a hexadecimal digit
 constexpr char kState[] = "eyJjc3JmIjoiM2ViMWJkNDM5OTQ3ZWI3NjI5OThlNTY2Y2NjMmUwOTkiLCJvcmlnaW4iOiIvcGFnZSJ9";
 constexpr char kSession[] = "fedcba9876543210fedcba9876543210";
 constexpr char kSessionCookie[] = "__Host-session";
@@ -30,7 +30,7 @@ constexpr std::time_t kSeconds = 600;
 constexpr char kFolder[] = "/usr/tavo/var/frontend";
 constexpr char kLogins[] = "/usr/tavo/var/frontend/logins";
 
-/// One login under way and one session open, whatever the last input made of them.
+/// Creates one pending login and one session.
 void Prepare() {
     std::filesystem::create_directories("/usr/tavo/var");
     std::filesystem::create_directories("/usr/tavo/etc/ssoclient");
@@ -45,11 +45,11 @@ void Prepare() {
     login["format"] = "login 2";
     login["settings"] = TAVO::Web::RequireSettings();
     login["state"] = kState;
-    Require(logins.Keep(kLogin, TAVO::Web::WriteCompact(login)), "there is room for a login");
+    Require(logins.Keep(kLogin, TAVO::Web::WriteCompact(login)), "cannot store the login");
     TAVO::Web::PrivateFolder sessions("/usr/tavo/var/frontend/sessions", kSeconds);
     sessions.Take(kSession);
     Require(sessions.Keep(kSession, R"({"format": "session 1", "user": "CORP\\alice", "profile": "websphere"})"),
-            "there is room for a session");
+            "cannot store the session");
 }
 
 bool IsHexDigit(char c) { return c != '\0' && std::string("0123456789abcdefABCDEF").find(c) != std::string::npos; }
@@ -82,7 +82,7 @@ TAVO::Web::Parameters ExpectedParameters(const std::string &query) {
     return parameters;
 }
 
-/// Every value that the header gives to a cookie.
+/// The values of a cookie in the header.
 std::vector<std::string> CookieValues(const std::string &header, const std::string &name) {
     std::vector<std::string> values;
     for (std::string piece : Split(header, ';')) {
@@ -110,12 +110,12 @@ void RequireSession(const std::string &cookies) {
     TAVO::Web::Response response;
     std::optional<Frontend::Session> session;
     RequireSame(FailureOf([&] { session = Frontend::FindSession(response, cookies); }), Test::kNothingThrown);
-    Require(session.has_value() == HasOnly(cookies, kSessionCookie, kSession), "a session is its cookie's");
-    Require(!session || session->user == kUser, "a session is its user's");
+    Require(session.has_value() == HasOnly(cookies, kSessionCookie, kSession), "the session does not match the cookie");
+    Require(!session || session->user == kUser, "the session has another user");
 }
 
 void RequireOneLine(const std::string &line) {
-    Require(TAVO::Web::IsPrintable(line) && line.size() <= 200, "a line is one, and not a long one");
+    Require(TAVO::Web::IsPrintable(line) && line.size() <= 200, "not a short printable line");
 }
 
 std::string UnescapeHtml(std::string text) {
@@ -131,18 +131,19 @@ std::string UnescapeHtml(std::string text) {
 
 void RequireHarmless(const std::string &text) {
     const std::string html = TAVO::Web::EscapeHtml(text);
-    Require(html.find_first_of("<>\"'") == std::string::npos && UnescapeHtml(html) == text, "a text is escaped, whole");
+    Require(html.find_first_of("<>\"'") == std::string::npos && UnescapeHtml(html) == text,
+            "the text is not escaped correctly");
     RequireOneLine(TAVO::Web::OneLine(text));
 
     const std::string origin = TAVO::Web::SafeOrigin(text);
-    Require(origin == text || origin == "/index.cgi", "an origin is kept or replaced");
+    Require(origin == text || origin == "/index.cgi", "the origin was changed");
     Require(origin[0] == '/' && origin[1] != '/' && origin.find('\\') == std::string::npos && origin.size() <= 512 &&
                 origin.find_first_of(" \"") == std::string::npos && TAVO::Web::IsPrintable(origin),
-            "an origin is a path on this site");
+            "the origin is not a local path");
 }
 
-/// What a user is told of a provider's answer is the error that it names, and nothing else of it.
-void RequireDiscreet(const std::string &text) {
+/// Of a provider's answer, only the error and its description may be shown.
+void RequireOnlyErrorShown(const std::string &text) {
     const std::string reason = TAVO::Web::ReasonOf(std::runtime_error(text));
     RequireOneLine(reason);
     const std::string shown = UpToNUL(text);
@@ -153,7 +154,7 @@ void RequireDiscreet(const std::string &text) {
         const std::string description = StringMember(answer, "error_description").value_or("");
         Require(reason == TAVO::Web::OneLine("The provider refused: " + (error.empty() ? "unknown error" : error) +
                                              (description.empty() ? "" : " (" + description + ")")),
-                "a reason is the error that the provider names");
+                "the reason is not the provider's error");
     }
 }
 
@@ -161,10 +162,10 @@ void RequireDecoded(const std::string &text) {
     const Json::Value state = TAVO::Web::DecodeState(text);
     const std::optional<std::string> decoded = DecodeCanonicalBase64(text);
     Require(state.isNull() || (state.isObject() && decoded && ParseJson(*decoded) == state),
-            "a state's object is what it encodes");
+            "the state is decoded incorrectly");
 }
 
-bool Concludes(const std::string &cookies, const std::string &state) {
+bool Finishes(const std::string &cookies, const std::string &state) {
     TAVO::Web::Response response;
     TAVO::Web::FolderLoginStore store(kLogins);
     std::string origin;
@@ -184,19 +185,19 @@ bool Accepts(const std::string &input) {
     const std::string &cookies = lines[1];
     Prepare();
     const TAVO::Web::Parameters parameters = TAVO::Web::ParseQuery(lines[0]);
-    Require(parameters == ExpectedParameters(lines[0]), "parameters are the query's");
+    Require(parameters == ExpectedParameters(lines[0]), "the query is parsed incorrectly");
     RequireSession(cookies);
     RequireHarmless(lines[2]);
-    RequireDiscreet(lines[2]);
+    RequireOnlyErrorShown(lines[2]);
     RequireDecoded(lines[2]);
 
     const std::string state = TAVO::Web::OnlyValue(parameters, "state").value_or("");
-    const bool concluded = Concludes(cookies, state);
-    Require(concluded == (state == kState && HasLoginCookie(cookies)),
-            "a login is concluded by its own state, in its own browser");
-    Require(!concluded || !Concludes(cookies, state), "a login is concluded once");
+    const bool finished = Finishes(cookies, state);
+    Require(finished == (state == kState && HasLoginCookie(cookies)),
+            "the login was finished with another state or browser, or was rejected");
+    Require(!finished || !Finishes(cookies, state), "the login was finished twice");
     RequireLog({});
-    return concluded && parameters.count("code") == 1;
+    return finished && parameters.count("code") == 1;
 }
 
 }  // namespace Fuzz

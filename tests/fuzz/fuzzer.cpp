@@ -1,4 +1,4 @@
-// What libFuzzer calls with each input that it makes up.
+// The entry point of libFuzzer.
 #include <cstddef>
 #include <cstdint>
 

@@ -1,4 +1,4 @@
-// An HMAC signature: the lines of an input are the algorithm, the key in base64 and the token. It is good when it
+// An HMAC signature. Input lines: the algorithm, the key in base64 and the token. An input is accepted if the signature
 // verifies.
 #include <algorithm>
 
@@ -23,12 +23,12 @@ bool Accepts(const std::string &input) {
     const Decoded key = DecodeBase64(lines[1]);
     const bool verifies =
         !key.bytes.empty() && HMACSignature(key.bytes, UpToNUL(parts[0] + "." + parts[1]), digest) == UpToNUL(parts[2]);
-    Require(verifies || !accepted, "no signature is taken that does not verify");
-    Require(accepted || !verifies || !key.wellFormed, "a signature that verifies is taken");
+    Require(verifies || !accepted, "an invalid signature was accepted");
+    Require(accepted || !verifies || !key.wellFormed, "a valid signature was rejected");
     RequireOneOf(failure,
                  {Test::kNothingThrown, Test::Fails<TAVO::JWT::jwt_verify_failed>("verify hmac signature failed")});
     RequireLog({});
-    Require(keyText == lines[1], "the key is unchanged");
+    Require(keyText == lines[1], "the key has changed");
     return accepted;
 }
 

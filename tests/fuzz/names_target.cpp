@@ -1,5 +1,4 @@
-// The user's name in the claims of an ID token, as both clients make it. The claims are good when either can name a
-// user.
+// The user's name in the claims of an ID token, for both clients. An input is accepted if either client returns a name.
 #include <algorithm>
 #include <stdexcept>
 
@@ -72,17 +71,17 @@ template <typename Client>
 bool Names(const std::string &part) {
     Client client;
     client.token = "e30." + part + ".";
-    std::string userName = "as it was";
+    std::string userName = "unchanged";
     const Test::Failure failure = FailureOf([&] { client.GetUserName(userName); });
-    std::string expected = "as it was";
+    std::string expected = "unchanged";
     std::vector<std::string> log;
     RequireSame(failure, Test::FailureOf([&] { Client::Expected(part, expected, log); }));
-    Require(userName == expected, "the name is told, also what is left of it after a failure");
+    Require(userName == expected, "unexpected user name");
 
-    Json::Value info = "as it was";
-    Json::Value claims = "as it was";
+    Json::Value info = "unchanged";
+    Json::Value claims = "unchanged";
     RequireSame(FailureOf([&] { client.GetUserInfo(info); }), Test::FailureOf([&] { claims = Claims(part); }));
-    Require(info == claims, "all claims are given, and none after a failure");
+    Require(info == claims, "unexpected claims");
     RequireLog(log);
     return failure == Test::kNothingThrown;
 }

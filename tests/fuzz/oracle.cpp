@@ -11,7 +11,7 @@
 #include "tests/support/encoding.h"
 #include "tests/support/token.h"
 
-#pragma GCC diagnostic ignored "-Wdeprecated-declarations"  // Json::Reader, whose verdict is the one that is promised
+#pragma GCC diagnostic ignored "-Wdeprecated-declarations"  // Json::Reader, which the library uses
 
 namespace Fuzz {
 
@@ -152,7 +152,7 @@ std::optional<Json::Value> ParseJson(const std::string &text) {
             return document;
         }
     } catch (const Json::Exception &) {
-        // Too deeply nested, which counts as malformed.
+        // Nested too deeply: counts as malformed.
     }
     return std::nullopt;
 }

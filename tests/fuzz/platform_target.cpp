@@ -1,5 +1,5 @@
-// The platform's stand-in: the lines of an input are "url", "encode", "decode" or "netbios", the size that the function
-// is told, and its text. It is good when the function succeeds.
+// The platform's stand-in. Input lines: "url", "encode", "decode" or "netbios", the size argument, and the text. An
+// input is accepted if the function succeeds.
 #include <algorithm>
 #include <cstdlib>
 #include <vector>
@@ -16,27 +16,27 @@ namespace {
 constexpr std::size_t kLargest = 8192;
 constexpr char kMark = '#';
 
-/// A buffer of exactly so many bytes, each with a mark, behind which AddressSanitizer looks.
+/// A marked buffer of exactly `size` bytes, so AddressSanitizer detects writes beyond it.
 class Buffer {
   public:
     explicit Buffer(std::size_t size) : bytes_(size, kMark) {}
 
     char *data() { return bytes_.data(); }
 
-    /// Holds the buffer against this content at its beginning, and the marks that must be left behind it.
+    /// Requires `content` at the beginning and marks after it.
     void Require(const std::optional<std::string> &content) const {
         std::vector<char> expected(bytes_.size(), kMark);
         if (content) {
             std::copy(content->begin(), content->end(), expected.begin());
         }
-        Fuzz::Require(bytes_ == expected, "the buffer has the result, nothing behind it, and nothing after a failure");
+        Fuzz::Require(bytes_ == expected, "unexpected content of the buffer");
     }
 
   private:
     std::vector<char> bytes_;
 };
 
-/// With its NUL.
+/// The result with its NUL, if it fits.
 std::optional<std::string> AsText(const std::optional<std::string> &result, std::size_t longest) {
     return result && result->size() <= longest ? std::optional(*result + '\0') : std::nullopt;
 }
@@ -45,7 +45,7 @@ bool EncodesURL(const std::string &text, std::size_t size) {
     Buffer buffer(size + 1);
     const int result = TavoCgiURLEncode(text.c_str(), buffer.data(), size);
     const std::optional<std::string> expected = AsText(PercentEncode(text), size);
-    Require((result == 0) == expected.has_value(), "a text is percent-encoded where it fits");
+    Require((result == 0) == expected.has_value(), "unexpected result of percent-encoding");
     buffer.Require(expected);
     return result == 0;
 }
@@ -54,7 +54,7 @@ bool Encodes(const std::string &text, std::size_t size) {
     Buffer buffer(size);
     const int result = TLIBCBase64SzEncodeFull(text.data(), text.size(), buffer.data(), 1, size, 0, 1);
     const std::optional<std::string> expected = size == 0 ? std::nullopt : AsText(EncodeBase64(text), size - 1);
-    Require((result != 0) == expected.has_value(), "bytes are encoded where they fit");
+    Require((result != 0) == expected.has_value(), "unexpected result of encoding");
     buffer.Require(expected);
     return result != 0;
 }
@@ -64,12 +64,12 @@ bool Decodes(const std::string &text, std::size_t size) {
     std::size_t length = size;
     const int result = TLIBCBase64Decode(text.data(), text.size(), buffer.data(), &length);
     std::optional<std::string> expected = DecodeCanonicalBase64(text);
-    // A vector of no bytes has no address, and without one the function refuses.
+    // An empty vector has a null address, which the function rejects.
     if (expected && (expected->size() > size || size == 0)) {
         expected.reset();
     }
-    Require((result != 0) == expected.has_value(), "a canonical text is decoded where its bytes fit");
-    Require(length == (expected ? expected->size() : size), "the length is the bytes', or as it was");
+    Require((result != 0) == expected.has_value(), "unexpected result of decoding");
+    Require(length == (expected ? expected->size() : size), "unexpected length");
     buffer.Require(expected);
     return result != 0;
 }
@@ -80,7 +80,7 @@ bool Converts(const std::string &name, std::size_t size) {
     const int result = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.data(), size);
     const Conversion conversion = ToNetBIOS(name, size);
     const std::optional<std::string> expected = AsText(conversion.name, size);
-    Require((result >= 0) == expected.has_value(), "a name of a known domain is converted where it fits");
+    Require((result >= 0) == expected.has_value(), "unexpected result of the conversion");
     buffer.Require(expected);
     RequireLog(Lines(conversion));
     return result >= 0;

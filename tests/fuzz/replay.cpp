@@ -1,4 +1,4 @@
-// Shows a target its seeds: those whose name begins with "accepted" are good inputs, all others are not.
+// Runs a target with its seeds. It must accept those whose name begins with "accepted", and no others.
 //
 //   replay FOLDER
 #include <exception>
@@ -25,7 +25,7 @@ std::string ReadFile(const std::filesystem::path &path) {
     return content;
 }
 
-bool Keeps(const std::filesystem::path &seed) {
+bool Passes(const std::filesystem::path &seed) {
     const std::string name = seed.filename();
     try {
         const bool accepted = Fuzz::Accepts(ReadFile(seed));
@@ -38,17 +38,17 @@ bool Keeps(const std::filesystem::path &seed) {
     }
 }
 
-/// How many of the folder's seeds fail; a folder without any good one proves nothing, and counts as a failure.
+/// The number of failed seeds. A folder without an accepted seed counts as a failure.
 int Failures(const std::filesystem::path &folder) {
     const std::filesystem::directory_iterator entries(folder);
     const std::set<std::filesystem::path> seeds(begin(entries), end(entries));
     int failures = 0;
     bool anyGood = false;
     for (const std::filesystem::path &seed : seeds) {
-        failures += Keeps(seed) ? 0 : 1;
+        failures += Passes(seed) ? 0 : 1;
         anyGood = anyGood || seed.filename().string().rfind(kGoodPrefix, 0) == 0;
     }
-    std::cout << seeds.size() << " seeds, " << failures << " of them fail" << std::endl;
+    std::cout << seeds.size() << " seeds, " << failures << " failed" << std::endl;
     return anyGood ? failures : failures + 1;
 }
 

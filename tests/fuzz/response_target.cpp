@@ -1,11 +1,11 @@
-// The token endpoint's answer, as both clients take it. It is good when they find an ID token in it.
+// The answer of the token endpoint, for both clients. An input is accepted if both find an ID token.
 #include <stdexcept>
 
 #include "sso/sso.h"
 #include "tests/fuzz/oracle.h"
 #include "tests/fuzz/target.h"
 
-#pragma GCC diagnostic ignored "-Wdeprecated-declarations"  // Json::FastWriter, in whose words an error is reported
+#pragma GCC diagnostic ignored "-Wdeprecated-declarations"  // Json::FastWriter, whose output an exception contains
 
 namespace Fuzz {
 
@@ -53,7 +53,7 @@ bool Takes(const std::string &response) {
 
     std::string expected;
     RequireSame(failure, Test::FailureOf([&] { expected = Client::Expected(response); }));
-    Require(client.token == expected, "the token is the answer's, and without one there is none");
+    Require(client.token == expected, "unexpected token");
     RequireLog({});
     return failure == Test::kNothingThrown;
 }

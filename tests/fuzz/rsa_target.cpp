@@ -1,4 +1,4 @@
-// An RSA signature: the lines of an input are the algorithm, n, e and the token. It is good when it verifies.
+// An RSA signature. Input lines: the algorithm, n, e and the token. An input is accepted if the signature verifies.
 #include <algorithm>
 
 #include "jwt/jwt.h"
@@ -16,7 +16,7 @@ struct Input {
     std::string token;
 };
 
-/// By other calls of OpenSSL's than the library's.
+/// Uses OpenSSL calls that the library does not use.
 bool Verifies(const Input &input, bool &certain) {
     const std::vector<std::string> parts = Split(input.token, '.');
     const Decoded n = DecodeBase64(input.n);
@@ -27,18 +27,18 @@ bool Verifies(const Input &input, bool &certain) {
            RSAVerifies(n.bytes, e.bytes, signature.bytes, UpToNUL(parts[0] + "." + parts[1]), input.digest);
 }
 
-void RequireToldLog(bool accepted, bool anyEmpty, bool certain) {
+void RequireExpectedLog(bool accepted, bool anyEmpty, bool certain) {
     const std::vector<Test::LogLine> log = Test::TakeSystemLog();
     if (accepted || anyEmpty) {
-        Require(log.empty(), "nothing is logged of a good signature, nor where a part is missing");
+        Require(log.empty(), "a line was logged for a valid signature or a missing part");
         return;
     }
-    const std::vector<Test::LogLine> told = {
+    const std::vector<Test::LogLine> expected = {
         Test::Error("jwt:N EVP_DigestVerifyInit failed"),
         Test::Error("jwt:N EVP_DigestVerifyFinal failed"),
     };
-    const bool isTold = log.size() == 1 && std::find(told.begin(), told.end(), log[0]) != told.end();
-    Require(isTold || (log.empty() && !certain), "a wrong signature is one told line");
+    const bool isExpected = log.size() == 1 && std::find(expected.begin(), expected.end(), log[0]) != expected.end();
+    Require(isExpected || (log.empty() && !certain), "unexpected log lines for an invalid signature");
 }
 
 }  // namespace
@@ -56,14 +56,14 @@ bool Accepts(const std::string &text) {
 
     bool certain = false;
     const bool verifies = Verifies(input, certain);
-    Require(verifies || !accepted, "no signature is taken that does not verify");
-    Require(accepted || !verifies || !certain, "a signature that verifies is taken");
+    Require(verifies || !accepted, "an invalid signature was accepted");
+    Require(accepted || !verifies || !certain, "a valid signature was rejected");
     RequireOneOf(failure,
                  {Test::kNothingThrown, Test::Fails<TAVO::JWT::jwt_verify_failed>("verify rsa signature failed")});
     const bool anyEmpty =
         UpToNUL(input.n).empty() || UpToNUL(input.e).empty() || UpToNUL(Split(input.token, '.')[2]).empty();
-    RequireToldLog(accepted, anyEmpty, certain);
-    Require(input.n == before.n && input.e == before.e, "the key is unchanged");
+    RequireExpectedLog(accepted, anyEmpty, certain);
+    Require(input.n == before.n && input.e == before.e, "the key has changed");
     return accepted;
 }
 

@@ -1,5 +1,5 @@
-// The state that came back from the provider, as the relay page's address is made of it. It is good when it tells where
-// the user came from. What comes instead of it after a failure, the reason, is put in as it stands.
+// The relay URL. The input is the state after a success and the reason after a failure. It is accepted if the state
+// contains an origin.
 #include "sso/sso.h"
 #include "tests/fuzz/oracle.h"
 #include "tests/fuzz/target.h"
@@ -33,9 +33,9 @@ bool Accepts(const std::string &input) {
     const std::optional<std::string> origin = Origin(input);
     Require(RelayURL(true, input, "no reason") ==
                 kPage + (origin ? "origin=" + PercentEncode(*origin) + "&" : "") + "success=true",
-            "after a success the address has the state's origin");
+            "unexpected relay URL of a success");
     Require(RelayURL(false, "e30=", input) == kPage + (input.empty() ? "" : "reason=" + input + "&") + "success=false",
-            "after a failure the address has the reason");
+            "unexpected relay URL of a failure");
     return origin.has_value();
 }
 

@@ -28,38 +28,38 @@ std::string Shown(const Value &value) {
 
 }  // namespace
 
-void Require(bool kept, const std::string &promise) {
-    if (!kept) {
-        std::cerr << "Broken promise: " << promise << std::endl;
-        throw BrokenPromise{promise};
+void Require(bool condition, const std::string &property) {
+    if (!condition) {
+        std::cerr << "Violated property: " << property << std::endl;
+        throw ViolatedProperty{property};
     }
 }
 
-void RequireSame(const Test::Failure &failure, const Test::Failure &told) {
-    const bool textIsTold = told.type != typeid(std::logic_error).name();
-    Require(textIsTold ? failure == told : failure.type == told.type,
-            "it ends as told: " + Shown(told) + ", and not: " + Shown(failure));
+void RequireSame(const Test::Failure &failure, const Test::Failure &expected) {
+    const bool hasFixedText = expected.type != typeid(std::logic_error).name();
+    Require(hasFixedText ? failure == expected : failure.type == expected.type,
+            "expected " + Shown(expected) + ", got " + Shown(failure));
 }
 
-void RequireOneOf(const Test::Failure &failure, const std::vector<Test::Failure> &told) {
-    Require(std::find(told.begin(), told.end(), failure) != told.end(),
-            "it ends in one of the ways told, and not: " + Shown(failure));
+void RequireOneOf(const Test::Failure &failure, const std::vector<Test::Failure> &expected) {
+    Require(std::find(expected.begin(), expected.end(), failure) != expected.end(),
+            "unexpected failure: " + Shown(failure));
 }
 
-void RequireLog(const std::vector<std::string> &told) {
+void RequireLog(const std::vector<std::string> &expected) {
     std::vector<Test::LogLine> lines;
-    for (const std::string &text : told) {
+    for (const std::string &text : expected) {
         lines.push_back(Test::Error(text));
     }
     const std::vector<Test::LogLine> log = Test::TakeSystemLog();
-    Require(log == lines, "it logs what is told:\n" + Text(lines) + "and not:\n" + Text(log));
+    Require(log == lines, "expected log:\n" + Text(lines) + "got:\n" + Text(log));
 }
 
 void RequireNotIn(const std::vector<Test::LogLine> &log, std::initializer_list<std::string> secrets) {
     for (const std::string &secret : secrets) {
         for (const Test::LogLine &line : log) {
             Require(secret.size() < kShortestSecret || line.text.find(secret) == std::string::npos,
-                    "the log shows nobody's secret: " + line.text);
+                    "secret in the log: " + line.text);
         }
     }
 }

@@ -10,48 +10,46 @@
 #include "tests/support/failure.h"
 #include "tests/support/system_log.h"
 
-// One surface of the library under inputs that nobody thought of. The same target is run by libFuzzer (fuzzer.cpp) and,
-// over its seeds alone, by the ordinary tests (replay.cpp).
+// A fuzz target. libFuzzer runs it (fuzzer.cpp); as a test, replay.cpp runs it with its seeds.
 namespace Fuzz {
 
-/// Each target defines it: shows the input to its surface, and holds what comes of it against what is promised. Whether
-/// the input is good: what that means, the target says.
+/// Defined by each target. Passes the input to the library and checks the results. Returns whether the input is
+/// accepted, as the target defines it.
 bool Accepts(const std::string &input);
 
-/// Not an exception of the standard library's family, so that nothing in between can take it for one of the library's.
-struct BrokenPromise {
-    std::string promise;
+/// Not derived from std::exception, so no code in between catches it as a library exception.
+struct ViolatedProperty {
+    std::string property;
 };
 
-/// Throws BrokenPromise, and says so on standard error: libFuzzer ends the program where it is thrown.
-void Require(bool kept, const std::string &promise);
+/// Prints the violated property and throws ViolatedProperty unless `condition` is true. libFuzzer reports the uncaught
+/// exception.
+void Require(bool condition, const std::string &property);
 
-/// What a call into the library throws. The program's own entry in OpenSSL's error queue must be there afterwards, and
-/// no other.
+/// The exception of a call of the library. Requires that the program's entry in OpenSSL's error queue is preserved and
+/// is the only one.
 template <typename Function>
 Test::Failure FailureOf(Function function) {
     ERR_clear_error();
     ERR_raise(ERR_LIB_USER, 99);
     Test::Failure failure = Test::FailureOf(function);
-    Require(ERR_GET_LIB(ERR_get_error()) == ERR_LIB_USER && ERR_get_error() == 0,
-            "the error queue is the program's own");
+    Require(ERR_GET_LIB(ERR_get_error()) == ERR_LIB_USER && ERR_get_error() == 0, "the error queue has changed");
     return failure;
 }
 
-/// Holds a failure against the one that is told for this case; a plain std::logic_error has no told text.
-void RequireSame(const Test::Failure &failure, const Test::Failure &told);
+/// Compares a failure with the expected one. A plain std::logic_error has no fixed text.
+void RequireSame(const Test::Failure &failure, const Test::Failure &expected);
 
-/// Holds a failure against all that are told for this function.
-void RequireOneOf(const Test::Failure &failure, const std::vector<Test::Failure> &told);
+/// Requires one of the expected failures.
+void RequireOneOf(const Test::Failure &failure, const std::vector<Test::Failure> &expected);
 
-/// Holds the lines that were logged since the last call against those that are told, at LOG_ERR and in this order.
-void RequireLog(const std::vector<std::string> &told);
+/// Compares the log since the last call with the expected lines, in order and at LOG_ERR.
+void RequireLog(const std::vector<std::string> &expected);
 
-/// Holds against the log that it shows none of these texts. A text of a few characters stands in any line by chance,
-/// and is not looked for.
+/// Requires that the log contains none of the secrets. Ignores short ones, which may occur by chance.
 void RequireNotIn(const std::vector<Test::LogLine> &log, std::initializer_list<std::string> secrets);
 
-/// The first lines of an input, as many as `count` less one, and the rest of it behind them. Missing ones are empty.
+/// The first `count` - 1 lines and the rest of the input. Missing lines are empty.
 std::vector<std::string> Lines(const std::string &input, std::size_t count);
 
 }  // namespace Fuzz

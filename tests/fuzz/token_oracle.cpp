@@ -15,7 +15,7 @@ namespace {
 constexpr char kHeaderNotJson[] = "bad jwt header format!";
 constexpr char kClaimsNotJson[] = "bad jwt body format!";
 
-/// The part's value. Throws what must be thrown of it.
+/// The value of the part. Throws the expected exception.
 Json::Value Read(const std::string &part, const char *notJson) {
     const ExpectedPart read = ReadPart(part, notJson);
     if (read.failure == Test::Fails<std::logic_error>("empty jwt part")) {
@@ -27,8 +27,8 @@ Json::Value Read(const std::string &part, const char *notJson) {
     return read.value;
 }
 
-/// Whether a client refuses a token for a reason that is told. Of an algorithm the text names it, and of an empty part
-/// there is no told text.
+/// Whether a client may reject a token with this failure. Some texts contain the algorithm; an empty part has no fixed
+/// text.
 bool IsReason(const Test::Failure &failure, const std::vector<Test::Failure> &reasons) {
     for (const char *text : {"token cannot be empty", "bad jwt format!", kHeaderNotJson, kClaimsNotJson,
                              "id_token expired.", "client ID invalid"}) {
@@ -102,14 +102,14 @@ const EVP_MD *ExpectedToken::ChooseDigest(const std::string &family) const {
     return digest;
 }
 
-void RequireVerdict(const Test::Failure &failure, const Test::Failure &told, bool certain,
+void RequireVerdict(const Test::Failure &failure, const Test::Failure &expected, bool certain,
                     const std::vector<Test::Failure> &reasons) {
     if (certain) {
-        RequireSame(failure, told);
+        RequireSame(failure, expected);
     } else if (failure == Test::kNothingThrown) {
-        Require(told == Test::kNothingThrown, "no token is trusted that is not good");
+        Require(expected == Test::kNothingThrown, "an invalid token was trusted");
     } else {
-        Require(IsReason(failure, reasons), "a token is refused as told");
+        Require(IsReason(failure, reasons), "unexpected failure");
     }
 }
 

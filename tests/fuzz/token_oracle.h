@@ -10,14 +10,14 @@
 
 #include "tests/support/failure.h"
 
-// What the clients must say of an ID token, worked out without them.
+// The expected results of ID token verification.
 namespace Fuzz {
 
-/// The second that it is for the clients, so that a token is judged alike whenever it is shown.
+/// The current time, fixed so that results are reproducible.
 constexpr std::time_t kNow = 2000000000;
 
-/// The header or the claims of a token. Where the part is not well-formed base64 it is not certain: the library may
-/// read the bytes before the fault, or refuse.
+/// The header or the claims of a token. The result is not certain for malformed base64: the library may decode the
+/// bytes before the error or reject the part.
 struct ExpectedPart {
     Json::Value value;
     Test::Failure failure = Test::kNothingThrown;
@@ -26,10 +26,10 @@ struct ExpectedPart {
 
 ExpectedPart ReadPart(const std::string &part, const char *notJson);
 
-/// Whether header and claims are well-formed, or the token is not one at all.
+/// Whether the expected result is certain.
 bool IsCertain(const std::string &token);
 
-/// A token taken apart, and each check as the clients must make it: throws what they must throw.
+/// A parsed token with the expected checks, which throw the expected exceptions.
 class ExpectedToken {
   public:
     explicit ExpectedToken(const std::string &token);
@@ -46,9 +46,9 @@ class ExpectedToken {
     std::string signingInput;
 };
 
-/// Holds what a client says of a token against what it must say. Where that is not certain it may not be trusted unless
-/// it is good, and is refused for one of the reasons of both clients, or for one of these.
-void RequireVerdict(const Test::Failure &failure, const Test::Failure &told, bool certain,
+/// Compares a client's result with the expected one. If that is not certain, requires that an invalid token is
+/// rejected, for a reason of both clients or one of `reasons`.
+void RequireVerdict(const Test::Failure &failure, const Test::Failure &expected, bool certain,
                     const std::vector<Test::Failure> &reasons);
 
 }  // namespace Fuzz

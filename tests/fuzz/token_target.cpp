@@ -1,4 +1,4 @@
-// A compact token: its parts, header and claims. An input is good when both are JSON.
+// A compact token: its parts, header and claims. An input is accepted if both are JSON.
 #include <algorithm>
 #include <optional>
 #include <stdexcept>
@@ -12,14 +12,14 @@ namespace Fuzz {
 
 namespace {
 
-/// Holds what the library reads in a part against what it ought to read.
+/// Compares what the library reads from a part with the expected value.
 bool Reads(const std::string &part, Json::Value (TAVO::JWT::Jwt::*read)(), TAVO::JWT::Jwt &token, const char *notJson) {
     Json::Value value;
     const Test::Failure failure = FailureOf([&] { value = (token.*read)(); });
     const ExpectedPart expected = ReadPart(part, notJson);
     if (expected.certain) {
         RequireSame(failure, expected.failure);
-        Require(value == expected.value, "a part is the JSON that it encodes");
+        Require(value == expected.value, "unexpected JSON");
     } else {
         RequireOneOf(failure, {Test::kNothingThrown, Test::Fails<std::invalid_argument>(notJson)});
     }
@@ -38,7 +38,7 @@ bool Accepts(const std::string &input) {
         return false;
     }
     const std::vector<std::string> parts = Split(input, '.');
-    Require(token->GetSignature() == parts[2], "the signature is the third part as it stands");
+    Require(token->GetSignature() == parts[2], "unexpected signature");
     const bool header = Reads(parts[0], &TAVO::JWT::Jwt::GetHeader, *token, "bad jwt header format!");
     const bool body = Reads(parts[1], &TAVO::JWT::Jwt::GetBody, *token, "bad jwt body format!");
     RequireLog({});

@@ -1,5 +1,5 @@
-// The check of a WebSphere ID token: the lines of an input are the client secret and the token. It is good when the
-// token may be trusted.
+// Verification of a WebSphere ID token. Input lines: the client secret and the token. An input is accepted if the token
+// is trusted.
 #include "jwt/jwt.h"
 #include "sso/sso.h"
 #include "tests/fuzz/oracle.h"
@@ -22,7 +22,7 @@ struct Client : TAVO::SSO::WebSphereSSOClient {
     }
 };
 
-/// The same check, by the told order.
+/// The expected verification.
 void Verify(const std::string &secret, const std::string &idToken) {
     const ExpectedToken token(idToken);
     token.CheckExpiry();
@@ -46,12 +46,12 @@ bool Accepts(const std::string &input) {
     Client client(secret, token);
     const Test::Failure failure = FailureOf([&] { client.VerifyIDToken(); });
 
-    const Test::Failure told = Test::FailureOf([&] { Verify(secret, token); });
-    RequireVerdict(failure, told, IsCertain(token),
+    const Test::Failure expected = Test::FailureOf([&] { Verify(secret, token); });
+    RequireVerdict(failure, expected, IsCertain(token),
                    {Test::Fails<TAVO::JWT::jwt_verify_failed>("verify hmac signature failed"),
                     Test::Fails<TAVO::SSO::sso_op_failed>("encode base64 failed.")});
     RequireLog({});
-    Require(client.GetToken() == token && client.GetClientSecret() == secret, "the client is unchanged");
+    Require(client.GetToken() == token && client.GetClientSecret() == secret, "the client has changed");
     return failure == Test::kNothingThrown;
 }
 

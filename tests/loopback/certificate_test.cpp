@@ -14,7 +14,7 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// What the servers of a login show: at each address a server that answers well is asked, or is not.
+// Server certificates at each endpoint of a login. Each server would answer correctly.
 namespace Test {
 
 namespace {
@@ -42,13 +42,13 @@ std::shared_ptr<EVP_PKEY> KeyOf(unsigned int bits) {
     return key;
 }
 
-/// Trusted beside the authority of this run; it can sign with the digests of old.
+/// Also trusted; it signs with outdated digests.
 const Credentials &OldAuthority() {
     static const Credentials authority = Certify(AuthorityText("Old authority"), nullptr, KeyOf(2048));
     return authority;
 }
 
-/// Trusted as well, but nobody should: its key can be found.
+/// Also trusted, with a key that is too short.
 const Credentials &WeakAuthority() {
     static const Credentials authority = Certify(AuthorityText("Weak authority"), nullptr, KeyOf(1024));
     return authority;
@@ -66,8 +66,8 @@ class ServerCertificate : public ::testing::TestWithParam<CertificateCase> {
         const std::string key = profile == Profile::kAzure ? "azure_token_endpoint" : "websphere_token_endpoint";
         Provider provider(profile, "{\"" + key + "\": \"" + server.URL("/token", GetParam().host) + "\"}");
         provider.AnswerVerification();
-        ExpectOnlyTheGoodToBeAsked(server, provider, profile, Refused<std::invalid_argument>("parse json falied"),
-                                   {Error("sso:N request token uri " + Text(GetParam().result) + ".")});
+        ExpectRequestOnlyIfValid(server, provider, profile, Refused<std::invalid_argument>("parse json falied"),
+                                 {Error("sso:N request token uri " + Text(GetParam().result) + ".")});
     }
 
     static void AtTheDiscoveryDocument() {
@@ -77,9 +77,9 @@ class ServerCertificate : public ::testing::TestWithParam<CertificateCase> {
         server.Answer(HTTPAnswer(R"({"jwks_uri": ")" + provider.URL("/keys") + "\"}"));
         provider.Answer(TokenResponse(Token(Profile::kAzure)));
         provider.Answer(KeySet());
-        ExpectOnlyTheGoodToBeAsked(server, provider, Profile::kAzure, UnknownKey(),
-                                   {Error("sso:N " + Text(GetParam().result)),
-                                    Error("azuresso:N request wellknown uri " + Text(CURLE_URL_MALFORMAT) + ".")});
+        ExpectRequestOnlyIfValid(server, provider, Profile::kAzure, UnknownKey(),
+                                 {Error("sso:N " + Text(GetParam().result)),
+                                  Error("azuresso:N request wellknown uri " + Text(CURLE_URL_MALFORMAT) + ".")});
     }
 
     static void AtTheKeySet() {
@@ -88,15 +88,15 @@ class ServerCertificate : public ::testing::TestWithParam<CertificateCase> {
         Provider provider(Profile::kAzure);
         provider.Answer(TokenResponse(Token(Profile::kAzure)));
         provider.Answer(R"({"jwks_uri": ")" + server.URL("/keys", GetParam().host) + "\"}");
-        ExpectOnlyTheGoodToBeAsked(server, provider, Profile::kAzure, UnknownKey(),
-                                   {Error("azuresso:N request wellknown uri " + Text(GetParam().result) + ".")});
+        ExpectRequestOnlyIfValid(server, provider, Profile::kAzure, UnknownKey(),
+                                 {Error("azuresso:N request wellknown uri " + Text(GetParam().result) + ".")});
     }
 
   private:
     static Outcome UnknownKey() { return Refused<std::invalid_argument>("kid does not exist in Azure verified kyes"); }
 
-    static void ExpectOnlyTheGoodToBeAsked(const Server &server, Provider &provider, Profile profile,
-                                           const Outcome &refusal, const std::vector<LogLine> &log) {
+    static void ExpectRequestOnlyIfValid(const Server &server, Provider &provider, Profile profile,
+                                         const Outcome &refusal, const std::vector<LogLine> &log) {
         const bool good = GetParam().result == CURLE_OK;
         TrustAuthority({OldAuthority(), WeakAuthority()});
         EXPECT_EQ(provider.LogIn(), good ? LoggedIn(UserName(profile)) : refusal);
@@ -133,22 +133,22 @@ std::vector<CertificateCase> Names() {
         return CertificateCase{name, [text] { return Certify(text, &Authority()); }, result, host};
     };
     constexpr char kHost[] = "localhost";
-    // "localhost", a NUL and ".x", in one name.
+    // One name: "localhost", a NUL and ".x".
     constexpr char kCutByANUL[] = "DER:30:0e:82:0c:6c:6f:63:61:6c:68:6f:73:74:00:2e:78";
     return {
         row("ItsAddress", CURLE_OK, Good()),
         row("ItsName", CURLE_OK, Named("DNS:localhost"), kHost),
         row("ItsNameInCapitals", CURLE_OK, Named("DNS:LOCALHOST"), kHost),
         row("ItsNameAmongOthers", CURLE_OK, Named("DNS:a.example, IP:127.0.0.2, DNS:localhost"), kHost),
-        row("ItsNameAsCommonNameAlone", CURLE_OK, Named("", "localhost"), kHost),
-        row("ItsAddressAsCommonNameAlone", CURLE_OK, Named("", "127.0.0.1")),
+        row("ItsNameOnlyAsCommonName", CURLE_OK, Named("", "localhost"), kHost),
+        row("ItsAddressOnlyAsCommonName", CURLE_OK, Named("", "127.0.0.1")),
         row("AnotherName", CURLE_PEER_FAILED_VERIFICATION, Named("DNS:localhost.example"), kHost),
         row("AnotherAddress", CURLE_PEER_FAILED_VERIFICATION, Named("IP:127.0.0.2")),
         row("ItsAddressAsAName", CURLE_PEER_FAILED_VERIFICATION, Named("DNS:127.0.0.1")),
-        row("AnotherNameBesideItsOwnAsCommonName", CURLE_PEER_FAILED_VERIFICATION, Named("DNS:a.example", "localhost"),
+        row("AnotherNameAndItsOwnAsCommonName", CURLE_PEER_FAILED_VERIFICATION, Named("DNS:a.example", "localhost"),
             kHost),
         row("AWildcardForEveryName", CURLE_PEER_FAILED_VERIFICATION, Named("DNS:*"), kHost),
-        row("ANameThatANULCutsShort", CURLE_PEER_FAILED_VERIFICATION, Named(kCutByANUL), kHost),
+        row("ItsNameUpToNUL", CURLE_PEER_FAILED_VERIFICATION, Named(kCutByANUL), kHost),
         row("ACommonNameOfAnother", CURLE_PEER_FAILED_VERIFICATION, Named("", "a.example"), kHost),
     };
 }
@@ -156,26 +156,26 @@ std::vector<CertificateCase> Names() {
 std::vector<CertificateCase> Issuers() {
     constexpr CURLcode kRefused = CURLE_PEER_FAILED_VERIFICATION;
     return {
-        {"OneOfItsOwn", [] { return Certify(Good(), nullptr); }, kRefused},
-        {"OneOfAnUnknownAuthority",
+        {"SelfSigned", [] { return Certify(Good(), nullptr); }, kRefused},
+        {"UnknownAuthority",
          [] {
              const Credentials unknown = Certify(AuthorityText("Unknown authority"), nullptr);
              return Certify(Good(), &unknown);
          },
          kRefused},
-        {"OneOfAnAuthorityThatTakesTheTrustedOnesName",
+        {"UnknownAuthorityWithTrustedName",
          [] {
              const Credentials impostor = Certify(AuthorityText("Authority of this test run"), nullptr);
              return Certify(Good(), &impostor);
          },
          CURLE_SSL_CONNECT_ERROR},
-        {"OneOfAServerThatIsNoAuthority",
+        {"ServerThatIsNoAuthority",
          [] {
              const Credentials server = CertificateFor("DNS:a.example");
              return Certify(Good(), &server);
          },
          kRefused},
-        {"OneOfATrustedAuthorityOfOld", [] { return Certify(Good(), &OldAuthority()); }, CURLE_OK},
+        {"SecondTrustedAuthority", [] { return Certify(Good(), &OldAuthority()); }, CURLE_OK},
     };
 }
 
@@ -186,9 +186,9 @@ std::vector<CertificateCase> Purposes() {
         return CertificateCase{name, [text] { return Certify(text, &Authority()); }, CURLE_PEER_FAILED_VERIFICATION};
     };
     return {
-        row("OneForClients", [](CertificateText &text) { text.extendedKeyUsage = "clientAuth"; }),
-        row("OneThatHasExpired", [](CertificateText &text) { text.notAfter = "20231114221319Z"; }),
-        row("OneThatIsNotYetValid", [](CertificateText &text) { text.notBefore = "20231114221321Z"; }),
+        row("ForClients", [](CertificateText &text) { text.extendedKeyUsage = "clientAuth"; }),
+        row("Expired", [](CertificateText &text) { text.notAfter = "20231114221319Z"; }),
+        row("NotYetValid", [](CertificateText &text) { text.notBefore = "20231114221321Z"; }),
     };
 }
 

@@ -16,8 +16,7 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// Each illness of a provider at each of the addresses that a login asks: what it answers with is a good document, were
-// it well.
+// Each fault of a provider at each endpoint of a login. Without the fault, the answer would be correct.
 namespace Test {
 
 namespace {
@@ -28,16 +27,16 @@ using ::testing::ValuesIn;
 
 using Document = const std::string &;
 using MakeAnswer = std::function<std::string(Document document)>;
-using Illness = std::function<void(Connection &connection, Document document)>;
+using Fault = std::function<void(Connection &connection, Document document)>;
 
-struct IllnessCase {
+struct FaultCase {
     std::string name;
-    Illness illness;
+    Fault fault;
     CURLcode result;
-    bool arrives;  // the document, whole
+    bool arrives;  // whether the complete document arrives
 };
 
-void PrintTo(const IllnessCase &row, std::ostream *stream) { *stream << row.name; }
+void PrintTo(const FaultCase &row, std::ostream *stream) { *stream << row.name; }
 
 std::string Token(Profile profile) { return SignedToken(TokenHeader(profile), TokenClaims(profile)); }
 
@@ -47,17 +46,17 @@ Outcome UnknownKey() { return Refused<std::invalid_argument>("kid does not exist
 
 LogLine KeyRequestLogged(const std::string &text) { return Error("azuresso:N request wellknown uri " + text + "."); }
 
-class FaultyProvider : public ::testing::TestWithParam<IllnessCase> {
+class FaultyProvider : public ::testing::TestWithParam<FaultCase> {
   protected:
-    static void PlaySick(Provider &provider, const std::string &document) {
-        provider.Play([document](Connection &connection) { GetParam().illness(connection, document); });
+    static void PlayFault(Provider &provider, const std::string &document) {
+        provider.Play([document](Connection &connection) { GetParam().fault(connection, document); });
     }
 
-    // A transfer that failed is logged, but what arrived of a token answer counts.
-    static void FallIllAtTheTokenEndpoint(Profile profile) {
-        const auto &[name, illness, result, arrives] = GetParam();
+    // A failed transfer is logged, but a complete token response counts.
+    static void FailAtTheTokenEndpoint(Profile profile) {
+        const auto &[name, fault, result, arrives] = GetParam();
         Provider provider(profile);
-        PlaySick(provider, TokenResponse(Token(profile)));
+        PlayFault(provider, TokenResponse(Token(profile)));
         provider.AnswerVerification();
         EXPECT_EQ(provider.LogIn(),
                   arrives ? LoggedIn(UserName(profile)) : Refused<std::invalid_argument>("parse json falied"));
@@ -68,71 +67,70 @@ class FaultyProvider : public ::testing::TestWithParam<IllnessCase> {
         EXPECT_THAT(TakeSystemLog(), ElementsAreArray(log));
     }
 
-    static void FallIllAtTheDiscoveryDocument() {
+    static void FailAtTheDiscoveryDocument() {
         Provider provider(Profile::kAzure);
         provider.Answer(TokenResponse(Token(Profile::kAzure)));
-        PlaySick(provider, R"({"jwks_uri": ")" + provider.URL("/keys") + "\"}");
+        PlayFault(provider, R"({"jwks_uri": ")" + provider.URL("/keys") + "\"}");
         provider.Answer(KeySet());
-        ExpectOnlyTheWellToLogIn(provider,
-                                 {Error("sso:N " + Complaint()), KeyRequestLogged(TextOf(CURLE_URL_MALFORMAT))});
+        ExpectLoginOnlyWithoutFault(provider,
+                                    {Error("sso:N " + FailureText()), KeyRequestLogged(TextOf(CURLE_URL_MALFORMAT))});
     }
 
-    static void FallIllAtTheKeySet() {
+    static void FailAtTheKeySet() {
         Provider provider(Profile::kAzure);
         provider.Answer(TokenResponse(Token(Profile::kAzure)));
         provider.Answer(R"({"jwks_uri": "$BASE/keys"})");
-        PlaySick(provider, KeySet());
-        ExpectOnlyTheWellToLogIn(provider, {KeyRequestLogged(Complaint())});
+        PlayFault(provider, KeySet());
+        ExpectLoginOnlyWithoutFault(provider, {KeyRequestLogged(FailureText())});
     }
 
   private:
-    static std::string Complaint() {
+    static std::string FailureText() {
         return GetParam().result != CURLE_OK ? TextOf(GetParam().result) : "bad wellknown json format.";
     }
 
-    static void ExpectOnlyTheWellToLogIn(Provider &provider, const std::vector<LogLine> &complaints) {
-        const bool well = GetParam().arrives && GetParam().result == CURLE_OK;
-        EXPECT_EQ(provider.LogIn(), well ? LoggedIn(UserName(Profile::kAzure)) : UnknownKey());
-        EXPECT_THAT(TakeSystemLog(), ElementsAreArray(well ? std::vector<LogLine>() : complaints));
+    static void ExpectLoginOnlyWithoutFault(Provider &provider, const std::vector<LogLine> &failures) {
+        const bool sound = GetParam().arrives && GetParam().result == CURLE_OK;
+        EXPECT_EQ(provider.LogIn(), sound ? LoggedIn(UserName(Profile::kAzure)) : UnknownKey());
+        EXPECT_THAT(TakeSystemLog(), ElementsAreArray(sound ? std::vector<LogLine>() : failures));
     }
 };
 
 TEST_P(FaultyProvider, YieldsExpectedOutcome) {
     for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
         SCOPED_TRACE("token endpoint, " + Name(profile));
-        FallIllAtTheTokenEndpoint(profile);
+        FailAtTheTokenEndpoint(profile);
     }
     {
         SCOPED_TRACE("discovery document");
-        FallIllAtTheDiscoveryDocument();
+        FailAtTheDiscoveryDocument();
     }
     SCOPED_TRACE("key set");
-    FallIllAtTheKeySet();
+    FailAtTheKeySet();
 }
 
-/// Waits for a request and sends what becomes of the document.
-Illness Answers(const MakeAnswer &answer) {
+/// Waits for a request and sends the answer made of the document.
+Fault Answers(const MakeAnswer &answer) {
     return [answer](Connection &connection, Document document) {
         connection.ReceiveRequest();
         connection.Send(answer(document));
     };
 }
 
-/// The same, and then it is gone without a goodbye.
-Illness BreaksOffAfter(const MakeAnswer &answer) {
+/// The same, then closes the connection without a TLS close_notify.
+Fault BreaksOffAfter(const MakeAnswer &answer) {
     return [answer](Connection &connection, Document document) {
         Answers(answer)(connection, document);
         connection.BreakOff();
     };
 }
 
-IllnessCase Row(const char *name, CURLcode result, bool arrives, const MakeAnswer &answer) {
+FaultCase Row(const char *name, CURLcode result, bool arrives, const MakeAnswer &answer) {
     return {name, Answers(answer), result, arrives};
 }
 
 std::string Half(Document document) { return document.substr(0, document.size() / 2); }
 
-/// An answer with these fields in its header, each on a line.
 std::string With(const std::string &fields, const std::string &body) {
     return "HTTP/1.1 200 OK\r\n" + fields + "\r\n" + body;
 }
@@ -156,7 +154,7 @@ std::string LittleEndian(std::uint32_t number, int bytes) {
     return text;
 }
 
-/// The text in the gzip format (RFC 1952), stored in one block: short texts only.
+/// The text in the gzip format (RFC 1952), as one stored block. For short texts only.
 std::string Gzip(const std::string &text) {
     const auto length = static_cast<std::uint32_t>(text.size());
     boost::crc_32_type sum;
@@ -165,14 +163,14 @@ std::string Gzip(const std::string &text) {
            text + LittleEndian(sum.checksum(), 4) + LittleEndian(length, 4);
 }
 
-std::vector<IllnessCase> Connections() {
+std::vector<FaultCase> Connections() {
     const auto whole = [](Document document) { return HTTPAnswer(document); };
     const auto withoutLength = [](Document document) { return With("", document); };
     return {
         {"ClosesBeforeTheHandshake", [](Connection &, Document) {}, CURLE_SSL_CONNECT_ERROR, false},
         {"ClosesInTheHandshake", [](Connection &connection, Document) { connection.ReceiveRaw(); },
          CURLE_SSL_CONNECT_ERROR, false},
-        {"ClosesHalfWayThroughItsHello",
+        {"ClosesDuringServerHello",
          [](Connection &connection, Document) {
              connection.ReceiveRaw();
              connection.SendRaw(std::string("\x16\x03\x03\x00\x7a\x02", 6));
@@ -186,7 +184,7 @@ std::vector<IllnessCase> Connections() {
          CURLE_SSL_CONNECT_ERROR, false},
         {"ClosesInTheStatusLine", Answers([](Document) { return "HTTP/1.1 20"; }), CURLE_GOT_NOTHING, false},
         {"ClosesInTheHeader", Answers([](Document) { return "HTTP/1.1 200 OK\r\nContent-Len"; }), CURLE_OK, false},
-        {"ClosesBehindTheHeader", Answers([](Document document) { return With(Length(document.size()), ""); }),
+        {"ClosesAfterTheHeader", Answers([](Document document) { return With(Length(document.size()), ""); }),
          CURLE_PARTIAL_FILE, false},
         {"ClosesInTheBody", Answers([](Document document) { return With(Length(document.size()), Half(document)); }),
          CURLE_PARTIAL_FILE, false},
@@ -203,7 +201,7 @@ std::vector<IllnessCase> Connections() {
              connection.SendByteByByte(HTTPAnswer(document));
          },
          CURLE_OK, true},
-        {"DripsEachByteInAChunkOfItsOwn", Answers([](Document document) {
+        {"SendsEachByteInSeparateChunk", Answers([](Document document) {
              std::vector<std::string> bytes;
              for (const char byte : document) {
                  bytes.emplace_back(1, byte);
@@ -214,30 +212,30 @@ std::vector<IllnessCase> Connections() {
     };
 }
 
-std::vector<IllnessCase> Lengths() {
+std::vector<FaultCase> Lengths() {
     const auto row = [](const char *name, CURLcode result, bool arrives, const MakeAnswer &fields) {
         return Row(name, result, arrives, [fields](Document document) { return With(fields(document), document); });
     };
     return {
-        row("ToldTooLong", CURLE_PARTIAL_FILE, true, [](Document document) { return Length(document.size() + 1); }),
-        row("ToldTooShort", CURLE_OK, false, [](Document document) { return Length(document.size() - 1); }),
-        row("ToldAsNone", CURLE_OK, false, [](Document) { return Length(0); }),
+        row("TooLong", CURLE_PARTIAL_FILE, true, [](Document document) { return Length(document.size() + 1); }),
+        row("TooShort", CURLE_OK, false, [](Document document) { return Length(document.size() - 1); }),
+        row("Zero", CURLE_OK, false, [](Document) { return Length(0); }),
         row("Negative", CURLE_WEIRD_SERVER_REPLY, false, [](Document) { return "Content-Length: -1\r\n"; }),
         row("NotANumber", CURLE_WEIRD_SERVER_REPLY, false, [](Document) { return "Content-Length: many\r\n"; }),
         row("Empty", CURLE_WEIRD_SERVER_REPLY, false, [](Document) { return "Content-Length: \r\n"; }),
-        row("BeyondAllNumbers", CURLE_OK, true, [](Document) { return "Content-Length: 99999999999999999999\r\n"; }),
+        row("TooLarge", CURLE_OK, true, [](Document) { return "Content-Length: 99999999999999999999\r\n"; }),
         row("FollowedByLetters", CURLE_OK, true,
             [](Document document) { return "Content-Length: " + std::to_string(document.size()) + "abc\r\n"; }),
-        row("ToldTwiceAlike", CURLE_OK, true,
+        row("RepeatedEqual", CURLE_OK, true,
             [](Document document) { return Length(document.size()) + Length(document.size()); }),
-        row("ToldTwiceTheLastTimeTooShort", CURLE_OK, false,
+        row("RepeatedLastTooShort", CURLE_OK, false,
             [](Document document) { return Length(document.size()) + Length(3); }),
-        row("ToldTwiceTheFirstTimeTooShort", CURLE_OK, true,
+        row("RepeatedFirstTooShort", CURLE_OK, true,
             [](Document document) { return Length(3) + Length(document.size()); }),
     };
 }
 
-std::vector<IllnessCase> Headers() {
+std::vector<FaultCase> Headers() {
     const auto withStatusLine = [](const char *name, CURLcode result, const char *line) {
         return Row(name, result, result == CURLE_OK, [line](Document document) {
             return std::string(line) + "\r\n" + Length(document.size()) + "\r\n" + document;
@@ -246,7 +244,7 @@ std::vector<IllnessCase> Headers() {
     return {
         withStatusLine("OfHTTP09", CURLE_UNSUPPORTED_PROTOCOL, "HTTP/0.9 200 OK"),
         withStatusLine("OfHTTP10", CURLE_OK, "HTTP/1.0 200 OK"),
-        withStatusLine("OfHTTP2OnAConnectionOfHTTP1", CURLE_OK, "HTTP/2 200"),
+        withStatusLine("OfHTTP2OverHTTP1", CURLE_OK, "HTTP/2 200"),
         withStatusLine("OfHTTP4", CURLE_UNSUPPORTED_PROTOCOL, "HTTP/4 200"),
         withStatusLine("WhoseStatusIsNoNumber", CURLE_UNSUPPORTED_PROTOCOL, "HTTP/1.1 two OK"),
         withStatusLine("WhoseStatusIs99", CURLE_UNSUPPORTED_PROTOCOL, "HTTP/1.1 099 OK"),
@@ -274,18 +272,18 @@ std::vector<IllnessCase> Headers() {
     };
 }
 
-std::vector<IllnessCase> Codings() {
+std::vector<FaultCase> Codings() {
     return {
-        Row("GzipThatWasNotAskedFor", CURLE_OK, false,
+        Row("GzipNotRequested", CURLE_OK, false,
             [](Document document) { return With("Content-Encoding: gzip\r\n", Gzip(document)); }),
-        Row("GzipThatIsNone", CURLE_OK, true,
+        Row("GzipDeclaredButPlain", CURLE_OK, true,
             [](Document document) { return With("Content-Encoding: gzip\r\n", document); }),
         Row("GzipForTheTransfer", LibcurlAcceptsGzipForTheTransfer() ? CURLE_OK : CURLE_BAD_CONTENT_ENCODING,
             LibcurlAcceptsGzipForTheTransfer(),
             [](Document document) { return With("Transfer-Encoding: gzip\r\n", Gzip(document)); }),
         Row("UnknownForTheTransfer", CURLE_BAD_CONTENT_ENCODING, false,
             [](Document document) { return With("Transfer-Encoding: rot13\r\n", document); }),
-        Row("ChunkedWithALengthThatLies", CURLE_OK, true,
+        Row("ChunkedWithWrongLength", CURLE_OK, true,
             [](Document document) {
                 return With("Transfer-Encoding: chunked\r\n" + Length(3), Chunk(document) + Chunk(""));
             }),
@@ -298,9 +296,9 @@ std::vector<IllnessCase> Codings() {
             [](Document document) {
                 return ChunkedHTTPAnswer({Half(document) + '\0' + document.substr(Half(document).size())});
             }),
-        Row("ChunkWithANULAndMoreBehind", CURLE_OK, true,
+        Row("ChunkWithTextAfterNUL", CURLE_OK, true,
             [](Document document) { return ChunkedHTTPAnswer({document + '\0' + "<html>"}); }),
-        Row("ChunksOfNothingButNULsAround", CURLE_OK, true,
+        Row("SurroundedByChunksOfNULs", CURLE_OK, true,
             [](Document document) {
                 return ChunkedHTTPAnswer({std::string(5000, '\0'), document, std::string(1, '\0')});
             }),
@@ -310,21 +308,21 @@ std::vector<IllnessCase> Codings() {
             [](Document document) { return InChunks("xyz\r\n" + document + "\r\n"); }),
         Row("ChunkWhoseSizeIsNegative", CURLE_RECV_ERROR, false,
             [](Document document) { return InChunks("-5\r\n" + document + "\r\n"); }),
-        Row("ChunkWhoseSizeIsBeyondAllNumbers", CURLE_RECV_ERROR, false,
+        Row("ChunkWhoseSizeIsTooLarge", CURLE_RECV_ERROR, false,
             [](Document document) { return InChunks("fffffffffffffffff\r\n" + document + "\r\n"); }),
-        Row("ChunkLongerThanItIs", CURLE_PARTIAL_FILE, true,
+        Row("ChunkShorterThanDeclared", CURLE_PARTIAL_FILE, true,
             [](Document document) { return InChunks("fffff\r\n" + document); }),
-        Row("ChunkShorterThanItIs", CURLE_RECV_ERROR, false,
+        Row("ChunkLongerThanDeclared", CURLE_RECV_ERROR, false,
             [](Document document) { return InChunks("3\r\n" + document + "\r\n0\r\n\r\n"); }),
     };
 }
 
-std::string NameOfIllness(const ::testing::TestParamInfo<IllnessCase> &info) { return info.param.name; }
+std::string NameOfFault(const ::testing::TestParamInfo<FaultCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(Connection, FaultyProvider, ValuesIn(Connections()), NameOfIllness);
-INSTANTIATE_TEST_SUITE_P(Length, FaultyProvider, ValuesIn(Lengths()), NameOfIllness);
-INSTANTIATE_TEST_SUITE_P(Header, FaultyProvider, ValuesIn(Headers()), NameOfIllness);
-INSTANTIATE_TEST_SUITE_P(Coding, FaultyProvider, ValuesIn(Codings()), NameOfIllness);
+INSTANTIATE_TEST_SUITE_P(Connection, FaultyProvider, ValuesIn(Connections()), NameOfFault);
+INSTANTIATE_TEST_SUITE_P(Length, FaultyProvider, ValuesIn(Lengths()), NameOfFault);
+INSTANTIATE_TEST_SUITE_P(Header, FaultyProvider, ValuesIn(Headers()), NameOfFault);
+INSTANTIATE_TEST_SUITE_P(Coding, FaultyProvider, ValuesIn(Codings()), NameOfFault);
 
 TEST(ChunkedAnswer, ReadsEachChunkUpToFirstNUL) {
     Provider provider(Profile::kAzure);
@@ -358,7 +356,7 @@ TEST(LargeAnswer, Accepts200MB) {
 constexpr const char *kRedirects[] = {"301 Moved Permanently", "302 Found", "303 See Other", "307 Temporary Redirect",
                                       "308 Permanent Redirect"};
 
-/// A provider each of whose redirects leads to a server that would answer well.
+/// A provider that redirects to a server with a correct answer.
 class Redirect : public ::testing::Test {
   protected:
     void ExpectNotFollowed(const std::vector<std::string> &answersBefore, const Outcome &outcome,

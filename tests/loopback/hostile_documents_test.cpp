@@ -15,7 +15,7 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// Discovery documents and key sets of a provider that means harm.
+// Discovery documents and key sets of a hostile provider.
 namespace Test {
 
 namespace {
@@ -36,15 +36,14 @@ LogLine KeyRequestLogged(CURLcode result) {
     return Error(std::string("azuresso:N request wellknown uri ") + curl_easy_strerror(result) + ".");
 }
 
-/// Changes to the token's header are a row's business: it may name its key in any way.
 std::string Token(const std::string &headerChanges = "{}") {
     return SignedToken(Change(TokenHeader(Profile::kAzure), headerChanges), TokenClaims(Profile::kAzure));
 }
 
-/// Where a discovery document says that the keys are.
+/// The address of the key set in a discovery document.
 struct AddressCase {
     std::string name;
-    std::string jwksURI;  // JSON; $INSIDE is a server of plain HTTP behind the appliance's own walls
+    std::string jwksURI;  // JSON; $INSIDE is an HTTP server in the appliance's network
     Outcome outcome;
     std::vector<LogLine> log;
     std::vector<std::string> requestsInside;
@@ -90,7 +89,7 @@ std::vector<AddressCase> Types() {
         refused("True", "true", CURLE_COULDNT_RESOLVE_HOST),
         refused("False", "false", CURLE_COULDNT_RESOLVE_HOST),
         refused("Number", "5", CURLE_COULDNT_CONNECT),
-        refused("NumberThatIsTheLoopbackAddress", "2130706433", CURLE_COULDNT_CONNECT),
+        refused("NumberOfLoopbackAddress", "2130706433", CURLE_COULDNT_CONNECT),
         refused("Fraction", "0.5", CURLE_COULDNT_CONNECT),
         refused("EmptyText", R"("")", CURLE_URL_MALFORMAT),
         refused("Object", R"({"uri": "http://$INSIDE/keys"})", CURLE_URL_MALFORMAT),
@@ -104,9 +103,9 @@ std::vector<AddressCase> Addresses() {
     const std::vector<std::string> asked = {"GET /keys HTTP/1.1"};
     return {
         {"File", R"("file:///tmp/keys.json")", Accepted(), {}, {}},
-        refused("FileOfTheApplianceItself", R"("file:///usr/tavo/etc/ssoclient/azure.conf")",
+        refused("FileOfTheAppliance", R"("file:///usr/tavo/etc/ssoclient/azure.conf")",
                 Error("azuresso:N no kyes information")),
-        refused("FileThatIsNotThere", R"("file:///tmp/nothing")", KeyRequestLogged(CURLE_FILE_COULDNT_READ_FILE)),
+        refused("MissingFile", R"("file:///tmp/nothing")", KeyRequestLogged(CURLE_FILE_COULDNT_READ_FILE)),
         {"InsideWithoutTLS", R"("http://$INSIDE/keys")", Accepted(), {}, asked},
         {"InsideWithoutScheme", R"("$INSIDE/keys")", Accepted(), {}, asked},
         refused("OfAnUnknownScheme", R"("secret://$INSIDE/keys")", KeyRequestLogged(CURLE_UNSUPPORTED_PROTOCOL)),
@@ -115,18 +114,14 @@ std::vector<AddressCase> Addresses() {
         {"UpToItsFirstNUL", R"("http://$INSIDE/keys\u0000\r\nX: y")", Accepted(), {}, asked},
         refused("Of9MB", "\"http://$INSIDE/" + std::string(std::size_t{9} << 20, 'k') + "\"",
                 KeyRequestLogged(CURLE_URL_MALFORMAT)),
-        {"ToldTwiceTheLastOneCounts",
-         R"("file:///tmp/nothing", "jwks_uri": "http://$INSIDE/keys")",
-         Accepted(),
-         {},
-         asked},
+        {"RepeatedLastCounts", R"("file:///tmp/nothing", "jwks_uri": "http://$INSIDE/keys")", Accepted(), {}, asked},
     };
 }
 
 std::string NameOfAddress(const ::testing::TestParamInfo<AddressCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(OfType, KeySetAddress, ValuesIn(Types()), NameOfAddress);
-INSTANTIATE_TEST_SUITE_P(Of, KeySetAddress, ValuesIn(Addresses()), NameOfAddress);
+INSTANTIATE_TEST_SUITE_P(Type, KeySetAddress, ValuesIn(Types()), NameOfAddress);
+INSTANTIATE_TEST_SUITE_P(Address, KeySetAddress, ValuesIn(Addresses()), NameOfAddress);
 
 TEST(DiscoveryDocument, NamesNoKeySetUnlessObject) {
     for (const char *document : {"null", "true", "5", "0.5", R"("$BASE/keys")", R"([{"jwks_uri": "$BASE/keys"}])"}) {
@@ -139,7 +134,7 @@ TEST(DiscoveryDocument, NamesNoKeySetUnlessObject) {
     }
 }
 
-/// What is published as keys, by a text in which $KEY stands for the members of the key that signed.
+/// A published key set. $KEY is replaced with the members of the signing key.
 struct KeySetCase {
     std::string name;
     std::string keySet;
@@ -187,19 +182,19 @@ std::vector<KeySetCase> Sets() {
     const std::string foreign =
         "{" + kNamed + R"(, "n": ")" + Base64Url(std::string(256, '\xff')) + R"(", "e": "AQAB"})";
     return {
-        {"TenThousandTheLastIsRight", Keys(many + right), Accepted()},
-        {"TenThousandNoneIsRight", Keys(many + R"({"kid": "last key", $KEY})"), UnknownKey()},
-        {"TenThousandOfTheNameTheFirstIsRight", Keys(right + "," + many + foreign), Accepted()},
-        {"OfTheNameTheFirstIsOfAnotherType",
+        {"TenThousandLastIsCorrect", Keys(many + right), Accepted()},
+        {"TenThousandNoneIsCorrect", Keys(many + R"({"kid": "last key", $KEY})"), UnknownKey()},
+        {"TenThousandFirstIsCorrect", Keys(right + "," + many + foreign), Accepted()},
+        {"SameNameFirstIsOfAnotherType",
          Keys("{" + kNamed + R"(, "kty": "EC", "crv": "P-256", "x": "AQAB", "y": "AQAB"}, )" + right),
          Refused<std::invalid_argument>("RSA public 'n' cannot be found!")},
-        {"ASymmetricKeyOfTheName", Key(kNamed + R"(, "kty": "oct", "k": "AQAB")"),
+        {"SymmetricKeyOfTheName", Key(kNamed + R"(, "kty": "oct", "k": "AQAB")"),
          Refused<std::invalid_argument>("RSA public 'n' cannot be found!")},
-        {"AKeyOfAnotherTypeUnderAnotherName", Keys(R"({"kid": "x", "kty": "EC"}, )" + right), Accepted()},
-        {"AKeyThatClaimsToBeOfAnotherType", Key(kNamed + R"(, "kty": "EC", "use": "enc", "alg": "RS512", $KEY)"),
+        {"KeyOfAnotherTypeAndName", Keys(R"({"kid": "x", "kty": "EC"}, )" + right), Accepted()},
+        {"KeyWithAnotherDeclaredType", Key(kNamed + R"(, "kty": "EC", "use": "enc", "alg": "RS512", $KEY)"),
          Accepted()},
-        {"SetsToldTwiceTheLastOneCounts", R"({"keys": [], "keys": [)" + right + "]}", Accepted()},
-        {"SetsToldTwiceTheLastOneIsEmpty", R"({"keys": [)" + right + R"(], "keys": []})", UnknownKey()},
+        {"SetsRepeatedLastCounts", R"({"keys": [], "keys": [)" + right + "]}", Accepted()},
+        {"SetsRepeatedLastIsEmpty", R"({"keys": [)" + right + R"(], "keys": []})", UnknownKey()},
         {"ASetInASet", Keys("[" + right + "]"), UnknownKey()},
         {"True", R"({"keys": true})", UnknownKey()},
         {"ANumber", R"({"keys": 5})", UnknownKey()},
@@ -228,10 +223,10 @@ std::vector<KeySetCase> Names() {
         row("Lists", UnknownKey(), R"(["first key"])", R"(["first key"])"),
         row("EmptyAndList", UnknownKey(), R"("")", "[]"),
         row("Of1MB", Accepted(), text, text),
-        row("AlikeUpToANUL", UnknownKey(), R"("first key")", R"("first key\u0000")"),
-        row("AlikeBeyondANUL", Accepted(), R"("first\u0000key")", R"("first\u0000key")"),
-        row("ToldTwiceTheLastOneCounts", Accepted(), R"("second")", R"("first", "kid": "second")"),
-        row("ToldTwiceTheFirstOneDoesNot", UnknownKey(), R"("first")", R"("first", "kid": "second")"),
+        row("EqualUpToNUL", UnknownKey(), R"("first key")", R"("first key\u0000")"),
+        row("EqualWithNUL", Accepted(), R"("first\u0000key")", R"("first\u0000key")"),
+        row("RepeatedLastCounts", Accepted(), R"("second")", R"("first", "kid": "second")"),
+        row("RepeatedFirstDoesNotCount", UnknownKey(), R"("first")", R"("first", "kid": "second")"),
     };
 }
 
@@ -251,7 +246,7 @@ std::vector<KeySetCase> Members() {
         rows.push_back({std::string("ExponentOfType") + type, Key(kNamed + ", $KEY, \"e\": " + json),
                         Refused<std::invalid_argument>("RSA public 'e' cannot be found!")});
     }
-    rows.push_back({"ExponentToldTwiceTheLastOneCounts", Key(kNamed + R"(, "e": 5, $KEY)"), Accepted()});
+    rows.push_back({"ExponentRepeatedLastCounts", Key(kNamed + R"(, "e": 5, $KEY)"), Accepted()});
     rows.push_back({"ModulusUpToItsFirstNUL",
                     Key(kNamed + R"(, $KEY, "n": "AQAB\u0000")"),
                     Refused<jwt_verify_failed>("verify rsa signature failed"),
@@ -262,9 +257,9 @@ std::vector<KeySetCase> Members() {
 
 std::string NameOfKeySet(const ::testing::TestParamInfo<KeySetCase> &info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(As, PublishedKeys, ValuesIn(Sets()), NameOfKeySet);
-INSTANTIATE_TEST_SUITE_P(Named, PublishedKeys, ValuesIn(Names()), NameOfKeySet);
-INSTANTIATE_TEST_SUITE_P(With, PublishedKeys, ValuesIn(Members()), NameOfKeySet);
+INSTANTIATE_TEST_SUITE_P(Set, PublishedKeys, ValuesIn(Sets()), NameOfKeySet);
+INSTANTIATE_TEST_SUITE_P(Name, PublishedKeys, ValuesIn(Names()), NameOfKeySet);
+INSTANTIATE_TEST_SUITE_P(Member, PublishedKeys, ValuesIn(Members()), NameOfKeySet);
 
 }  // namespace
 

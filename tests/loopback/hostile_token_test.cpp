@@ -14,8 +14,7 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// Tokens that are really signed, by a provider that writes anything into them: every member that is looked at, of every
-// JSON type, twice over, and huge.
+// Correctly signed tokens with arbitrary content: each member with every JSON type, repeated, and huge.
 namespace Test {
 
 namespace {
@@ -40,7 +39,7 @@ Outcome Unsupported(const std::string &algorithm) {
 Outcome NoUser() { return Refused<std::invalid_argument>("cannot find the user name!"); }
 Outcome NoDomain(const std::string &user) { return Refused<std::invalid_argument>("cannot get the user name!", user); }
 
-/// A token of these texts with the provider's own signature, whatever they say.
+/// A token of these texts, signed by the provider.
 std::string Sign(Profile profile, const std::string &header, const std::string &claims) {
     const std::string signingInput = Base64Url(header) + "." + Base64Url(claims);
     return signingInput + "." +
@@ -51,14 +50,14 @@ std::string Sign(Profile profile, const std::string &header, const std::string &
 std::string HeaderText(Profile profile) { return Compact(TokenHeader(profile)); }
 std::string ClaimsText(Profile profile) { return Compact(TokenClaims(profile)); }
 
-/// JSON text of an object with other values of one member, as they stand; without it if there is none.
+/// The object as JSON text, with `value` verbatim as its member `name`; without the member if `value` is empty.
 std::string WithMember(Json::Value object, const std::string &name, const std::string &value) {
     object.removeMember(name);
     std::string text = Compact(object);
     return value.empty() ? text : text.insert(text.size() - 1, ",\"" + name + "\":" + value);
 }
 
-/// Another member of the same name.
+/// Repeats the member.
 std::string Again(const std::string &first, const std::string &name, const std::string &second) {
     return first + ",\"" + name + "\":" + second;
 }
@@ -68,7 +67,7 @@ std::string Quoted(const std::string &text) { return "\"" + text + "\""; }
 struct ValueCase {
     std::string value;
     Outcome outcome;
-    bool asksForKeys = true;  // it gets past the claims
+    bool asksForKeys = true;  // the claims are accepted
     std::vector<LogLine> log = {};
 };
 
@@ -115,7 +114,7 @@ TEST_P(TokenMember, YieldsExpectedOutcome) {
 std::vector<ValueCase> ExpiryValues(const Outcome &accepted) {
     const std::string never = "9223372036854775807";
     return {
-        {"1700000000.5", accepted},  // digits up to the point
+        {"1700000000.5", accepted},  // read up to the point
         {"1.7e9", accepted},
         {never, accepted},
         {"9223372036854775808", accepted},
@@ -140,7 +139,7 @@ std::vector<ValueCase> ExpiryValues(const Outcome &accepted) {
     };
 }
 
-/// Of a member that has to be this text.
+/// Values of a member that must equal this text.
 std::vector<ValueCase> TextValues(const std::string &member, const std::string &text, const Outcome &accepted,
                                   const Outcome &refused) {
     return {
@@ -160,7 +159,7 @@ std::vector<ValueCase> TextValues(const std::string &member, const std::string &
     };
 }
 
-/// A setting that is no text in the token but has one: the text counts.
+/// A value that is not a string is compared as text.
 MemberCase TextOf(const std::string &name, Profile profile, const std::string &member, const std::string &value,
                   const std::string &text) {
     const std::string key = member == "tid"              ? "azure_tenant_id"
@@ -211,7 +210,7 @@ std::vector<ValueCase> PrincipalNames(const std::string &member) {
     return {
         {name, alice},
         {Again(Quoted("bob@corp.example"), member, name), alice},
-        {Quoted("alice\\u0000x@corp.example"), alice},  // the platform takes a text up to its first NUL
+        {Quoted("alice\\u0000x@corp.example"), alice},  // the platform reads up to the first NUL
         {"", NoUser()},
         {"null", NoUser()},
         {"true", NoUser()},
@@ -231,7 +230,7 @@ std::vector<ValueCase> PrincipalNames(const std::string &member) {
 
 std::vector<MemberCase> Users() {
     const std::string huge(kHuge, 'u');
-    // Each alone: "unique_name" takes the place of "email".
+    // "unique_name" has precedence over "email", so each is tested without the other.
     return {
         {"AzureUniqueName", Profile::kAzure, false, "unique_name", PrincipalNames("unique_name")},
         {"WebSphereSubject",
@@ -267,7 +266,7 @@ std::vector<ValueCase> AlgorithmValues(const std::string &own, const Outcome &ac
         {Quoted(" " + own), Unsupported(" " + own)},
         {Quoted(huge), Unsupported(huge)},
         {Again(Quoted(own), "alg", Quoted("none")), Unsupported("none")},
-        // What the exception tells ends at the NUL.
+        // The text of the exception ends at the NUL.
         {Quoted(own + "\\u0000"), Refused<jwt_not_support>(own)},
     };
 }
@@ -346,11 +345,11 @@ TEST_P(TokenJSON, HasNoMembersUnlessObject) {
 }
 
 TEST_P(TokenJSON, AllowsCommentsAndTrailingText) {
-    for (const std::string &behind :
+    for (const std::string &trailing :
          {std::string(" \n\t"), std::string("// more"), std::string("/* more */"), std::string("}}"),
           std::string("{\"exp\": 1}"), std::string("\0{]", 3), std::string(kHuge, ' ')}) {
-        ExpectLogin(header_ + behind, claims_, accepted_);
-        ExpectLogin(header_, claims_ + behind, accepted_);
+        ExpectLogin(header_ + trailing, claims_, accepted_);
+        ExpectLogin(header_, claims_ + trailing, accepted_);
     }
     ExpectLogin("/* less */ \n" + header_, "// less\n" + claims_, accepted_);
 }

@@ -9,8 +9,8 @@
 #include "tests/loopback/loopback_provider.h"
 #include "tests/support/server.h"
 
-// Tokens of all sizes through whole logins. OpenSSL's base64 filter works in blocks of 1024 characters, and scratch
-// space changes its place with the size, so each size takes another way.
+// Logins with tokens of all sizes. OpenSSL's base64 filter works in blocks of 1024 characters and buffers depend on the
+// size, so the sizes cover different code paths.
 namespace Test {
 
 namespace {
@@ -28,7 +28,7 @@ struct Size {
 
 void PrintTo(const Size &size, std::ostream *stream) { *stream << size.name; }
 
-/// A really signed token whose claims, before they are encoded, take about that many bytes more than they need.
+/// A signed token with about `more` additional bytes in its claims.
 std::string TokenWith(Profile profile, std::size_t more) {
     Json::Value claims = TokenClaims(profile);
     claims["groups"] = std::string(more, 'g');
@@ -72,7 +72,7 @@ TEST_P(TokenOfSize, RejectsBodyWithoutLastCharacter) {
 
 TEST_P(TokenOfSize, RejectsChangedCharacterInBody) {
     std::string token = Token();
-    // One of the letters of the long claim, or of a name, gives way to another: still JSON or no more, never trusted.
+    // Changes a letter of the long claim or of a member's name. The result may be invalid JSON.
     char &letter = token[token.find('.') + BodyOf(token).size() / 2];
     letter = letter == 'Z' ? 'W' : 'Z';
     Provider provider(profile());
@@ -91,7 +91,6 @@ INSTANTIATE_TEST_SUITE_P(
 
 class HugeAnswer : public ::testing::TestWithParam<Profile> {
   protected:
-    /// Logs in with a token answer that holds this as its token, or is this.
     static Outcome LogInWithToken(const std::string &token) {
         Provider provider(GetParam());
         provider.AnswerLogin(token);

@@ -115,7 +115,7 @@ std::string KeySet(const std::string &changes) {
 Provider::Provider(Profile profile, const std::string &changes)
     : profile_(profile), server_(CertificateFor("IP:127.0.0.1")) {
     const bool azure = profile == Profile::kAzure;
-    TakeSystemLog();  // what another test left
+    TakeSystemLog();  // left by another test
     SetClock(kNow);
     RemoveFiles();
     TrustAuthority();

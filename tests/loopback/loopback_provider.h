@@ -11,7 +11,7 @@
 
 #include "tests/support/server.h"
 
-// Whole logins against a provider in this program, over TLS. The clock stands still, for the library and for the test.
+// Whole logins with a provider in this program, over TLS. The clock is stopped at kNow.
 namespace Test {
 
 constexpr std::time_t kNow = 1'700'000'000;
@@ -21,16 +21,16 @@ enum class Profile { kAzure, kWebSphere };
 std::string Name(Profile profile);
 void PrintTo(Profile profile, std::ostream *stream);
 
-/// What the appliance calls the user whom the tokens name.
+/// The user name of the appliance for the tokens of this provider.
 std::string UserName(Profile profile);
 
 constexpr char kSecret[] = "a secret & 100 % only of this test";
 constexpr char kKeyID[] = "first key";
 constexpr char kUserNameBefore[] = "as it was before";
 
-/// How a login ended.
+/// The outcome of a login.
 struct Outcome {
-    std::string exception;  // its class, as the compiler names it; empty after a login
+    std::string exception;  // the mangled class name; empty after a successful login
     std::string text;
     std::string userName;
 };
@@ -45,39 +45,39 @@ Outcome Refused(const std::string &text, const std::string &userName = kUserName
 
 Outcome LoggedIn(const std::string &userName);
 
-/// Logs in with this code, through the provider that the appliance is configured for.
+/// Logs in with this code and the configured profile.
 Outcome LogIn(const std::string &code);
 
-/// JSON text with these members, over those of the value; a null takes a member away.
+/// Applies `changes`, a JSON object, to the value. A null removes a member.
 Json::Value Change(Json::Value value, const std::string &changes);
 
-/// What a token of this provider says, unless a test changes it.
+/// The default content of this provider's tokens.
 Json::Value TokenHeader(Profile profile);
 Json::Value TokenClaims(Profile profile);
 
-/// Signed as the header's "alg" says: HSnnn under the secret, everything else with the provider's RSA key; under
-/// SHA-256 where "alg" names no digest.
+/// Signed as "alg" requires: HSnnn with the secret, every other value with the provider's RSA key; with SHA-256 if
+/// "alg" names no digest.
 std::string SignedToken(const Json::Value &header, const Json::Value &claims, const std::string &secret = kSecret);
 
 std::string TokenResponse(const std::string &idToken);
 
-/// The provider's key set, with changes to its one key.
+/// The provider's key set, with changes to its only key.
 std::string KeySet(const std::string &changes = "{}");
 
-/// A provider and the appliance's configuration for it, which is nothing else than that.
+/// A provider, and the appliance's configuration for it.
 class Provider {
   public:
-    /// Changes are those to the client's configuration file; $BASE in them and in every answer is the provider's URL.
+    /// `changes` apply to the client's configuration file. $BASE in them and in every answer is the provider's URL.
     explicit Provider(Profile profile, const std::string &changes = "{}");
 
     void Answer(const std::string &body);
     void AnswerByteByByte(const std::string &answer);
     void Play(const Script &script);
 
-    /// Discovery document and key set, where this provider has them.
+    /// The discovery document and key set, if the profile uses them.
     void AnswerVerification();
 
-    /// The token and what it takes to verify it.
+    /// The token and the documents to verify it.
     void AnswerLogin(const std::string &idToken);
 
     Outcome LogIn();
@@ -93,7 +93,7 @@ class Provider {
     Server server_;
 };
 
-/// The requests of a login that gets through.
+/// The requests of a successful login.
 std::vector<std::string> AllRequestLines(Profile profile);
 
 }  // namespace Test

@@ -26,22 +26,22 @@
 
 namespace {
 
-std::vector<int> errorsAtReading;         // errno, whenever a file is opened for the library
-std::function<void()> whenAFileIsOpened;  // what happens then, once
+std::vector<int> errorsAtReading;  // errno at each fopen of the library
+std::function<void()> atNextOpen;  // called once, at the next fopen
 
 }  // namespace
 
 extern "C" FILE *fopen(const char *path, const char *mode) {
     errorsAtReading.push_back(errno);
-    if (const auto happens = std::exchange(whenAFileIsOpened, nullptr)) {
+    if (const auto happens = std::exchange(atNextOpen, nullptr)) {
         happens();
     }
     static const auto realOpen = reinterpret_cast<FILE *(*)(const char *, const char *)>(dlsym(RTLD_NEXT, "fopen"));
     return realOpen(path, mode);
 }
 
-// What a web front end does that runs under ids of its own: it becomes them for good, or keeps the right to go back to
-// root's, and then reads files that only root may read. The kernel grants the changes of the ids, or refuses them.
+// Reading configuration files in a process that drops root's ids permanently or temporarily. The kernel permits or
+// refuses each change of ids.
 namespace Test {
 
 namespace {
@@ -52,7 +52,7 @@ using ::testing::IsEmpty;
 constexpr uid_t kUser = 1024;
 constexpr gid_t kGroup = 100;
 
-/// The real and effective ids, and those that the process may go back to.
+/// The real ids, which are also the effective ids, and the saved ids.
 struct Ids {
     uid_t user;
     gid_t group;
@@ -63,9 +63,9 @@ struct Ids {
 constexpr Ids kRoot{0, 0, 0, 0};
 constexpr Ids kRootInAnotherGroup{0, kGroup, 0, 0};
 constexpr Ids kUserInRootsGroup{kUser, 0, 0, 0};
-constexpr Ids kUserWhoMayGoBack{kUser, kGroup, 0, 0};
-constexpr Ids kUserForGood{kUser, kGroup, kUser, kGroup};
-constexpr Ids kUserForGoodInRootsGroup{kUser, 0, kUser, 0};
+constexpr Ids kUserWhoMayReturn{kUser, kGroup, 0, 0};
+constexpr Ids kPermanentUser{kUser, kGroup, kUser, kGroup};
+constexpr Ids kPermanentUserInRootsGroup{kUser, 0, kUser, 0};
 constexpr Ids kUserWhoMayRaiseTheGroupOnly{kUser, kGroup, kUser, 0};
 
 struct EffectiveIds {
@@ -73,13 +73,13 @@ struct EffectiveIds {
     gid_t group;
 };
 
-/// How one file is read.
+/// The expected result of reading one file.
 struct Reading {
-    std::vector<LogLine> log = {};  // without the source's name
+    std::vector<LogLine> log = {};  // without the name of the source
     bool succeeds = true;
     int errorAtOpening = 0;
     int error = 0;
-    std::optional<EffectiveIds> left = std::nullopt;  // what the process is left with; none: what it had
+    std::optional<EffectiveIds> left = std::nullopt;  // ids after reading; unset: unchanged
 };
 
 LogLine Raised(const std::string &call) { return {LOG_AUTH | LOG_INFO, "WARNING: " + call}; }
@@ -94,7 +94,7 @@ const LogLine kUserNotRestored = Failed("setresuid(-1, 1024, -1) [Operation not 
 const LogLine kNotEntered = Failed("ENTERCriticalSection");
 const LogLine kNotLeft = Failed("LEAVECriticalSection");
 
-/// No call of the library's tells the raise of the user from the return to it: only the time does.
+/// The return to user 0 is the same call as the raise. Only its position in time distinguishes it.
 enum class Refused { kFromTheStart, kAfterTheRaise };
 
 struct Case {
@@ -103,8 +103,8 @@ struct Case {
     Reading first;
     std::vector<IdChange> refusals = {};
     Refused refused = Refused::kFromTheStart;
-    std::optional<Reading> later = std::nullopt;  // how the process then reads other files; none: like the first
-    bool ofANamespace = false;                    // that has those ids alone, and in which the files are its user's
+    std::optional<Reading> later = std::nullopt;  // for later files; unset: as `first`
+    bool inNamespace = false;                     // a namespace that maps only these ids; the files belong to its user
 };
 
 void PrintTo(const Case &row, std::ostream *stream) { *stream << row.name; }
@@ -114,16 +114,16 @@ const Reading kGroupIsNotRaised{{kGroupNotRaised, kNotEntered}, false, 1};
 const Reading kUserIsNotRaised{{kUserNotRaised, kNotEntered}, false, 1};
 const Reading kOnlyGroupIsRaised{{kGroupRaised, kUserNotRaised, kNotEntered}, false, 1};
 
-/// As the ids themselves allow it.
+/// Cases that depend only on the ids.
 std::vector<Case> Allowed() {
     return {
         {"Root", kRoot, kReadWithoutACall},
         {"RootInAnotherGroup", kRootInAnotherGroup, {{kGroupRaised}}},
         {"UserInRootsGroup", kUserInRootsGroup, {{kUserRaised, kUserRaised}}},
-        {"UserWhoMayGoBack", kUserWhoMayGoBack, {{kGroupRaised, kUserRaised, kUserRaised}}},
-        {"UserForGood", kUserForGood, kGroupIsNotRaised},
-        {"UserForGoodInRootsGroup", kUserForGoodInRootsGroup, kUserIsNotRaised},
-        // The group may be raised, then the user may not: the group has to come back.
+        {"UserWhoMayReturn", kUserWhoMayReturn, {{kGroupRaised, kUserRaised, kUserRaised}}},
+        {"PermanentUser", kPermanentUser, kGroupIsNotRaised},
+        {"PermanentUserInRootsGroup", kPermanentUserInRootsGroup, kUserIsNotRaised},
+        // The group is raised, the user cannot be: the group must be restored.
         {"UserWhoMayRaiseTheGroupOnly", kUserWhoMayRaiseTheGroupOnly, kOnlyGroupIsRaised},
     };
 }
@@ -133,16 +133,16 @@ constexpr IdChange kRaiseUser{SYS_setresuid, 0};
 constexpr IdChange kRestoreGroup{SYS_setresgid, kGroup};
 constexpr IdChange kRestoreUser{SYS_setresuid, kUser};
 
-/// A policy of the machine refuses what the ids allow.
-std::vector<Case> RefusedAtTheRaise() {
+/// A system call filter refuses changes that the ids permit.
+std::vector<Case> RaiseRefused() {
     return {
-        {"GroupOfAUser", kUserWhoMayGoBack, kGroupIsNotRaised, {kRaiseGroup}},
-        // Whose files they are nevertheless: a failed raise does not stop the reading.
+        {"GroupOfAUser", kUserWhoMayReturn, kGroupIsNotRaised, {kRaiseGroup}},
+        // Root owns the files: a failed raise does not prevent reading.
         {"GroupOfRoot", kRootInAnotherGroup, {{kGroupNotRaised, kNotEntered}, true, 1}, {kRaiseGroup}},
-        {"UserAfterTheGroup", kUserWhoMayGoBack, kOnlyGroupIsRaised, {kRaiseUser}},
+        {"UserAfterTheGroup", kUserWhoMayReturn, kOnlyGroupIsRaised, {kRaiseUser}},
         {"UserAlone", kUserInRootsGroup, kUserIsNotRaised, {kRaiseUser}},
-        {"UserAndThenTheGroupsRestoring",
-         kUserWhoMayGoBack,
+        {"UserAndThenRestoreOfGroup",
+         kUserWhoMayReturn,
          {{kGroupRaised, kUserNotRaised, kNotEntered, kGroupNotRestored, kNotLeft},
           false,
           1,
@@ -155,37 +155,37 @@ std::vector<Case> RefusedAtTheRaise() {
 }
 
 const EffectiveIds kRootsIds{0, 0};
-const Reading kReadByWhoStayedRoot{{}, true, 0, 0, kRootsIds};
+const Reading kReadWhileStillRoot{{}, true, 0, 0, kRootsIds};
 
-std::vector<Case> RefusedAtLeaving() {
+std::vector<Case> DropRefused() {
     return {
         {"ReturnToRoot",
-         kUserWhoMayGoBack,
+         kUserWhoMayReturn,
          {{kGroupRaised, kUserRaised, kUserNotRaised, kNotLeft}, true, 0, 1, kRootsIds},
          {kRaiseUser},
          Refused::kAfterTheRaise,
-         kReadByWhoStayedRoot},
+         kReadWhileStillRoot},
         {"ReturnToRootOfRootsGroup",
          kUserInRootsGroup,
          {{kUserRaised, kUserNotRaised, kNotLeft}, true, 0, 1, kRootsIds},
          {kRaiseUser},
          Refused::kAfterTheRaise,
-         kReadByWhoStayedRoot},
+         kReadWhileStillRoot},
         {"GroupOfAUser",
-         kUserWhoMayGoBack,
+         kUserWhoMayReturn,
          {{kGroupRaised, kUserRaised, kUserRaised, kGroupNotRestored, kNotLeft}, true, 0, 1, kRootsIds},
          {kRestoreGroup},
          Refused::kFromTheStart,
-         kReadByWhoStayedRoot},
+         kReadWhileStillRoot},
         {"GroupOfRoot",
          kRootInAnotherGroup,
          {{kGroupRaised, kGroupNotRestored, kNotLeft}, true, 0, 1, kRootsIds},
          {kRestoreGroup},
          Refused::kFromTheStart,
-         kReadByWhoStayedRoot},
-        // The group is its own again, and so is raised and restored for whatever is read later.
+         kReadWhileStillRoot},
+        // The group was restored, so later reads raise and restore it again.
         {"UserAfterTheGroup",
-         kUserWhoMayGoBack,
+         kUserWhoMayReturn,
          {{kGroupRaised, kUserRaised, kUserRaised, kUserNotRestored, kNotLeft}, true, 0, 1, EffectiveIds{0, kGroup}},
          {kRestoreUser},
          Refused::kFromTheStart,
@@ -195,27 +195,27 @@ std::vector<Case> RefusedAtLeaving() {
          {{kUserRaised, kUserRaised, kUserNotRestored, kNotLeft}, true, 0, 1, kRootsIds},
          {kRestoreUser},
          Refused::kFromTheStart,
-         kReadByWhoStayedRoot},
+         kReadWhileStillRoot},
     };
 }
 
-/// There is no root to become. Nothing but the ids that an ordinary user of the machine has is needed for this.
-std::vector<Case> OfANamespaceWithoutRoot() {
+/// The namespace has no root. These cases also run as an ordinary user.
+std::vector<Case> NamespaceWithoutRoot() {
     const Reading noGroup{{Failed("setresgid(-1, 0, -1) [Invalid argument]"), kNotEntered}, true, 1};
     const Reading noUser{{Failed("setresuid(-1, 0, -1) [Invalid argument]"), kNotEntered}, true, 1};
     return {
-        {"User", kUserForGood, noGroup, {}, {}, {}, true},
-        {"UserInRootsGroup", kUserForGoodInRootsGroup, noUser, {}, {}, {}, true},
+        {"User", kPermanentUser, noGroup, {}, {}, {}, true},
+        {"UserInRootsGroup", kPermanentUserInRootsGroup, noUser, {}, {}, {}, true},
     };
 }
 
-/// Something that reads configuration files when it is constructed.
+/// A class that reads configuration files in its constructor.
 struct Reader {
     const char *name;
     const char *profile;
     const char *clientID;
-    std::vector<std::string> sources;        // those that read a file, in their order
-    std::function<std::string()> construct;  // gives the client ID that it then has
+    std::vector<std::string> sources;        // the sources that read files, in order
+    std::function<std::string()> construct;  // returns the client ID that was read
 };
 
 void PrintTo(const Reader &reader, std::ostream *stream) { *stream << reader.name; }
@@ -258,27 +258,27 @@ std::vector<unsigned int> CurrentIds() {
     return {users[0], users[1], users[2], groups[0], groups[1], groups[2]};
 }
 
-/// Writes to a file that has been there before.
-bool Tell(const std::string &path, const std::string &text) {
+/// Writes to an existing file.
+bool WriteExisting(const std::string &path, const std::string &text) {
     std::ofstream file(path, std::ios::in);
     return static_cast<bool>(file << text << std::flush);
 }
 
-/// A new user namespace, in which the process has these ids and there are no others.
+/// Enters a new user namespace that maps only these ids.
 bool MakeNamespaceOf(const Ids &ids) {
     const std::string user = std::to_string(geteuid());
     const std::string group = std::to_string(getegid());
-    return unshare(CLONE_NEWUSER) == 0 && Tell("/proc/self/setgroups", "deny") &&
-           Tell("/proc/self/uid_map", std::to_string(ids.user) + " " + user + " 1") &&
-           Tell("/proc/self/gid_map", std::to_string(ids.group) + " " + group + " 1");
+    return unshare(CLONE_NEWUSER) == 0 && WriteExisting("/proc/self/setgroups", "deny") &&
+           WriteExisting("/proc/self/uid_map", std::to_string(ids.user) + " " + user + " 1") &&
+           WriteExisting("/proc/self/gid_map", std::to_string(ids.group) + " " + group + " 1");
 }
 
 bool Become(const Ids &ids) {
     return setresgid(ids.group, ids.group, ids.savedGroup) == 0 && setresuid(ids.user, ids.user, ids.savedUser) == 0;
 }
 
-/// Runs what is given in a child process; its failures are this test's, and what it throws ends it.
-void RunInAChild(const std::function<void()> &body) noexcept {
+/// Runs `body` in a child process. Its failures count for this test; an exception ends the child.
+void RunInChild(const std::function<void()> &body) noexcept {
     std::fflush(nullptr);
     const pid_t child = fork();
     ASSERT_GE(child, 0);
@@ -297,22 +297,23 @@ class RealIds : public ::testing::TestWithParam<std::tuple<Case, Reader>> {
     static const Case &row() { return std::get<0>(GetParam()); }
     static const Reader &reader() { return std::get<1>(GetParam()); }
 
-    static void BecomeTheProcess() {
-        ASSERT_TRUE(row().ofANamespace ? MakeNamespaceOf(row().ids) : Become(row().ids)) << std::strerror(errno);
-        EXPECT_EQ(access(kAzureFile, R_OK) == 0, row().ids.user == 0 || row().ofANamespace) << "whose is the file?";
+    static void ChangeIds() {
+        ASSERT_TRUE(row().inNamespace ? MakeNamespaceOf(row().ids) : Become(row().ids)) << std::strerror(errno);
+        EXPECT_EQ(access(kAzureFile, R_OK) == 0, row().ids.user == 0 || row().inNamespace)
+            << "unexpected access to the file";
         if (row().refused == Refused::kAfterTheRaise) {
-            whenAFileIsOpened = [] { RefuseIdChanges(row().refusals); };
+            atNextOpen = [] { RefuseIdChanges(row().refusals); };
         } else if (!row().refusals.empty()) {
             RefuseIdChanges(row().refusals);
         }
     }
 
-    /// Of each file, if the first and any others are to be read so.
+    /// The expected result for each file.
     static std::vector<Reading> Readings(const Reading &first, const Reading &others) {
         std::vector<Reading> readings(reader().sources.size(), others);
         readings.front() = first;
         if (!first.succeeds) {
-            readings.resize(1);  // a profile that was not read names no client
+            readings.resize(1);  // an unread profile selects no client
         }
         return readings;
     }
@@ -353,11 +354,11 @@ class RealIds : public ::testing::TestWithParam<std::tuple<Case, Reader>> {
 
 TEST_P(RealIds, AreRaisedForReadingIfKernelAllows) {
     WriteFilesThatOnlyRootMayRead(reader().profile);
-    RunInAChild([] {
-        ASSERT_NO_FATAL_FAILURE(BecomeTheProcess());
+    RunInChild([] {
+        ASSERT_NO_FATAL_FAILURE(ChangeIds());
         const Reading later = row().later.value_or(row().first);
         ExpectToRead(Readings(row().first, later));
-        SCOPED_TRACE("another one in the same process");
+        SCOPED_TRACE("second read in the same process");
         ExpectToRead(Readings(later, later));
     });
 }
@@ -366,19 +367,19 @@ constexpr auto NameOfTest = [](const auto &row) {
     return std::string(std::get<0>(row.param).name) + std::get<1>(row.param).name;
 };
 
-#define INSTANTIATE_OWNERSHIP(suite, cases) \
-    INSTANTIATE_TEST_SUITE_P(               \
+#define INSTANTIATE_REAL_IDS(suite, cases) \
+    INSTANTIATE_TEST_SUITE_P(              \
         suite, RealIds, ::testing::Combine(::testing::ValuesIn(cases), ::testing::ValuesIn(Readers())), NameOfTest)
 
-INSTANTIATE_OWNERSHIP(OfTheProcess, Allowed());
-INSTANTIATE_OWNERSHIP(RefusedAtTheRaise, RefusedAtTheRaise());
-INSTANTIATE_OWNERSHIP(RefusedAtLeaving, RefusedAtLeaving());
-INSTANTIATE_OWNERSHIP(OfANamespaceWithoutRoot, OfANamespaceWithoutRoot());
+INSTANTIATE_REAL_IDS(Allowed, Allowed());
+INSTANTIATE_REAL_IDS(RaiseRefused, RaiseRefused());
+INSTANTIATE_REAL_IDS(DropRefused, DropRefused());
+INSTANTIATE_REAL_IDS(NamespaceWithoutRoot, NamespaceWithoutRoot());
 
 TEST(OIDCLogin, ReadsProfileWithoutRaisingIds) {
     WriteFilesThatOnlyRootMayRead("azure");
-    RunInAChild([] {
-        ASSERT_TRUE(Become(kUserWhoMayGoBack));
+    RunInChild([] {
+        ASSERT_TRUE(Become(kUserWhoMayReturn));
         std::string userName = "as it was before";
         try {
             TAVO::SSO::OIDCLogin("a code", userName);
@@ -409,13 +410,13 @@ bool IsMapped(const char *map, unsigned int id) {
 }  // namespace Test
 
 int main(int count, char **arguments) {
-    constexpr int kNotRun = 77;  // as the build tells ctest
+    constexpr int kNotRun = 77;  // SKIP_RETURN_CODE in CMakeLists.txt
     ::testing::InitGoogleMock(&count, arguments);
     if (Test::IsMapped("/proc/self/uid_map", Test::kUser) && Test::IsMapped("/proc/self/gid_map", Test::kGroup)) {
         return RUN_ALL_TESTS();
     }
-    GTEST_FLAG_SET(filter, "OfANamespaceWithoutRoot/*");
+    GTEST_FLAG_SET(filter, "NamespaceWithoutRoot/*");
     const int result = RUN_ALL_TESTS();
-    std::puts("Not run, all but these: an ordinary user has no other ids to change to. Run it as root.");
+    std::puts("Not run: all other tests need root.");
     return result == 0 ? kNotRun : result;
 }

@@ -15,7 +15,7 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// What a login needs to know and nobody else may: the client secret, the code, what the provider answers.
+// The secrets of a login: the client secret, the code, and the answers of the provider.
 namespace Test {
 
 namespace {
@@ -26,13 +26,13 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 
-/// A text in each of the forms that it takes on its way.
+/// The text plain, percent-encoded and in base64.
 std::vector<std::string> FormsOf(const std::string &text) { return {text, TAVO::SSO::URLEncode(text), Base64(text)}; }
 
 class Secrets : public ::testing::TestWithParam<Profile> {
   protected:
-    static constexpr char kCode[] = "a code & long enough to need memory of its own";
-    static constexpr char kAccessToken[] = "an access token that nobody asked for";
+    static constexpr char kCode[] = "a code & long enough for a heap allocation";
+    static constexpr char kAccessToken[] = "an access token that was not requested";
 
     static std::string Claims() { return Compact(TokenClaims(GetParam())); }
 
@@ -55,7 +55,7 @@ class Secrets : public ::testing::TestWithParam<Profile> {
         return {};
     }
 
-    /// Watched where the token comes back: also what is made of it, and each of its parts.
+    /// All secrets, the token and its parts.
     static std::vector<std::string> AllWith(const std::string &token) {
         std::vector<std::string> secrets = All();
         const std::size_t firstDot = token.find('.');
@@ -91,7 +91,7 @@ INSTANTIATE_TEST_SUITE_P(Of, Secrets, ::testing::Values(Profile::kAzure, Profile
                          [](const auto &row) { return Name(row.param); });
 
 TEST_P(Secrets, AreOverwrittenBeforeRelease) {
-    // The file is longer than what is read of it at once, and the answer comes in pieces: texts grow, and move.
+    // The file exceeds one read and the answer arrives in pieces, so texts grow and move in memory.
     Provider provider(GetParam(), Compact(Change({}, R"({"z": ")" + std::string(10000, ' ') + "\"}")));
     const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
     provider.AnswerByteByByte(ChunkedHTTPAnswer(PiecesOf(Answer(token), 50)));
@@ -109,21 +109,21 @@ TEST_P(Secrets, AreOverwrittenBeforeRelease) {
 TEST_P(Secrets, AreOverwrittenWhenReplaced) {
     Provider provider(GetParam());
     const std::unique_ptr<TAVO::SSO::SSOClient, void (*)(TAVO::SSO::SSOClient *)> client = MakeClient(GetParam());
-    // Without the first character, in whose place a cleared text has its end.
+    // Without the first character: clearing a string overwrites it with a NUL.
     const std::string token = SignedToken(TokenHeader(GetParam()), TokenClaims(GetParam()));
     const std::vector<std::string> secrets{token.substr(1), std::string(kCode).substr(1)};
     const std::string answer = Answer(token);
-    const std::string nextAnswer = Answer("another token that is long enough to need memory of its own");
+    const std::string nextAnswer = Answer("another token that is long enough for a heap allocation");
     client->SetCode(kCode);
     client->ProcessTokenResponse(answer);
     const WatchReleases releases(secrets);
-    client->SetCode("another code that is long enough to need memory of its own");
+    client->SetCode("another code that is long enough for a heap allocation");
     client->ProcessTokenResponse(nextAnswer);
     EXPECT_GT(releases.Blocks(), 0U);
     EXPECT_THAT(releases.Found(), IsEmpty());
 }
 
-/// Tokens that end a login at each step of their verification and behind it.
+/// Tokens that fail at each step of the verification and after it.
 std::vector<std::string> RefusedTokens(Profile profile) {
     const Json::Value header = TokenHeader(profile);
     const Json::Value claims = TokenClaims(profile);
@@ -143,7 +143,7 @@ std::vector<std::string> RefusedTokens(Profile profile) {
     return tokens;
 }
 
-/// Answers of the token endpoint that end a login at each of its steps.
+/// Answers of the token endpoint that fail at each step.
 std::vector<std::string> Failures(Profile profile) {
     std::vector<std::string> answers{
         "not JSON",

@@ -14,8 +14,8 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// RSA keys as no provider should publish them. A token counts under whatever key the provider publishes, as whoever can
-// publish keys can sign tokens anyway; what matters is that nobody else can, and that no number does harm.
+// RSA keys that no provider should publish. A token is accepted with any published key, because a provider that
+// publishes keys can also sign. These keys must not let anyone else sign, or harm the process.
 namespace Test {
 
 namespace {
@@ -24,7 +24,7 @@ using TAVO::JWT::jwt_verify_failed;
 using ::testing::ElementsAreArray;
 using ::testing::ValuesIn;
 
-constexpr int kLargestModulus = 16384;  // in bits: libcrypto verifies under none above
+constexpr int kLargestModulus = 16384;  // in bits: the maximum of libcrypto
 
 using Number = std::shared_ptr<BIGNUM>;
 
@@ -39,7 +39,7 @@ Number FromBytes(const std::string &bytes) {
     return {BN_bin2bn(data, static_cast<int>(bytes.size()), nullptr), BN_free};
 }
 
-/// With leading zeros up to that length.
+/// With leading zeros up to `length`.
 std::string ToBytes(const Number &number, std::size_t length) {
     std::string bytes(length, '\0');
     BN_bn2binpad(number.get(), reinterpret_cast<unsigned char *>(bytes.data()), static_cast<int>(length));
@@ -50,7 +50,7 @@ std::string Encode(const Number &number) {
     return Base64Url(ToBytes(number, static_cast<std::size_t>(BN_num_bytes(number.get()))));
 }
 
-/// What a signature with SHA-256 has to become under the key (RFC 8017, section 9.2).
+/// The padded SHA-256 digest to which a valid signature decrypts (RFC 8017, section 9.2).
 Number PaddedDigest(const std::string &signingInput, std::size_t length) {
     constexpr char kDigestInfo[] = "\x30\x31\x30\x0d\x06\x09\x60\x86\x48\x01\x65\x03\x04\x02\x01\x05\x00\x04\x20";
     std::string digest(32, '\0');
@@ -62,22 +62,21 @@ Number PaddedDigest(const std::string &signingInput, std::size_t length) {
 
 std::string SigningInputOfALogin() { return SigningInput(TokenHeader(Profile::kAzure), TokenClaims(Profile::kAzure)); }
 
-/// A key and a signature of a login's token, each in its text form.
+/// A key and a signature of a login's token, encoded.
 struct SignedKey {
     std::string n;
     std::string e;
     std::string signature;
 };
 
-/// A modulus made for this one signature: s is chosen, and n is what is left of s to the e-th beside what s has to
-/// become. The exponent divides the number of bits.
-SignedKey MadeToMeasure(int bits, unsigned long exponent) {
+/// A modulus for one chosen signature s: n = s^e - padded digest. `exponent` must divide `bits`.
+SignedKey ModulusForSignature(int bits, unsigned long exponent) {
     const std::shared_ptr<BN_CTX> context(BN_CTX_new(), BN_CTX_free);
     const auto length = static_cast<std::size_t>(bits / 8);
     const Number padded = PaddedDigest(SigningInputOfALogin(), length);
     const Number signature = MakeNumber();
     BN_set_bit(signature.get(), bits / static_cast<int>(exponent));
-    BN_sub_word(signature.get(), BN_is_odd(padded.get()) ? 2 : 1);  // so that the modulus is odd
+    BN_sub_word(signature.get(), BN_is_odd(padded.get()) ? 2 : 1);  // makes the modulus odd
     const Number power = MakeNumber();
     BN_exp(power.get(), signature.get(), MakeNumber(exponent).get(), context.get());
     const Number modulus = MakeNumber();
@@ -85,13 +84,13 @@ SignedKey MadeToMeasure(int bits, unsigned long exponent) {
     return {Encode(modulus), Encode(MakeNumber(exponent)), Base64Url(ToBytes(signature, length))};
 }
 
-/// Under the exponent 1 a signature is what it has to become.
+/// With exponent 1, the signature is the padded digest itself.
 SignedKey UnderExponentOne(const std::string &modulus) {
     const Number padded = PaddedDigest(SigningInputOfALogin(), 256);
     return {modulus, Encode(MakeNumber(1)), Base64Url(ToBytes(padded, 256))};
 }
 
-/// The provider's own signature and key, changed.
+/// The provider's signature and key.
 SignedKey Own() {
     const Json::Value key = ProviderKey().JWK(kKeyID);
     return {key["n"].asString(), key["e"].asString(), ProviderKey().Sign(SigningInputOfALogin(), EVP_sha256())};
@@ -107,7 +106,7 @@ SignedKey OfBits(unsigned int bits) {
     return {published["n"].asString(), published["e"].asString(), key.Sign(SigningInputOfALogin(), EVP_sha256())};
 }
 
-/// The last letter of 256 bytes in base64 stands for two bits, and a modulus is odd.
+/// The last base64 letter of 256 bytes has two significant bits; an odd modulus becomes even.
 std::string OwnModulusLessOne() {
     std::string n = Own().n;
     n.back() = n.back() == 'Q' ? 'A' : 'g';
@@ -151,9 +150,9 @@ std::vector<KeyCase> Exponents() {
         own("OneLess", Encode(MakeNumber(65536)), false),
         own("TwoMore", Encode(MakeNumber(65539)), false),
         own("Of8KB", Base64Url(std::string(8192, '\xff')), false),
-        {"OneLetsAnybodySign", [] { return UnderExponentOne(Own().n); }, true},
-        {"EvenFitsAModulusMadeForIt", [] { return MadeToMeasure(2048, 2); }, true},
-        {"ThreeFitsAModulusMadeForIt", [] { return MadeToMeasure(3072, 3); }, true},
+        {"OneAcceptsForgery", [] { return UnderExponentOne(Own().n); }, true},
+        {"EvenWithMatchingModulus", [] { return ModulusForSignature(2048, 2); }, true},
+        {"ThreeWithMatchingModulus", [] { return ModulusForSignature(3072, 3); }, true},
         {"AsLargeAsTheModulus", [] { return OwnWithExponent(Own().n); }, false},
     };
 }
@@ -181,11 +180,11 @@ std::vector<KeyCase> Moduli() {
         small("OfTwoBitsUnderExponentOne", "Aw", "AQ", "\1"),
         {"Of512BitsIsEnough", [] { return OfBits(512); }, true},
         {"Of1024BitsIsEnough", [] { return OfBits(1024); }, true},
-        {"OfTheLargestSize", [] { return MadeToMeasure(kLargestModulus, 2); }, true},
-        {"BeyondTheLargestSize", [] { return MadeToMeasure(kLargestModulus + 16, 2); }, false},
-        {"OfTheLargestSizeUnderAnExponentAsLarge",
+        {"OfTheLargestSize", [] { return ModulusForSignature(kLargestModulus, 2); }, true},
+        {"BeyondTheLargestSize", [] { return ModulusForSignature(kLargestModulus + 16, 2); }, false},
+        {"OfTheLargestSizeWithLargeExponent",
          [] {
-             const SignedKey key = MadeToMeasure(kLargestModulus, 2);
+             const SignedKey key = ModulusForSignature(kLargestModulus, 2);
              return SignedKey{key.n, Base64Url(std::string(kLargestModulus / 8, '\x7f')), key.signature};
          },
          false},

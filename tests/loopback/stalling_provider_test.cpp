@@ -17,8 +17,8 @@
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
 
-// Providers that take their time. It passes at the test's word: libcurl measures its limits on a clock that can be put
-// forward here, and looks at it whenever something arrives.
+// Slow providers. The test sets the clock that libcurl measures its time limits with; libcurl reads it whenever data
+// arrives.
 namespace Test {
 
 namespace {
@@ -28,7 +28,7 @@ using ::testing::IsEmpty;
 using ::testing::ValuesIn;
 
 constexpr std::time_t kDay = 24 * 60 * 60;
-constexpr std::time_t kLongestConnecting = 300;  // libcurl's own limit, up to the end of TLS's handshake
+constexpr std::time_t kLongestConnecting = 300;  // libcurl's limit, including the TLS handshake
 
 std::atomic<std::time_t> timePassed{0};
 
@@ -46,15 +46,15 @@ namespace Test {
 
 namespace {
 
-/// A login on a thread of its own, at a provider that stops on its way until it is told to go on.
+/// A login on its own thread, with a provider that stalls until the test continues it.
 class StalledLogin {
   public:
     explicit StalledLogin(Provider &provider) : provider_(provider) {}
 
-    /// For the provider's script.
+    /// Called by the provider's script.
     void Stall() {
         stalled_.set_value();
-        goOn_.get_future().wait();
+        continue_.get_future().wait();
     }
 
     void Start() {
@@ -64,21 +64,21 @@ class StalledLogin {
 
     bool IsWaiting() const { return login_.wait_for(std::chrono::seconds(0)) == std::future_status::timeout; }
 
-    Outcome GoOn() {
-        goOn_.set_value();
+    Outcome Continue() {
+        continue_.set_value();
         return login_.get();
     }
 
   private:
     Provider &provider_;
     std::promise<void> stalled_;
-    std::promise<void> goOn_;
+    std::promise<void> continue_;
     std::future<Outcome> login_;
 };
 
 std::string Token(Profile profile) { return SignedToken(TokenHeader(profile), TokenClaims(profile)); }
 
-/// What has gone out of an answer when the provider stalls, and how a transfer ends there if nothing more comes.
+/// The part of an answer that is sent before the stall, and the result of a transfer that ends there.
 struct StallCase {
     std::string name;
     std::string sent;
@@ -93,7 +93,7 @@ class Stall : public ::testing::TestWithParam<StallCase> {
         return "HTTP/1.1 200 OK\r\nContent-Length: " + std::to_string(document.size()) + "\r\n\r\n" + document;
     }
 
-    /// The answer up to where this row stalls, and the rest if there is to be one.
+    /// Sends the answer up to the stall and, if `withRest`, the rest after it.
     static void Play(Provider &provider, StalledLogin &login, const std::string &document, bool withRest) {
         const std::string answer = Answer(document);
         const std::size_t sent = answer.find(GetParam().sent) + GetParam().sent.size();
@@ -102,7 +102,7 @@ class Stall : public ::testing::TestWithParam<StallCase> {
             connection.Send(answer.substr(0, sent));
             login.Stall();
             if (withRest) {
-                connection.SendByteByByte(answer.substr(sent));  // libcurl looks at the clock in between
+                connection.SendByteByByte(answer.substr(sent));  // libcurl reads the clock between the bytes
             }
         });
     }
@@ -110,13 +110,13 @@ class Stall : public ::testing::TestWithParam<StallCase> {
     static std::string Text() { return curl_easy_strerror(GetParam().result); }
 };
 
-INSTANTIATE_TEST_SUITE_P(Of, Stall,
+INSTANTIATE_TEST_SUITE_P(Point, Stall,
                          ValuesIn(std::vector<StallCase>{
-                             {"TheWholeAnswer", "", CURLE_GOT_NOTHING},
-                             {"TheStatusLine", "HTTP/1.1 2", CURLE_GOT_NOTHING},
-                             {"TheHeader", "Content-L", CURLE_OK},
-                             {"TheBody", "\r\n\r\n", CURLE_PARTIAL_FILE},
-                             {"TheBodysRest", "\r\n\r\n{", CURLE_PARTIAL_FILE},
+                             {"BeforeAnswer", "", CURLE_GOT_NOTHING},
+                             {"InStatusLine", "HTTP/1.1 2", CURLE_GOT_NOTHING},
+                             {"InHeader", "Content-L", CURLE_OK},
+                             {"BeforeBody", "\r\n\r\n", CURLE_PARTIAL_FILE},
+                             {"InBody", "\r\n\r\n{", CURLE_PARTIAL_FILE},
                          }),
                          [](const auto &row) { return row.param.name; });
 
@@ -129,7 +129,7 @@ TEST_P(Stall, IsWaitedForAtTokenEndpoint) {
         login.Start();
         timePassed += kDay;
         EXPECT_TRUE(login.IsWaiting()) << Name(profile);
-        EXPECT_EQ(login.GoOn(), LoggedIn(UserName(profile)));
+        EXPECT_EQ(login.Continue(), LoggedIn(UserName(profile)));
         EXPECT_THAT(TakeSystemLog(), IsEmpty()) << Name(profile);
     }
 }
@@ -142,7 +142,7 @@ TEST_P(Stall, EndsWhenTokenEndpointCloses) {
         login.Start();
         timePassed += kDay;
         EXPECT_TRUE(login.IsWaiting()) << Name(profile);
-        EXPECT_EQ(login.GoOn(), Refused<std::invalid_argument>("parse json falied")) << Name(profile);
+        EXPECT_EQ(login.Continue(), Refused<std::invalid_argument>("parse json falied")) << Name(profile);
         std::vector<LogLine> log;
         if (GetParam().result != CURLE_OK) {
             log.push_back(Error("sso:N request token uri " + Text() + "."));
@@ -160,7 +160,7 @@ TEST_P(Stall, IsWaitedForAtDiscoveryDocument) {
     login.Start();
     timePassed += kDay;
     EXPECT_TRUE(login.IsWaiting());
-    EXPECT_EQ(login.GoOn(), LoggedIn(UserName(Profile::kAzure)));
+    EXPECT_EQ(login.Continue(), LoggedIn(UserName(Profile::kAzure)));
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
@@ -173,7 +173,7 @@ TEST_P(Stall, IsWaitedForAtKeySet) {
     login.Start();
     timePassed += kDay;
     EXPECT_TRUE(login.IsWaiting());
-    EXPECT_EQ(login.GoOn(), LoggedIn(UserName(Profile::kAzure)));
+    EXPECT_EQ(login.Continue(), LoggedIn(UserName(Profile::kAzure)));
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
@@ -188,7 +188,7 @@ TEST(HandshakeStall, IsWaitedForUpToConnectLimit) {
     login.Start();
     timePassed += kLongestConnecting - 60;
     EXPECT_TRUE(login.IsWaiting());
-    EXPECT_EQ(login.GoOn(), LoggedIn(UserName(Profile::kWebSphere)));
+    EXPECT_EQ(login.Continue(), LoggedIn(UserName(Profile::kWebSphere)));
     EXPECT_THAT(TakeSystemLog(), IsEmpty());
 }
 
@@ -198,12 +198,12 @@ TEST(HandshakeStall, FailsAfterConnectLimit) {
     provider.Play([&login](Connection &connection) {
         connection.ReceiveRaw();
         login.Stall();
-        connection.ReceiveRaw();  // until the client goes
+        connection.ReceiveRaw();  // until the client disconnects
     });
     login.Start();
     EXPECT_TRUE(login.IsWaiting());
     timePassed += kLongestConnecting + 1;
-    EXPECT_EQ(login.GoOn(), Refused<std::invalid_argument>("parse json falied"));
+    EXPECT_EQ(login.Continue(), Refused<std::invalid_argument>("parse json falied"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(std::string("sso:N request token uri ") +
                                                    curl_easy_strerror(CURLE_OPERATION_TIMEDOUT) + ".")));
 }

@@ -45,7 +45,7 @@ std::string NameOfOperation(const ::testing::TestParamInfo<Operation> &info) { r
 
 void PrintTo(const Operation &operation, std::ostream *stream) { *stream << operation.name; }
 
-/// How a transfer ended: with libcurl's text of that result, exactly so.
+/// The exception and the response of a transfer.
 struct Ending {
     std::string exception;
     std::string response;
@@ -185,8 +185,8 @@ TEST_P(Transfer, KeepsPartialBodyOfFailedTransfer) {
 }
 
 TEST_P(Transfer, FailsIfConnectionIsRefused) {
-    const Port nobody;
-    EXPECT_EQ(Perform("http://127.0.0.1:" + std::to_string(nobody.number()) + "/"), Failed(CURLE_COULDNT_CONNECT));
+    const Port closed;
+    EXPECT_EQ(Perform("http://127.0.0.1:" + std::to_string(closed.number()) + "/"), Failed(CURLE_COULDNT_CONNECT));
 }
 
 TEST_P(Transfer, FailsWithoutURL) { EXPECT_EQ(Perform(""), Failed(CURLE_URL_MALFORMAT)); }
@@ -260,7 +260,7 @@ TEST_F(Post, SendsBodyUpToFirstNUL) {
     EXPECT_EQ(request, Expected("a=1"));
 }
 
-/// The plain client with the addresses that a provider's client reads from its file.
+/// The base client with the endpoints that derived clients read from a file.
 struct PlainClient : TAVO::SSO::SSOClient {
     using SSOClient::tokenEndpoint;
     using SSOClient::wellknownEndpoint;
@@ -285,7 +285,7 @@ LogLine Logged(const std::string &text) { return {LOG_ERR, "sso:N " + text}; }
 class ProviderExchange : public ::testing::Test {
   protected:
     ProviderExchange() {
-        TakeSystemLog();  // what another test left
+        TakeSystemLog();  // left by another test
         TrustAuthority();
     }
     PlainClient client_;
@@ -359,8 +359,8 @@ TEST_F(ProviderExchange, LogsAndDiscardsInvalidDiscoveryDocument) {
 }
 
 TEST_F(ProviderExchange, LogsOneLineIfConnectionIsRefused) {
-    const Port nobody;
-    const std::string url = "https://127.0.0.1:" + std::to_string(nobody.number()) + "/";
+    const Port closed;
+    const std::string url = "https://127.0.0.1:" + std::to_string(closed.number()) + "/";
     const std::string refused = curl_easy_strerror(CURLE_COULDNT_CONNECT);
     EXPECT_EQ(client_.RequestToken(url), "before ");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Logged("request token uri " + refused + ".")));

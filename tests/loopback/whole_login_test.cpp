@@ -81,7 +81,7 @@ TEST_P(WholeLogin, SucceedsAfterFailedLogin) {
     EXPECT_EQ(provider.LogIn(), LoggedIn(UserName(GetParam())));
 }
 
-/// The descriptors that a program finds open which this process executes.
+/// The descriptors that a program executed by this process inherits.
 std::string DescriptorsHandedOn() {
     const std::unique_ptr<FILE, int (*)(FILE *)> list(popen("exec ls /proc/self/fd", "r"), pclose);
     std::string descriptors;
@@ -116,7 +116,7 @@ TEST_P(WholeLogin, ThrowsLogicErrorForEmptyTokenPart) {
     }
 }
 
-/// A login with a token that is really signed, and what comes of it.
+/// A login with a correctly signed token, and its expected outcome.
 struct TokenCase {
     TokenCase(const std::string &caseName, Profile of, const Outcome &expected)
         : name(Name(of) + caseName), profile(of), outcome(expected) {}
@@ -127,7 +127,7 @@ struct TokenCase {
     TokenCase &Configuration(const std::string &changes) { return configuration = changes, *this; }
     TokenCase &SignedUnder(const std::string &otherSecret) { return secret = otherSecret, *this; }
     TokenCase &Then(const std::function<std::string(const std::string &)> &change) { return damage = change, *this; }
-    TokenCase &BeforeAnyKeyIsFetched() { return fetchesKeys = false, *this; }
+    TokenCase &WithoutKeyRequest() { return fetchesKeys = false, *this; }
     TokenCase &Logs(const std::string &text) { return log.push_back(Error(text)), *this; }
 
     std::string name;
@@ -188,7 +188,7 @@ std::vector<TokenCase> Malformed() {
         const auto refused = [&](const char *name, const char *text,
                                  const std::function<std::string(const std::string &)> &damage) {
             rows.push_back(
-                TokenCase(name, profile, Refused<std::invalid_argument>(text)).Then(damage).BeforeAnyKeyIsFetched());
+                TokenCase(name, profile, Refused<std::invalid_argument>(text)).Then(damage).WithoutKeyRequest());
         };
         refused("Empty", "token cannot be empty", [](const std::string &) { return ""; });
         refused("OfTwoParts", "bad jwt format!", WithoutSignature);
@@ -212,7 +212,7 @@ std::vector<TokenCase> Expiry() {
         const auto expired = [&](const char *name, const char *claims) {
             rows.push_back(TokenCase(name, profile, Refused<std::invalid_argument>("id_token expired."))
                                .Claims(claims)
-                               .BeforeAnyKeyIsFetched());
+                               .WithoutKeyRequest());
         };
         const auto accepted = [&](const char *name, const char *claims) {
             rows.push_back(TokenCase(name, profile, LoggedIn(UserName(profile))).Claims(claims));
@@ -224,10 +224,10 @@ std::vector<TokenCase> Expiry() {
         expired("AList", R"({"exp": [1700000300]})");
         expired("BeforeTheEpoch", R"({"exp": -1})");
         accepted("WrittenAsText", R"({"exp": "1700000000"})");
-        accepted("AsFarAsItsDigitsGo", R"({"exp": "1700000000 and more"})");
-        expired("AsFarAsItsDigitsGoOneSecondAgo", R"({"exp": "1699999999.9"})");
-        expired("TellsBeforeTheAudience", R"({"exp": 1699999999, "aud": "another client"})");
-        expired("TellsBeforeTheTenant", R"({"exp": 1699999999, "tid": "another tenant"})");
+        accepted("UpToFirstNonDigit", R"({"exp": "1700000000 and more"})");
+        expired("UpToFirstNonDigitOneSecondAgo", R"({"exp": "1699999999.9"})");
+        expired("PrecedesTheAudience", R"({"exp": 1699999999, "aud": "another client"})");
+        expired("PrecedesTheTenant", R"({"exp": 1699999999, "tid": "another tenant"})");
     }
     return rows;
 }
@@ -238,7 +238,7 @@ std::vector<TokenCase> TenantAndAudience() {
     std::vector<TokenCase> rows;
     const auto refused = [&](const char *name, Profile profile, const char *text, const char *claims) {
         rows.push_back(
-            TokenCase(name, profile, Refused<std::invalid_argument>(text)).Claims(claims).BeforeAnyKeyIsFetched());
+            TokenCase(name, profile, Refused<std::invalid_argument>(text)).Claims(claims).WithoutKeyRequest());
         return &rows.back();
     };
     for (const Profile profile : kBoth) {
@@ -247,7 +247,7 @@ std::vector<TokenCase> TenantAndAudience() {
         refused("AudienceLonger", profile, "client ID invalid", R"({"aud": "the client "})");
         refused("AudienceMissing", profile, "client ID invalid", R"({"aud": null})");
         refused("AudienceAList", profile, "client ID invalid", R"({"aud": ["the client"]})");
-        refused("AudienceTellsBeforeTheAlgorithm", profile, "client ID invalid", R"({"aud": "another client"})")
+        refused("AudiencePrecedesTheAlgorithm", profile, "client ID invalid", R"({"aud": "another client"})")
             ->Header(R"({"alg": "none"})");
     }
     refused("TenantOfAnother", Profile::kAzure, "tenant ID invalid", R"({"tid": "another tenant"})");
@@ -255,7 +255,7 @@ std::vector<TokenCase> TenantAndAudience() {
     refused("TenantAList", Profile::kAzure, "tenant ID invalid", R"({"tid": ["the tenant"]})");
     refused("TenantNotConfigured", Profile::kAzure, "tenant ID invalid", "{}")
         ->Configuration(R"({"azure_tenant_id": 5})");
-    refused("TenantTellsBeforeTheAudience", Profile::kAzure, "tenant ID invalid",
+    refused("TenantPrecedesTheAudience", Profile::kAzure, "tenant ID invalid",
             R"({"tid": "another tenant", "aud": "another client"})");
     return rows;
 }
@@ -300,13 +300,13 @@ std::vector<TokenCase> SigningKey() {
     refused("NotNamed", kUnknown)->Header(R"({"kid": null})");
     refused("NamedByAList", kUnknown)->Header(R"({"kid": ["first key"]})");
     refused("WithoutName", kUnknown)->Key(R"({"kid": null})");
-    refused("UnknownTellsBeforeTheAlgorithm", kUnknown)->Header(R"({"kid": "second key", "alg": "HS256"})");
+    refused("UnknownPrecedesTheAlgorithm", kUnknown)->Header(R"({"kid": "second key", "alg": "HS256"})");
     refused("WithoutModulus", kNoModulus)->Key(R"({"n": null})");
     refused("WhoseModulusIsANumber", kNoModulus)->Key(R"({"n": 65537})");
     refused("WithoutModulusAndExponent", kNoModulus)->Key(R"({"n": null, "e": null})");
     refused("WithoutExponent", kNoExponent)->Key(R"({"e": null})");
     refused("WhoseExponentIsANumber", kNoExponent)->Key(R"({"e": 65537})");
-    refused("WithoutExponentTellsBeforeTheAlgorithm", kNoExponent)->Key(R"({"e": null})").Header(R"({"alg": "none"})");
+    refused("WithoutExponentPrecedesTheAlgorithm", kNoExponent)->Key(R"({"e": null})").Header(R"({"alg": "none"})");
 
     const auto failed = [&](const char *name) {
         rows.emplace_back(name, Profile::kAzure, Refused<jwt_verify_failed>("verify rsa signature failed"));
@@ -321,7 +321,7 @@ std::vector<TokenCase> SigningKey() {
         return &rows.back();
     };
     accepted("NamedByANumber")->Header(R"({"kid": 7})").Key(R"({"kid": "7"})");
-    accepted("NamedByNothingOnBothSides")->Header(R"({"kid": null})").Key(R"({"kid": ""})");
+    accepted("UnnamedOnBothSides")->Header(R"({"kid": null})").Key(R"({"kid": ""})");
     return rows;
 }
 
@@ -363,7 +363,7 @@ std::vector<TokenCase> SignatureRows() {
 INSTANTIATE_TEST_SUITE_P(Signature, TokenVerification, ValuesIn(SignatureRows()), NameOfTokenCase);
 
 std::vector<TokenCase> Secret() {
-    constexpr std::size_t kLongest = 765;  // bytes whose base64 text and its NUL fit into 1024
+    constexpr std::size_t kLongest = 765;  // base64 with NUL is 1024 bytes
     const auto configured = [](const std::string &secret) {
         return R"({"websphere_client_secret": ")" + secret + "\"}";
     };
@@ -377,13 +377,13 @@ std::vector<TokenCase> Secret() {
         TokenCase("InBytesBeyondASCII", profile, LoggedIn("alice"))
             .SignedUnder("\xc3\xa4\xc3\xbf\xef\xbf\xbf")
             .Configuration(configured("\xc3\xa4\xc3\xbf\xef\xbf\xbf")),
-        TokenCase("OfTheGreatestLength", profile, LoggedIn("alice"))
+        TokenCase("OfMaximumLength", profile, LoggedIn("alice"))
             .SignedUnder(longest)
             .Configuration(configured(longest)),
-        TokenCase("OneByteLongerThanThat", profile, Refused<sso_op_failed>("encode base64 failed."))
+        TokenCase("OneByteTooLong", profile, Refused<sso_op_failed>("encode base64 failed."))
             .SignedUnder(tooLong)
             .Configuration(configured(tooLong)),
-        TokenCase("RightButTheSignatureIsPadded", profile, failed).Then([](const std::string &token) {
+        TokenCase("CorrectWithPaddedSignature", profile, failed).Then([](const std::string &token) {
             return token + "=";
         }),
     };
@@ -420,7 +420,7 @@ std::vector<TokenCase> Identity() {
 
 INSTANTIATE_TEST_SUITE_P(Identity, TokenVerification, ValuesIn(Identity()), NameOfTokenCase);
 
-/// What the Azure provider publishes, as whole answers, and what comes of a login with a good token.
+/// The complete answers of the Azure provider, and the outcome of a login with a good token.
 struct DocumentCase {
     std::string name;
     std::function<std::vector<std::string>()> answers;
@@ -494,12 +494,12 @@ std::vector<DocumentCase> Documents() {
     badKeySet("KeySetAList", "[]", {noKeys});
     badKeySet("KeySetWithoutKeys", R"({"key": []})", {noKeys});
     badKeySet("KeySetOfNoKeys", R"({"keys": []})", {});
-    badKeySet("KeySetOfKeysThatAreNone", R"({"keys": null})", {});
-    badKeySet("KeySetOfThingsThatAreNoKeys", R"({"keys": [5, "first key", null, ["kid"]]})", {});
-    keySet("KeySetCutOffBehindTheKey", [] { return KeySet().substr(0, KeySet().size() - 1); }, unknownKey, {notJSON});
+    badKeySet("KeySetOfNullKeys", R"({"keys": null})", {});
+    badKeySet("KeySetOfOtherValues", R"({"keys": [5, "first key", null, ["kid"]]})", {});
+    keySet("KeySetTruncatedAfterKey", [] { return KeySet().substr(0, KeySet().size() - 1); }, unknownKey, {notJSON});
 
     keySet(
-        "OtherThingsBeforeTheKey",
+        "OtherValuesBeforeTheKey",
         [] {
             return KeySetOf({5, "first key", Json::nullValue, Parse(R"({"kty": "RSA"})"), ProviderKey().JWK(kKeyID)});
         },
@@ -523,9 +523,9 @@ class AzureLogin : public ::testing::Test {
 };
 
 TEST_F(AzureLogin, FailsIfDiscoveryIsUnreachable) {
-    const Port nobody;
+    const Port closed;
     Provider provider(Profile::kAzure,
-                      R"({"azure_wellknown": "https://127.0.0.1:)" + std::to_string(nobody.number()) + "\"}");
+                      R"({"azure_wellknown": "https://127.0.0.1:)" + std::to_string(closed.number()) + "\"}");
     provider.AnswerLogin(Token());
     EXPECT_EQ(provider.LogIn(), unknownKey_);
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error(std::string("sso:N ") + curl_easy_strerror(CURLE_COULDNT_CONNECT)),
@@ -534,10 +534,10 @@ TEST_F(AzureLogin, FailsIfDiscoveryIsUnreachable) {
 }
 
 TEST_F(AzureLogin, FailsIfKeySetIsUnreachable) {
-    const Port nobody;
+    const Port closed;
     Provider provider(Profile::kAzure);
     provider.Answer(TokenResponse(Token()));
-    provider.Answer(R"({"jwks_uri": "https://127.0.0.1:)" + std::to_string(nobody.number()) + "\"}");
+    provider.Answer(R"({"jwks_uri": "https://127.0.0.1:)" + std::to_string(closed.number()) + "\"}");
     EXPECT_EQ(provider.LogIn(), unknownKey_);
     EXPECT_THAT(TakeSystemLog(), ElementsAre(KeyRequestLogged(CURLE_COULDNT_CONNECT)));
 }
@@ -569,7 +569,7 @@ TEST_F(AzureLogin, IgnoresHTTPStatus) {
     EXPECT_EQ(provider.LogIn(), LoggedIn(UserName(Profile::kAzure)));
 }
 
-/// What the token endpoint answers, byte by byte, and how the login ends there.
+/// An answer of the token endpoint, and the outcome of the login.
 struct TokenAnswerCase {
     std::string name;
     Profile profile;
@@ -621,7 +621,7 @@ std::vector<TokenAnswerCase> TokenAnswers() {
             error("{\"error\":\"invalid_grant\",\"error_codes\":[70008],\"error_description\":\"gone\"}\n"));
         row("ErrorNull", HTTPAnswer(R"({"error": null})"), error("{\"error\":null}\n"));
     }
-    rows.push_back({"AzureErrorBesideAToken",
+    rows.push_back({"AzureErrorNextToToken",
                     Profile::kAzure,
                     HTTPAnswer(R"({"id_token": "a.b.c", "error": 0})"),
                     Refused<sso_err_resp>("{\"error\":0,\"id_token\":\"a.b.c\"}\n"),
@@ -650,16 +650,16 @@ TEST_P(WholeLogin, AcceptsCompleteTokenInTruncatedResponse) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(TokenRequestLogged(CURLE_PARTIAL_FILE)));
 }
 
-/// The key under which the client's file names its token endpoint, and another address for it.
+/// The key of the token endpoint in the client's file, with this URL.
 std::string TokenEndpointAt(Profile profile, const std::string &url) {
     return std::string(profile == Profile::kAzure ? R"({"azure)" : R"({"websphere)") + R"(_token_endpoint": ")" + url +
            "\"}";
 }
 
 TEST_P(WholeLogin, FailsIfTokenEndpointRefusesConnection) {
-    const Port nobody;
+    const Port closed;
     Provider provider(GetParam(),
-                      TokenEndpointAt(GetParam(), "https://127.0.0.1:" + std::to_string(nobody.number()) + "/token"));
+                      TokenEndpointAt(GetParam(), "https://127.0.0.1:" + std::to_string(closed.number()) + "/token"));
     EXPECT_EQ(provider.LogIn(), Refused<std::invalid_argument>("parse json falied"));
     EXPECT_THAT(TakeSystemLog(), ElementsAre(TokenRequestLogged(CURLE_COULDNT_CONNECT)));
     EXPECT_THAT(provider.Requests(), IsEmpty());

@@ -19,7 +19,7 @@ void Require(bool condition, const char *what) {
     }
 }
 
-/// None if its value is empty.
+/// Does nothing if the value is empty.
 void AddExtension(X509 *certificate, int nid, const std::string &value) {
     if (value.empty()) {
         return;

@@ -8,8 +8,7 @@
 #include <string>
 #include <vector>
 
-// A certificate authority made for this run, and what servers show to their clients. All that is valid is so whatever
-// time a test's clock tells.
+// A generated certificate authority and server certificates. Valid ones are valid at every clock setting of the tests.
 namespace Test {
 
 struct Credentials {
@@ -17,7 +16,7 @@ struct Credentials {
     std::shared_ptr<X509> certificate;
 };
 
-/// What a certificate says; as it stands, what a good server's does.
+/// The content of a certificate. The defaults are those of a valid server.
 struct CertificateText {
     std::string alternativeName;  // such as "DNS:localhost" or "IP:127.0.0.1"; none if empty
     std::string commonName = "Server of this test run";
@@ -29,26 +28,25 @@ struct CertificateText {
 
 std::shared_ptr<EVP_PKEY> EllipticKey();
 
-/// A certificate for the key, signed by the issuer, or by itself where there is none.
+/// A certificate for the key, signed by the issuer; self-signed if `issuer` is null.
 Credentials Certify(const CertificateText &text, const Credentials *issuer,
                     const std::shared_ptr<EVP_PKEY> &key = EllipticKey(), const EVP_MD *digest = EVP_sha256());
 
-/// What an authority's own certificate says.
+/// The content of an authority's certificate.
 CertificateText AuthorityText(const std::string &commonName);
 
-/// The one that this machine trusts, if it trusts any.
+/// The authority of this program.
 const Credentials &Authority();
 
-/// Makes the authority, and others if any are told, the only ones that this machine trusts.
+/// Makes the system trust only the authority and `others`.
 void TrustAuthority(const std::vector<Credentials> &others = {});
 
-/// What a server shows under a name such as "DNS:localhost" or "IP:127.0.0.1".
+/// A valid certificate for a name such as "DNS:localhost" or "IP:127.0.0.1".
 Credentials CertificateFor(const std::string &name);
 
-/// The authority's as well, but it ran out long ago.
+/// The same, expired.
 Credentials ExpiredCertificateFor(const std::string &name);
 
-/// One that no authority stands behind.
 Credentials SelfSignedCertificateFor(const std::string &name);
 
 }  // namespace Test

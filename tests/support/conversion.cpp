@@ -4,11 +4,11 @@ namespace Test {
 
 namespace {
 
-constexpr bool kAsksWinbind = TAVOSSO_WINBIND;  // 0 where the build leaves it out
+constexpr bool kHasWinbind = TAVOSSO_WINBIND;  // false if built without winbind
 
 std::string Line(const std::string &domain, const std::string &why) {
     return "platform:N domain '" + domain + "' is not in domains.conf, and winbindd " +
-           (kAsksWinbind ? why : "cannot be asked: left out of this build");
+           (kHasWinbind ? why : "cannot be asked: left out of this build");
 }
 
 }  // namespace

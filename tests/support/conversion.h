@@ -5,11 +5,10 @@
 
 namespace Test {
 
-/// The log line on a domain that stands in no table, where nobody answers at winbindd's place: so it is in the private
-/// namespaces that the tests run in.
+/// The log line for a domain that is not in the table. winbindd is not available in the private namespaces.
 std::string UnknownDomain(const std::string &domain);
 
-/// The same on a name whose domain is empty, about which winbindd is not asked.
+/// The log line for a name with an empty domain. winbindd is not asked.
 std::string EmptyDomain();
 
 }  // namespace Test

@@ -27,7 +27,7 @@ std::string FromBase64(const std::string &text) {
                         reinterpret_cast<const unsigned char *>(text.data()), static_cast<int>(text.size()));
     bytes.resize(length < 0 ? 0 : static_cast<std::size_t>(length));
     for (auto end = text.rbegin(); end != text.rend() && *end == '=' && !bytes.empty(); ++end) {
-        bytes.pop_back();  // the zero byte that padding counts as
+        bytes.pop_back();  // EVP_DecodeBlock decodes padding to a zero byte
     }
     return bytes;
 }

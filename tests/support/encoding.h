@@ -3,7 +3,7 @@
 
 #include <string>
 
-// How texts are wrapped on their way through a browser, independent of the code under test.
+// Encodings, independent of the code under test.
 namespace Test {
 
 std::string Base64(const std::string &bytes);
@@ -11,7 +11,7 @@ std::string Base64(const std::string &bytes);
 /// base64url (RFC 4648, section 5), without padding.
 std::string Base64Url(const std::string &bytes);
 
-/// The bytes of a base64 text; empty when it is none.
+/// The decoded bytes; empty if the text is not base64.
 std::string FromBase64(const std::string &text);
 
 std::string PercentDecode(const std::string &text);

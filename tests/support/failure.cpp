@@ -14,7 +14,7 @@ namespace Test {
 
 namespace {
 
-/// The class as the table names it: without the library's namespaces, and without what Boost wraps around its own.
+/// The class without the library's namespaces and Boost's wrapper, as in the table.
 std::string NameInTable(std::string name) {
     for (const std::string around : {"TAVO::SSO::", "TAVO::JWT::", "boost::wrapexcept<"}) {
         if (name.compare(0, around.size(), around) == 0) {
@@ -25,7 +25,7 @@ std::string NameInTable(std::string name) {
 }
 
 bool IsText(const std::string &type, const std::string &text, const char *ofTable) {
-    // The text begins with the token's "alg", and what() ends at a NUL in it.
+    // The text begins with "alg" of the token and ends at a NUL in it.
     const bool isCut = type == "jwt_not_support" && text.find(' ') == std::string::npos;
     return std::string(ofTable) == "CURL" ? TAVO::Web::FindTransferText(text) != CURLE_OK
                                           : isCut || TAVO::Web::IsText(text, ofTable);

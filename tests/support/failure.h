@@ -8,7 +8,7 @@
 
 namespace Test {
 
-/// What a call throws: exactly this class, exactly this text.
+/// The exact class and text of an exception.
 struct Failure {
     std::string type;
     std::string text;
@@ -24,10 +24,10 @@ Failure Fails(const std::string &text) {
     return {typeid(Exception).name(), text};
 }
 
-/// The class of an exception, in the words of C++.
+/// The demangled class of an exception.
 std::string ClassOf(const std::exception &error);
 
-/// Throws if the table of failures has no such exception. `FailureOf` and `LogIn` do this with each that they catch.
+/// Throws if the failure table has no row for the exception. `FailureOf` and `LogIn` call it for each exception.
 void RequireInTable(const std::exception &error);
 
 template <typename Function>

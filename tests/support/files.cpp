@@ -13,15 +13,15 @@ namespace Test {
 
 namespace {
 
-/// A test that is run without tools/private-root, by root, would take the machine's own authorities for its own. In
-/// there, what is written to is in memory.
+/// Throws unless the path is in memory. Without tools/private-root, a test run by root would overwrite the machine's
+/// certificate authorities.
 void RequirePrivate(fs::path path) {
     while (!fs::exists(path)) {
         path = path.parent_path();
     }
     struct statfs system = {};
     if (statfs(path.c_str(), &system) != 0 || system.f_type != TMPFS_MAGIC) {
-        throw std::runtime_error("would write to this machine's " + path.string() +
+        throw std::runtime_error("refusing to write to " + path.string() +
                                  ": run the tests through tools/private-root");
     }
 }

@@ -3,8 +3,8 @@
 
 #include <string>
 
-// Files at the appliance's fixed paths. The tests run in private namespaces (tools/private-root), where /usr/tavo is
-// theirs alone.
+// Files at the appliance's fixed paths. The tests run in private namespaces (tools/private-root), each with its own
+// /usr/tavo.
 namespace Test {
 
 constexpr char kProfileFile[] = "/usr/tavo/etc/ssoclient/profile.conf";
@@ -13,7 +13,7 @@ constexpr char kWebSphereFile[] = "/usr/tavo/etc/ssoclient/websphere.conf";
 constexpr char kDomainTable[] = "/usr/tavo/etc/domains.conf";
 constexpr char kTrustedAuthorities[] = "/etc/ssl/certs/ca-certificates.crt";
 
-/// Writes a file that only its owner can read, and the folders above it.
+/// Writes a file with mode 0600, and creates its folders.
 void WriteFile(const std::string &path, const std::string &content);
 
 /// Empties /usr/tavo.

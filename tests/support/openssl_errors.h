@@ -6,7 +6,7 @@
 
 namespace Test {
 
-/// Every entry of the calling thread's error queue of OpenSSL, and no more of them: "REASON FILE:LINE FUNCTION DATA".
+/// Returns and removes all entries of the thread's OpenSSL error queue, as "REASON FILE:LINE FUNCTION DATA".
 std::vector<std::string> TakeErrorQueue();
 
 }  // namespace Test

@@ -19,7 +19,7 @@ namespace {
 
 using Filter = std::vector<sock_filter>;
 
-// An argument has 64 bits, of which an id fills the lower; a filter loads 32.
+// Arguments have 64 bits, ids and filter loads 32.
 constexpr std::size_t kLowerHalf = __BYTE_ORDER__ == __ORDER_BIG_ENDIAN__ ? 4 : 0;
 
 constexpr std::size_t OffsetOfArgument(std::size_t n) {
@@ -28,7 +28,7 @@ constexpr std::size_t OffsetOfArgument(std::size_t n) {
 
 void Return(Filter &filter, std::uint32_t verdict) { filter.push_back(BPF_STMT(BPF_RET | BPF_K, verdict)); }
 
-/// Goes on where the value at that offset is the wanted one, and else skips so many statements.
+/// Continues if the value at `offset` equals `wanted`, else skips `skipped` statements.
 void Require(Filter &filter, std::size_t offset, std::uint32_t wanted, std::uint8_t skipped) {
     filter.push_back(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(offset)));
     filter.push_back(BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, wanted, 0, skipped));
@@ -43,7 +43,7 @@ void Refuse(Filter &filter, const IdChange &change) {
     Return(filter, SECCOMP_RET_ERRNO | EPERM);
 }
 
-/// Calls that write, or that make, move or remove a file. The older ones are not on every machine.
+/// Calls that write, or that create, move or remove a file. Some architectures lack the older ones.
 constexpr long kWriting[] = {
     SYS_write,    SYS_writev,   SYS_pwrite64, SYS_pwritev,  SYS_pwritev2,  SYS_sendto,    SYS_sendmsg,
     SYS_sendmmsg, SYS_socket,   SYS_sendfile, SYS_splice,   SYS_truncate,  SYS_ftruncate, SYS_fallocate,
@@ -55,7 +55,7 @@ constexpr long kWriting[] = {
 #endif
 };
 
-/// Ends the process at a call that opens a file not only to read it; its flags are the argument of that number.
+/// Kills the process if the call opens a file for writing. `flags` is the index of its argument.
 void RefuseOpeningToWrite(Filter &filter, long call, std::size_t flags) {
     Require(filter, offsetof(seccomp_data, nr), static_cast<std::uint32_t>(call), 3);
     filter.push_back(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(OffsetOfArgument(flags))));
@@ -65,9 +65,9 @@ void RefuseOpeningToWrite(Filter &filter, long call, std::size_t flags) {
 
 void Install(const Filter &filter) {
     const sock_fprog program{static_cast<unsigned short>(filter.size()), const_cast<sock_filter *>(filter.data())};
-    // Without root's right to filter, a process may filter only what can gain no rights any more.
+    // Required for a filter without CAP_SYS_ADMIN.
     if (prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) != 0 || prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program) != 0) {
-        throw std::runtime_error(std::string("no filter for system calls: ") + std::strerror(errno));
+        throw std::runtime_error(std::string("cannot install a system call filter: ") + std::strerror(errno));
     }
 }
 

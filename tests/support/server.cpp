@@ -37,7 +37,7 @@ void WriteAll(BIO *connection, const std::string &bytes) {
         const int length = static_cast<int>(std::min<std::size_t>(bytes.size() - written, 1 << 20));
         const int count = BIO_write(connection, bytes.data() + written, length);
         if (count <= 0) {
-            return;  // the client has gone: that is its right
+            return;  // the client has disconnected
         }
         written += static_cast<std::size_t>(count);
     }
@@ -46,7 +46,7 @@ void WriteAll(BIO *connection, const std::string &bytes) {
 std::shared_ptr<SSL_CTX> MakeTLS(const Credentials &credentials, int onlyVersion) {
     std::shared_ptr<SSL_CTX> context(SSL_CTX_new(TLS_server_method()), SSL_CTX_free);
     Require(context != nullptr, "SSL_CTX_new");
-    // A server may show what a client ought to refuse.
+    // The client must reject weak certificates, not the server.
     SSL_CTX_set_security_level(context.get(), 0);
     Require(SSL_CTX_use_certificate(context.get(), credentials.certificate.get()) == 1 &&
                 SSL_CTX_use_PrivateKey(context.get(), credentials.key.get()) == 1,
@@ -146,7 +146,7 @@ Port::Port() : socket_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
     address.sin_family = AF_INET;
     address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
     Require(bind(socket_, reinterpret_cast<sockaddr *>(&address), sizeof address) == 0, "bind");
-    // A proxy that the environment names does not know this machine's loopback.
+    // A proxy from the environment cannot reach the loopback.
     setenv("no_proxy", "*", 1);
 }
 
@@ -171,7 +171,7 @@ Server::Server(const Credentials &credentials, int onlyVersion) : tls_(MakeTLS(c
 
 Server::~Server() {
     stopping_ = true;
-    shutdown(port_.socket(), SHUT_RDWR);  // wakes the thread out of accept
+    shutdown(port_.socket(), SHUT_RDWR);  // interrupts accept
     thread_.join();
 }
 
@@ -206,7 +206,7 @@ std::vector<std::string> Server::RequestLines() const {
 }
 
 void Server::Serve() {
-    // A client that goes away early ends its connection, not the program.
+    // A disconnecting client must not end the program.
     sigset_t brokenPipe;
     sigemptyset(&brokenPipe);
     sigaddset(&brokenPipe, SIGPIPE);
@@ -215,9 +215,9 @@ void Server::Serve() {
     while (!stopping_) {
         const int socket = accept4(port_.socket(), nullptr, nullptr, SOCK_CLOEXEC);
         if (socket < 0) {
-            continue;  // told to stop, or the client was gone before it was let in
+            continue;  // stopping, or the client has disconnected
         }
-        ERR_clear_error();  // what the last connection left there would count as this one's
+        ERR_clear_error();  // entries of the previous connection would count for this one
         Connection connection(socket, tls_.get(), [this](const std::string &request) { Record(request); });
         NextScript()(connection);
     }

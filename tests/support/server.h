@@ -18,17 +18,16 @@
 
 namespace Test {
 
-/// An answer of HTTP/1.1 with its length told.
+/// An HTTP/1.1 answer with Content-Length.
 std::string HTTPAnswer(const std::string &body, const std::string &status = "200 OK");
 
-/// The same, but it tells more bytes than there are: the server goes away half-way.
+/// The same, with a Content-Length that exceeds the body by `missing` bytes.
 std::string CutHTTPAnswer(const std::string &body, std::size_t missing);
 
 /// An answer in the chunked coding (RFC 9112, section 7.1).
 std::string ChunkedHTTPAnswer(const std::vector<std::string> &chunks);
 
-/// A TCP port of 127.0.0.1 that the kernel chose. As long as nobody listens on it, it refuses connections, and belongs
-/// to nobody else.
+/// A bound TCP port of 127.0.0.1. It refuses connections until a server listens on it.
 class Port {
   public:
     Port();
@@ -43,17 +42,16 @@ class Port {
     int socket_;
 };
 
-/// A server's end of one connection. Waiting for a client that has gone gives the empty text, and what is sent to it is
-/// lost: that is the client's right.
+/// The server's end of a connection. If the client has disconnected, receiving returns an empty text and sent data is
+/// lost.
 class Connection {
   public:
     using OnRequest = std::function<void(const std::string &)>;
 
-    /// Takes the socket over. Speaks TLS where there is a context for it, and shakes hands when it first has to.
+    /// Owns the socket. Uses TLS if `tls` is not null; the first read or write performs the handshake.
     Connection(int socket, SSL_CTX *tls, OnRequest onRequest);
 
-    /// Says goodbye, and waits for the client to go: the kernel would take back what was sent if it closed a connection
-    /// with something unread in it.
+    /// Closes TLS and waits for the client to disconnect. If unread data were left, the kernel would discard sent data.
     ~Connection();
     Connection(const Connection &) = delete;
     Connection &operator=(const Connection &) = delete;
@@ -61,14 +59,14 @@ class Connection {
     std::string ReceiveRequest();
     void Send(const std::string &bytes);
 
-    /// Each byte in a TLS record of its own.
+    /// Sends each byte in a separate TLS record.
     void SendByteByByte(const std::string &bytes);
 
-    /// Past TLS: what next arrives, or goes out, on the socket itself.
+    /// Bypasses TLS.
     std::string ReceiveRaw();
     void SendRaw(const std::string &bytes);
 
-    /// Nothing more goes out, TLS's own goodbye neither.
+    /// Ends sending, without a TLS close_notify.
     void BreakOff();
 
   private:
@@ -81,32 +79,29 @@ class Connection {
     OnRequest onRequest_;
 };
 
-/// What a server does on a connection, which ends with it.
+/// Handles one connection, which is closed afterwards.
 using Script = std::function<void(Connection &)>;
 
-/// A server that does what it was told, whatever it is asked: one script or answer for each connection.
+/// A server with one script or answer for each connection, in order.
 class Server {
   public:
     Server();                                                              // HTTP
-    explicit Server(const Credentials &credentials, int onlyVersion = 0);  // HTTPS, of that version of TLS if any
+    explicit Server(const Credentials &credentials, int onlyVersion = 0);  // HTTPS; TLS of `onlyVersion` unless 0
     ~Server();
     Server(const Server &) = delete;
     Server &operator=(const Server &) = delete;
 
     std::string URL(const std::string &path, const std::string &host = "127.0.0.1") const;
 
-    /// What it does on the next connection that nothing is told for yet. A connection that nothing is told for is
-    /// closed as soon as it has asked.
+    /// Adds a script. A connection without a script is closed after its request.
     void Play(Script script);
 
-    /// Waits for a request and sends this, byte for byte.
+    /// Adds a script that waits for a request and sends these bytes.
     void Answer(const std::string &bytes);
 
-    /// Every request so far, byte by byte. A connection that never sends a whole one, because its client refused the
-    /// certificate for instance, leaves none.
+    /// The complete requests so far, byte for byte.
     std::vector<std::string> Requests() const;
 
-    /// Their first lines.
     std::vector<std::string> RequestLines() const;
 
   private:

@@ -17,7 +17,7 @@ namespace Test {
 
 namespace {
 
-// Kept without asking for memory, as a real syslog is not refused any: tests let it run out.
+// A fixed buffer, because tests let memory run out.
 struct Record {
     int priority;
     std::size_t length;
@@ -33,18 +33,18 @@ LogLine Read(const Record &record, const char *text) {
 void Write(int priority, const char *format, std::va_list arguments) {
     Record record{priority, 0};
     if (used + sizeof record >= records.size()) {
-        std::abort();  // more than any test looks at
+        std::abort();  // buffer is full
     }
     char *text = &records[used + sizeof record];
     const std::size_t room = records.size() - used - sizeof record;
-    const int length = std::vsnprintf(text, room, format, arguments);  // glibc's knows %m
+    const int length = std::vsnprintf(text, room, format, arguments);  // glibc supports %m
     if (length < 0 || static_cast<std::size_t>(length) >= room) {
         std::abort();
     }
     record.length = static_cast<std::size_t>(length);
     std::memcpy(&records[used], &record, sizeof record);
     used += sizeof record + record.length + 1;
-    errno = EINTR;  // as a real one may leave it: nothing in the library may rely on it
+    errno = EINTR;  // like a real syslog, which may change errno
 }
 
 std::string LevelOf(int priority) {
@@ -58,7 +58,7 @@ std::string LevelOf(int priority) {
 
 bool IsInTable(const LogLine &line) {
     const auto isText = [&](const char *ofTable) {
-        // What is behind the source in a line of this text can only be libcurl's.
+        // The placeholder matches only texts of libcurl.
         const bool isCurls =
             std::strstr(ofTable, "CURL") == nullptr || TAVO::Web::FindTransferText(line.text) != CURLE_OK;
         return isCurls && TAVO::Web::IsText(line.text, ofTable);
@@ -114,7 +114,7 @@ void syslog(int priority, const char *format, ...) {
     va_end(arguments);
 }
 
-/// What a library calls that is built with _FORTIFY_SOURCE.
+/// Called by libraries built with _FORTIFY_SOURCE.
 void __syslog_chk(int priority, int /*flag*/, const char *format, ...) {
     std::va_list arguments;
     va_start(arguments, format);

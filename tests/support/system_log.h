@@ -7,12 +7,12 @@
 #include <string>
 #include <vector>
 
-// The program that links this defines `syslog` itself, and so sees what the library under test writes.
+// Defines `syslog`, to read what the library logs.
 namespace Test {
 
 struct LogLine {
     int priority;
-    std::string text;  // with the source's line number written as N: "utils:N calloc failed. ..."
+    std::string text;  // the line number of the source is N: "utils:N calloc failed. ..."
 };
 
 bool operator==(const LogLine &a, const LogLine &b);
@@ -21,10 +21,10 @@ std::ostream &operator<<(std::ostream &stream, const LogLine &line);
 /// A line at LOG_ERR.
 LogLine Error(const std::string &text);
 
-/// Every line so far, and no more of them. Throws if the table of failures has no such line of this level.
+/// Returns and removes all lines. Throws if the failure table has no row for one of them.
 std::vector<LogLine> TakeSystemLog();
 
-/// The same where the test itself has thrown what the library logs, with a text of its own.
+/// The same without the check, for lines whose text comes from the test.
 std::vector<LogLine> TakeSystemLogWithOwnTexts();
 
 }  // namespace Test

@@ -7,28 +7,28 @@
 #include <memory>
 #include <string>
 
-// What an identity provider does with tokens, by OpenSSL's high-level calls: independent of the code under test.
+// Signs tokens like an identity provider, with high-level OpenSSL functions, independent of the code under test.
 namespace Test {
 
 std::string Compact(const Json::Value &value);
 Json::Value Parse(const std::string &text);
 
-/// header.claims, each encoded: what gets signed.
+/// The signing input: header and claims, encoded.
 std::string SigningInput(const Json::Value &header, const Json::Value &claims);
 
 std::string SignHMAC(const std::string &signingInput, const std::string &secret, const EVP_MD *digest);
 
-/// A whole token signed with HS256 under the secret.
+/// A token signed with HS256.
 std::string HS256Token(const Json::Value &claims, const std::string &secret);
 
-/// An RSA key pair made for this run.
+/// A generated RSA key pair.
 class RSAKey {
   public:
     explicit RSAKey(unsigned int bits = 2048);
 
     std::string Sign(const std::string &signingInput, const EVP_MD *digest) const;
 
-    /// A whole token signed with RS256, its header naming this key.
+    /// A token signed with RS256. Its header names this key.
     std::string RS256Token(const Json::Value &claims, const std::string &kid) const;
 
     /// The public key as a JSON Web Key (RFC 7517).
@@ -41,7 +41,7 @@ class RSAKey {
     std::shared_ptr<EVP_PKEY> key_;
 };
 
-/// One 2048-bit key for the whole program: making one takes longer than most tests.
+/// One 2048-bit key for the whole program, because generating one takes longer than most tests.
 const RSAKey &ProviderKey();
 
 }  // namespace Test

@@ -1,4 +1,4 @@
-// The authorization request, which both clients make alike but for the scope.
+// The authorization request of both clients. They differ in the scope.
 #include <iostream>
 #include <regex>
 #include <sstream>
@@ -17,7 +17,7 @@ namespace {
 
 using namespace TAVO::SSO;
 
-/// The value of a query's parameter, as a provider would read it.
+/// The decoded value of a query parameter.
 std::string Parameter(const std::string &uri, const std::string &name) {
     std::smatch match;
     EXPECT_TRUE(std::regex_search(uri, match, std::regex("[?&]" + name + "=([^&]*)"))) << name;
@@ -135,8 +135,8 @@ TYPED_TEST(AuthorizationRequest, PassesZeroedBufferAndFlagsToEncoder) {
         EXPECT_EQ(flag2, 0);
         EXPECT_EQ(flag3, 1);
         EXPECT_EQ(std::string(dst, size), std::string(1024, '\0'));
-        std::fill_n(dst, size, 'x');  // to the last byte, without a NUL
-        return -1;                    // anything but 0 is success
+        std::fill_n(dst, size, 'x');  // fills the buffer, without a NUL
+        return -1;                    // every value except 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(Parameter(this->URI(), "state"), std::string(1024, 'x'));
@@ -157,7 +157,7 @@ TYPED_TEST(AuthorizationRequest, AppendsSecondQuestionMarkToEndpointWithQuery) {
 
 TYPED_TEST(AuthorizationRequest, ThrowsUnlessStateIsObjectOrNull) { EXPECT_THROW(this->URI("[]"), Json::LogicError); }
 
-/// Stands behind std::cout and counts what is done to it.
+/// Replaces the buffer of std::cout and counts insertions and flushes.
 class Output : public std::stringbuf {
   public:
     Output() : former_(std::cout.rdbuf(this)) {}

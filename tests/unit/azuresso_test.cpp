@@ -140,7 +140,7 @@ class AzureVerification : public Library {
         keySet["keys"].append(ProviderKey().JWK("key 1"));
     }
 
-    /// Verifies a token of `header` and `claims`, signed by the provider, who publishes `keySet`.
+    /// Verifies a token of `header` and `claims` with the provider's signature. `keySet` is the published key set.
     Failure Verify(const EVP_MD *digest = EVP_sha256()) {
         const std::string signingInput = SigningInput(header, claims);
         return VerifyToken(signingInput + "." + ProviderKey().Sign(signingInput, digest));
@@ -220,7 +220,7 @@ TEST_F(AzureVerification, ReadsExpiryUpToFirstNonDigit) {
     EXPECT_EQ(Verify(), kExpired);
 }
 
-/// Digits in groups of three behind points, as in Germany.
+/// Groups digits by threes with a point, as in Germany.
 struct Grouping : std::numpunct<char> {
     char do_thousands_sep() const override { return '.'; }
     std::string do_grouping() const override { return "\3"; }
@@ -267,7 +267,7 @@ TEST_F(AzureVerification, MatchesEmptyTenantWithMissingClaim) {
     claims["tid"] = Json::arrayValue;
     EXPECT_EQ(Verify(), kWrongTenant);
     claims.removeMember("tid");
-    EXPECT_EQ(Verify(), kVerified) << "the comparison is the literal one";
+    EXPECT_EQ(Verify(), kVerified) << "both are the empty text";
 }
 
 TEST_F(AzureVerification, TreatsNonObjectClaimsAsExpired) {
@@ -390,7 +390,7 @@ TEST_F(AzureVerification, RequiresStringModulus) {
     EXPECT_EQ(Verify(), missing);
     keySet["keys"][0].removeMember("n");
     keySet["keys"][0].removeMember("e");
-    EXPECT_EQ(Verify(), missing) << "n is looked at before e";
+    EXPECT_EQ(Verify(), missing) << "n is checked before e";
 }
 
 TEST_F(AzureVerification, RequiresStringExponent) {
@@ -399,7 +399,7 @@ TEST_F(AzureVerification, RequiresStringExponent) {
     EXPECT_EQ(Verify(), missing);
     header["alg"] = "none";
     keySet["keys"][0].removeMember("e");
-    EXPECT_EQ(Verify(), missing) << "e is looked at before the algorithm";
+    EXPECT_EQ(Verify(), missing) << "e is checked before the algorithm";
 }
 
 TEST_F(AzureVerification, RejectsOtherAlgorithms) {
@@ -429,7 +429,7 @@ TEST_F(AzureVerification, RejectsSignatureOfAnotherKey) {
 }
 
 TEST_F(AzureVerification, RejectsHMACUnderPublicKey) {
-    // The classic confusion of algorithms: the public modulus as the secret of an HMAC.
+    // Algorithm confusion: the public modulus as the secret of an HMAC.
     header["alg"] = "HS256";
     const std::string signingInput = SigningInput(header, claims);
     EXPECT_EQ(VerifyToken(signingInput + "." + SignHMAC(signingInput, keySet["keys"][0]["n"].asString(), EVP_sha256())),
@@ -444,7 +444,6 @@ TEST_F(AzureVerification, IgnoresOtherClaims) {
     EXPECT_EQ(Verify(), kVerified);
 }
 
-/// A client whose discovery document comes from elsewhere.
 struct OwnDiscovery : AzureClient {
     void RequestWellknownInfo(Json::Value &out) override { out["jwks_uri"] = "https://elsewhere.example/keys"; }
 };
@@ -570,7 +569,7 @@ TEST_F(AzureIdentity, ConvertsOnlyDomainToUpperCase) {
         EXPECT_EQ(size, 1023u);
         EXPECT_EQ(std::string(dst, size + 1), std::string(1024, '\0'));
         *dst = 'x';
-        return 5;  // anything that is not negative is success
+        return 5;  // every value from 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(NameOf(R"({"unique_name": "aLice@cOrp.example-1.n\u00e9t"})"), kNamed);
@@ -578,13 +577,13 @@ TEST_F(AzureIdentity, ConvertsOnlyDomainToUpperCase) {
     EXPECT_EQ(userName, "x");
 }
 
-/// Upper case as in no language: the global locale's own.
-struct OwnCase : std::ctype<char> {
+/// Distinguishable from every real locale.
+struct CustomCase : std::ctype<char> {
     char do_toupper(char c) const override { return c == 'p' ? '#' : c; }
 };
 
 TEST_F(AzureIdentity, ConvertsDomainByGlobalLocale) {
-    const std::locale before = std::locale::global(std::locale(std::locale::classic(), new OwnCase));
+    const std::locale before = std::locale::global(std::locale(std::locale::classic(), new CustomCase));
     EXPECT_EQ(NameOf(R"({"unique_name": "pat@corp.example"})"),
               Fails<sso_op_failed>("TAVOWinsUserNameFqdn2Netbios failed."));
     std::locale::global(before);
@@ -608,7 +607,7 @@ TEST_F(AzureIdentity, PassesEmptyUserToConversion) {
 TEST_F(AzureIdentity, ReadsNameThatFillsBuffer) {
     Platform platform;
     platform.fqdn2Netbios = [](const char *, char *dst, std::size_t size) {
-        std::fill_n(dst, size + 1, 'x');  // no room was left for a NUL
+        std::fill_n(dst, size + 1, 'x');  // without a NUL
         return 0;
     };
     ReplacePlatform(platform);

@@ -3,7 +3,7 @@
 
 #include "sso/sso.h"
 
-// Both clients with their fields open: what a configuration file or an earlier step puts there, a test can.
+// Both clients with public fields, so tests can set them.
 namespace Test {
 
 struct AzureClient : TAVO::SSO::AzureSSOClient {

@@ -1,4 +1,4 @@
-// The two exception families, thrown and caught across the boundary of the built library.
+// The exception classes of SSO and JWT, thrown by the built library.
 #include <stdexcept>
 #include <type_traits>
 

@@ -10,8 +10,8 @@
 
 namespace Test {
 
-/// A process as it is in the ordinary case: root, an empty /usr/tavo, nobody to connect to, every call in order. A test
-/// that leaves log lines behind which it has not looked at fails.
+/// Starts each test as root, with an empty /usr/tavo, no reachable server and no failing call. Fails if a test leaves
+/// unread log lines.
 class Library : public testing::Test {
   protected:
     void SetUp() override;

@@ -1,4 +1,4 @@
-// The binary interface of the built library: layout, slots, and the type information that exceptions are caught by.
+// The binary interface of the built library: layout, virtual tables, and the type information of exceptions.
 #include <dlfcn.h>
 #include <link.h>
 
@@ -28,7 +28,7 @@ static_assert(sizeof(SSO::WebSphereSSOClient) == sizeof(SSO::SSOClient));
 static_assert(sizeof(SSO::SSOProfile) == 16 + sizeof(std::string) + sizeof(SSO::SSOClient));
 static_assert(sizeof(JWT::Jwt) == 3 * sizeof(std::string));
 
-// Where an alignment changes no size, nothing else would show it.
+// Sizes do not always reveal a changed alignment.
 template <typename... Types>
 constexpr bool kAreAlignedAsPointers = ((alignof(Types) == alignof(void *)) && ...);
 static_assert(
@@ -36,12 +36,12 @@ static_assert(
                           SSO::sso_exception, SSO::sso_err_resp, SSO::sso_not_implemented, SSO::sso_op_failed,
                           JWT::jwt_exception, JWT::jwt_not_support, JWT::jwt_verify_failed>);
 
-// Programs keep clients by value. A copy is made in their own code: no exported name would be lost with it.
+// Programs copy clients. Copies are inline, so the list of exported names does not cover them.
 template <typename... Types>
 constexpr bool kAreCopied = std::conjunction_v<std::is_copy_constructible<Types>..., std::is_copy_assignable<Types>...>;
 static_assert(kAreCopied<SSO::SSOClient, SSO::AzureSSOClient, SSO::WebSphereSSOClient, SSO::SSOProfile, JWT::Jwt>);
 
-/// An exception with nothing of its own, caught as `Base` too, and made of a text that has to be named as one.
+/// Whether the exception derives from `Base`, adds no fields, and converts from text only explicitly.
 template <typename Exception, typename Base>
 constexpr bool kIsCaughtAs =
     std::conjunction_v<std::is_base_of<Base, Exception>, std::is_constructible<Exception, std::string>,
@@ -57,7 +57,7 @@ static_assert(kIsCaughtAs<JWT::jwt_verify_failed, JWT::jwt_exception>);
 
 using Slots = std::vector<std::string>;
 
-/// The slots of a class's virtual table in the built library, by the names of the functions in them.
+/// The exported functions in a class's virtual table, in order.
 Slots SlotsOf(const std::string &mangledClass) {
     Slots slots;
     void *table = dlsym(RTLD_DEFAULT, ("_ZTV" + mangledClass).c_str());
@@ -70,7 +70,7 @@ Slots SlotsOf(const std::string &mangledClass) {
         return slots;
     }
     void **entries = static_cast<void **>(table);
-    for (std::size_t i = 2; i < symbol->st_size / sizeof(void *); ++i) {  // behind the offset and the type information
+    for (std::size_t i = 2; i < symbol->st_size / sizeof(void *); ++i) {  // after the offset and the type information
         if (dladdr(entries[i], &info) == 0 || info.dli_saddr != entries[i]) {
             slots.emplace_back("not an exported function");
         } else {
@@ -88,7 +88,7 @@ std::string Function(const std::string &mangledClass, const std::string &nameAnd
 
 const std::string kBase = "N4TAVO3SSO9SSOClientE";
 
-/// The eighteen slots, of which a client's class defines four.
+/// The eighteen slots. A client overrides four of them.
 Slots Eighteen(const std::string &hooks) {
     const std::string string = kString;
     return {
@@ -124,7 +124,7 @@ TEST_F(Interface, ClientsOverrideFourSlotsAndAppendDestructor) {
         expected.push_back(Function(client, "D0Ev"));
         Slots found = SlotsOf(client);
         if (found.size() > 18 && found[18] == Function(client, "D2Ev")) {
-            found[18] = Function(client, "D1Ev");  // the base-object destructor, at the same address
+            found[18] = Function(client, "D1Ev");  // the base-object destructor has the same address
         }
         EXPECT_EQ(found, expected) << client;
     }
@@ -136,7 +136,6 @@ TEST_F(Interface, ProfileHasOnlyDestructor) {
     EXPECT_EQ(found[1], "_ZN4TAVO3SSO10SSOProfileD0Ev");
 }
 
-/// Where a field lies in its object.
 template <typename Object, typename Field>
 std::ptrdiff_t Offset(Object &object, Field &field) {
     return reinterpret_cast<char *>(&field) - reinterpret_cast<char *>(&object);

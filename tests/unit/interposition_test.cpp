@@ -1,5 +1,5 @@
-// This program puts exported functions of its own in front of the library's: the library's calls to each other must
-// find them, whatever compiler built it and however it optimised.
+// Defines functions that the library exports. The library's own calls must use these definitions, with every compiler
+// and optimisation level.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <syslog.h>
@@ -69,7 +69,7 @@ TEST(Interposition, ReplacesHttpPost) {
     EXPECT_EQ(client.GetToken(), "from httpPost");
 }
 
-/// The three exchanges with a provider, and the source that logs each.
+/// A request to the provider, and the source that logs its failure.
 struct Exchange {
     const char *name;
     const char *source;

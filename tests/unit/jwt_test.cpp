@@ -66,7 +66,7 @@ TEST_F(JwtParsing, DecodesHeaderAndBody) {
 }
 
 TEST_F(JwtParsing, AcceptsBase64AndBase64Url) {
-    // {"a":"???>>~"} and a trailing blank: both special characters, and padding
+    // {"a":"???>>~"} and a blank: has both special characters and padding
     EXPECT_EQ(HeaderOf("eyJhIjoiPz8_Pj5-In0g"), Parse(R"({"a": "???>>~"})"));
     EXPECT_EQ(HeaderOf("eyJhIjoiPz8/Pj5+In0g"), Parse(R"({"a": "???>>~"})"));
     EXPECT_EQ(HeaderOf("eyJhIjoxfQ"), Parse(R"({"a": 1})"));
@@ -237,7 +237,7 @@ struct FailingCall {
     const char *line;  // null: nothing is logged
 };
 
-/// Without it GoogleTest prints the bytes, those between the members too, which nobody has written.
+/// By default GoogleTest prints the bytes of the object, including uninitialised padding.
 void PrintTo(const FailingCall &row, std::ostream *stream) { *stream << row.function << "Number" << row.call; }
 
 std::string Named(const testing::TestParamInfo<FailingCall> &info) { return testing::PrintToString(info.param); }
@@ -284,7 +284,7 @@ class HMACSignature : public Library {
     }
 
     void TearDown() override {
-        EXPECT_THAT(TakeSystemLog(), IsEmpty()) << "this check never logs";
+        EXPECT_THAT(TakeSystemLog(), IsEmpty()) << "the HMAC check logs nothing";
         Library::TearDown();
     }
 
@@ -322,7 +322,7 @@ TEST_F(HMACSignature, FailsIfAnyCharacterChanges) {
 TEST_F(HMACSignature, FailsWithPaddingOrStandardBase64) {
     EXPECT_EQ(Verify(Sign("key") + "=", "a2V5"), kHMACFailed);
     std::string standard;
-    for (int i = 0; standard.empty(); ++i) {  // a signature in which both special characters stand
+    for (int i = 0; standard.empty(); ++i) {  // searches for a signature with both special characters
         const std::string secret = std::to_string(i);
         std::string token = Sign(secret);
         if (token.find('-') != std::string::npos && token.find('_') != std::string::npos) {
@@ -355,7 +355,6 @@ TEST_F(HMACSignature, AcceptsBase64AndBase64UrlKey) {
 }
 
 TEST_F(HMACSignature, RejectsEmptyOrUndecodableKey) {
-    // Signed under the empty key, as anyone can.
     for (const char *key : {"", "!!!!", "!", "####a2V5"}) {
         EXPECT_EQ(Verify(Sign(""), key), kHMACFailed) << key;
     }

@@ -1,4 +1,4 @@
-// OIDCLogin up to the client's own steps, and GetSSORelayURL.
+// OIDCLogin up to the steps of the client, and GetSSORelayURL.
 
 #include "sso/sso.h"
 #include "tests/support/encoding.h"
@@ -44,7 +44,7 @@ TEST_F(LoginEntry, RequiresEnableAsBooleanTrue) {
     EXPECT_EQ(LoginWith(R"({"sso_enable": false, "sso_profile": "azure"})"), notEnabled);
     EXPECT_EQ(LoginWith(R"({"sso_enable": "true", "sso_profile": "azure"})"), notEnabled);
     EXPECT_EQ(LoginWith(R"({"sso_enable": 1, "sso_profile": "azure"})"), notEnabled);
-    EXPECT_EQ(LoginWith(R"([true])"), notEnabled) << "a document that is no object has no members";
+    EXPECT_EQ(LoginWith(R"([true])"), notEnabled) << "a list has no members";
 }
 
 TEST_F(LoginEntry, RequiresProfileAsString) {
@@ -147,8 +147,8 @@ TEST_F(RelayURL, PassesZeroedBufferToDecoder) {
         EXPECT_EQ(std::string(dst, *length), std::string(1024, '\0'));
         const std::string text = R"({"origin": "/here"})";
         text.copy(dst, text.size());
-        *length = 0;  // which is not looked at
-        return -1;    // anything but 0 is success
+        *length = 0;  // ignored by the library
+        return -1;    // every value except 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(GetSSORelayURL(true, "the state", ""), "ssoclient/relay.html#origin=%2Fhere&success=true");

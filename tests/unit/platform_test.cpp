@@ -1,4 +1,4 @@
-// The stand-in for the appliance's libraries, by itself: this program links libtavoplatform.so.0 alone.
+// The stand-in for the appliance's libraries. This program links only libtavoplatform.so.0.
 #include "platform/platform.h"
 
 #include <gmock/gmock.h>
@@ -17,7 +17,7 @@ namespace Test {
 
 namespace {
 
-/// Room for a text of `usable` characters and its NUL, with a mark in every byte and more bytes behind.
+/// A buffer for `usable` characters and a NUL, followed by more bytes. All bytes are marked.
 struct Buffer {
     explicit Buffer(std::size_t usable) : size(usable), bytes(usable + 17, '#') {}
 
@@ -102,14 +102,14 @@ TEST(Base64, RejectsInvalidArgumentsWhenEncoding) {
     EXPECT_NE(TLIBCBase64SzEncodeFull(nullptr, 0, &byte, 1, 1, 0, 1), 0);
 }
 
-/// The decoded bytes, or "refused".
+/// The decoded bytes, or "rejected".
 std::string Decode(const std::string &text, std::size_t room = 100) {
     Buffer buffer(room);
     std::size_t length = room;
     if (TLIBCBase64Decode(text.data(), text.size(), buffer.bytes.data(), &length) == 0) {
         EXPECT_TRUE(buffer.Untouched());
         EXPECT_EQ(length, room);
-        return "refused";
+        return "rejected";
     }
     EXPECT_TRUE(buffer.UntouchedFrom(length));
     return {buffer.bytes.data(), length};
@@ -128,14 +128,14 @@ TEST(Base64, DecodesWhatItEncodes) {
 TEST(Base64, RejectsNonCanonicalText) {
     for (const std::string text : {"Zm9v\n", "Zm 9v", " Zm9v", "Zm9v ", "Zm9", "Zm8", "Zm8=Zm8=", "Zm9=", "Zh==",
                                    "====", "=", "Z===", "Zm8==", "Zm9v====", "Zm-_", "Zm9!", "Zm\xff=", "Zm9vZm9"}) {
-        EXPECT_EQ(Decode(text), "refused") << text;
+        EXPECT_EQ(Decode(text), "rejected") << text;
     }
-    EXPECT_EQ(Decode(std::string("Zm9v\0Zm9", 8)), "refused");
+    EXPECT_EQ(Decode(std::string("Zm9v\0Zm9", 8)), "rejected");
 }
 
 TEST(Base64, DecodesIntoExactlySizedBuffer) {
     EXPECT_EQ(Decode("Zm9v", 3), "foo");
-    EXPECT_EQ(Decode("Zm9v", 2), "refused");
+    EXPECT_EQ(Decode("Zm9v", 2), "rejected");
     EXPECT_EQ(Decode("", 0), "");
 }
 
@@ -162,19 +162,19 @@ class DomainConversion : public testing::Test {
         const int result = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer.bytes.data(), size);
         if (result < 0) {
             EXPECT_TRUE(buffer.Untouched());
-            return "refused";
+            return "rejected";
         }
         EXPECT_EQ(result, 0);
         EXPECT_THAT(TakeSystemLog(), testing::IsEmpty());
         return buffer.Text();
     }
 
-    /// Why a name was refused: the one line that was logged.
+    /// The line that was logged for a rejected name.
     static std::string Refusal(const std::string &name, std::size_t size = 1023) {
-        EXPECT_EQ(Convert(name, size), "refused") << name;
+        EXPECT_EQ(Convert(name, size), "rejected") << name;
         const std::vector<LogLine> log = TakeSystemLog();
         EXPECT_THAT(log, testing::SizeIs(1)) << name;
-        return log.size() == 1 && log[0].priority == LOG_ERR ? log[0].text : "logged otherwise";
+        return log.size() == 1 && log[0].priority == LOG_ERR ? log[0].text : "unexpected log";
     }
 };
 

@@ -1,4 +1,4 @@
-// The root-privilege section, seen through a client's constructor, which reads its file in it.
+// RootPrivilege, tested through the constructor of a client, which reads its file with it.
 #include <cerrno>
 #include <filesystem>
 #include <new>
@@ -22,7 +22,7 @@ LogLine AuthWarning(const std::string &text) { return {LOG_AUTH | LOG_INFO, "azu
 
 class RootPrivilege : public Library {
   protected:
-    /// Constructs a client as a process with these ids, of which the n-th change fails; 0: none.
+    /// Constructs a client in a process with these ids. The change of ids number `failing` fails; 0 means none.
     void ReadAs(uid_t uid, gid_t gid, int failing = 0) {
         WriteFile(kAzureFile, R"({"azure_client_id": "read"})");
         SetEffectiveIDs(uid, gid);
@@ -76,7 +76,7 @@ TEST_F(RootPrivilege, KeepsUserIfGroupCannotBeRaised) {
     EXPECT_THAT(TakeSystemLog(), ElementsAre(AuthError("setresgid(-1, 0, -1) [Operation not permitted]"),
                                              AuthError("ENTERCriticalSection")));
     EXPECT_EQ(ErrnoAtOpen(), 1);
-    EXPECT_EQ(errno_, 0) << "nothing had changed, so there was nothing to restore";
+    EXPECT_EQ(errno_, 0) << "no id was changed, so none is restored";
 }
 
 TEST_F(RootPrivilege, RestoresGroupIfUserCannotBeRaised) {
@@ -137,7 +137,7 @@ TEST_F(RootPrivilege, ClosesFileAndSetsCloseOnExec) {
     ReadAs(0, 0);
     SSOProfile profile;
     EXPECT_EQ(openFiles(), before);
-    EXPECT_EQ(ModeAtOpen(), "re") << "a program that the caller executes must not inherit the secrets";
+    EXPECT_EQ(ModeAtOpen(), "re") << "executed programs must not inherit the file";
 }
 
 TEST_F(RootPrivilege, OverwritesBuffersAfterReading) {
@@ -147,7 +147,7 @@ TEST_F(RootPrivilege, OverwritesBuffersAfterReading) {
     const std::string content = R"({"azure_client_id": "read"})";
     EXPECT_THAT(cleansed, testing::Contains(content)) << "the file's content";
     EXPECT_THAT(cleansed, testing::Contains(testing::AllOf(testing::StartsWith(content), testing::SizeIs(4096))))
-        << "the buffer it was read by";
+        << "the buffer for reading";
 }
 
 TEST_F(RootPrivilege, RestoresIdsIfMemoryRunsOut) {

@@ -1,4 +1,4 @@
-// The client base: accessors, the two exchanges, the order of a login.
+// The base client: accessors, the two requests, the steps of a login.
 #include "sso/sso.h"
 
 #include <new>
@@ -44,7 +44,7 @@ class ClientBase : public Library {
     std::string response;
 };
 
-/// Writes down the steps, and fails at one.
+/// Records the steps. Throws in step `failingStep`.
 struct SteppingClient : SSOClient {
     void SetCode(std::string authorizationCode) override { Step("SetCode " + authorizationCode); }
     std::string GetIDTokenReqParams() override {
@@ -117,12 +117,12 @@ TEST_F(ClientBase, FetchesAndParsesDiscoveryDocument) {
     EXPECT_EQ(out["jwks_uri"].asString(), "keys");
     EXPECT_TRUE(out["jwks_uri"].hasComment(Json::commentAfterOnSameLine)) << "comments are collected";
     for (const std::string &call : CurrentTransport().calls) {
-        EXPECT_THAT(call, testing::Not(testing::HasSubstr("VERIFY"))) << "libcurl's own checks must stay on";
+        EXPECT_THAT(call, testing::Not(testing::HasSubstr("VERIFY"))) << "libcurl's checks must stay enabled";
     }
 }
 
 TEST_F(ClientBase, ReturnsNullIfDiscoveryIsUnreachable) {
-    client.wellknownEndpoint = "https://nobody.example/";
+    client.wellknownEndpoint = "https://unreachable.example/";
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N " + ::Test::kNotConnected)));
@@ -130,7 +130,7 @@ TEST_F(ClientBase, ReturnsNullIfDiscoveryIsUnreachable) {
 
 TEST_F(ClientBase, ReturnsNullIfDiscoveryIsNotJSON) {
     CurrentTransport().answers[kWellknown] = Whole("<html>not found</html>");
-    out["jwks_uri"] = "of another time";
+    out["jwks_uri"] = "earlier";
     client.RequestWellknownInfo(out);
     EXPECT_TRUE(out.isNull());
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N bad wellknown json format.")));
@@ -210,7 +210,7 @@ TEST_F(ClientBase, LogsFailedTokenRequestAndKeepsPartialAnswer) {
 }
 
 TEST_F(ClientBase, ReturnsEmptyResponseIfTokenEndpointIsUnreachable) {
-    client.tokenEndpoint = "https://nobody.example/";
+    client.tokenEndpoint = "https://unreachable.example/";
     client.RequestTokenEndpoint(response, "a=b");
     EXPECT_EQ(response, "");
     EXPECT_THAT(TakeSystemLog(), ElementsAre(Error("sso:N request token uri " + ::Test::kNotConnected + ".")));

@@ -1,4 +1,4 @@
-// The token request and its answer, as far as both clients are alike.
+// The token request and its answer, as both clients process it.
 #include "tests/unit/clients.h"
 #include "tests/unit/fixture.h"
 

@@ -8,7 +8,7 @@
 
 namespace Test {
 
-/// A client that holds a token, and is asked for the user's name.
+/// Asks a client with a token for the user's name.
 template <typename Client>
 class Identity : public Library {
   protected:

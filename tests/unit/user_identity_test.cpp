@@ -1,4 +1,4 @@
-// What both clients say of the user, as far as they are alike.
+// GetUserName and GetUserInfo of both clients.
 #include "tests/unit/user_identity.h"
 
 namespace Test {
@@ -8,7 +8,7 @@ namespace {
 template <typename Client>
 class UserIdentity : public Identity<Client> {
   protected:
-    /// What asking for the name and asking for all claims throw for this token.
+    /// The exceptions of GetUserName and GetUserInfo for this token.
     std::vector<Failure> FailuresOf(const std::string &token) {
         const Failure nameFailure = this->NameIn(token);
         return {nameFailure, FailureOf([this] { this->client.GetUserInfo(info); })};

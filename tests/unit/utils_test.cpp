@@ -83,7 +83,7 @@ TEST_F(Transfer, ThrowsLibcurlTextAfterCleanup) {
     std::string response;
     EXPECT_EQ(FailureOf([&] { httpGet(kURL, response, true, Append); }),
               Fails<sso_err_resp>(curl_easy_strerror(CURLE_PEER_FAILED_VERIFICATION)));
-    EXPECT_EQ(FailureOf([&] { httpPost("http://nobody.example/", "", response, true, Append); }),
+    EXPECT_EQ(FailureOf([&] { httpPost("http://unreachable.example/", "", response, true, Append); }),
               Fails<sso_err_resp>(curl_easy_strerror(CURLE_COULDNT_CONNECT)));
     const auto &calls = CurrentTransport().calls;
     EXPECT_EQ(std::vector<std::string>(calls.end() - 3, calls.end()),

@@ -117,11 +117,11 @@ class WebSphereVerification : public Library {
     }
 
     void TearDown() override {
-        EXPECT_THAT(CurrentTransport().calls, testing::IsEmpty()) << "this provider's tokens need no request";
+        EXPECT_THAT(CurrentTransport().calls, testing::IsEmpty()) << "verification sends no request";
         Library::TearDown();
     }
 
-    /// Verifies a token of `header` and `claims`, signed under the secret.
+    /// Verifies a token of `header` and `claims`, signed with the secret.
     Failure Verify(const EVP_MD *digest = EVP_sha256(), const std::string &secret = "made-up") {
         const std::string signingInput = SigningInput(header, claims);
         return VerifyToken(signingInput + "." + SignHMAC(signingInput, secret, digest));
@@ -191,7 +191,7 @@ TEST_F(WebSphereVerification, ComparesAudienceExactlyAndRejectsList) {
     }
     client.clientID = "";
     claims["aud"] = Json::arrayValue;
-    EXPECT_EQ(Verify(), kWrongAudience) << "a list is no empty text";
+    EXPECT_EQ(Verify(), kWrongAudience) << "a list is not the empty text";
 }
 
 TEST_F(WebSphereVerification, RejectsOtherAlgorithms) {
@@ -244,14 +244,14 @@ TEST_F(WebSphereVerification, PassesZeroedBufferAndFlagsToEncoder) {
         EXPECT_EQ(flag2, 0);
         EXPECT_EQ(flag3, 1);
         EXPECT_EQ(std::string(dst, size), std::string(1024, '\0'));
-        std::fill_n(dst, size, 'A');  // to the last byte, without a NUL
-        return -1;                    // anything but 0 is success
+        std::fill_n(dst, size, 'A');  // fills the buffer, without a NUL
+        return -1;                    // every value except 0 is success
     };
     ReplacePlatform(platform);
     EXPECT_EQ(Verify(EVP_sha256(), std::string(768, '\0')), kVerified);
 }
 
-/// An algorithm, and whether the token is signed under the client's secret.
+/// An algorithm, and whether the token is signed with the client's secret.
 using Signing = std::tuple<const char *, bool>;
 
 class WebSphereSecret : public WebSphereVerification, public testing::WithParamInterface<Signing> {

@@ -1,5 +1,5 @@
-// How the stand-in asks winbindd, where a real one cannot be had to do what is needed: this program defines the calls
-// of the question itself. A real winbindd is asked in tests/e2e/directory.
+// How the stand-in asks winbindd. This program defines the calls, to simulate failures that a real winbindd does not
+// show. tests/e2e/directory uses a real one.
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>
@@ -32,7 +32,7 @@ int pipeError = 0;
 int forkError = 0;
 int forks = 0;
 
-/// What winbindd answers; runs in the process that asks.
+/// The answer of winbindd. Called in the child process.
 wbcErr (*answer)(const char *domain, struct wbcDomainInfo &information) = nullptr;
 
 char dnsName[1000];
@@ -46,7 +46,7 @@ wbcErr AnswerACME(const char * /*domain*/, struct wbcDomainInfo &information) {
     return WBC_ERR_SUCCESS;
 }
 
-[[noreturn]] void WaitForEver() {
+[[noreturn]] void WaitForever() {
     for (;;) {
         pause();
     }
@@ -56,7 +56,7 @@ void Ignore(int /*signal*/) {}
 
 std::ptrdiff_t OpenDescriptors() { return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {}); }
 
-/// Those that a program gets that this one starts.
+/// Descriptors that a program started by this process inherits.
 std::ptrdiff_t DescriptorsForPrograms() {
     return std::count_if(std::filesystem::directory_iterator("/proc/self/fd"), {}, [](const auto &entry) {
         const int flags = fcntl(std::atoi(entry.path().filename().c_str()), F_GETFD);
@@ -64,13 +64,13 @@ std::ptrdiff_t DescriptorsForPrograms() {
     });
 }
 
-/// Collects the children that are left: what comes of waiting for any is ECHILD where there is none.
+/// Reaps children. Returns ECHILD if there are none.
 int ErrorOfWaiting() {
     errno = 0;
     return waitpid(-1, nullptr, WNOHANG) < 0 ? errno : 0;
 }
 
-/// What a host does with a signal, for as long as this lives.
+/// Sets the handler of a signal for the lifetime of the object.
 class Disposition {
   public:
     Disposition(int signal, void (*handler)(int), int flags = 0) : signal_(signal) {
@@ -102,7 +102,7 @@ class WinbindLookup : public testing::Test {
         EXPECT_EQ(ErrorOfWaiting(), ECHILD) << "a child is left";
     }
 
-    /// The converted name, or the one line that was logged, without its beginning.
+    /// The converted name, or the end of the line that was logged.
     static std::string Convert(const std::string &domain = "CORP.EXAMPLE.NET") {
         char buffer[1024] = "untouched";
         const int result = TAVOWinsUserNameFqdn2Netbios((domain + "\\alice").c_str(), buffer, sizeof buffer - 1);
@@ -141,7 +141,7 @@ TEST_F(WinbindLookup, RequiresAnswerForRequestedDNSName) {
     EXPECT_EQ(Convert("CORP"), "does not know it");
     answer = [](const char *domain, struct wbcDomainInfo &information) {
         AnswerACME(domain, information);
-        dnsName[0] = '\0';  // BUILTIN, and the machine's own domain
+        dnsName[0] = '\0';  // as for BUILTIN and the machine's own domain
         return WBC_ERR_SUCCESS;
     };
     EXPECT_EQ(Convert("BUILTIN"), "does not know it");
@@ -202,10 +202,10 @@ TEST_F(WinbindLookup, FailsIfChildCrashes) {
     EXPECT_EQ(Convert(), "does not answer");
 }
 
-// No clock is looked at in these: without its alarm the child would wait for ever, and the test with it.
+// These tests measure no time. Without the alarm, the child would wait forever and the test would time out.
 
 TEST_F(WinbindLookup, FailsAfterAlarmOfChild) {
-    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForEver(); };
+    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForever(); };
     EXPECT_EQ(Convert(), "does not answer");
 }
 
@@ -216,7 +216,7 @@ TEST_F(WinbindLookup, FailsAfterAlarmEvenIfHostBlocksSignal) {
     sigemptyset(&alarms);
     sigaddset(&alarms, SIGALRM);
     pthread_sigmask(SIG_BLOCK, &alarms, &before);
-    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForEver(); };
+    answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForever(); };
     EXPECT_EQ(Convert(), "does not answer");
     pthread_sigmask(SIG_SETMASK, &before, nullptr);
 }
@@ -260,7 +260,7 @@ TEST_F(WinbindLookup, IgnoresEnvironment) {
                    : WBC_ERR_DOMAIN_NOT_FOUND;
     };
     EXPECT_EQ(Convert(), "ACME\\alice");
-    EXPECT_STREQ(std::getenv("_NO_WINBINDD"), "1") << "the host's own environment";
+    EXPECT_STREQ(std::getenv("_NO_WINBINDD"), "1") << "the environment of the host";
     unsetenv("_NO_WINBINDD");
 }
 

@@ -1,4 +1,4 @@
-// What loading the built library does to a program, and unloading it again. The program is not linked with it.
+// Loads and unloads the built library in a program that is not linked with it.
 #include <dlfcn.h>
 #include <gmock/gmock.h>
 #include <malloc.h>
@@ -18,7 +18,7 @@ namespace {
 
 constexpr char kLibrary[] = TAVOSSO_LIBRARY;
 
-/// One loading, or none where the library cannot be loaded.
+/// A loaded library; false if loading fails.
 class Loaded {
   public:
     Loaded() : handle(dlopen(kLibrary, RTLD_NOW | RTLD_LOCAL)) {}
@@ -42,11 +42,11 @@ class Loaded {
 
 bool IsStillLoaded() { return dlopen(kLibrary, RTLD_NOW | RTLD_NOLOAD) != nullptr; }
 
-/// Uses the library, so that each of its calls is bound and what it makes at the first use is made.
+/// Calls the library, so that symbols are bound and one-time initialisation is done.
 std::string Digest(const Loaded &library) {
     auto *digest = library.Find<std::string(std::string)>(
         "_ZN4TAVO3SSO9MD5DigestENSt7__cxx1112basic_stringIcSt11char_traitsIcESaIcEEE");
-    return digest != nullptr ? digest("") : "there is no MD5Digest";
+    return digest != nullptr ? digest("") : "MD5Digest not found";
 }
 
 constexpr char kDigestOfNothing[] = "d41d8cd98f00b204e9800998ecf8427e";
@@ -66,21 +66,20 @@ std::ptrdiff_t CountFiles() {
 std::size_t HeapInUse() { return mallinfo2().uordblks; }
 
 TEST(Loading, LeaksNothingInThousandRounds) {
-    // Loaded and unloaded by itself, libcurl loses 50 bytes each time.
+    // libcurl leaks 50 bytes each time it is unloaded, so it stays loaded.
     ASSERT_NE(dlopen("libcurl.so.4", RTLD_NOW), nullptr);
-    // The dynamic loader's own tables have grown to their size after some loadings.
+    // Lets the tables of the dynamic loader grow to their final size.
     LoadAndUse(10);
     const auto files = CountFiles();
     const auto heap = HeapInUse();
     constexpr int kTimes = 1000;
     LoadAndUse(kTimes);
     EXPECT_EQ(CountFiles(), files);
-    // A block that is free again may count as in use while the allocator keeps it for the next request; blocks that
-    // were lost, of which none is smaller than 24 bytes, would be one for each time.
+    // Freed blocks may count as in use while the allocator caches them. A leak is at least 24 bytes for each round.
     EXPECT_LT(HeapInUse(), heap + kTimes);
 }
 
-/// How a child ends that loads the library, and then does something, while the kernel ends it at its first write.
+/// The exit status of a child that loads the library and calls `then`. A write kills it.
 int StatusOfLoadingWithoutWriting(void (*then)()) {
     const pid_t child = fork();
     if (child == 0) {
@@ -96,7 +95,7 @@ int StatusOfLoadingWithoutWriting(void (*then)()) {
 
 TEST(Loading, WritesNothing) {
     const int status = StatusOfLoadingWithoutWriting([] {});
-    EXPECT_TRUE(WIFEXITED(status)) << "ended by signal " << WTERMSIG(status);
+    EXPECT_TRUE(WIFEXITED(status)) << "killed by signal " << WTERMSIG(status);
     EXPECT_EQ(WEXITSTATUS(status), EXIT_SUCCESS);
 }
 
@@ -105,8 +104,8 @@ TEST(Loading, IsKilledOnWrite) {
              +[] { std::ofstream("/tmp/file") << "text" << std::flush; },
              +[] { std::ofstream("/dev/null", std::ios::app); },
              +[] { std::filesystem::create_directory("/tmp/folder"); },
-             +[] { std::filesystem::rename("/tmp/there is none", "/tmp/file"); },
-             +[] { std::filesystem::remove("/tmp/there is none"); },
+             +[] { std::filesystem::rename("/tmp/missing", "/tmp/file"); },
+             +[] { std::filesystem::remove("/tmp/missing"); },
              +[] { syslog(LOG_ERR, "line"); },
              +[] { [[maybe_unused]] const ssize_t count = ::write(STDOUT_FILENO, "", 0); },
          }) {

@@ -17,7 +17,7 @@ struct AddressRange {
     std::uintptr_t end = 0;
 };
 
-/// A library of this process, and where it has its code.
+/// A library of this process and its code.
 struct Library {
     const char *name;
     AddressRange code;
@@ -38,7 +38,7 @@ int NoteCode(dl_phdr_info *object, std::size_t /*size*/, void *found) {
     return 1;
 }
 
-/// Asks for no memory: the first who wants to know may be malloc.
+/// Must not allocate: malloc may be the first caller.
 AddressRange CodeOf(const char *name) {
     Library library{name, {}};
     dl_iterate_phdr(NoteCode, &library);
@@ -53,10 +53,10 @@ bool IsIn(const AddressRange &code, const void *pointer) {
 struct Calls {
     std::array<char, 64> function;
     int made;
-    int failing;  // the number of the one to fail
+    int failing;  // number of the call to fail
 };
 
-// Asks for no memory either: it may be a request for memory that is counted.
+// Must not allocate: malloc may be the counted function.
 std::array<Calls, 64> calls;
 std::size_t functions = 0;
 
@@ -73,7 +73,7 @@ Calls &CallsOf(const char *function) {
 }
 
 std::vector<std::string> &Cleansed() {
-    static auto &texts = *new std::vector<std::string>();  // outlives libcrypto's own end, which cleanses too
+    static auto &texts = *new std::vector<std::string>();  // libcrypto still cleanses memory at exit
     return texts;
 }
 

@@ -3,10 +3,10 @@
 
 #include <ctime>
 
-// The program that links this defines `time` itself.
+// Defines `time`.
 namespace Test {
 
-/// From now on it is this second, until RestoreClock.
+/// Sets the time until RestoreClock.
 void SetClock(std::time_t now);
 void RestoreClock();
 

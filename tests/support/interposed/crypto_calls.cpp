@@ -1,4 +1,4 @@
-// The libcrypto calls of the library under test, each of which can be made to fail: see calls.h.
+// libcrypto functions that can fail: see calls.h.
 #define OPENSSL_SUPPRESS_DEPRECATED
 #include <openssl/bio.h>
 #include <openssl/bn.h>
@@ -69,7 +69,7 @@ unsigned char *HMAC(const EVP_MD *digest, const void *key, int keyLength, const 
     return PassOn<unsigned char *>("HMAC", CALLER, nullptr, HMAC, digest, key, keyLength, data, length, mac, macLength);
 }
 
-/// Leaves no entry in the error queue when it fails.
+/// Fails without an entry in the error queue.
 unsigned char *MD5(const unsigned char *data, size_t length, unsigned char *digest) {
     return Test::ShouldFail("MD5", CALLER) ? nullptr : Test::Next(MD5, "MD5")(data, length, digest);
 }

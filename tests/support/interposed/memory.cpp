@@ -18,14 +18,14 @@ namespace {
 constexpr std::size_t kNoLimit = std::numeric_limits<std::size_t>::max();
 std::atomic<std::size_t> limit{kNoLimit};
 
-// This thread's alone: a server that the program runs beside the library has all the memory that it wants.
+// Per thread, so that servers in the same process do not run out of memory.
 thread_local bool counting = false;
 thread_local int requestsUntilFailure = 0;
 thread_local FailingAllocation::Of countedRequests{};
 thread_local FailingAllocation::Until failing{};
 thread_local bool filling = false;
 
-bool CountedOut(bool ofCxx) {
+bool IsToFail(bool ofCxx) {
     if (!counting || (countedRequests == FailingAllocation::Of::kCxx && !ofCxx)) {
         return false;
     }
@@ -35,21 +35,21 @@ bool CountedOut(bool ofCxx) {
 
 bool Refused(const char *function, std::size_t size, const void *caller) {
     const bool ofCxx = FromLibrary(caller) || FromJsonLibrary(caller);
-    if (size > limit || CountedOut(ofCxx) || ShouldFail(function, caller)) {
+    if (size > limit || IsToFail(ofCxx) || ShouldFail(function, caller)) {
         errno = ENOMEM;
         return true;
     }
     return false;
 }
 
-/// Finds the allocator's own function for `next`, once. Looking for it may itself ask for memory, and does without.
+/// Finds the allocator's function once. Allocations during the search fail.
 template <typename Function>
 bool Find(Function *&next, Function *own, const char *name) {
-    static thread_local bool looking = false;
-    if (next == nullptr && !looking) {
-        looking = true;
+    static thread_local bool searching = false;
+    if (next == nullptr && !searching) {
+        searching = true;
         next = Next(own, name);
-        looking = false;
+        searching = false;
     }
     return next != nullptr;
 }
@@ -101,7 +101,7 @@ void *realloc(void *memory, size_t size) noexcept {
 
 void *operator new(std::size_t size) {
     static decltype(&malloc) next = nullptr;
-    const bool refused = size > Test::limit || Test::CountedOut(true);
+    const bool refused = size > Test::limit || Test::IsToFail(true);
     void *memory = !refused && Test::Find(next, std::malloc, "malloc") ? Test::Filled(next(size)) : nullptr;
     if (memory == nullptr) {
         errno = ENOMEM;

@@ -3,10 +3,10 @@
 
 #include <cstddef>
 
-// The program that links this defines malloc, calloc, realloc and `operator new` itself, for every library in it.
+// Defines malloc, calloc, realloc and `operator new` for all libraries of the program.
 namespace Test {
 
-/// While it lives, a single request for more memory than that fails.
+/// Makes each request for more memory than `largest` fail.
 class MemoryLimit {
   public:
     explicit MemoryLimit(std::size_t largest);
@@ -15,12 +15,12 @@ class MemoryLimit {
     MemoryLimit &operator=(const MemoryLimit &) = delete;
 };
 
-/// Until it is stopped or gone, the n-th request of this thread for memory (1: the next) fails, of whatever size.
+/// Makes the n-th request for memory of this thread fail (1: the next), until stopped or destroyed.
 class FailingAllocation {
   public:
     enum class Of {
         kEveryone,
-        kCxx,  // of the C++ code: whatever goes through `operator new`, and of the library under test and of jsoncpp
+        kCxx,  // `operator new`, and malloc calls of the library and of jsoncpp
     };
     enum class Until { kNext, kEver };
 
@@ -31,12 +31,11 @@ class FailingAllocation {
 
     void Stop();
 
-    /// Whether there were n requests.
+    /// Whether the n-th request was made.
     bool Happened();
 };
 
-/// Whether this thread's memory comes filled: what a block's last owner has left in it would be taken for the next
-/// one's.
+/// Fills new memory of this thread, so that remains of earlier blocks are not found in new ones.
 void FillNewMemory(bool fill);
 
 }  // namespace Test

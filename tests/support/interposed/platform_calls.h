@@ -5,7 +5,7 @@
 #include <functional>
 #include <string>
 
-// This program defines the platform's functions, which pass on to the stand-in unless a test puts its own in place.
+// Defines the platform's functions. They call the stand-in unless a test replaces them.
 namespace Test {
 
 struct Platform {
@@ -15,7 +15,7 @@ struct Platform {
     std::function<int(const char *src, char *dst, std::size_t size)> fqdn2Netbios;
 };
 
-/// Puts the given functions in place of the stand-in's.
+/// Replaces the functions that are set; restores the others.
 void ReplacePlatform(Platform platform);
 
 }  // namespace Test

@@ -1,4 +1,4 @@
-// The headers would bring a `fread` of their own with it, in the way of the one that is defined here.
+// With _FORTIFY_SOURCE, the headers would define `fread`.
 #undef _FORTIFY_SOURCE
 
 #include "tests/support/interposed/process.h"
@@ -122,7 +122,7 @@ size_t fread(void *bytes, size_t size, size_t count, FILE *file) {
     return Test::FailsToRead(file, CALLER) ? 0 : Test::Next(fread, "fread")(bytes, size, count, file);
 }
 
-/// What a library calls that is built with _FORTIFY_SOURCE, where the compiler does not know how much is read.
+/// Called by libraries built with _FORTIFY_SOURCE.
 size_t __fread_chk(void *bytes, size_t room, size_t size, size_t count, FILE *file) {
     return Test::FailsToRead(file, CALLER) ? 0 : Test::Next(__fread_chk, "__fread_chk")(bytes, room, size, count, file);
 }
@@ -147,7 +147,7 @@ int ferror(FILE *file) noexcept {
 
 int fclose(FILE *file) {
     if (file == Test::failedFile) {
-        Test::failedFile = nullptr;  // its memory may become another file's
+        Test::failedFile = nullptr;  // the pointer may be reused
     }
     const bool fails = Test::ShouldFail("fclose", CALLER);
     const int result = Test::Next(fclose, "fclose")(file);

@@ -7,28 +7,28 @@
 #include <string>
 #include <vector>
 
-// The process that the library under test sees: its effective ids, its files, its entropy.
+// Simulates effective ids and records uses of files and entropy.
 namespace Test {
 
-/// From now on the process has these effective ids, and may change them, until RestoreProcess.
+/// Sets the effective ids, which the process may change, until RestoreProcess.
 void SetEffectiveIDs(uid_t uid, gid_t gid);
 uid_t EffectiveUID();
 gid_t EffectiveGID();
 
-/// The n-th setresuid or setresgid from now on fails with this error.
+/// Makes the n-th setresuid or setresgid fail with this error.
 void FailSetID(int n, int error = EPERM);
 
-/// Every setresuid and setresgid since the last call: "setresgid(-1, 0, -1)".
+/// The setresuid and setresgid calls since the last call: "setresgid(-1, 0, -1)".
 std::vector<std::string> TakeSetIDCalls();
 
-/// What errno was when a file was last opened, and the mode it was opened with.
+/// errno and the mode at the last fopen.
 int ErrnoAtOpen();
 std::string ModeAtOpen();
 
-/// How often the system's entropy source has been read.
+/// The number of getrandom calls.
 int EntropyReads();
 
-/// The ids are the real ones again.
+/// Restores the real ids.
 void RestoreProcess();
 
 }  // namespace Test

@@ -16,10 +16,10 @@ namespace Test {
 
 namespace {
 
-// This thread's alone: a server beside the library knows the secrets, too.
+// Per thread, because a server in the same process also has the secrets.
 thread_local const std::vector<std::string> *watched = nullptr;
 thread_local std::size_t blocks = 0;
-thread_local bool looking = false;
+thread_local bool inspecting = false;
 
 std::vector<std::string> &Finds() {
     static std::vector<std::string> finds;
@@ -37,15 +37,15 @@ _Unwind_Reason_Code NoteFrame(_Unwind_Context *context, void *stack) {
     return _URC_NO_REASON;
 }
 
-/// Not backtrace(3), which loads a library the first time.
+/// backtrace(3) would load a library.
 std::pair<Frames, int> CallStack() {
     std::pair<Frames, int> stack{};
     _Unwind_Backtrace(NoteFrame, &stack);
     return stack;
 }
 
-/// Whether the library under test released it: what stands between is the C++ library and this program.
-bool IsTheLibrarys(const Frames &frames, int depth) {
+/// Whether the library released it. Between its frames and this one there are only the C++ library and this program.
+bool IsFromLibrary(const Frames &frames, int depth) {
     for (int i = 0; i < depth; ++i) {
         Dl_info object{};
         if (FromLibrary(frames.at(static_cast<std::size_t>(i)))) {
@@ -70,7 +70,7 @@ std::string Describe(const Frames &frames, int depth) {
     return text;
 }
 
-void LookAt(void *block) {
+void Inspect(void *block) {
     const std::size_t size = malloc_usable_size(block);
     ++blocks;
     for (const std::string &secret : *watched) {
@@ -78,7 +78,7 @@ void LookAt(void *block) {
             continue;
         }
         const auto [frames, depth] = CallStack();
-        if (IsTheLibrarys(frames, depth)) {
+        if (IsFromLibrary(frames, depth)) {
             Finds().push_back(secret + Describe(frames, depth));
         }
     }
@@ -109,7 +109,7 @@ extern "C" void free(void *block) noexcept {
     static thread_local bool searching = false;
     static thread_local void *postponed = nullptr;
     if (next == nullptr && searching) {
-        postponed = block;  // of the search itself, for what it wrote about a failure of before
+        postponed = block;  // dlsym releases the text of an earlier error
         return;
     }
     if (next == nullptr) {
@@ -117,10 +117,10 @@ extern "C" void free(void *block) noexcept {
         next = Test::Next(free, "free");
         next(postponed);
     }
-    if (Test::watched != nullptr && block != nullptr && !Test::looking) {
-        Test::looking = true;  // looking asks for memory, and releases it
-        Test::LookAt(block);
-        Test::looking = false;
+    if (Test::watched != nullptr && block != nullptr && !Test::inspecting) {
+        Test::inspecting = true;  // the inspection allocates and releases memory
+        Test::Inspect(block);
+        Test::inspecting = false;
     }
     next(block);
 }

@@ -5,23 +5,22 @@
 #include <string>
 #include <vector>
 
-// The program that links this, and memory.cpp, defines `free` itself.
+// Defines `free`. Programs must also link memory.cpp.
 namespace Test {
 
-/// While it lives, looks at each block of memory as it is released, on this thread, by the library under test: by its
-/// own code, or by what that has the C++ library do.
+/// Inspects each block of memory that the library releases on this thread, directly or through the C++ library.
 class WatchReleases {
   public:
-    /// The texts that no block may hold any more; they stay the caller's.
+    /// Searches blocks for `secrets`, which must outlive this object.
     explicit WatchReleases(const std::vector<std::string> &secrets);
     ~WatchReleases();
     WatchReleases(const WatchReleases &) = delete;
     WatchReleases &operator=(const WatchReleases &) = delete;
 
-    /// How many blocks have been looked at.
+    /// The number of inspected blocks.
     std::size_t Blocks() const;
 
-    /// The secrets that were found, each with the functions that released it, innermost first.
+    /// The secrets found, each with the call stack of the release, innermost first.
     std::vector<std::string> Found() const;
 };
 

@@ -5,9 +5,9 @@
 #include <memory>
 #include <new>
 
-#undef curl_easy_setopt  // a macro that checks types, in front of the function
+#undef curl_easy_setopt  // a type-checking macro
 
-// libcurl itself puts an enumeration in front of the "...", and clang holds that against whoever defines the function.
+// libcurl declares an enumeration before "...". clang warns about the definition.
 #pragma GCC diagnostic ignored "-Wvarargs"
 
 namespace Test {
@@ -28,7 +28,7 @@ Transport &State() {
 void Note(const char *call, const std::string &detail = "") noexcept try {
     State().calls.push_back(call + detail);
 } catch (const std::bad_alloc &) {
-    // A test lets memory run out, and looks at other things than the calls; libcurl's own do not throw.
+    // In tests that let memory run out. libcurl does not throw.
 }
 
 CURLcode Perform(const Handle &handle) {
@@ -41,7 +41,7 @@ CURLcode Perform(const Handle &handle) {
         return CURLE_COULDNT_CONNECT;
     }
     for (const std::string &chunk : answer->second.chunks) {
-        // Handed over without a NUL behind it, as libcurl does: who reads on is seen by AddressSanitizer.
+        // Without a NUL, like libcurl: AddressSanitizer detects reads beyond the end.
         const auto data = std::make_unique<char[]>(chunk.size());
         chunk.copy(data.get(), chunk.size());
         if (handle.write(data.get(), 1, chunk.size(), handle.user) != chunk.size()) {
@@ -69,7 +69,7 @@ extern "C" {
 
 CURLcode curl_global_init(long flags) {
     Note("curl_global_init ", std::to_string(flags));
-    return CURLE_FAILED_INIT;  // which the library must not mind
+    return CURLE_FAILED_INIT;  // the library must ignore it
 }
 
 void curl_global_cleanup() { Note("curl_global_cleanup"); }

@@ -8,8 +8,8 @@
 #include <string>
 #include <vector>
 
-// This program defines the libcurl calls of the library under test: what it would send is written down, and the answers
-// are scripted. (Real transfers are in tests/loopback.)
+// Defines the libcurl functions that the library calls. Records requests and returns scripted answers. tests/loopback
+// tests real transfers.
 namespace Test {
 
 struct Answer {
@@ -18,20 +18,20 @@ struct Answer {
 };
 
 struct Transport {
-    /// By URL. A URL without an answer cannot be connected to.
+    /// By URL. Connections to other URLs fail.
     std::map<std::string, Answer> answers;
 
-    /// Every call in order, as "name" or "curl_easy_setopt OPTION VALUE".
+    /// All calls in order, as "name" or "curl_easy_setopt OPTION VALUE".
     std::vector<std::string> calls;
 
-    /// The URLs asked for, and the form of the last POST.
+    /// The requested URLs, and the form of the last POST.
     std::vector<std::string> urls;
     std::string form;
 
-    /// What else happens in a transfer.
+    /// Called during each transfer.
     std::function<void()> duringPerform;
 
-    /// Whether the next handle cannot be made.
+    /// Makes curl_easy_init fail.
     bool noHandle = false;
 };
 
@@ -39,7 +39,7 @@ struct Transport {
 Transport &CurrentTransport();
 void ResetTransport();
 
-/// An answer that arrives whole.
+/// A successful answer in one chunk.
 Answer Whole(const std::string &body);
 
 /// libcurl's text for a URL without an answer. It differs between versions.
