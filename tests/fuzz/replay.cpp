@@ -32,8 +32,8 @@ bool Passes(const std::filesystem::path &seed) {
         const bool expected = name.rfind(kEitherPrefix, 0) == 0 || accepted == (name.rfind(kGoodPrefix, 0) == 0);
         std::cout << name << ": " << (accepted ? "accepted" : "refused") << (expected ? "" : ", WRONGLY") << std::endl;
         return expected;
-    } catch (const Fuzz::BrokenPromise &) {
-        std::cout << name << ": BREAKS A PROMISE" << std::endl;
+    } catch (const Fuzz::ViolatedProperty &) {
+        std::cout << name << ": VIOLATES A PROPERTY" << std::endl;
         return false;
     }
 }
