@@ -18,8 +18,8 @@ std::string DescribeProviderError(const std::string &error, const std::string &d
 
 }  // namespace
 
-ProviderRefusal::ProviderRefusal(const std::string &name, const std::string &description)
-    : Refusal(DescribeProviderError(name, description)), error(OneLine(name)) {}
+ProviderRefusal::ProviderRefusal(const std::string &error, const std::string &description)
+    : Refusal(DescribeProviderError(error, description)), providerError(OneLine(error)) {}
 
 std::string ReasonOf(const std::exception &failure) {
     const std::string text = failure.what();
@@ -32,7 +32,7 @@ std::string ReasonOf(const std::exception &failure) {
 
 std::optional<std::string> ProviderErrorOf(const std::exception &failure) {
     if (const auto *refusal = dynamic_cast<const ProviderRefusal *>(&failure)) {
-        return refusal->error;
+        return refusal->providerError;
     }
     const std::string text = failure.what();
     return IsJson(text) ? std::optional(OneLine(StringMember(ParseObject(text), "error"))) : std::nullopt;

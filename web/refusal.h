@@ -18,7 +18,7 @@ class Refusal : public std::runtime_error {
 class ProviderRefusal : public Refusal {
   public:
     ProviderRefusal(const std::string &error, const std::string &description);
-    std::string error;  // empty if the provider sent none
+    std::string providerError;  // empty if the provider sent none
 };
 
 /// The store of logins threw an exception.
