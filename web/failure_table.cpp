@@ -558,7 +558,8 @@ const std::vector<FailureRow> &FailureTable() {
         {kException,
          {},
          Failure::kInternal,
-         "The kernel's source of random numbers failed. Programs catch it as `std::runtime_error`.",
+         "The kernel's source of random numbers failed. Programs catch it as `std::runtime_error`, which it is with "
+         "Boost 1.86 and later.",
          "Check the kernel and its seccomp filters.",
          "boost::uuids::entropy_error",
          "the start of any login"},

@@ -31,10 +31,10 @@ std::string ReasonOf(const std::exception &failure) {
 }
 
 std::optional<std::string> ProviderErrorOf(const std::exception &failure) {
+    const std::string text = failure.what();
     if (const auto *refusal = dynamic_cast<const ProviderRefusal *>(&failure)) {
         return refusal->providerError;
     }
-    const std::string text = failure.what();
     return IsJson(text) ? std::optional(OneLine(StringMember(ParseObject(text), "error"))) : std::nullopt;
 }
 

@@ -129,6 +129,12 @@ std::string TryEachCall(const Scenario &scenario) {
         for (int n = 1; n <= calls; ++n) {
             outcomes.push_back(TryOne(scenario, healthy, function, n));
         }
+        if (function == "getrandom") {
+            EXPECT_THAT(outcomes, testing::Each(testing::AnyOf(testing::StartsWith("throws boost::wrapexcept<"),
+                                                               testing::StartsWith("throws std::runtime_error"))));
+            table += "getrandom, each: throws a std::runtime_error\n";
+            continue;  // versions of Boost read different amounts and throw different classes
+        }
         for (std::size_t first = 0, last = 0; first < outcomes.size(); first = last + 1) {
             last = first;
             while (last + 1 < outcomes.size() && outcomes[last + 1] == outcomes[first]) {

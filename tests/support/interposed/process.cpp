@@ -10,6 +10,8 @@
 #include <cstdio>
 #include <cstdlib>
 #include <optional>
+#include <random>
+#include <stdexcept>
 
 #include "tests/support/interposed/calls.h"
 
@@ -164,3 +166,14 @@ ssize_t getrandom(void *bytes, size_t length, unsigned int flags) {
 }
 
 }  // extern "C"
+
+// Boost 1.86 and later read random numbers by this class, which may use an instruction instead of a system call.
+std::random_device::result_type std::random_device::_M_getval() {
+    ++Test::entropyReads;
+    result_type value = 0;
+    if (Test::ShouldFail("getrandom", CALLER) ||
+        Test::Next(::getrandom, "getrandom")(&value, sizeof value, 0) != sizeof value) {
+        throw std::runtime_error("getrandom");
+    }
+    return value;
+}
