@@ -558,10 +558,16 @@ const std::vector<FailureRow> &FailureTable() {
         {kException,
          {},
          Failure::kInternal,
-         "The kernel's source of random numbers failed. Programs catch it as `std::runtime_error`, which it is with "
-         "Boost 1.86 and later.",
+         "The kernel's source of random numbers failed. Programs catch it as `std::runtime_error`.",
          "Check the kernel and its seccomp filters.",
          "boost::uuids::entropy_error",
+         "the start of any login"},
+        {kException,
+         {},
+         Failure::kInternal,
+         "The same, if the library was built with Boost 1.86 or later.",
+         "Check the kernel and its seccomp filters.",
+         "std::runtime_error",
          "the start of any login"},
 
         // Results of transfers

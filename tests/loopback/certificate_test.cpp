@@ -10,6 +10,7 @@
 
 #include "tests/loopback/loopback_provider.h"
 #include "tests/support/authority.h"
+#include "tests/support/libcurl_version.h"
 #include "tests/support/server.h"
 #include "tests/support/system_log.h"
 #include "tests/support/token.h"
@@ -168,7 +169,7 @@ std::vector<CertificateCase> Issuers() {
              const Credentials impostor = Certify(AuthorityText("Authority of this test run"), nullptr);
              return Certify(Good(), &impostor);
          },
-         CURLE_SSL_CONNECT_ERROR},
+         LibcurlResultOfForgedAuthority()},
         {"ServerThatIsNoAuthority",
          [] {
              const Credentials server = CertificateFor("DNS:a.example");

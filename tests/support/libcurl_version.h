@@ -22,6 +22,14 @@ inline CURLcode LibcurlResultOfLongHeader() {
 /// Accepts "Transfer-Encoding: gzip" although the request did not ask for it.
 inline bool LibcurlAcceptsGzipForTheTransfer() { return !IsLibcurlAtLeast(8, 14); }
 
+/// Accepts a Content-Length with trailing letters, and two that differ.
+inline bool LibcurlAcceptsBadLengths() { return !IsLibcurlAtLeast(8, 22); }
+
+/// The result for a certificate that another authority of the trusted name has signed.
+inline CURLcode LibcurlResultOfForgedAuthority() {
+    return IsLibcurlAtLeast(8, 22) ? CURLE_PEER_FAILED_VERIFICATION : CURLE_SSL_CONNECT_ERROR;
+}
+
 }  // namespace Test
 
 #endif

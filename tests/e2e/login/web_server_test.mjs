@@ -250,7 +250,8 @@ describe('The web server', () => {
                 for (const target of targets) {
                     const answer = await send(request(`${target}/x${lineBreak}${injected.replace(' ', '%20')}`));
                     assert.deepEqual(valuesOf(answer, 'injected'), [], target);
-                    assert.ok([200, 302, 405].includes(answer.status), `${target}: status ${answer.status}`);
+                    // Newer versions of lighttpd reject a raw CR.
+                    expectStatus(answer.status, lineBreak === '\r' ? [200, 302, 400, 405] : [200, 302, 405]);
                 }
             });
         }
