@@ -1,13 +1,16 @@
 // Runs a target with its seeds. It must accept those whose name begins with "accepted", and no others.
 //
 //   replay FOLDER
+#include <algorithm>
 #include <exception>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
 #include <iterator>
+#include <random>
 #include <set>
 #include <stdexcept>
+#include <vector>
 
 #include "tests/fuzz/target.h"
 
@@ -52,9 +55,59 @@ int Failures(const std::filesystem::path &folder) {
     return anyGood ? failures : failures + 1;
 }
 
+/// Replaces, inserts, removes, repeats or swaps up to four pieces of a seed.
+std::string Mutate(std::string input, std::mt19937 &random) {
+    constexpr char kCharacters[] = "ABCabc019-_+/=.{}\"\0\x80 ";
+    for (auto edits = random() % 4 + 1; edits > 0; --edits) {
+        const std::size_t at = random() % (input.size() + 1);
+        const std::size_t length = random() % 8;
+        const char character = kCharacters[random() % (sizeof kCharacters - 1)];
+        switch (random() % 5) {
+            case 0:
+                input.replace(at, std::min<std::size_t>(1, input.size() - at), 1, character);
+                break;
+            case 1:
+                input.insert(at, 1, character);
+                break;
+            case 2:
+                input.erase(at, length);
+                break;
+            case 3:
+                input.insert(at, input.substr(random() % (input.size() + 1), length));
+                break;
+            default:
+                input.insert(at, std::string(random() % 2000, character));
+        }
+    }
+    return input;
+}
+
+/// Prints a verdict for each of `count` mutations of the seeds, the same ones on each platform, to compare platforms.
+void PrintVerdicts(const std::filesystem::path &folder, unsigned long count) {
+    const std::filesystem::directory_iterator entries(folder);
+    const std::set<std::filesystem::path> paths(begin(entries), end(entries));
+    std::vector<std::string> seeds;
+    std::transform(paths.begin(), paths.end(), std::back_inserter(seeds), ReadFile);
+    std::mt19937 random(1);  // NOLINT(cert-msc51-cpp): the same on each platform
+    for (unsigned long i = 0; i < count; ++i) {
+        const std::string input = Mutate(seeds.at(random() % seeds.size()), random);
+        std::cout << i << ' ' << input.size() << ' ';
+        try {
+            std::cout << (Fuzz::Accepts(input) ? "accepted" : "refused") << '\n';
+        } catch (const Fuzz::ViolatedProperty &violated) {
+            std::cout << "violates: " << violated.property << '\n';
+        }
+    }
+}
+
 }  // namespace
 
+// replay SEEDS [MUTATIONS]
 int main(int argc, char **argv) try {
+    if (argc == 3) {
+        PrintVerdicts(argv[1], std::stoul(argv[2]));
+        return 0;
+    }
     return argc == 2 && Failures(argv[1]) == 0 ? 0 : 1;
 } catch (const std::exception &error) {
     std::cerr << error.what() << std::endl;
