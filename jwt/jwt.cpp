@@ -250,7 +250,7 @@ bool VerifyHMAC(const std::string &signingInput, const std::string &key, const s
     const BIOPointer chain = PushBase64Filter(std::move(filter), std::move(sink));
 
     unsigned char mac[EVP_MAX_MD_SIZE] = {};
-    const Utils::CleanseOnExit cleanseMAC(mac, sizeof mac);  // the valid signature of a forged token
+    const Utils::CleanseOnExit cleanseMAC(mac, sizeof mac);  // for a forged token, this is the valid signature
     unsigned int macLength = 0;
     if (HMAC(md, keyBytes.bytes.get(), keyBytes.size, reinterpret_cast<const unsigned char *>(signingInput.c_str()),
              std::strlen(signingInput.c_str()), mac, &macLength) == nullptr) {

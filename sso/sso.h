@@ -81,8 +81,8 @@ class sso_op_failed : public sso_exception {
 };
 
 /**
- * Base class of the clients: settings, requests to the provider, and the order of a login. Use an object for one login.
- * Derived classes implement the functions that throw `sso_not_implemented` here.
+ * Base class of the clients: settings, requests to the provider, and the order of a login. Use each object for one
+ * login only. Derived classes implement the functions that throw `sso_not_implemented` here.
  *
  * It has no virtual destructor. Deleting a client through a pointer to this class is undefined behaviour:
  * @code
@@ -93,7 +93,7 @@ class sso_op_failed : public sso_exception {
 class SSOClient {
   public:
     /**
-     * Returns whether the client's file enables it. Does not affect logins.
+     * Returns whether the client's file enables the client. Does not affect logins.
      * @return "azure_sso_enable"; false for WebSphere, whose file has no such key
      */
     virtual bool isEnable();
@@ -103,7 +103,7 @@ class SSOClient {
     virtual std::string GetClientSecret();
     /** Returns the redirect URI. @return as configured, or as set by `SetRedirectURI` */
     virtual std::string GetRedirectURI();
-    /** Returns the ID token. @return compact; empty unless `ProcessTokenResponse` succeeded */
+    /** Returns the ID token. @return the compact form; empty unless `ProcessTokenResponse` succeeded */
     virtual std::string GetToken();
     /** Returns the authorization endpoint. @return as configured */
     virtual std::string GetAuthEndpoint();
@@ -134,8 +134,8 @@ class SSOClient {
     /**
      * Sends the token request (RFC 6749, section 4.1.3). Verifies certificate and host name.
      *
-     * @param response  the response is appended, with any HTTP status; of a failed transfer, the part that arrived.
-     *                  Each chunk is cut at its first NUL
+     * @param response  the response is appended to it, whatever the HTTP status. After a failed transfer, this is the
+     *                  part that arrived. Each chunk is cut at its first NUL
      * @param body      as returned by `GetIDTokenReqParams`
      *
      * Does not throw. Logs a failure at `LOG_ERR`:
@@ -163,7 +163,7 @@ class SSOClient {
     virtual std::string GetIDTokenReqParams();
 
     /**
-     * Reads the user's name from the ID token, unverified.
+     * Reads the user's name from the ID token, without verifying the token.
      *
      * @param userName  receives the name; unchanged in this class
      *
@@ -270,8 +270,8 @@ class AzureSSOClient : public SSOClient {
     void GetUserName(std::string &userName) override;
 
     /**
-     * Stores the ID token of a token response (OpenID Connect Core 1.0, section 3.1.3.3). After a failure there is
-     * none.
+     * Stores the ID token of a token response (OpenID Connect Core 1.0, section 3.1.3.3). After a failure, no token is
+     * stored.
      *
      * @param response  of the token endpoint
      *
@@ -315,8 +315,8 @@ class AzureSSOClient : public SSOClient {
      *  - redirect_uri;
      *  - response_type: "code";
      *  - scope: "openid";
-     *  - state: `state` with the MD5 digest of the nonce as "nonce"; compact JSON and a line feed, in padded base64.
-     *    Percent-decode a returned state before you compare it.
+     *  - state: `state` with the nonce's MD5 digest as its member "nonce", as compact JSON and a line feed, in padded
+     *    base64. Percent-decode a returned state before you compare it.
      *
      * @param state  a JSON object, or null; up to 721 bytes as compact JSON. A member "nonce" is replaced and does not
      *               count
@@ -331,8 +331,8 @@ class AzureSSOClient : public SSOClient {
     std::string GetAccessTokenReqURI(const Json::Value &state);
 
     /**
-     * Writes "Location: ", the URL of `GetAccessTokenReqURI` and two line feeds to `std::cout`, unflushed; nothing if
-     * that throws. Write other header lines before, and nothing after.
+     * Writes "Location: ", the URL of `GetAccessTokenReqURI` and two line feeds to `std::cout`, and does not flush it.
+     * Writes nothing if `GetAccessTokenReqURI` throws. Write other header lines before this call, and nothing after it.
      *
      * @param state  as for `GetAccessTokenReqURI`
      */
@@ -382,7 +382,7 @@ class WebSphereSSOClient : public SSOClient {
     void GetUserName(std::string &userName) override;
 
     /**
-     * Stores the ID token of a token response. After a failure there is none. Ignores "error".
+     * Stores the ID token of a token response. After a failure, no token is stored. Ignores "error".
      *
      * @param response  of the token endpoint
      *
@@ -434,7 +434,8 @@ class SSOProfile {
     /**
      * Returns the settings of the client, as a base client, which cannot log in. Use `SSOIsEnable`, not its `isEnable`.
      *
-     * @return owned by this object, never null; empty if single sign-on is off or the profile is unknown
+     * @return a client that this object owns, never null. Its settings are empty if single sign-on is off or the
+     *         profile is unknown
      */
     SSOClient *GetSSOClient();
 
@@ -463,8 +464,8 @@ void OIDCLogin(const std::string &code, std::string &userName);
  * Returns the address of the relay page, which shows the result of a login.
  *
  * @param success  whether the login succeeded
- * @param state    as received with the code; used on success. Base64 of a JSON object, whose string "origin" is
- *                 percent-encoded; anything else omits the origin
+ * @param state    used on success: the state received with the code, which is base64 of a JSON object. Its string
+ *                 "origin" is percent-encoded into the address; without one, the origin is omitted
  * @param reason   used on failure. Copied verbatim: percent-encode it. Omitted if empty
  * @return "ssoclient/relay.html#" and "origin=ORIGIN&success=true" or "reason=REASON&success=false"; relative to the
  *         web root of the appliance's pages
@@ -475,7 +476,7 @@ std::string GetSSORelayURL(bool success, const std::string &state, const std::st
  * Returns the URL that ends the Azure session and then opens the relay page (OpenID Connect RP-Initiated Logout 1.0,
  * section 2). WebSphere has none: end your own session only. Log lines and side effects: those of `AzureSSOClient()`.
  *
- * @param base  the URL of the web interface. A trailing "/index.cgi", then a trailing "/", is removed, and
+ * @param base  the URL of the web interface. A trailing "/index.cgi" and then a trailing "/" are removed, and
  *              "/webman/ssoclient/relay.html" is appended
  * @return the logout endpoint with the relay page as "post_logout_redirect_uri"; only the endpoint if `base` is empty
  *
@@ -504,7 +505,7 @@ void httpGet(const std::string &url, std::string &response, bool verifySSL,
 /**
  * Posts a form (application/x-www-form-urlencoded). Otherwise as `httpGet`.
  *
- * @param url            of the form's receiver
+ * @param url            that receives the form
  * @param body           sent verbatim, up to its first NUL
  * @param response       as for `httpGet`
  * @param verifySSL      as for `httpGet`

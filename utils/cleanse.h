@@ -23,8 +23,8 @@ class CleanseOnExit {
 
 inline void Cleanse(std::string &text) { explicit_bzero(text.data(), text.size()); }
 
-/// The same for a text. Let the text grow only by AppendSecret or within its capacity: any other reallocation would
-/// leave an uncleared copy.
+/// Overwrites a text at the end of a scope. Let the text grow only by AppendSecret or within its capacity: any other
+/// reallocation would leave an uncleared copy.
 class CleanseTextOnExit {
   public:
     explicit CleanseTextOnExit(std::string &text) : text_(text) {}

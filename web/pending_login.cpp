@@ -21,9 +21,8 @@ constexpr char kCookieSlots[] = "0123456789abcdef";
 
 std::string CookieName(char slot) { return std::string("__Host-login-") + slot; }
 
-/// Returns a cookie name that the browser does not use yet, so that logins in other tabs continue. Starts at the
-/// login's random name, so that tabs that start at once rarely choose the same. If all names are in use, returns one of
-/// them.
+/// Returns a cookie name that the browser does not use yet, so that logins in other tabs continue. The search starts at
+/// a random name, so that simultaneous logins rarely choose the same one. If all names are in use, returns one of them.
 std::string FreeCookieName(const std::string &cookies, const std::string &login) {
     const std::string slots = kCookieSlots;
     const std::size_t first = slots.find(login.front());
@@ -36,7 +35,7 @@ std::string FreeCookieName(const std::string &cookies, const std::string &login)
     return CookieName(login.front());
 }
 
-/// Returns the login of a cookie's value: the first half of its SHA-256, in hexadecimal.
+/// Returns the name of the login that a cookie's value identifies: the first half of its SHA-256, in hexadecimal.
 std::string LoginOf(const std::string &secret) {
     unsigned char digest[EVP_MAX_MD_SIZE];
     if (EVP_Digest(secret.data(), secret.size(), digest, nullptr, EVP_sha256(), nullptr) != 1) {
@@ -115,12 +114,12 @@ PendingLogin EndLogin(Response &response, std::string &origin, const Request &re
     if (StringMember(started, "format") != kFormat) {
         throw Refusal("This sign-in took too long, or was already completed.");
     }
-    // A user can write another state with the user's own cookie, for example with the nonce of a stolen token.
+    // A user can return another state with a valid cookie, for example one with the digest of a stolen token's nonce.
     if (state != StringMember(started, "state")) {
         throw Refusal("This sign-in was changed on its way.");
     }
     origin = StringMember(returned, "origin");
-    // The code must not be sent to another provider with that provider's client secret.
+    // Changed settings could send the code to another provider, with the client secret of that provider.
     const Json::Value settings = RequireSettings();
     if (settings != started["settings"]) {
         throw Refusal("The settings of this device were changed during this sign-in.");

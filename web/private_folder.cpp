@@ -49,7 +49,7 @@ Descriptor OpenFolderIn(const Descriptor &parent, const std::string &name) {
             "The front end's folder cannot be opened"};
 }
 
-/// Opens a parent folder. Only root or this user may be able to replace what is in it.
+/// Opens a parent folder. Throws if anyone but root and this user can replace its entries.
 Descriptor OpenTrusted(const Descriptor &parent, const std::string &name) {
     Descriptor folder = OpenFolderIn(parent, name);
     const struct stat status = StatusOf(folder);
@@ -130,7 +130,7 @@ struct CloseDirectory {
     void operator()(DIR *directory) const { closedir(directory); }
 };
 
-/// Returns the names of texts, including unfinished ones. Ignores other files.
+/// Returns the names of the stored texts, including unfinished ones. Ignores other files.
 std::vector<std::string> NamesIn(const Descriptor &folder) {
     const int reopened = openat(folder.Number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     const std::unique_ptr<DIR, CloseDirectory> directory(reopened < 0 ? nullptr : fdopendir(reopened));

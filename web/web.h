@@ -1,7 +1,7 @@
 /**
  * @file
- * A secure sign-in for a web front end: what a program needs around the library's login. Link `tavosso::web` with
- * CMake, or `tavosso-web` with pkg-config.
+ * Secure sign-in for a web front end: the checks that a program must add to the library's login. Link `tavosso::web`
+ * with CMake, or `tavosso-web` with pkg-config.
  */
 #ifndef TAVOSSO_WEB_WEB_H
 #define TAVOSSO_WEB_WEB_H
@@ -68,8 +68,8 @@ class Response {
 };
 
 /**
- * Stores logins between start and return. Several requests may use the same store at once. `StartLogin` and
- * `FinishLogin` return what a store throws as `Failure::kStorage`; its text becomes the `reason`.
+ * Stores logins between start and return. Several requests may use the same store at once. If a store throws,
+ * `StartLogin` and `FinishLogin` return `Failure::kStorage` with the exception's text as the `reason`.
  */
 class LoginStore {
   public:
@@ -84,7 +84,7 @@ class LoginStore {
     [[nodiscard]] virtual bool Keep(const std::string &name, const std::string &text) = 0;
 
     /**
-     * Returns a login and removes it. Of two requests that take the same login, one gets it.
+     * Returns a login and removes it. If two requests take the same login, only one gets it.
      * @param name  as given to `Keep`
      * @return the text; nothing if it is unknown, taken or older than `kLoginSeconds`
      */
@@ -144,7 +144,7 @@ enum class Failure {
     kProviderRefused,   ///< "provider_refused": the provider reported an error; see `FailedLogin::providerError`
     kNetwork,           ///< "network": a request to the provider failed
     kCertificate,       ///< "certificate": the provider's certificate was refused
-    kInvalidResponse,   ///< "invalid_response": a response of the provider is not what it must be
+    kInvalidResponse,   ///< "invalid_response": a response of the provider cannot be used
     kInvalidToken,      ///< "invalid_token": the ID token is malformed, or has another audience or algorithm
     kTokenExpired,      ///< "token_expired": the ID token has expired, or this machine's clock is wrong
     kOtherTenant,       ///< "other_tenant": the account belongs to another organisation
@@ -163,11 +163,11 @@ std::string NameOf(Failure failure);
 /** A login that failed. */
 struct FailedLogin {
     Failure failure = Failure::kInternal;  ///< the code
-    std::string reason;  ///< one printable line for the log, without secrets; the library's texts are fixed
-    std::string
-        providerError;  ///< the provider's "error" (RFC 6749); empty for others, and if the library does not report it
-    std::string sentence;  ///< one sentence for the user, in English
-    std::string hint;      ///< what an administrator can do
+    std::string reason;         ///< one printable line for the log, without secrets; the library's texts are fixed
+    std::string providerError;  ///< the provider's "error" (RFC 6749); empty for other failures, and if the library
+                                ///< does not report it
+    std::string sentence;       ///< one sentence for the user, in English
+    std::string hint;           ///< what an administrator can do
 };
 
 /**
@@ -177,15 +177,15 @@ struct FailedLogin {
  */
 FailedLogin FailedLoginOf(const std::exception &error);
 
-/** A login that was started, or was not. */
+/** The result of `StartLogin`. */
 struct StartedLogin {
-    Response response;                   ///< sends the browser to the provider; of a failed start only its headers
+    Response response;                   ///< redirects the browser to the provider; has only headers after a failure
     std::optional<FailedLogin> failure;  ///< nothing if the login was started
     std::string origin;                  ///< the page to return to
 };
 
 /**
- * Returns whether the provider sent the browser, for a program that is both start and redirect URI.
+ * Returns whether the provider sent the browser, for a program that handles both the start and the return.
  * @param request  of the browser
  * @return whether the query has "state" or "error" (RFC 6749, section 4.1.2)
  */
@@ -213,7 +213,7 @@ struct User {
     Json::Value claims;       ///< all claims of the verified ID token
 };
 
-/** How a login ended. */
+/** The result of `FinishLogin`. */
 struct FinishedLogin {
     Response response;                   ///< expires the login's cookie; the caller adds the session and a redirect
     std::optional<User> user;            ///< the user, if the login succeeded
@@ -222,9 +222,9 @@ struct FinishedLogin {
     std::string state;                   ///< as received, percent-decoded: for `GetSSORelayURL`
 };
 
-/** What the caller accepts. */
+/** Options of `FinishLogin`. */
 struct FinishOptions {
-    /** Whether "email" names an Azure user although the provider has not verified it. Often the user chooses it. */
+    /** Whether an unverified "email" may name an Azure user. Users can often choose that address. */
     bool acceptUnverifiedEmail = false;
 };
 
@@ -236,7 +236,7 @@ struct FinishOptions {
  *
  * @param request  of the browser, with method GET
  * @param store    as given to `StartLogin`
- * @param options  what to accept
+ * @param options  what else to accept
  * @return the user or the failure; failures are returned, not thrown
  *
  * Log lines: those of the library's steps; and, at `LOG_AUTH | LOG_ERR`, "frontend: jwks_uri of the discovery document

@@ -1,4 +1,4 @@
-// Compares the verification of an ID token with 1 KB of claims with the floor and with other libraries.
+// Compares how fast the library, the floor (floor.cpp) and other libraries verify an ID token with 1 KB of claims.
 #include <cstdlib>
 
 #include "bench/comparison.h"

@@ -12,7 +12,7 @@ const NOT_KNOWN = 'Something went wrong. Try again. If the problem persists, con
 
 // Keys are the beginnings of reasons; a provider may append text.
 export const EXPLANATIONS = new Map([
-    ['id_token expired.', 
+    ['id_token expired.',
         'Your sign-in took too long. Try again. If the problem persists, the clock of this device may be wrong.'],
     ['This sign-in took too long', TOO_LONG],
     ['The provider refused: invalid_grant', TOO_LONG],

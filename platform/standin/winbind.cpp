@@ -70,8 +70,8 @@ Message Ask(const char *domain) {
     return message;
 }
 
-/// Runs the child process. libwbclient waits for minutes and has no time limit, so an alarm ends the child. The program
-/// may have blocked or handled SIGALRM.
+/// Runs the child process. An alarm ends it, because libwbclient waits for minutes and cannot be given a time limit.
+/// SIGALRM is reset and unblocked first, because the program may have handled or blocked it.
 [[noreturn]] void AskInChild(const char *domain, int out) {
     std::signal(SIGALRM, SIG_DFL);
     sigset_t signals;
@@ -86,14 +86,14 @@ Message Ask(const char *domain) {
     _exit(write(out, &message, sizeof message) == sizeof message ? 0 : 1);
 }
 
-/// Waits until the child has ended. Other code of the program may collect it.
+/// Waits until the child has ended. Other code of the program may reap it first.
 void WaitForEnd(pid_t child) {
     while (waitpid(child, nullptr, 0) < 0 && errno == EINTR) {
     }
 }
 
-/// Reads the answer of the child, which has ended. Never waits: the pipe is non-blocking, since another fork of the
-/// program may hold its other end open.
+/// Reads the answer of the child, which has ended. The pipe is non-blocking, because another child of the program may
+/// hold its other end open.
 std::optional<Message> Receive(int in) {
     Message message{};
     return read(in, &message, sizeof message) == sizeof message ? std::optional(message) : std::nullopt;

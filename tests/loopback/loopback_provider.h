@@ -21,7 +21,7 @@ enum class Profile { kAzure, kWebSphere };
 std::string Name(Profile profile);
 void PrintTo(Profile profile, std::ostream *stream);
 
-/// The user name of the appliance for the tokens of this provider.
+/// The appliance's name for the user of this provider's tokens.
 std::string UserName(Profile profile);
 
 constexpr char kSecret[] = "a secret & 100 % only of this test";
@@ -55,8 +55,8 @@ Json::Value Change(Json::Value value, const std::string &changes);
 Json::Value TokenHeader(Profile profile);
 Json::Value TokenClaims(Profile profile);
 
-/// Signed as "alg" requires: HSnnn with the secret, every other value with the provider's RSA key; with SHA-256 if
-/// "alg" names no digest.
+/// Signs as "alg" requires: HSnnn with the secret, every other value with the provider's RSA key. Uses SHA-256 if "alg"
+/// names no digest.
 std::string SignedToken(const Json::Value &header, const Json::Value &claims, const std::string &secret = kSecret);
 
 std::string TokenResponse(const std::string &idToken);
@@ -67,17 +67,17 @@ std::string KeySet(const std::string &changes = "{}");
 /// A provider, and the appliance's configuration for it.
 class Provider {
   public:
-    /// `changes` apply to the client's configuration file. $BASE in them and in every answer is the provider's URL.
+    /// Applies `changes` to the client's configuration file. Replaces $BASE in them and in every answer by its URL.
     explicit Provider(Profile profile, const std::string &changes = "{}");
 
     void Answer(const std::string &body);
     void AnswerByteByByte(const std::string &answer);
     void Play(const Script &script);
 
-    /// The discovery document and key set, if the profile uses them.
+    /// Answers with the discovery document and the key set, if the profile uses them.
     void AnswerVerification();
 
-    /// The token and the documents to verify it.
+    /// Answers with the token and the documents to verify it.
     void AnswerLogin(const std::string &idToken);
 
     Outcome LogIn();
