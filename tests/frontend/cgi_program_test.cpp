@@ -69,7 +69,7 @@ TEST_F(Program, DisablesCoreFilesAndTracing) {
 
 #ifndef __SANITIZE_ADDRESS__
 TEST_F(Program, LimitsAddressSpaceToOneGigabyte) {
-    if (Test::IsEmulated()) {
+    if (::Test::IsEmulated()) {
         GTEST_SKIP() << "qemu-user ignores the limit";
     }
     const auto examine = [](Response &) { _exit(LimitOf(RLIMIT_AS) == rlim_t{1} << 30 ? 42 : 1); };

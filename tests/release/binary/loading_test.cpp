@@ -95,7 +95,7 @@ int StatusOfLoadingWithoutWriting(void (*then)()) {
 }
 
 TEST(Loading, WritesNothing) {
-    if (Test::IsEmulated()) {
+    if (::Test::IsEmulated()) {
         GTEST_SKIP() << "qemu-user has no system call filters";
     }
     const int status = StatusOfLoadingWithoutWriting([] {});
@@ -104,7 +104,7 @@ TEST(Loading, WritesNothing) {
 }
 
 TEST(Loading, IsKilledOnWrite) {
-    if (Test::IsEmulated()) {
+    if (::Test::IsEmulated()) {
         GTEST_SKIP() << "qemu-user has no system call filters";
     }
     for (auto *write : {
