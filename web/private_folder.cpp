@@ -256,10 +256,10 @@ bool PrivateFolder::CountOneMore() {
     }
     const Json::Value known = ParseObject(ReadAll(counter));
     const std::time_t now = Now();
-    const std::time_t swept = known["swept"].isInt64() ? known["swept"].asInt64() : 0;
+    const Json::Int64 swept = known["swept"].isInt64() ? known["swept"].asInt64() : 0;
     const bool isRecent = swept <= now && now - swept < kSecondsBetweenSweeps && known["count"].isUInt64() &&
                           known["count"].asUInt64() < capacity;
-    const std::size_t count = isRecent ? known["count"].asUInt64() : Sweep();
+    const Json::UInt64 count = isRecent ? known["count"].asUInt64() : Sweep();
     const bool hasRoom = count < capacity;
 
     Json::Value counted;

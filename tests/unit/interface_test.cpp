@@ -22,10 +22,11 @@ static_assert(!std::is_polymorphic_v<JWT::Jwt>);
 
 static_assert(std::is_base_of_v<SSO::SSOClient, SSO::AzureSSOClient>);
 static_assert(std::is_base_of_v<SSO::SSOClient, SSO::WebSphereSSOClient>);
-static_assert(sizeof(SSO::SSOClient) == 16 + 9 * sizeof(std::string));
+constexpr std::size_t kFirstText = 2 * sizeof(void *);  // after the virtual table and a bool
+static_assert(sizeof(SSO::SSOClient) == kFirstText + 9 * sizeof(std::string));
 static_assert(sizeof(SSO::AzureSSOClient) == sizeof(SSO::SSOClient) + sizeof(std::string));
 static_assert(sizeof(SSO::WebSphereSSOClient) == sizeof(SSO::SSOClient));
-static_assert(sizeof(SSO::SSOProfile) == 16 + sizeof(std::string) + sizeof(SSO::SSOClient));
+static_assert(sizeof(SSO::SSOProfile) == kFirstText + sizeof(std::string) + sizeof(SSO::SSOClient));
 static_assert(sizeof(JWT::Jwt) == 3 * sizeof(std::string));
 
 // Sizes do not always reveal a changed alignment.
@@ -160,11 +161,12 @@ TEST_F(Interface, BaseStartsDisabledAndEmpty) {
 }
 
 TEST_F(Interface, BaseKeepsOrderOfFields) {
-    constexpr std::ptrdiff_t string = sizeof(std::string);
+    std::vector<std::ptrdiff_t> offsets = {sizeof(void *)};
+    for (std::size_t i = 0; i < 9; ++i) {
+        offsets.push_back(static_cast<std::ptrdiff_t>(kFirstText + i * sizeof(std::string)));
+    }
     BaseFields fields;
-    EXPECT_THAT(fields.Offsets(),
-                testing::ElementsAre(8, 16, 16 + string, 16 + 2 * string, 16 + 3 * string, 16 + 4 * string,
-                                     16 + 5 * string, 16 + 6 * string, 16 + 7 * string, 16 + 8 * string));
+    EXPECT_THAT(fields.Offsets(), testing::ElementsAreArray(offsets));
 }
 
 TEST_F(Interface, AzureAppendsTenant) {
@@ -176,9 +178,9 @@ TEST_F(Interface, ProfileKeepsOrderOfFields) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure"})");
     SSO::SSOProfile profile;
     char *start = reinterpret_cast<char *>(&profile);
-    EXPECT_EQ(*reinterpret_cast<bool *>(start + 8), true);
-    EXPECT_EQ(*reinterpret_cast<std::string *>(start + 16), "azure");
-    EXPECT_EQ(Offset(profile, *profile.GetSSOClient()), static_cast<std::ptrdiff_t>(16 + sizeof(std::string)));
+    EXPECT_EQ(*reinterpret_cast<bool *>(start + sizeof(void *)), true);
+    EXPECT_EQ(*reinterpret_cast<std::string *>(start + kFirstText), "azure");
+    EXPECT_EQ(Offset(profile, *profile.GetSSOClient()), static_cast<std::ptrdiff_t>(kFirstText + sizeof(std::string)));
 }
 
 TEST_F(Interface, TokenKeepsOrderOfFields) {
