@@ -11,7 +11,8 @@ namespace Test {
 /// Whether qemu-user runs this program. It supports neither system call filters nor user namespaces, and ignores limits
 /// on the address space. The kernel would report the null pointer.
 inline bool IsEmulated() {
-    return prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, nullptr) == -1 && errno == EINVAL;
+    const int result = prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, nullptr);
+    return result == -1 && errno == EINVAL;
 }
 
 }  // namespace Test
