@@ -14,7 +14,7 @@ struct CloseURL {
 
 std::string Piece(CURLU *url, CURLUPart part) {
     char *text = nullptr;
-    if (curl_url_get(url, part, &text, 0) != CURLUE_OK) {
+    if (curl_url_get(url, part, &text, CURLU_DEFAULT_PORT) != CURLUE_OK) {
         return {};
     }
     const std::unique_ptr<char, void (*)(void *)> owner(text, curl_free);
@@ -31,6 +31,7 @@ Address SplitAddress(const std::string &url) {
     return {true,
             Piece(parsed.get(), CURLUPART_SCHEME),
             Piece(parsed.get(), CURLUPART_HOST),
+            Piece(parsed.get(), CURLUPART_PORT),
             Piece(parsed.get(), CURLUPART_PATH),
             Piece(parsed.get(), CURLUPART_QUERY),
             Piece(parsed.get(), CURLUPART_FRAGMENT)};

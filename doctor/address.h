@@ -5,11 +5,12 @@
 
 namespace Doctor {
 
-/// A URL (RFC 3986) in the pieces that a finding can be about.
+/// The components of a URL (RFC 3986).
 struct Address {
     bool isValid = false;
     std::string scheme;
     std::string host;
+    std::string port;  // the default of the scheme if the URL has none
     std::string path;
     std::string query;
     std::string fragment;

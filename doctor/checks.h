@@ -8,28 +8,32 @@
 
 #include "doctor/client.h"
 #include "doctor/report.h"
+#include "doctor/settings_file.h"
 
-// The groups of checks, in the order in which one makes sense after the other.
+// The groups of checks, in the order of a login.
 namespace Doctor {
 
-/// The profile file, as a login of a program with the ids of this process finds it. Nothing where no profile is in
-/// force.
-std::optional<Profile> CheckProfile(Report &report);
+/// The profile file, read with the ids of this process. Returns nothing if no profile is configured.
+std::optional<Profile> CheckProfile(Report &report, RunAs runAs);
+
+/// Returns whether the client id cannot be the client secret. Azure AD's ids are GUIDs.
+bool MayPrintClientID(Client &client);
+
+/// Hides the client secret, and the id of an Azure client if it may be the secret.
+void HideSecrets(Report &report, Client &client);
 
 /// The file of the profile's client, key by key.
-void CheckClientFile(Report &report, Client &client, const std::string &returnProgram);
+void CheckClientFile(Report &report, Client &client, const std::string &returnProgram, RunAs runAs);
 
-/// The discovery document, the certificate of its server, the clock, the authorization endpoint, the key set, and the
-/// token endpoint. The latter is asked to exchange a code that was made up, which tells whether it takes the client's
-/// id and secret.
+/// The discovery document, certificates, the clock, the authorization endpoint, the key set, and the token endpoint,
+/// which receives a test code with the client's id and secret.
 void CheckProvider(Report &report, Client &client);
 
-/// What the platform converts domains by; of one domain, or that of a user, if one is told, which source answers.
-void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser);
+/// The platform's sources of domain names. Converts a domain, or the name of a user, if there is one.
+void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser, RunAs runAs);
 
-/// Has the library verify an ID token and find the user's name in it, and reports its steps. Those that need the
-/// provider's keys are left out unless it may fetch them. Returns the id of the step at which the library stops, empty
-/// if at none.
+/// Verifies an ID token with the library. Steps that need the provider's keys are not checked unless `mayFetch`.
+/// Returns the id of the step at which the library stops, or an empty text.
 std::string CheckToken(Report &report, Client &client, const std::string &token, bool mayFetch);
 
 }  // namespace Doctor

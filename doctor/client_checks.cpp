@@ -5,11 +5,13 @@
 #include <boost/algorithm/string/predicate.hpp>
 #include <boost/algorithm/string/trim.hpp>
 #include <iterator>
-#include <regex>
 #include <vector>
 
 #include "doctor/address.h"
+#include "doctor/azure_checks.h"
 #include "doctor/checks.h"
+#include "doctor/file_text.h"
+#include "doctor/guid.h"
 #include "doctor/settings_file.h"
 #include "doctor/watch.h"
 #include "web/text.h"
@@ -19,27 +21,29 @@ namespace Doctor {
 namespace {
 
 enum class Kind {
-    kSwitch,  // which no login looks at
+    kSwitch,  // not read by logins
     kIdentifier,
+    kGUID,      // an identifier of Azure AD
+    kClientID,  // a GUID that may have been confused with the secret
     kSecret,
-    kEndpoint,  // that is asked as it stands
-    kQueried,   // that a query is put behind
+    kEndpoint,  // used verbatim
+    kQueried,   // used with a query appended
     kRedirectURI,
-    kSpare,  // that no login needs
+    kSpare,  // not used by logins
 };
 
 struct Key {
     const char *name;  // without the profile's prefix
     Kind kind;
-    std::string (*read)(Client &client);  // as the library has read it; null for the switch
+    std::string (*read)(Client &client);  // returns the library's value; null for the switch
 };
 
 constexpr Key kAzureKeys[] = {
     {"sso_enable", Kind::kSwitch, nullptr},
     {"wellknown", Kind::kEndpoint, [](Client &client) { return client->GetWellknownEndpoint(); }},
-    {"client_id", Kind::kIdentifier, [](Client &client) { return client->GetClientID(); }},
+    {"client_id", Kind::kClientID, [](Client &client) { return client->GetClientID(); }},
     {"client_secret", Kind::kSecret, [](Client &client) { return client->GetClientSecret(); }},
-    {"tenant_id", Kind::kIdentifier, [](Client &client) { return client.Azure()->GetTenantID(); }},
+    {"tenant_id", Kind::kGUID, [](Client &client) { return client.Azure()->GetTenantID(); }},
     {"authorization_endpoint", Kind::kQueried, [](Client &client) { return client->GetAuthEndpoint(); }},
     {"token_endpoint", Kind::kEndpoint, [](Client &client) { return client->GetTokenEndpoint(); }},
     {"redirect_uri", Kind::kRedirectURI, [](Client &client) { return client->GetRedirectURI(); }},
@@ -79,11 +83,21 @@ class KeyCheck {
             return;
         }
         if (boost::trim_copy(value_) != value_ || !TAVO::Web::IsPrintable(value_)) {
-            Finding("has blanks around it or control characters in it",
-                    "take them out: the text is used as it stands, letter by letter");
+            Finding("begins or ends with a blank, or contains an invisible character",
+                    "Type the value of " + name_ + " again. The library uses it verbatim.");
+            return;
+        }
+        if (const std::string pasted = FindPastedCharacter(value_); !pasted.empty()) {
+            Finding("contains a " + pasted, "Type the value of " + name_ + " again instead of pasting it.");
             return;
         }
         switch (key.kind) {
+            case Kind::kGUID:
+                CheckGUID();
+                break;
+            case Kind::kClientID:
+                CheckClientID();
+                break;
             case Kind::kSecret:
                 CheckSecret();
                 break;
@@ -95,7 +109,7 @@ class KeyCheck {
                 CheckRedirectURI();
                 break;
             case Kind::kSpare:
-                report_.Good(id_, name_, Quoted(value_) + "; no login uses it");
+                report_.Good(id_, name_, Quoted(value_) + "; sign-in does not use it");
                 break;
             default:
                 report_.Good(id_, name_, Quoted(value_));
@@ -108,10 +122,10 @@ class KeyCheck {
     void CheckSwitch() {
         const Json::Value &value = file_.content[name_];
         if (value.isNull() || value.isBool()) {
-            report_.Good(id_, name_, "no login looks at it: the profile decides");
+            report_.Good(id_, name_, "sign-in does not use it; the profile decides");
         } else {
-            report_.Note(id_, name_, "is no boolean, and so counts as false; no login looks at it",
-                         "set it to true or false");
+            report_.Note(id_, name_, "is not a boolean, so it counts as false; sign-in does not use it",
+                         "Set " + name_ + " to true or false, without quotation marks.");
         }
     }
 
@@ -119,27 +133,59 @@ class KeyCheck {
         const Json::Value &value = file_.content[name_];
         const std::string found = !file_.content.isMember(name_) ? "is missing"
                                   : value.isString()             ? "is empty"
-                                                                 : "is no text: the library takes it for empty";
+                                                                 : "is not a string, so it counts as empty";
         if (key.kind == Kind::kSpare) {
-            report_.Good(id_, name_, found + "; no login uses it");
+            report_.Good(id_, name_, found + "; sign-in does not use it");
         } else if (id_ == "client.logout_endpoint") {
-            report_.Note(id_, name_, found + ": a sign-out ends at this machine, and not at the provider",
-                         "set it to the provider's " + Quoted("end_session_endpoint"));
+            report_.Note(id_, name_, found + ": signing out ends the session of this machine only",
+                         "Set " + name_ + R"( to the "end_session_endpoint" of the discovery document.)");
         } else {
-            Finding(found, "set it, in quotation marks, as the provider has registered or published it");
+            Finding(found,
+                    "Set " + name_ + " in " + file_.path + ", in quotation marks, to " + SourceOf(key.kind) + ".");
         }
+    }
+
+    static std::string SourceOf(Kind kind) {
+        return kind == Kind::kGUID                                    ? "the directory (tenant) ID at the provider"
+               : kind == Kind::kClientID || kind == Kind::kIdentifier ? "the client (application) ID at the provider"
+               : kind == Kind::kSecret                                ? "the client secret of the provider"
+               : kind == Kind::kRedirectURI ? "the redirect URI that is registered at the provider"
+                                            : "the address that the provider publishes";
+    }
+
+    void CheckGUID() {
+        if (IsGUID(value_)) {
+            report_.Good(id_, name_, Quoted(value_));
+            return;
+        }
+        Finding(
+            Quoted(value_) + R"( is not a GUID. A token's "tid" always is)",
+            "Set " + name_ + " to " + SourceOf(Kind::kGUID) + R"(, such as "9f3c7a52-1b0e-4d43-8f0a-6c5d4e3f2a1b".)");
+    }
+
+    void CheckClientID() {
+        if (IsGUID(value_)) {
+            report_.Good(id_, name_, Quoted(value_));
+            return;
+        }
+        const bool isSwapped = IsGUID(client_->GetClientSecret());
+        Finding(std::string("is not a GUID") + (isSwapped ? ", and azure_client_secret is: they are swapped"
+                                                          : ". Its value is not printed, it may be the client secret"),
+                isSwapped ? "Swap the values of azure_client_id and azure_client_secret."
+                          : "Set " + name_ + " to " + SourceOf(Kind::kClientID) + ".");
     }
 
     void CheckSecret() {
         const std::string found = "is set, " + std::to_string(value_.size()) + " bytes";
         const bool isKey = client_.profile() == Profile::kWebSphere;
         if (isKey && value_.size() > TAVO::SSO::kLongestSecret) {
-            Finding(found + ": too long", "get one of at most " + std::to_string(TAVO::SSO::kLongestSecret) +
-                                              " bytes from the provider: with a longer one no token can be verified");
+            Finding(found + ": too long", "Request a client secret of at most " +
+                                              std::to_string(TAVO::SSO::kLongestSecret) +
+                                              " bytes from the provider. A longer one cannot verify tokens.");
         } else if (isKey && value_.size() < kShortestWebSphereKey) {
-            report_.Note(id_, name_,
-                         found + ": the shorter a key, the easier it is found by trying, for whoever has a token",
-                         "get one of at least " + std::to_string(kShortestWebSphereKey) + " bytes from the provider");
+            report_.Note(id_, name_, found + ". An attacker who has a token can find a short secret by brute force",
+                         "Request a client secret of at least " + std::to_string(kShortestWebSphereKey) +
+                             " bytes from the provider.");
         } else {
             report_.Good(id_, name_, found);
         }
@@ -148,13 +194,14 @@ class KeyCheck {
     void CheckEndpoint(Kind kind) {
         const Address address = SplitAddress(value_);
         if (!address.isValid) {
-            Finding(Quoted(value_) + " is no address", "write the whole of it, from https:// on");
+            Finding(Quoted(value_) + " is not a URL",
+                    "Set " + name_ + " to " + SourceOf(kind) + R"(, beginning with "https://".)");
         } else if (address.scheme != "https") {
-            Finding(Quoted(value_) + " is not https: whoever listens on the way reads secret, codes and tokens",
-                    "use the provider's https address");
+            Finding(Quoted(value_) + " is not an https:// URL: others on the network can read secret, codes and tokens",
+                    "Set " + name_ + " to the https:// URL of the provider.");
         } else if (kind == Kind::kQueried && (!address.query.empty() || !address.fragment.empty())) {
-            Finding(Quoted(value_) + " has a query or fragment of its own, behind which a second query would be put",
-                    R"(leave out what stands from "?" or "#" on)");
+            Finding(Quoted(value_) + " has a query or a fragment. The library appends a second query",
+                    "Set " + name_ + " to " + Quoted(value_.substr(0, value_.find_first_of("?#"))) + ".");
         } else {
             report_.Good(id_, name_, Quoted(value_));
         }
@@ -163,12 +210,14 @@ class KeyCheck {
     void CheckRedirectURI() {
         const Address address = SplitAddress(value_);
         if (!address.isValid || address.scheme != "https" || !address.fragment.empty()) {
-            Finding(Quoted(value_) + " is no https address without fragment",
-                    "write it as it is registered at the provider: https://THIS-MACHINE" + returnProgram_);
+            Finding(Quoted(value_) + " must be an https:// URL without a fragment",
+                    "Set " + name_ + " to the redirect URI that is registered at the provider: https://HOST" +
+                        returnProgram_);
         } else if (address.path != returnProgram_) {
-            Finding(Quoted(value_) + " does not lead to the return program: its path is " + Quoted(address.path),
-                    "let it end in " + Quoted(returnProgram_) +
-                        ", here and at the provider; or tell of another program with --return-program");
+            Finding(Quoted(value_) + " is not the address of the return program: its path is " + Quoted(address.path),
+                    "Set " + name_ + " to " + Quoted("https://" + address.host + returnProgram_) +
+                        " here and at the provider. If the return program has another path, name it with "
+                        "--return-program.");
         } else {
             report_.Good(id_, name_, Quoted(value_));
         }
@@ -183,64 +232,52 @@ class KeyCheck {
     std::string value_;
 };
 
-/// Addresses of Azure AD hold the tenant by its id, by a domain name, or by a word for several tenants.
-void CheckTenant(Report &report, Client &client) {
-    constexpr char kID[] = "client.tenant";
-    constexpr char kSubject[] = "tenant in the endpoints";
-    const std::string tenant = client.Azure()->GetTenantID();
-    const std::string endpoints[] = {client->GetWellknownEndpoint(), client->GetAuthEndpoint(),
-                                     client->GetTokenEndpoint()};
-    static const std::regex uuid("[0-9a-fA-F]{8}(-[0-9a-fA-F]{4}){3}-[0-9a-fA-F]{12}");
-    bool occurs = false;
-    for (const std::string &endpoint : endpoints) {
-        const std::string looked = endpoint.substr(0, 2048);  // the expressions of the C++ library recurse
-        occurs = occurs || (!tenant.empty() && boost::icontains(looked, tenant));
-        std::smatch other;
-        if (std::regex_search(looked, other, uuid) && !boost::iequals(other.str(), tenant)) {
-            report.Finding(kID, kSubject,
-                           Quoted(endpoint) + " belongs to the tenant " + other.str() + ", and azure_tenant_id is " +
-                               Quoted(tenant),
-                           "set azure_tenant_id to the directory whose users sign in, and take the addresses from it");
-            return;
-        }
-    }
-    if (occurs) {
-        report.Good(kID, kSubject, "they name the tenant " + Quoted(tenant));
-    } else {
-        report.Note(kID, kSubject, "none of them names the tenant " + Quoted(tenant),
-                    "compare it with the directory's id at the provider: a token's \"tid\" has to equal it");
-    }
-}
-
-void ReportIDs(Report &report) {
+void ReportIDs(Report &report, RunAs runAs) {
+    constexpr char kID[] = "client.ids";
+    constexpr char kSubject[] = "root's ids";
     for (const std::string &line : TakeLogLines()) {
         report.Detail(line);
         if (boost::contains(line, "ERROR: ENTERCriticalSection")) {
-            report.Finding("client.ids", "root's ids",
-                           "this process could not become root for reading the file, nor can such a program",
-                           "let the web server start its programs as root, or with root as saved ids");
+            if (runAs == RunAs::kOrdinaryUser) {
+                report.NotChecked(kID, kSubject, "needs root");
+            } else {
+                report.Finding(kID, kSubject, "cannot be raised to root's to read the file",
+                               runAs == RunAs::kRoot
+                                   ? "Check for a security module or seccomp filter: aa-status, getenforce."
+                                   : RemedyForRefusal("", runAs));
+            }
             return;
         }
     }
-    report.Good("client.ids", "root's ids", "the library could take them on for reading the file");
+    report.Good(kID, kSubject, "raised to read the file");
 }
 
 }  // namespace
 
-void CheckClientFile(Report &report, Client &client, const std::string &returnProgram) {
-    report.Section("Client (" + NameOf(client.profile()) + ")");
+bool MayPrintClientID(Client &client) {
+    const std::string id = client->GetClientID();
+    return client.Azure() == nullptr || id.empty() || IsGUID(id);
+}
+
+void HideSecrets(Report &report, Client &client) {
     report.Hide(client->GetClientSecret());
-    ReportIDs(report);
-    const SettingsFile file = ReadSettingsFile(client.profile() == Profile::kAzure ? kAzureFile : kWebSphereFile);
+    if (!MayPrintClientID(client)) {
+        report.Hide(client->GetClientID());
+    }
+}
+
+void CheckClientFile(Report &report, Client &client, const std::string &returnProgram, RunAs runAs) {
+    report.Section("Client (" + NameOf(client.profile()) + ")");
+    HideSecrets(report, client);
+    ReportIDs(report, runAs);
+    const SettingsFile file =
+        ReadSettingsFile(client.profile() == Profile::kAzure ? kAzureFile : kWebSphereFile, runAs);
     if (!file.problem.empty()) {
-        report.Finding("client.file", "file", file.problem,
-                       file.isRefused
-                           ? "leave its rights as they are, for it holds the secret: the web server has to start its "
-                             "programs as root, or with root as saved ids"
-                           : file.remedy);
+        report.Finding("client.file", "file", file.problem, file.remedy);
         return;
     }
     report.Good("client.file", "file", file.path + " is JSON");
+    ReportText(report, "client", file);
     ReportRights(report, "client.rights", file, true);
 
     const std::vector<Key> keys = KeysOf(client.profile());
@@ -253,7 +290,7 @@ void CheckClientFile(Report &report, Client &client, const std::string &returnPr
         check.Run(key);
     }
     if (client.Azure() != nullptr) {
-        CheckTenant(report, client);
+        CheckAzureAddresses(report, client);
     }
 }
 

@@ -12,9 +12,13 @@ _tavosso_doctor() {
         mapfile -t COMPREPLY < <(compgen -u -- "$word")
         return
         ;;
+    --profile)
+        mapfile -t COMPREPLY < <(compgen -W 'azure websphere' -- "$word")
+        return
+        ;;
     --timeout | --domain | --return-program | --redirect-uri) return ;;
     esac
-    choices='--help --version --json --verbose --timeout --user --domain --return-program'
+    choices='--help --version --json --verbose --quiet --timeout --user --profile --domain --return-program'
     case $command in
     '') choices+=' token login explain' ;;
     token) choices+=' --fetch' ;;

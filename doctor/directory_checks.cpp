@@ -1,124 +1,169 @@
-// The conversion of domain names: the platform's table, and whatever it asks beside that.
+// The conversion of domain names: the stand-in's table, and the machine's directory.
 #include <sso/limits.h>
 
-#include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/predicate.hpp>
-#include <filesystem>
+#include <boost/algorithm/string/replace.hpp>
+#include <boost/algorithm/string/trim.hpp>
 
 #include "doctor/checks.h"
+#include "doctor/file_text.h"
 #include "doctor/settings_file.h"
 #include "doctor/watch.h"
 #include "platform/platform.h"
+#include "platform/standin/domain_table.h"
 
 namespace Doctor {
 
 namespace {
 
-constexpr char kUser[] = "\\user";
-constexpr std::size_t kMostShown = 5;  // of the table, for whoever may see a slip in it
+using TAVO::Platform::kDomainTable;
+
+constexpr char kTableID[] = "directory.table";
+constexpr char kTableSubject[] = "table of domains";
+constexpr std::size_t kMostShown = 5;
+
+constexpr char kRemedy[] =
+    R"(Join the domain and start winbindd, or add the domain to /usr/tavo/etc/domains.conf: {"corp.example.net": "CORP"})";
 
 struct Conversion {
-    std::string domain;  // empty where it failed
-    std::string log;     // what the platform wrote about that
+    std::string name;  // DOMAIN\user; empty if it failed
+    std::string log;   // of the platform
 };
 
-Conversion Convert(Report &report, const std::string &domain) {
+/// Converts a name in the form that a login passes: the domain in capitals, and the size without the NUL.
+Conversion Convert(Report &report, const std::string &user, const std::string &domain) {
     char buffer[TAVO::SSO::kPlatformBuffer] = {};
-    // As a login asks: the domain in capitals, the room for the NUL not counted.
-    const std::string name = boost::to_upper_copy(domain) + kUser;
+    const std::string name = boost::to_upper_copy(domain) + '\\' + user;
     const bool isConverted = TAVOWinsUserNameFqdn2Netbios(name.c_str(), buffer, sizeof buffer - 1) >= 0;
     std::string log;
     for (const std::string &line : TakeLogLines()) {
         report.Detail("log: " + line);
         log += (log.empty() ? "" : "; ") + MessageOf(line);
     }
-    const std::string converted = buffer;
-    return {isConverted ? converted.substr(0, converted.find('\\')) : "", log};
+    return {isConverted ? std::string(buffer) : "", log};
 }
 
-bool IsInTable(const Json::Value &table, const std::string &domain) {
-    const std::vector<std::string> names = table.getMemberNames();
-    return std::any_of(names.begin(), names.end(), [&](const auto &name) { return boost::iequals(name, domain); });
+/// Reads the table with the stand-in's parser.
+SettingsFile ReadTable(RunAs runAs) {
+    SettingsFile file = ReadTextFile(kDomainTable, runAs);
+    if (!file.problem.empty()) {
+        return file;
+    }
+    std::string errors;
+    try {
+        file.content = TAVO::Platform::ParseDomainTable(file.text, &errors);
+    } catch (const Json::Exception &) {
+        errors = "nested too deeply";
+    }
+    if (!file.content.isObject()) {
+        const TextProblem mistake = FindMistake(file.text);
+        file.content = Json::Value();
+        file.problem = file.path + " is not a JSON object: " +
+                       (mistake.what.empty() ? boost::trim_copy_if(errors, boost::is_any_of("* \n")) : mistake.what);
+        file.remedy = mistake.what.empty() ? R"(Write an object: {"corp.example.net": "CORP"})" : mistake.remedy;
+    }
+    return file;
 }
 
-/// The administrator's own table, which a machine need not have.
-SettingsFile CheckTable(Report &report) {
-    constexpr char kID[] = "directory.table";
-    constexpr char kSubject[] = "table of domains";
-    SettingsFile table = ReadSettingsFile(kDomainTable);
-    if (!std::filesystem::exists(kDomainTable)) {
-        report.Note(kID, kSubject, std::string(kDomainTable) + " is not there: the directory alone is asked");
+/// Returns the first domain without a usable NetBIOS name.
+std::string FindUnnamed(const Json::Value &table) {
+    for (const std::string &domain : table.getMemberNames()) {
+        if (!table[domain].isString() || table[domain].asString().empty()) {
+            return domain;
+        }
+    }
+    return {};
+}
+
+std::string Describe(const Json::Value &table) {
+    std::string text = "domains: " + std::to_string(table.size());
+    std::size_t shown = 0;
+    for (const std::string &domain : table.getMemberNames()) {
+        if (shown++ == kMostShown) {
+            return text + ", ...";
+        }
+        text += ", " + domain + " is " + Quoted(table[domain].asString());
+    }
+    return text;
+}
+
+SettingsFile CheckTable(Report &report, RunAs runAs) {
+    SettingsFile table = ReadTable(runAs);
+    if (table.isMissing) {
+        report.Note(kTableID, kTableSubject, table.problem + "; the directory converts all domains");
         return table;
     }
     if (!table.problem.empty()) {
-        report.Finding(kID, kSubject, table.problem, table.remedy);
+        report.Finding(kTableID, kTableSubject, table.problem, table.remedy);
         return table;
     }
-    for (const std::string &name : table.content.getMemberNames()) {
-        if (!table.content[name].isString() || table.content[name].asString().empty()) {
-            report.Finding(kID, kSubject, Quoted(name) + " has no NetBIOS name",
-                           "write its name as a text, or take the line out");
-            return table;
-        }
+    ReportText(report, "directory", table);
+    ReportRights(report, "directory.rights", table, false);
+    const std::string unnamed = FindUnnamed(table.content);
+    if (unnamed.empty()) {
+        report.Good(kTableID, kTableSubject, Describe(table.content));
+    } else {
+        report.Finding(kTableID, kTableSubject, Quoted(unnamed) + " has no NetBIOS name",
+                       "Write its name in quotation marks, or remove the line.");
     }
-    std::string found = std::string(kDomainTable) + " names " + std::to_string(table.content.size());
-    std::size_t left = kMostShown;
-    for (const std::string &name : table.content.getMemberNames()) {
-        if (left-- == 0) {
-            found += ", ...";
-            break;
-        }
-        found += ", " + name + " as " + Quoted(table.content[name].asString());
-    }
-    report.Good(kID, kSubject, found);
     return table;
 }
 
-const char kHowToTell[] =
-    R"(join the domain and start winbindd, or write it into /usr/tavo/etc/domains.conf: {"corp.example.net": "CORP"})";
-
-/// Whether there is a directory: the platform logs why it has no name for a domain that nobody has (RFC 6761, section
-/// 6.4).
+/// Converts a domain that does not exist (RFC 6761, section 6.4). The platform's log shows whether a directory answers.
 void CheckSource(Report &report, const SettingsFile &table) {
     constexpr char kID[] = "directory.source";
     constexpr char kSubject[] = "directory";
-    const std::string kTested = "; the log about a made-up domain: ";
-    const std::string log = Convert(report, "tavosso-doctor.invalid").log;
+    const std::string log = Convert(report, "user", "tavosso-doctor.invalid").log;
     if (boost::ends_with(log, "winbindd does not know it")) {
         report.Good(kID, kSubject, "winbindd answers");
-    } else if (log.empty()) {
-        report.Note(kID, kSubject, "the platform does not log whether one answers", "test a domain: --domain NAME");
-    } else if (table.content.empty()) {
-        report.Finding(kID, kSubject, "no domain can be converted" + kTested + log, kHowToTell);
-    } else {
-        report.Note(kID, kSubject, "only the domains of the table are converted" + kTested + log);
+        return;
     }
+    if (log.empty()) {
+        report.Note(kID, kSubject, "the platform does not log whether one answers",
+                    "Test a user: tavosso-doctor --domain USER@DOMAIN");
+        return;
+    }
+    // The test domain is not the subject.
+    const std::string reason = log.substr(log.rfind(", and ") == std::string::npos ? 0 : log.rfind(", and ") + 6);
+    if (table.content.empty()) {
+        report.Finding(kID, kSubject, "no domain can be converted: the table is empty or missing, and " + reason,
+                       kRemedy);
+    } else {
+        report.Note(kID, kSubject, "only the domains of the table are converted: " + reason);
+    }
+}
+
+void CheckDomain(Report &report, const std::string &domainOrUser) {
+    constexpr char kID[] = "directory.domain";
+    const std::size_t at = domainOrUser.find('@');
+    const bool isUser = at != std::string::npos;
+    const std::string domain = isUser ? domainOrUser.substr(at + 1) : domainOrUser;
+    const std::string user = isUser ? domainOrUser.substr(0, at) : "user";
+    const std::string subject = "domain " + domain;
+    const Conversion conversion = Convert(report, user, domain);
+    if (conversion.name.empty()) {
+        report.Finding(kID, subject, "is not converted" + (conversion.log.empty() ? "" : ": " + conversion.log),
+                       kRemedy);
+        return;
+    }
+    const std::string source = TAVO::Platform::FindInDomainTable(domain) ? "the table" : "the directory (winbindd)";
+    const std::string converted = isUser ? conversion.name : conversion.name.substr(0, conversion.name.find('\\'));
+    report.Good(kID, subject, "is " + Quoted(converted) + ", by " + source);
+    report.Result(domainOrUser + (isUser ? " signs in as " : " is ") + Quoted(converted) + ", by " + source + ".");
 }
 
 }  // namespace
 
-void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser) {
+void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser, RunAs runAs) {
     report.Section("Directory");
     TakeLogLines();
-    const SettingsFile table = CheckTable(report);
-    CheckSource(report, table);
-    constexpr char kID[] = "directory.domain";
+    CheckSource(report, CheckTable(report, runAs));
     if (domainOrUser) {
-        const std::string domain = domainOrUser->substr(domainOrUser->find('@') + 1);
-        const std::string subject = "domain " + domain;
-        const Conversion conversion = Convert(report, domain);
-        if (conversion.domain.empty()) {
-            report.Add({kID, subject, Mark::kFinding,
-                        "is not converted" + (conversion.log.empty() ? "" : ": " + conversion.log), kHowToTell, ""});
-        } else {
-            report.Good(kID, subject,
-                        "is " + Quoted(conversion.domain) + ", by " +
-                            (IsInTable(table.content, domain) ? "the table" : "the directory (winbindd)"));
-        }
-        return;
+        CheckDomain(report, *domainOrUser);
+    } else {
+        report.NotChecked("directory.domain", "domain of the users", "name a user with --domain USER@DOMAIN");
     }
-    report.NotChecked(kID, "a domain of the users", "tell one with --domain NAME");
 }
 
 }  // namespace Doctor

@@ -32,7 +32,7 @@ std::vector<unsigned char> DecodeBase64Url(std::string text) {
     return bytes;
 }
 
-/// The size of an RSA key's modulus in bits, 0 where that is not base64url.
+/// Returns the size of an RSA key in bits; 0 if the modulus is not base64url.
 int SizeOf(const Json::Value &key) {
     const std::vector<unsigned char> bytes = DecodeBase64Url(TAVO::Web::StringMember(key, "n"));
     const std::unique_ptr<BIGNUM, FreeNumber> modulus(BN_bin2bn(bytes.data(), static_cast<int>(bytes.size()), nullptr));
@@ -49,19 +49,19 @@ std::string Describe(const Json::Value &key) {
     return algorithm.empty() ? text : text + ", " + algorithm;
 }
 
-/// What is wrong with a key for the library; empty if nothing is.
+/// Returns why the library cannot use a key, or an empty text.
 std::string FaultOf(const Json::Value &key) {
     if (!key.isObject()) {
-        return "is no object";
+        return "is not an object";
     }
     if (!key["kid"].isString()) {
-        return "has no \"kid\", by which a token could name it";
+        return R"(has no "kid")";
     }
     if (!key["n"].isString() || !key["e"].isString()) {
-        return R"(is no RSA key: it lacks "n" or "e")";
+        return R"(is not an RSA key: it has no "n" or no "e")";
     }
     if (SizeOf(key) == 0 || DecodeBase64Url(key["e"].asString()).empty()) {
-        return "holds numbers that are not base64url";
+        return R"(has an "n" or "e" that is not base64url)";
     }
     return {};
 }
@@ -73,8 +73,8 @@ void CheckKeySet(Report &report, const Json::Value &keySet) {
     constexpr char kSubject[] = "key set";
     const Json::Value keys = keySet.isObject() ? keySet["keys"] : Json::Value();
     if (!keys.isArray() || keys.empty()) {
-        report.Finding(kSet, kSubject, "the answer has no list \"keys\", or none in it",
-                       "ask the provider; is the discovery document theirs?");
+        report.Finding(kSet, kSubject, R"(the key set has no "keys", or an empty list)",
+                       "Check that azure_wellknown is the address of your provider's discovery document.");
         return;
     }
     std::set<std::string> kids;
@@ -83,21 +83,22 @@ void CheckKeySet(Report &report, const Json::Value &keySet) {
         const std::string fault = FaultOf(key);
         if (!fault.empty()) {
             report.Note("keys.unusable", "unusable key", (key.isObject() ? Describe(key) + " " : "one ") + fault,
-                        "a token that names it cannot be verified");
+                        "None. The library rejects tokens that name this key.");
         } else if (!kids.insert(key["kid"].asString()).second) {
-            report.Note("keys.duplicate", "key that is never reached",
-                        Describe(key) + ": the first one of this \"kid\" is taken");
+            report.Note("keys.duplicate", "repeated key",
+                        Describe(key) + ": the library uses the first key of this \"kid\"");
         } else {
             ++usable;
             report.Good("keys.key", "key", Describe(key));
             if (SizeOf(key) < kWeak) {
-                report.Finding("keys.weak", "weak key", Describe(key), "ask the provider for one of 2048 bits or more");
+                report.Finding("keys.weak", "weak key", Describe(key),
+                               "Ask the provider for a key of at least 2048 bits.");
             }
         }
     }
-    const std::string found = std::to_string(usable) + " of " + std::to_string(keys.size()) + " keys can be used";
+    const std::string found = std::to_string(usable) + " of " + std::to_string(keys.size()) + " keys are usable";
     if (usable == 0) {
-        report.Finding(kSet, kSubject, found, "let the provider sign with RSA keys: no token can be verified");
+        report.Finding(kSet, kSubject, found, "Configure the provider to sign with RSA keys.");
     } else {
         report.Good(kSet, kSubject, found);
     }

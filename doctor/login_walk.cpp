@@ -20,8 +20,7 @@ namespace Doctor {
 
 namespace {
 
-/// A terminal that does not show what is typed, for the code in it, and takes lines of any length. As it was at the
-/// end.
+/// Switches echo off, because the address contains a code, and accepts lines of any length. Restores the terminal.
 class SilentTerminal {
   public:
     SilentTerminal() : isTerminal_(tcgetattr(STDIN_FILENO, &before) == 0) {
@@ -48,14 +47,14 @@ class SilentTerminal {
   private:
     static constexpr int kEnds[] = {SIGHUP, SIGINT, SIGQUIT, SIGTERM};
 
-    /// Whoever gives up wants to see what they type next.
+    /// Restores the terminal and ends the process by the same signal.
     static void RestoreAndEnd(int signal) {
         tcsetattr(STDIN_FILENO, TCSANOW, &before);
         std::signal(signal, SIG_DFL);
         std::raise(signal);
     }
 
-    static termios before;  // of the one terminal that there is
+    static termios before;
     bool isTerminal_;
 };
 
@@ -67,7 +66,7 @@ std::string ReadAddress() {
     return boost::trim_copy(address);
 }
 
-/// What the provider is told by the address that the browser opens.
+/// Returns a parameter of the authorization request.
 std::string ParameterOf(const std::string &authorizationURI, const char *name) {
     const std::string query = authorizationURI.substr(authorizationURI.rfind('?') + 1);
     return TAVO::Web::OnlyValue(TAVO::Web::ParseQuery(query), name).value_or("");
@@ -93,13 +92,14 @@ class LoginWalk {
 
   private:
     std::string AskForAddress(const std::string &uri) {
-        const SilentTerminal silent;  // before it is asked for: someone may be quick
+        const SilentTerminal silent;  // before the prompt, for input that arrives early
         report_.Say(
             "Open this address in a browser, and sign in:\n\n  " + Printable(uri) +
             "\n\nThe provider then sends the browser to " + Printable(client_->GetRedirectURI()) +
-            ".\nCopy the whole address that it was sent to, with the code in it. Should the page there replace it at\n"
-            "once, look for it in the browser's network tools, or end this and take a redirect URI that nobody\n"
-            "serves, if one is registered (--redirect-uri). An error page of the provider tells what is wrong.\n\n"
+            ".\nCopy the whole address of that page, with the code. If the page replaces the address, copy it from "
+            "the\n"
+            "browser's network tools, or press Ctrl-C and use a registered redirect URI that no server answers\n"
+            "(--redirect-uri). If the provider shows an error page, that page has the cause.\n\n"
             "Paste the address here, and press Enter. It is not shown.\n");
         return ReadAddress();
     }
@@ -113,18 +113,19 @@ class LoginWalk {
             told["error"] = error;
             told["error_description"] = TAVO::Web::OnlyValue(answer, "error_description").value_or("");
             report_.Finding("login.answer", "answer of the provider", ErrorText(told),
-                            "look for this error in the provider's documentation");
+                            "Run: tavosso-doctor explain " + Quoted(error));
             return false;
         }
         if (!code || code->empty()) {
-            report_.Finding("login.answer", "answer of the provider", "that is no address with one code in it",
-                            "copy the whole address that the provider sent the browser to");
+            report_.Finding("login.answer", "answer of the provider", "this is not an address with one code",
+                            "Copy the whole address to which the provider sent the browser.");
             return false;
         }
         report_.Good("login.answer", "answer of the provider", "a code");
         if (TAVO::Web::OnlyValue(answer, "state") != state) {
-            report_.Finding("login.state", "state", "is not the one that was sent",
-                            "take the address of this very login; a provider has to give the state back unchanged");
+            report_.Finding(
+                "login.state", "state", "is not the one that was sent",
+                "Copy the address of this login. If it is, the provider changes the state: report it there.");
             return false;
         }
         report_.Good("login.state", "state", "is the one that was sent");
@@ -141,10 +142,10 @@ class LoginWalk {
             client_->ProcessTokenResponse(response);
         } catch (const std::exception &failure) {
             report_.Add({"login.exchange", "exchange of the code", Mark::kFinding, FoundIn(response) + log,
-                         "run tavosso-doctor, which looks at the token endpoint and the client", TextOf(failure)});
+                         "Run: sudo tavosso-doctor. It checks the token endpoint and the client.", TextOf(failure)});
             return;
         }
-        report_.Good("login.exchange", "exchange of the code", "the provider has given an ID token");
+        report_.Good("login.exchange", "exchange of the code", "the provider sent an ID token");
         const std::string token = client_->GetToken();
         CheckToken(report_, client_, token, true);
         CheckNonce(token, nonce);
@@ -152,9 +153,9 @@ class LoginWalk {
 
     static std::string FoundIn(const std::string &response) {
         const Json::Value answer = TAVO::Web::ParseObject(response);
-        return response.empty()            ? "no answer"
-               : !answer.isObject()        ? "the answer is no JSON"
-               : !answer.isMember("error") ? "the answer has no \"id_token\", and tells of no error"
+        return response.empty()            ? "no response"
+               : !answer.isObject()        ? "the response is not JSON"
+               : !answer.isMember("error") ? R"(the response has no "id_token" and no "error")"
                                            : ErrorText(answer);
     }
 
@@ -163,10 +164,11 @@ class LoginWalk {
         sent["nonce"] = TAVO::SSO::MD5Digest(nonce);
         try {
             TAVO::Web::RequireNonce(TAVO::JWT::Jwt(token).GetBody(), sent);
-            report_.Good("login.nonce", "nonce", "the token is of this login");
+            report_.Good("login.nonce", "nonce", "the token belongs to this login");
         } catch (const std::exception &) {
-            report_.Finding("login.nonce", "nonce", "the token is not of this login",
-                            "the provider has to put the nonce into the token: without it a front end refuses");
+            report_.Finding(
+                "login.nonce", "nonce", "the token does not belong to this login",
+                "Configure the provider to copy \"nonce\" into the ID token. Front ends reject it otherwise.");
         }
     }
 

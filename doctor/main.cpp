@@ -1,6 +1,7 @@
-// tavosso-doctor: why a login fails, for the administrator at the terminal.
+// tavosso-doctor: finds out why logins fail.
 #include <grp.h>
 #include <pwd.h>
+#include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <CLI/CLI.hpp>
@@ -27,13 +28,15 @@ using Doctor::Report;
 
 enum ExitStatus { kHealthy = 0, kFindings = 1, kCannotRun = 2 };
 
-// A larger one than any provider sends, and a file that was named by mistake is not read into memory.
+// More than any provider sends. Bounds the memory for a wrong file.
 constexpr std::size_t kLongestToken = std::size_t{1} << 20;
 
-/// The command line, as it was given.
+/// The command line.
 struct Options {
     bool isJson = false;
     bool isVerbose = false;
+    bool isQuiet = false;
+    std::string profile;
     long timeout = 10;
     std::string user;
     std::optional<std::string> domain;
@@ -46,13 +49,22 @@ struct Options {
     bool isMarkdown = false;
 };
 
-/// Why the command cannot run at all.
+constexpr char kExamples[] = R"(Examples:
+  sudo tavosso-doctor                              check everything
+  sudo tavosso-doctor --domain alice@corp.example.net
+                                                   also print the name that this user gets
+  sudo tavosso-doctor --profile azure              check a profile before it is switched on
+  sudo tavosso-doctor --user www-data              check with the rights of this user
+  sudo tavosso-doctor login                        walk through a login
+  tavosso-doctor explain "id_token expired."       explain a text)";
+
+/// The command cannot run.
 class cannot_run : public std::runtime_error {
   public:
     using std::runtime_error::runtime_error;
 };
 
-/// The rights that a program has which this user starts, with none of root's left to take on again.
+/// Takes the ids of a user for good.
 void Become(const std::string &name) {
     const passwd *user = getpwnam(name.c_str());
     if (user == nullptr) {
@@ -60,7 +72,7 @@ void Become(const std::string &name) {
     }
     if (initgroups(user->pw_name, user->pw_gid) != 0 || setresgid(user->pw_gid, user->pw_gid, user->pw_gid) != 0 ||
         setresuid(user->pw_uid, user->pw_uid, user->pw_uid) != 0) {
-        throw cannot_run("only root can look with the rights of " + name);
+        throw cannot_run("--user needs root. Run: sudo tavosso-doctor --user " + name);
     }
 }
 
@@ -77,52 +89,93 @@ std::string ReadToken(const std::string &name) {
     stream.read(token.data(), static_cast<std::streamsize>(token.size()));
     token.resize(static_cast<std::size_t>(stream.gcount()));
     if (token.size() > kLongestToken) {
-        throw cannot_run("that is no token: longer than 1 MiB");
+        throw cannot_run("this is not a token: it is longer than 1 MiB");
     }
     return boost::trim_copy(token);
 }
 
+std::string Variable(const char *name) {
+    const char *value = std::getenv(name);
+    return value != nullptr ? value : "";
+}
+
+bool IsDumb() { return Variable("TERM") == "dumb"; }
+
+bool HasColours() { return isatty(STDOUT_FILENO) == 1 && Variable("NO_COLOR").empty() && !IsDumb(); }
+
+/// Returns 0 if standard output is not a terminal.
+std::size_t WidthOfTerminal() {
+    winsize size{};
+    return ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 ? size.ws_col : 0;
+}
+
 int StatusOf(const Report &report) { return report.HasFindings() ? kFindings : kHealthy; }
 
+Doctor::RunAs RunAsOf(const Options &options) {
+    return !options.user.empty() ? Doctor::RunAs::kChosenUser
+           : geteuid() == 0      ? Doctor::RunAs::kRoot
+                                 : Doctor::RunAs::kOrdinaryUser;
+}
+
+/// Returns the configured profile, or that of --profile.
+std::optional<Profile> FindProfile(Report &report, const Options &options) {
+    if (options.profile.empty()) {
+        return Doctor::CheckProfile(report, RunAsOf(options));
+    }
+    report.Section("Profile");
+    report.NotChecked("profile.file", "profile", "--profile selects " + options.profile);
+    return Doctor::ProfileNamed(options.profile);
+}
+
 int CheckEverything(Report &report, const Options &options) {
-    if (const std::optional<Profile> profile = Doctor::CheckProfile(report)) {
+    const Doctor::RunAs runAs = RunAsOf(options);
+    if (runAs == Doctor::RunAs::kOrdinaryUser) {
+        report.Section("User");
+        report.Finding("process.user", "user", "not root, so the client's file cannot be read",
+                       "Run: sudo tavosso-doctor");
+    }
+    if (const std::optional<Profile> profile = FindProfile(report, options)) {
         Doctor::TakeLogLines();
         Client client(*profile);
-        Doctor::CheckClientFile(report, client, options.returnProgram);
+        Doctor::CheckClientFile(report, client, options.returnProgram, runAs);
         Doctor::CheckProvider(report, client);
         if (*profile == Profile::kAzure) {
-            Doctor::CheckDirectory(report, options.domain);
+            Doctor::CheckDirectory(report, options.domain, runAs);
         }
     }
-    report.Finish("check");
+    report.Unproved("that a user can sign in");
+    report.Finish("check", "Next step: sudo tavosso-doctor login");
     return StatusOf(report);
 }
 
-/// The client of the profile in force, for a command that can do nothing without one.
-Client RequireClient(Report &report) {
-    Report silent({true, false, false});  // a report for machines is printed when it is finished, as this one never is
-    const std::optional<Profile> profile = Doctor::CheckProfile(silent);
+/// Returns the client of the configured profile, or of --profile.
+Client RequireClient(Report &report, const Options &options) {
+    Report unprinted({});
+    const std::optional<Profile> profile = FindProfile(unprinted, options);
     if (!profile) {
-        throw cannot_run("no profile is in force; tavosso-doctor, without a command, tells why");
+        throw cannot_run("no profile is configured. For the cause, run: sudo tavosso-doctor");
     }
     Client client(*profile);
-    report.Hide(client->GetClientSecret());
+    Doctor::HideSecrets(report, client);
     return client;
 }
 
 int CheckOneToken(Report &report, const Options &options) {
-    Client client = RequireClient(report);
+    Client client = RequireClient(report, options);
     Json::Value more;
     more["stops_at"] = Doctor::CheckToken(report, client, ReadToken(options.tokenFile), options.mayFetch);
-    report.Finish("token", more);
+    report.Finish("token", "", more);
     return StatusOf(report);
 }
 
 int Login(Report &report, const Options &options) {
     if (options.isJson) {
-        throw cannot_run("login talks with a person: it has no JSON");
+        throw cannot_run("login is a dialogue. Remove --json");
     }
-    Client client = RequireClient(report);
+    Client client = RequireClient(report, options);
+    if (!Doctor::MayPrintClientID(client)) {
+        throw cannot_run("azure_client_id is not a GUID. Run: sudo tavosso-doctor");
+    }
     if (!options.redirectURI.empty()) {
         client->SetRedirectURI(options.redirectURI);
     }
@@ -135,7 +188,7 @@ int Login(Report &report, const Options &options) {
 
 int Explain(const Options &options) {
     if (options.isList != options.words.empty()) {
-        throw cannot_run("explain takes either a text or --list");
+        throw cannot_run("explain needs either a text or --list");
     }
     if (options.isMarkdown) {
         Doctor::PrintMarkdown();
@@ -150,7 +203,7 @@ int Explain(const Options &options) {
         json["explanations"] = Doctor::ExplanationsAsJson(explanations);
         Doctor::WriteJson(json);
     } else if (explanations.empty()) {
-        std::cout << "This text is unknown. Try a whole line of the log, or an exception's text.\n";
+        std::cout << "Unknown text. Use a whole line of the log, or the text of an exception.\n";
     } else {
         Doctor::PrintExplanations(explanations);
     }
@@ -161,32 +214,35 @@ int Explain(const Options &options) {
 
 int main(int argc, char **argv) try {
     Options options;
-    CLI::App app("Tells why a single sign-on login fails, from this machine's configuration and its provider.",
-                 "tavosso-doctor");
+    CLI::App app("Finds out why users cannot sign in, and prints a remedy for each finding.", "tavosso-doctor");
+    app.footer(kExamples);
     app.set_version_flag("--version", "tavosso-doctor " TAVOSSO_VERSION);
-    app.add_flag("--json", options.isJson, "Write one JSON object");
-    app.add_flag("--verbose", options.isVerbose, "Show the library's requests and log lines, too");
-    app.add_option("--timeout", options.timeout, "Seconds to wait for each answer of the provider")
+    CLI::Option *json = app.add_flag("--json", options.isJson, "Write one JSON object");
+    CLI::Option *verbose =
+        app.add_flag("--verbose", options.isVerbose, "Print all checks, and the library's requests and log lines");
+    app.add_flag("--quiet", options.isQuiet, "Print findings only")->excludes(verbose)->excludes(json);
+    app.add_option("--timeout", options.timeout, "Seconds to wait for each response of the provider")
         ->check(CLI::Range(1L, 3600L))
         ->capture_default_str();
-    app.add_option("--user", options.user, "Look with the rights of a program that this user starts");
-    app.add_option("--domain", options.domain, "A domain of the users, for asking the directory");
-    app.add_option("--return-program", options.returnProgram, "The path of the program that the provider sends back to")
-        ->capture_default_str();
+    app.add_option("--user", options.user, "Run with the rights of a program that this user starts");
+    app.add_option("--profile", options.profile, "Check this profile, whether or not it is switched on")
+        ->check(CLI::IsMember({"azure", "websphere"}));
+    app.add_option("--domain", options.domain, "Convert this domain, or the name of this user (USER@DOMAIN)");
+    app.add_option("--return-program", options.returnProgram, "The path in the redirect URI")->capture_default_str();
     app.require_subcommand(0, 1);
     app.fallthrough();
 
-    CLI::App *token = app.add_subcommand("token", "Verify an ID token as the library does, step by step");
+    CLI::App *token = app.add_subcommand("token", "Verify an ID token step by step");
     token->add_option("FILE", options.tokenFile, "A file with the token, or - for standard input")->required();
-    token->add_flag("--fetch", options.mayFetch, "Ask the provider for its keys");
+    token->add_flag("--fetch", options.mayFetch, "Fetch the provider's keys");
 
-    CLI::App *login = app.add_subcommand("login", "Walk through a login from the terminal");
-    login->add_option("--redirect-uri", options.redirectURI, "Another one that is registered at the provider");
+    CLI::App *login = app.add_subcommand("login", "Walk through a login in the terminal");
+    login->add_option("--redirect-uri", options.redirectURI, "Another redirect URI that is registered at the provider");
 
-    CLI::App *explain = app.add_subcommand("explain", "Explain an exception's text or a line of the log");
+    CLI::App *explain = app.add_subcommand("explain", "Explain an exception, an error code or a line of the log");
     explain->add_option("TEXT", options.words, "The text");
-    CLI::Option *list = explain->add_flag("--list", options.isList, "Print all that it explains");
-    explain->add_flag("--markdown", options.isMarkdown, "Print that as the tables of the documents")->needs(list);
+    CLI::Option *list = explain->add_flag("--list", options.isList, "Print all texts that it explains");
+    explain->add_flag("--markdown", options.isMarkdown, "Print them as the tables of the documentation")->needs(list);
 
     try {
         app.parse(argc, argv);
@@ -196,10 +252,9 @@ int main(int argc, char **argv) try {
     if (!options.user.empty()) {
         Become(options.user);
     }
-    const bool isOnTerminal = isatty(STDOUT_FILENO) == 1;
-    const char *noColour = std::getenv("NO_COLOR");
-    Report report({options.isJson, options.isVerbose, isOnTerminal && (noColour == nullptr || *noColour == '\0')});
-    Doctor::SetTransferRules({options.timeout, isatty(STDERR_FILENO) == 1 && !options.isJson});
+    Report report({options.isJson, options.isVerbose, options.isQuiet, HasColours(), WidthOfTerminal()});
+    const bool showsProgress = isatty(STDERR_FILENO) == 1 && !IsDumb() && !options.isJson && !options.isQuiet;
+    Doctor::SetTransferRules({options.timeout, showsProgress});
 
     return *token     ? CheckOneToken(report, options)
            : *login   ? Login(report, options)

@@ -1,17 +1,18 @@
-// The provider, asked by the library itself.
+// The provider, through the requests of the library.
 #include <algorithm>
+#include <boost/algorithm/string/classification.hpp>
 #include <boost/algorithm/string/join.hpp>
 #include <boost/algorithm/string/predicate.hpp>
-#include <cstdio>
-#include <cstdlib>
-#include <set>
+#include <boost/algorithm/string/trim.hpp>
 #include <vector>
 
 #include "doctor/address.h"
+#include "doctor/answer.h"
+#include "doctor/azure_checks.h"
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
+#include "doctor/transfer_checks.h"
 #include "doctor/watch.h"
-#include "web/failure_lookup.h"
 #include "web/request.h"
 #include "web/text.h"
 
@@ -19,185 +20,146 @@ namespace Doctor {
 
 namespace {
 
-constexpr long kDay = 24L * 60 * 60;
-constexpr long kSoon = 14 * kDay;  // time enough for getting another certificate
-constexpr long kWrongClock = 60;   // tokens may be valid for a few minutes only
 constexpr long kSuccess = 200;
+constexpr long kUnauthorized = 401;
 constexpr long kRefusals = 400;  // and above
 
-// No provider has given out this one.
-constexpr char kMadeUpCode[] = "tavosso-doctor-made-this-up";
+// No provider issues these.
+constexpr char kTestCode[] = "tavosso-doctor-made-this-up";
+constexpr char kTestSecret[] = "tavosso-doctor-made-this-up-too";
 
-/// What the library has just done: its one transfer, if it came to that, and its log lines for whoever wants to see.
-Transfer LastTransfer(Report &report) {
-    Transfer last;
-    last.result = CURLE_FAILED_INIT;
-    for (const Transfer &transfer : TakeTransfers()) {
-        char line[64];
-        std::snprintf(line, sizeof line, "HTTP %ld, %.0f ms: ", transfer.status, transfer.seconds * 1000);
-        report.Detail(line + transfer.url);
-        last = transfer;
-    }
-    for (const std::string &line : TakeLogLines()) {
-        report.Detail("log: " + line);
-    }
-    return last;
+constexpr char kWellknownPath[] = "/.well-known/openid-configuration";
+
+std::size_t Append(char *bytes, std::size_t size, std::size_t count, void *response) {
+    static_cast<std::string *>(response)->append(bytes, size * count);
+    return size * count;
 }
 
-std::string Describe(const Certificate &certificate) {
-    return certificate.subject + ", of " + certificate.issuer + ", until " + TimeText(certificate.expires, "%F");
+std::string WithoutTrailingSlashes(const std::string &url) {
+    return boost::trim_right_copy_if(url, boost::is_any_of("/"));
 }
 
-std::size_t Ignore(char * /*bytes*/, std::size_t size, std::size_t count, void * /*response*/) { return size * count; }
+bool IsDiscoveryDocument(const Json::Value &document) {
+    return document.isObject() && document["issuer"].isString() && document["jwks_uri"].isString();
+}
 
-/// The certificate that was refused, which libcurl shows only to those who do not verify it. Nothing is sent there.
-std::vector<Certificate> LookAtCertificates(Report &report, const std::string &url) {
-    try {
-        std::string response;
-        TAVO::SSO::httpGet(url, response, false, Ignore);
-    } catch (const std::exception &) {
-        // Whatever it was: the certificates are there, or they are not.
-    }
-    return LastTransfer(report).certificates;
+/// Returns the body of a token request with another client secret.
+std::string WithSecret(const std::string &body, const std::string &secret) {
+    constexpr char kName[] = "client_secret=";
+    const std::size_t begin = body.find(kName) + sizeof kName - 1;
+    return body.substr(0, begin) + secret + body.substr(std::min(body.find('&', begin), body.size()));
 }
 
 class ProviderCheck {
   public:
-    ProviderCheck(Report &report, Client &client) : report_(report), client_(client) {}
+    ProviderCheck(Report &report, Client &client)
+        : report_(report), client_(client), prefix_(NameOf(client.profile()) + '_'), transfers_(report) {}
 
     void Run() {
+        report_.Section("Provider");
+        if (!transfers_.CheckMachine(client_->GetTokenEndpoint())) {
+            report_.NotChecked("discovery.reachable", "provider", "no certificate can be verified");
+            return;
+        }
         CheckDiscovery();
         CheckAuthorization();
         if (client_.Azure() != nullptr) {
+            CheckTenantOfIssuer(report_, client_, TAVO::Web::StringMember(discovery_, "issuer"));
             CheckKeys();
         }
         CheckTokenEndpoint();
     }
 
   private:
-    /// Whether an answer came, and a certificate's findings if not or soon not.
-    bool CheckTransfer(const std::string &id, const std::string &subject, const Transfer &transfer) {
-        if (transfer.result != CURLE_OK) {
-            const std::string text = curl_easy_strerror(transfer.result);
-            const TAVO::Web::FailureRow *row = TAVO::Web::FindTransfer(transfer.result);
-            const std::string cause = row != nullptr ? row->cause : "";
-            report_.Finding(id + ".reachable", subject,
-                            transfer.url + ": " + text + (cause.empty() ? "" : " (" + cause + ")"),
-                            // Not as a command to copy: the provider may have chosen the address.
-                            "ask that address from this machine by other means, curl -v for instance");
-            if (transfer.result == CURLE_PEER_FAILED_VERIFICATION) {
-                ExplainRefusedCertificate(id, transfer.url);
-            }
-            return false;
-        }
-        report_.Good(id + ".reachable", subject, transfer.url);
-        CheckCertificates(id, transfer.certificates);
-        CheckClock(transfer);
-        return true;
-    }
+    /// A response as text. The library's own functions return JSON.
+    struct Fetched {
+        Transfer transfer;
+        std::string content;
+    };
 
-    void ExplainRefusedCertificate(const std::string &id, const std::string &url) {
-        const std::vector<Certificate> chain = LookAtCertificates(report_, url);
-        if (chain.empty()) {
-            return;
+    Fetched Fetch(const std::string &url) {
+        Fetched fetched;
+        try {
+            TAVO::SSO::httpGet(url, fetched.content, true, Append);
+        } catch (const std::exception &) {
+            // The transfer has the result.
         }
-        const Certificate &own = chain.front();
-        const std::string subject = "certificate of the server";
-        if (own.expires != -1 && own.expires < std::time(nullptr)) {
-            report_.Finding(id + ".certificate", subject, Describe(own) + ": it has expired",
-                            "the provider has to renew it; if the date is not past, set this machine's clock");
-        } else {
-            report_.Finding(id + ".certificate", subject, Describe(own),
-                            "is " + Quoted(SplitAddress(url).host) +
-                                " its name? is its issuer among the authorities of this machine "
-                                "(/etc/ssl/certs/ca-certificates.crt)? has it begun to be valid?");
-        }
-    }
-
-    void CheckCertificates(const std::string &id, const std::vector<Certificate> &chain) {
-        if (chain.empty()) {
-            return;  // without TLS, which is a finding already
-        }
-        const auto first = std::min_element(chain.begin(), chain.end(),
-                                            [](const auto &a, const auto &b) { return a.expires < b.expires; });
-        const long left = first->expires - std::time(nullptr);
-        const std::string found = Describe(*first) + ", " + std::to_string(left / kDay) + " days left";
-        if (!toldCertificates_.insert(found).second) {
-            return;  // one server mostly has it all
-        }
-        if (left < kSoon) {
-            report_.Finding(id + ".certificate", "certificate of the server", found,
-                            "the provider has to renew it: from that day on every login fails");
-        } else {
-            report_.Good(id + ".certificate", "certificate of the server", found);
-        }
-    }
-
-    /// Once, by whoever tells the time first.
-    void CheckClock(const Transfer &transfer) {
-        if (knowsClock_ || transfer.date == -1) {
-            return;
-        }
-        knowsClock_ = true;
-        const long offset = static_cast<long>(std::time(nullptr) - transfer.date);
-        const std::string seconds = std::to_string(std::labs(offset)) + " s ";
-        const std::string found =
-            offset == 0 ? "as the provider's" : seconds + (offset > 0 ? "ahead of" : "behind") + " the provider's";
-        if (std::labs(offset) > kWrongClock) {
-            report_.Finding(
-                "clock", "clock of this machine", found,
-                "let it be set by the network (timedatectl set-ntp true): tokens expire by it, without leeway");
-        } else {
-            report_.Good("clock", "clock of this machine", found);
-        }
+        fetched.transfer = LastTransfer(report_);
+        return fetched;
     }
 
     void CheckDiscovery() {
-        report_.Section("Provider");
         constexpr char kSubject[] = "discovery document";
         const std::string address = client_->GetWellknownEndpoint();
         if (address.empty()) {
-            report_.NotChecked("discovery.reachable", kSubject, "its address is not set");
+            report_.NotChecked("discovery.reachable", kSubject, prefix_ + "wellknown is not set");
             return;
         }
         client_->RequestWellknownInfo(discovery_);
         const Transfer transfer = LastTransfer(report_);
-        if (!CheckTransfer("discovery", kSubject, transfer)) {
+        if (!transfers_.Check("discovery", kSubject, prefix_ + "wellknown", transfer)) {
             return;
         }
-        if (!discovery_.isObject() || transfer.status != kSuccess) {
-            report_.Finding("discovery.document", kSubject,
-                            "the answer is no discovery document: HTTP " + std::to_string(transfer.status) +
-                                (discovery_.isObject() ? ", JSON" : ", no JSON object"),
-                            "compare the address with the provider's; it mostly ends in "
-                            "/.well-known/openid-configuration");
+        const bool isDocument =
+            discovery_.isObject() && (discovery_.isMember("issuer") || discovery_.isMember("jwks_uri") ||
+                                      discovery_.isMember("authorization_endpoint"));
+        if (!isDocument || transfer.status != kSuccess) {
+            report_.Finding(
+                "discovery.document", kSubject,
+                address + " returns no discovery document: " + DescribeAnswer(transfer, Fetch(address).content),
+                RemedyForDiscovery(transfer, address));
             return;
         }
         CheckIssuer();
         CheckEndpoint("authorization_endpoint", client_->GetAuthEndpoint());
         CheckEndpoint("token_endpoint", client_->GetTokenEndpoint());
         if (!client_->GetLogoutEndpoint().empty()) {
-            // An organisation may have a page of its own for it.
+            // An organisation may have its own logout page.
             CheckEndpoint("end_session_endpoint", client_->GetLogoutEndpoint(), Mark::kNote);
         }
         CheckOffer("id_token_signing_alg_values_supported", "discovery.algorithms", "signatures of tokens",
-                   AlgorithmsOf(client_.profile()), "let the provider sign this client's tokens with one of them");
+                   AlgorithmsOf(client_.profile()),
+                   "Configure the provider to sign the tokens of this client with one of them.");
         CheckOffer("token_endpoint_auth_methods_supported", "discovery.client_authentication", "client authentication",
                    {"client_secret_post"},
-                   "let the provider take the client's secret from the form (client_secret_post) for this client");
+                   "Configure the provider to accept client_secret_post for this client: the secret in the form.");
+    }
+
+    std::string RemedyForDiscovery(const Transfer &transfer, const std::string &address) {
+        if (IsProvidersError(transfer)) {
+            return "Wait until the provider works again. The settings of this machine are not the cause.";
+        }
+        const std::string published = FindDiscovery(address);
+        return published.empty() ? "Copy the address of the discovery document from the provider. It usually ends in " +
+                                       std::string(kWellknownPath)
+                                 : "Set " + prefix_ + "wellknown to " + Quoted(published);
+    }
+
+    /// Tries the usual variants of an address. Returns the one of a discovery document, or an empty text.
+    std::string FindDiscovery(const std::string &address) {
+        const std::string base = WithoutTrailingSlashes(address);
+        const std::string issuer = WithoutTrailingSlashes(TAVO::Web::StringMember(discovery_, "issuer"));
+        for (const std::string &variant : {base, base + kWellknownPath, issuer + kWellknownPath}) {
+            const bool isNew = variant != address && boost::istarts_with(variant, "https://");
+            if (isNew && IsDiscoveryDocument(TAVO::Web::ParseObject(Fetch(variant).content))) {
+                return variant;
+            }
+        }
+        return {};
     }
 
     void CheckIssuer() {
         const std::string issuer = TAVO::Web::StringMember(discovery_, "issuer");
         constexpr char kSubject[] = "issuer";
         if (issuer.empty()) {
-            report_.Note("discovery.issuer", kSubject, "the document names none", "is this the provider's address?");
+            report_.Note("discovery.issuer", kSubject, "the document has none",
+                         "Compare " + prefix_ + "wellknown with the provider's address.");
         } else if (boost::starts_with(client_->GetWellknownEndpoint(), issuer)) {
             report_.Good("discovery.issuer", kSubject, Quoted(issuer));
         } else {
             report_.Note("discovery.issuer", kSubject,
-                         Quoted(issuer) + " does not begin the address of its own document",
-                         "usual for a provider of several tenants; otherwise ask whose document this is");
+                         Quoted(issuer) + " is not the beginning of the document's address",
+                         "None for Azure AD. Otherwise compare " + prefix_ + "wellknown with the provider's address.");
         }
     }
 
@@ -205,22 +167,24 @@ class ProviderCheck {
         const std::string published = TAVO::Web::StringMember(discovery_, member.c_str());
         const std::string id = "discovery." + member;
         if (published.empty()) {
-            report_.Note(id, member, "the provider publishes none");
+            report_.Note(id, member, "the provider does not publish it");
         } else if (published == configured) {
             report_.Good(id, member, "as configured");
         } else {
             report_.Add({id, member, mark,
                          "the provider publishes " + Quoted(published) + ", the file has " + Quoted(configured),
-                         "take the provider's, unless you know better", ""});
+                         "Set " + prefix_ + (member == "end_session_endpoint" ? "logout_endpoint" : member) + " to " +
+                             Quoted(published),
+                         ""});
         }
     }
 
-    /// What the library can do, among what the provider offers; a provider need not tell.
+    /// Compares what the provider offers, which it need not publish, with what the library supports.
     void CheckOffer(const char *member, const std::string &id, const std::string &subject,
                     const std::vector<std::string> &usable, const std::string &remedy) {
         const Json::Value &offers = discovery_[member];
         if (!offers.isArray()) {
-            report_.Note(id, subject, "the provider does not tell which it supports");
+            report_.Note(id, subject, "the provider does not publish which it supports");
             return;
         }
         for (const Json::Value &offer : offers) {
@@ -231,45 +195,54 @@ class ProviderCheck {
         }
         report_.Finding(id, subject,
                         "the provider offers " + TAVO::Web::WriteCompact(offers) +
-                            ", and none that is needed: " + boost::join(usable, ", "),
+                            ", but the library needs one of: " + boost::join(usable, ", "),
                         remedy);
     }
 
-    /// The browser's first request, made without one: a provider that does not know the client, or not by this redirect
-    /// URI, mostly says so at once.
+    /// Sends the browser's first request. Most providers answer an unknown client or redirect URI with an error at
+    /// once.
     void CheckAuthorization() {
         report_.Section("Authorization endpoint");
         constexpr char kSubject[] = "authorization endpoint";
-        if (!boost::istarts_with(client_->GetAuthEndpoint(), "https://")) {
-            report_.NotChecked("authorization_endpoint.reachable", kSubject, "it has no https address");
+        if (!CanSendClient("authorization_endpoint", kSubject, client_->GetAuthEndpoint())) {
             return;
         }
-        try {
-            std::string response;
-            TAVO::SSO::httpGet(client_.AuthorizationURI(Json::objectValue), response, true, Ignore);
-        } catch (const std::exception &) {
-            // The transfer tells.
-        }
-        Transfer transfer = LastTransfer(report_);
-        transfer.url = client_->GetAuthEndpoint();  // without a query of hundreds of characters
-        if (CheckTransfer("authorization_endpoint", kSubject, transfer)) {
-            ReportAuthorization(transfer);
+        Fetched fetched = Fetch(client_.AuthorizationURI(Json::objectValue));
+        fetched.transfer.url = client_->GetAuthEndpoint();  // the query has hundreds of characters
+        if (transfers_.Check("authorization_endpoint", kSubject, prefix_ + "authorization_endpoint",
+                             fetched.transfer)) {
+            ReportAuthorization(fetched);
         }
     }
 
-    void ReportAuthorization(const Transfer &transfer) {
+    /// Returns whether client id and secret may be sent to an endpoint.
+    bool CanSendClient(const std::string &id, const std::string &subject, const std::string &url) {
+        const bool isSecure = boost::istarts_with(url, "https://");
+        if (!isSecure || !MayPrintClientID(client_)) {
+            report_.NotChecked(id + ".reachable", subject,
+                               isSecure ? "the client id may be the client secret" : "it has no https:// URL");
+            return false;
+        }
+        return true;
+    }
+
+    void ReportAuthorization(const Fetched &fetched) {
         constexpr char kID[] = "authorization_endpoint.request";
         constexpr char kSubject[] = "first request of a login";
+        const Transfer &transfer = fetched.transfer;
         const auto error = TAVO::Web::OnlyValue(TAVO::Web::ParseQuery(SplitAddress(transfer.location).query), "error");
         if (transfer.status < kRefusals && !error) {
-            report_.Good(kID, kSubject, "the provider does not refuse it: HTTP " + std::to_string(transfer.status));
+            report_.Good(kID, kSubject, "not rejected: HTTP " + std::to_string(transfer.status));
             return;
         }
         report_.Finding(
             kID, kSubject,
-            "the provider refuses it: HTTP " + std::to_string(transfer.status) + (error ? ", " + Quoted(*error) : ""),
-            "are the client's id and the redirect URI registered there, letter by letter, host and port "
-            "too? tavosso-doctor login gives the address to open: the page there may tell more");
+            "the provider rejects it: " + (error ? Quoted(*error) : DescribeAnswer(transfer, fetched.content)),
+            IsProvidersError(transfer)
+                ? "Wait until the provider works again. The settings of this machine are not the cause."
+                : "Compare the client id, and " + Quoted(client_->GetRedirectURI()) +
+                      ", with those registered at the provider. For the provider's error page, run: sudo "
+                      "tavosso-doctor login");
     }
 
     void CheckKeys() {
@@ -279,31 +252,39 @@ class ProviderCheck {
         if (address.empty()) {
             if (discovery_.isObject()) {
                 report_.Finding("keys.reachable", kSubject, "the discovery document has no \"jwks_uri\"",
-                                "is azure_wellknown the address of the provider's discovery document?");
+                                "Copy the address of the discovery document from the provider to azure_wellknown.");
             } else {
-                report_.NotChecked("keys.reachable", kSubject, "the discovery document tells its address");
+                report_.NotChecked("keys.reachable", kSubject, "its address is in the discovery document");
             }
             return;
         }
         Json::Value keySet;
         client_.Azure()->RequestKeysInfo(address, keySet);
-        if (CheckTransfer("keys", kSubject, LastTransfer(report_))) {
+        const Transfer transfer = LastTransfer(report_);
+        if (!transfers_.Check("keys", kSubject, R"("jwks_uri" in the discovery document)", transfer)) {
+            return;
+        }
+        if (keySet.isObject() && transfer.status == kSuccess) {
             CheckKeySet(report_, keySet);
+        } else {
+            report_.Finding("keys.set", kSubject,
+                            address + " returns no key set: " + DescribeAnswer(transfer, Fetch(address).content),
+                            "Check that azure_wellknown is the address of your provider's discovery document. If it "
+                            "is, report this to the provider.");
         }
     }
 
     void CheckTokenEndpoint() {
         report_.Section("Token endpoint");
         constexpr char kSubject[] = "token endpoint";
-        if (!boost::istarts_with(client_->GetTokenEndpoint(), "https://")) {
-            report_.NotChecked("token_endpoint.reachable", kSubject, "the secret is sent over https alone");
+        if (!CanSendClient("token_endpoint", kSubject, client_->GetTokenEndpoint())) {
             return;
         }
-        client_->SetCode(kMadeUpCode);
+        client_->SetCode(kTestCode);
         std::string response;
         client_->RequestTokenEndpoint(response, client_->GetIDTokenReqParams());
         const Transfer transfer = LastTransfer(report_);
-        if (CheckTransfer("token_endpoint", kSubject, transfer)) {
+        if (transfers_.Check("token_endpoint", kSubject, prefix_ + "token_endpoint", transfer)) {
             ReportAnswer(transfer, response);
         }
     }
@@ -314,28 +295,48 @@ class ProviderCheck {
         const Json::Value answer = TAVO::Web::ParseObject(response);
         const std::string error = TAVO::Web::StringMember(answer, "error");
         check.found = ErrorText(answer);
-        if (!answer.isObject()) {
-            check.found = "the answer is no JSON: HTTP " + std::to_string(transfer.status);
-            check.remedy = "compare the address with the provider's";
+        if (IsProvidersError(transfer)) {
+            check.found = DescribeAnswer(transfer, response);
+            check.remedy = "Wait until the provider works again. The settings of this machine are not the cause.";
         } else if (error.empty()) {
-            check.found = "the answer names no error, and yet a made-up code was sent: no token endpoint answers so";
-            check.remedy = "compare the address with the provider's";
+            check.found = "this is not a token endpoint: " + DescribeAnswer(transfer, response);
+            check.remedy = "Set " + prefix_ + R"(token_endpoint to the "token_endpoint" of the discovery document)" +
+                           PublishedTokenEndpoint();
         } else if (error == "invalid_grant") {
             check.mark = Mark::kGood;
-            check.found = "the provider accepts the client's id and secret";
-            check.library.clear();  // an answer that was asked for
+            check.found = DescribeAcceptance();
+            check.library.clear();  // the expected answer
         } else if (error == "invalid_client" || error == "unauthorized_client") {
-            check.remedy =
-                "compare the client's id and secret with the provider's; has the secret run out? does the provider "
-                "take it from the form (client_secret_post)?";
+            check.remedy = "Compare " + prefix_ +
+                           "client_id with the provider's. If it is correct, create a new client "
+                           "secret there, which may have expired, and set " +
+                           prefix_ + "client_secret to it. The provider must accept client_secret_post.";
         } else if (error == "invalid_request") {
-            // Some providers look at the code's form before they look at the client.
+            // Some providers check the form of the code before the client.
             check.mark = Mark::kNote;
-            check.remedy = "it may be the made-up code alone; try tavosso-doctor login";
+            check.remedy = "The provider may have rejected the test code only. Run: sudo tavosso-doctor login";
         } else {
-            check.remedy = "look for this error in the provider's documentation";
+            check.remedy = "Run: tavosso-doctor explain " + Quoted(error);
         }
         report_.Add(check);
+    }
+
+    std::string PublishedTokenEndpoint() const {
+        const std::string published = TAVO::Web::StringMember(discovery_, "token_endpoint");
+        return published.empty() ? "" : ": " + Quoted(published);
+    }
+
+    /// A provider that rejects a wrong secret before it checks the code has accepted the right one.
+    std::string DescribeAcceptance() {
+        std::string response;
+        client_->RequestTokenEndpoint(response, WithSecret(client_->GetIDTokenReqParams(), kTestSecret));
+        const Transfer transfer = LastTransfer(report_);
+        const std::string error = TAVO::Web::StringMember(TAVO::Web::ParseObject(response), "error");
+        if (transfer.result == CURLE_OK && (error == "invalid_client" || transfer.status == kUnauthorized)) {
+            return "the provider accepts the client's id and secret";
+        }
+        report_.Unproved("that the client secret is correct: the provider checks the code before the secret");
+        return "the provider did not reject the client's id and secret, but it may not have checked them";
     }
 
     std::string LibraryOn(const std::string &response) {
@@ -350,8 +351,8 @@ class ProviderCheck {
     Report &report_;
     Client &client_;
     Json::Value discovery_;
-    bool knowsClock_ = false;
-    std::set<std::string> toldCertificates_;
+    std::string prefix_;  // of the keys in the client's file
+    TransferChecks transfers_;
 };
 
 }  // namespace

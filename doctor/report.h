@@ -3,62 +3,64 @@
 
 #include <json/json.h>
 
+#include <cstddef>
 #include <ctime>
 #include <string>
 #include <vector>
 
-// What was found, for people line by line as it comes, or for machines as one JSON object at the end.
+// The results of the checks, as text or as one JSON object.
 namespace Doctor {
 
-/// Counts up when a member of the JSON is taken away or changes its meaning. One more member or id does not change it.
+/// Increases when a member of the JSON is removed or changes its meaning. New members and ids do not change it.
 constexpr int kJsonVersion = 1;
 
-/// On one line, and of characters alone that a terminal shows and does not obey. What is none in UTF-8 is replaced.
+/// Returns one line without control characters. Invalid bytes are replaced.
 std::string Printable(const std::string &text);
 
 std::string Quoted(const std::string &text);
 
-/// In UTC, as strftime's format has it; the bare number where the year takes more than four digits.
+/// Formats a time in UTC with strftime. Returns the number if the year has more than four digits.
 std::string TimeText(std::time_t time, const char *format);
 
-/// On standard output.
+/// Writes to standard output.
 void WriteJson(const Json::Value &json);
 
 enum class Mark {
     kGood,
-    kNote,        // worth knowing, and no reason why a login would fail
-    kFinding,     // something to be put right
-    kNotChecked,  // because of an earlier finding, or because it was not asked for
+    kNote,        // does not affect sign-in
+    kFinding,     // to be fixed
+    kNotChecked,  // because of an earlier finding, or not requested
 };
 
-/// One thing that was looked at.
 struct Check {
-    std::string id;  // for machines, and for looking it up: it keeps its meaning
+    std::string id;  // does not change its meaning
     std::string subject;
     Mark mark = Mark::kGood;
     std::string found;
-    std::string remedy;   // empty unless there is something to do
-    std::string library;  // the library's own word for it: the text of the exception that ends such a login
+    std::string remedy;   // an instruction, or empty
+    std::string library;  // the exception with which the library ends such a login, or empty
 };
 
 struct Presentation {
     bool isJson = false;
     bool isVerbose = false;
+    bool isQuiet = false;
     bool hasColours = false;
+    std::size_t width = 0;  // of the terminal, in characters; 0: lines are not wrapped
 };
 
-/**
- * Collects and prints. Whatever comes from outside is put on one line, without control characters: a provider's answer
- * must not move an administrator's cursor. What `Hide` has been told is printed by nothing in here.
- */
+/// Collects the results and prints them at the end: findings first. Texts are printed on one line, without control
+/// characters, and without what `Hide` has received.
 class Report {
   public:
     explicit Report(Presentation presentation) : presentation_(presentation) {}
 
-    /// A secret, a code or a token: no text that holds it is printed as it stands, nor one with its percent-encoding.
+    /// Replaces a secret, a code or a token in all output, also in percent-encoding.
     void Hide(const std::string &secret);
 
+    /// Begins a group of checks.
     void Section(const std::string &title);
+
     void Add(Check check);
     void Good(const std::string &id, const std::string &subject, const std::string &found);
     void Note(const std::string &id, const std::string &subject, const std::string &found,
@@ -67,25 +69,46 @@ class Report {
                  const std::string &remedy);
     void NotChecked(const std::string &id, const std::string &subject, const std::string &why);
 
-    /// What only whoever asks for more wants to see.
+    /// A line of --verbose.
     void Detail(const std::string &text);
 
-    /// For people alone: what to do next, where a command talks with them.
+    /// Something that the checks cannot prove. Printed if there are no findings.
+    void Unproved(const std::string &what);
+
+    /// A result that the user asked for. Printed after the checks.
+    void Result(const std::string &text);
+
+    /// Prints text for a person at once.
     void Say(const std::string &text);
 
     bool HasFindings() const;
 
-    /// The last line, or the JSON object: of a command, with what it has to tell beside the checks.
-    void Finish(const std::string &command, const Json::Value &more = Json::Value(Json::objectValue));
+    /// Prints the report. `more` has members of the JSON object; `nextStep` is printed if there are no findings.
+    void Finish(const std::string &command, const std::string &nextStep = "",
+                const Json::Value &more = Json::Value(Json::objectValue));
 
   private:
+    struct Group {
+        std::string title;
+        std::vector<Check> checks;
+        std::vector<std::string> details;
+    };
+
+    std::vector<Check> ChecksOf(Mark mark) const;
     std::string Redact(std::string text) const;
     void Print(const Check &check) const;
-    void PrintNotChecked() const;
+    void PrintMark(Mark mark) const;
+    void PrintWrapped(const std::string &text, std::size_t indent, std::size_t column) const;
+    void PrintGroups() const;
+    void PrintSummary(const Group &group) const;
+    void PrintEnd(const std::string &nextStep) const;
+    void PrintJson(const std::string &command, const Json::Value &more) const;
 
     Presentation presentation_;
     std::vector<std::string> hidden_;
-    std::vector<Check> checks_;
+    std::vector<Group> groups_;
+    std::vector<std::string> unproved_;
+    std::vector<std::string> results_;
 };
 
 }  // namespace Doctor

@@ -6,21 +6,23 @@
 #include <array>
 #include <boost/algorithm/string/predicate.hpp>
 #include <cerrno>
-#include <cstring>
 #include <fstream>
 #include <numeric>
 #include <sstream>
+#include <system_error>
+
+#include "doctor/file_text.h"
+#include "doctor/rights.h"
 
 namespace Doctor {
 
 namespace {
 
-// Names that are further from each other were hardly meant to be the same.
+// More edits make another name.
 constexpr std::size_t kFarthestSlip = 4;
 constexpr std::size_t kLongestKey = 64;
 
-/// How many characters have to be put in, taken away or exchanged (the Levenshtein distance). A name that is longer
-/// than any key is far from all of them.
+/// Returns the Levenshtein distance. A name that is longer than every key is far from all of them.
 std::size_t Distance(const std::string &name, const std::string &key) {
     std::array<std::size_t, kLongestKey + 1> row{};
     if (name.size() > kLongestKey || key.size() > kLongestKey) {
@@ -47,20 +49,14 @@ std::string NearestOf(const std::vector<std::string> &known, const std::string &
     return distance(*nearest) <= kFarthestSlip ? *nearest : "";
 }
 
-/// Where a reader of the file has to look. The reader's own message is left out where it quotes the file: that may be
-/// the secret.
-std::string Position(const std::string &text, const Json::Reader::StructuredError &error) {
+/// Describes an error of the JSON reader. Omits the reader's message if it quotes the file, which may hold the secret.
+std::string Describe(const std::string &text, const Json::Reader::StructuredError &error) {
     const auto offset = std::min<std::size_t>(static_cast<std::size_t>(error.offset_start), text.size());
-    const auto end = text.begin() + static_cast<std::ptrdiff_t>(offset);
-    const auto line = 1 + std::count(text.begin(), end, '\n');
-    const std::size_t lineBreak = offset == 0 ? std::string::npos : text.rfind('\n', offset - 1);
-    const std::size_t column = lineBreak == std::string::npos ? offset + 1 : offset - lineBreak;
     const bool quotes = boost::contains(error.message, "is not a number");
-    return "line " + std::to_string(line) + ", column " + std::to_string(column) + ": " +
-           (quotes ? "this is no number" : error.message);
+    return PositionOf(text, offset) + ": " + (quotes ? "not a number" : error.message);
 }
 
-// What the library parses its files with, and so what decides whether it can.
+// The library's JSON reader.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 
@@ -68,41 +64,93 @@ std::string ProblemOf(const std::string &text, Json::Value &content) {
     Json::Reader reader;
     try {
         if (reader.parse(text.data(), text.data() + text.size(), content, true)) {
-            return content.isObject() ? "" : "is JSON, but no object";
+            return content.isObject() ? "" : "is JSON, but not an object";
         }
     } catch (const Json::Exception &) {
-        return "is no JSON: nested too deeply";
+        return "is not JSON: nested too deeply";
     }
     const auto errors = reader.getStructuredErrors();
-    return "is no JSON" + (errors.empty() ? "" : ": " + Position(text, errors.front()));
+    return "is not JSON" + (errors.empty() ? "" : ": " + Describe(text, errors.front()));
 }
 
 #pragma GCC diagnostic pop
 
+void ExplainError(SettingsFile &file, int error, RunAs runAs) {
+    const std::string page = "tavosso-" + file.path.substr(file.path.rfind('/') + 1);
+    if (error == ENOENT) {
+        file.isMissing = true;
+        file.problem = file.path + " is missing";
+        file.remedy = "Write the file. For an example, run: man 5 " + page;
+        return;
+    }
+    file.problem = file.path + " cannot be read: " + std::generic_category().message(error);
+    file.remedy = "Run: ls -ld " + file.path + ". It must be a regular file. Remove it and write it again.";
+    if (error == EACCES) {
+        const std::string refusing = WhatRefuses(file.path);
+        struct stat status = {};
+        if (stat(refusing.c_str(), &status) == 0) {
+            file.problem += "; " + refusing + " refuses: " + DescribeRights(status);
+        }
+        file.remedy = RemedyForRefusal(file.path, runAs);
+    }
+}
+
 }  // namespace
 
-SettingsFile ReadSettingsFile(const std::string &path) {
-    SettingsFile file{path, Json::Value(), "", "", false};
+std::string RemedyForRefusal(const std::string &path, RunAs runAs) {
+    switch (runAs) {
+        case RunAs::kOrdinaryUser:
+            return "Run: sudo tavosso-doctor";
+        case RunAs::kChosenUser:
+            return "Start the programs of the web server as root, or with root as saved user and group id.";
+        case RunAs::kRoot:
+            break;
+    }
+    return "Compare: namei -l " + path +
+           ". If the modes allow root, a security module refuses: check aa-status, getenforce and the system log.";
+}
+
+SettingsFile ReadTextFile(const std::string &path, RunAs runAs) {
+    SettingsFile file;
+    file.path = path;
     errno = 0;
     const std::ifstream stream(path, std::ios::binary);
     std::ostringstream content;
-    content << stream.rdbuf();  // which throws nothing where it is a directory
+    content << stream.rdbuf();  // does not throw if it is a directory
     if (errno != 0) {
-        const bool isMissing = errno == ENOENT;
-        file.isRefused = errno == EACCES;
-        file.problem = path + (isMissing ? " is missing" : std::string(" cannot be read: ") + std::strerror(errno));
-        file.remedy =
-            isMissing ? "write it; its manual page has an example: man 5 tavosso-" + path.substr(path.rfind('/') + 1)
-                      : "look at what it is, who owns it, and who may read it: ls -l " + path;
+        ExplainError(file, errno, runAs);
+    }
+    file.text = content.str();
+    return file;
+}
+
+SettingsFile ReadSettingsFile(const std::string &path, RunAs runAs) {
+    SettingsFile file = ReadTextFile(path, runAs);
+    if (!file.problem.empty()) {
         return file;
     }
-    const std::string problem = ProblemOf(content.str(), file.content);
+    const std::string problem = ProblemOf(file.text, file.content);
     if (!problem.empty()) {
+        const TextProblem mistake = FindMistake(file.text);
         file.content = Json::Value();
-        file.problem = path + " " + problem;
-        file.remedy = "mend the file at that place; the library treats it as if it were missing";
+        file.problem = path + (mistake.what.empty()                       ? " " + problem
+                               : boost::starts_with(mistake.what, "line") ? " is not JSON: " + mistake.what
+                                                                          : " " + mistake.what);
+        file.remedy = mistake.what.empty() ? "Correct this place. The library treats the file as missing."
+                                           : mistake.remedy + " The library treats the file as missing.";
     }
     return file;
+}
+
+void ReportText(Report &report, const std::string &group, const SettingsFile &file) {
+    const TextProblem byte = FindInvalidByte(file.text);
+    if (!byte.what.empty()) {
+        report.Finding(group + ".encoding", "encoding", file.path + ", " + byte.what, byte.remedy);
+    }
+    const TextProblem key = FindDuplicateKey(file.text);
+    if (!key.what.empty()) {
+        report.Finding(group + ".duplicate_key", "repeated key", file.path + ", " + key.what, key.remedy);
+    }
 }
 
 void ReportUnknownKeys(Report &report, const std::string &id, const SettingsFile &file,
@@ -115,31 +163,33 @@ void ReportUnknownKeys(Report &report, const std::string &id, const SettingsFile
         if (nearest.empty()) {
             report.Note(id, "unknown key", Quoted(name) + " is ignored");
         } else {
-            report.Finding(id, "unknown key", Quoted(name) + " is ignored: no key has this name",
-                           "call it " + Quoted(nearest) + ", if that was meant; capitals count");
+            report.Finding(id, "unknown key", Quoted(name) + " is ignored: it is not a key",
+                           "Rename it to " + Quoted(nearest) + " in " + file.path + ". Keys are case-sensitive.");
         }
     }
 }
 
 void ReportRights(Report &report, const std::string &id, const SettingsFile &file, bool holdsSecret) {
+    constexpr char kSubject[] = "rights";
     struct stat status = {};
     if (stat(file.path.c_str(), &status) != 0) {
-        return;  // which the check of the file has already told
+        return;  // a finding of the file
     }
-    constexpr mode_t kOthersRead = S_IRGRP | S_IROTH;
-    constexpr mode_t kOthersWrite = S_IWGRP | S_IWOTH;
-    char mode[8];
-    std::snprintf(mode, sizeof mode, "%04o", static_cast<unsigned int>(status.st_mode & 07777));
-    const std::string found = std::string("mode ") + mode + ", owner " + std::to_string(status.st_uid);
-    if (holdsSecret && (status.st_mode & kOthersRead) != 0) {
-        report.Finding(id, "rights", found + ": others can read the client secret",
-                       "chmod 600 " + file.path + ", and get a new secret from the provider");
-    } else if (status.st_uid != 0 || (status.st_mode & kOthersWrite) != 0) {
-        report.Finding(id, "rights", found + ": others than root can change it",
-                       "chown root " + file.path + "; chmod go-w " + file.path);
-    } else {
-        report.Good(id, "rights", found);
+    if (holdsSecret && (status.st_mode & (S_IRGRP | S_IROTH)) != 0) {
+        report.Finding(id, kSubject, DescribeRights(status) + ": other users can read the client secret",
+                       "Run: sudo chmod 600 " + file.path + ". Then request a new client secret from the provider.");
+        return;
     }
+    std::vector<std::string> paths = FoldersAbove(file.path);
+    paths.push_back(file.path);
+    for (const std::string &path : paths) {
+        if (stat(path.c_str(), &status) == 0 && !IsChangedByRootOnly(status)) {
+            report.Finding(id, kSubject, path + ": " + DescribeRights(status) + ": users other than root can change it",
+                           "Run: sudo chown root " + path + "; sudo chmod go-w " + path);
+            return;
+        }
+    }
+    report.Good(id, kSubject, DescribeRights(status));
 }
 
 }  // namespace Doctor

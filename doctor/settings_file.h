@@ -8,30 +8,46 @@
 
 #include "doctor/report.h"
 
-// A configuration file: whether it can be read, and what stands in it beside what should.
+// A configuration file: whether it can be read, its rights and its keys.
 namespace Doctor {
 
 constexpr char kProfileFile[] = "/usr/tavo/etc/ssoclient/profile.conf";
 constexpr char kAzureFile[] = "/usr/tavo/etc/ssoclient/azure.conf";
 constexpr char kWebSphereFile[] = "/usr/tavo/etc/ssoclient/websphere.conf";
-constexpr char kDomainTable[] = "/usr/tavo/etc/domains.conf";
+
+/// Whose rights the doctor has.
+enum class RunAs {
+    kRoot,
+    kChosenUser,    // of --user
+    kOrdinaryUser,  // who forgot sudo
+};
 
 struct SettingsFile {
     std::string path;
+    std::string text;
     Json::Value content;  // an object; null where there is a problem
-    std::string problem;  // why the library cannot use the file
+    bool isMissing = false;
+    std::string problem;  // why the library cannot use the file, or empty
     std::string remedy;
-    bool isRefused = false;  // it is there, and these ids may not read it
 };
 
-/// Reads as the library does, with its JSON reader and with the ids of this process.
-SettingsFile ReadSettingsFile(const std::string &path);
+/// What to do if the rights of this process do not suffice to read a file.
+std::string RemedyForRefusal(const std::string &path, RunAs runAs);
 
-/// A note for each key that the library ignores, with the known one that it may have been meant for.
+/// Reads the text only.
+SettingsFile ReadTextFile(const std::string &path, RunAs runAs);
+
+/// Reads with the library's JSON reader and the ids of this process.
+SettingsFile ReadSettingsFile(const std::string &path, RunAs runAs);
+
+/// Reports bytes that are not UTF-8, and repeated keys. `group` begins the ids.
+void ReportText(Report &report, const std::string &group, const SettingsFile &file);
+
+/// Reports each key that the library ignores, with the key of a similar name.
 void ReportUnknownKeys(Report &report, const std::string &id, const SettingsFile &file,
                        const std::vector<std::string> &known);
 
-/// Whether others than its owner can read a secret in it, or anyone but root can change it.
+/// Reports whether other users can read a secret in the file, or change the file or a folder above it.
 void ReportRights(Report &report, const std::string &id, const SettingsFile &file, bool holdsSecret);
 
 }  // namespace Doctor

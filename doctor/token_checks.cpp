@@ -1,4 +1,4 @@
-// An ID token: the library verifies it, and the report says at which step it stops and what the token has there.
+// An ID token: the steps of the library's verification, and the token's values.
 #include <jwt/jwt.h>
 #include <sso/limits.h>
 
@@ -61,7 +61,7 @@ class TokenCheck {
     }
 
   private:
-    /// The text of the exception that ends the library's verification, empty where it takes the token.
+    /// Returns the text of the exception that ends the library's verification; empty if it accepts the token.
     std::string Verify() {
         if (client_.Azure() != nullptr) {
             client_.Azure()->mayFetch = mayFetch_;
@@ -73,7 +73,7 @@ class TokenCheck {
             try {
                 client_->VerifyIDToken();
             } catch (const not_fetched &) {
-                // The name can be found without the keys.
+                // The name does not need the keys.
             }
             client_->GetUserName(userName_);
             return {};
@@ -84,7 +84,7 @@ class TokenCheck {
         }
     }
 
-    /// A step of the library's verification, which ends there with one of these texts of the table of failures.
+    /// Reports a step of the library's verification, which fails with one of these texts of the failure table.
     void Step(const std::string &id, const std::string &subject, std::initializer_list<const char *> stops,
               const std::string &found, bool needsKeys = false) {
         if (!stop_.empty()) {
@@ -96,7 +96,7 @@ class TokenCheck {
                          found + log_ + (id == "token.key" && log_.empty() ? PublishedKeys() : ""), RemedyOf(failure_),
                          failure_});
         } else if (needsKeys && !mayFetch_) {
-            report_.NotChecked(id, subject, found + "; --fetch asks the provider for its keys");
+            report_.NotChecked(id, subject, found + "; --fetch fetches the provider's keys");
         } else {
             report_.Good(id, subject, found);
         }
@@ -120,7 +120,7 @@ class TokenCheck {
             Compare("token.tenant", "tid", "tenant ID invalid", "azure_tenant_id", client_.Azure()->GetTenantID());
         }
         Compare("token.audience", "aud", "client ID invalid", NameOf(client_.profile()) + "_client_id",
-                client_->GetClientID());
+                MayPrintClientID(client_) ? client_->GetClientID() : "[hidden]");
         const std::string kid = Describe(header_, "kid");
         if (isAzure) {
             Step("token.key", "key: \"kid\"", {"kid does not exist in Azure verified kyes"}, kid, true);
@@ -154,15 +154,18 @@ class TokenCheck {
     }
 
     void CheckUser(bool isAzure) {
-        const Json::Value &claims = claims_;  // a look at one that can be changed would put what is missing into it
+        const Json::Value &claims = claims_;  // operator[] of a mutable value would add the member
         const char *claim = !isAzure                                                ? "sub"
                             : claims.isObject() && claims["unique_name"].isString() ? "unique_name"
                                                                                     : "email";
         Step("token.user_name", "user name: " + Quoted(claim),
              {"cannot find the user name!", "cannot get the user name!"}, Describe(claims, claim));
-        // After a failure it has the form that was to be converted.
+        // After a failure, userName_ is the name before the conversion.
         Step("token.domain", isAzure ? "domain of the user" : "user", {"TAVOWinsUserNameFqdn2Netbios failed."},
              (stop_.empty() && failure_.empty() ? "signs in as " : "") + Quoted(userName_));
+        if (stop_.empty() && failure_.empty()) {
+            report_.Result("The user signs in as " + Quoted(userName_) + ".");
+        }
     }
 
     std::string PublishedKeys() {
@@ -174,7 +177,7 @@ class TokenCheck {
         for (const Json::Value &key : keySet.isObject() ? keySet["keys"] : Json::Value()) {
             kids.push_back(Describe(key, "kid"));
         }
-        return "; the provider has published " + (kids.empty() ? "none" : boost::join(kids, ", ")) + TakeMessages();
+        return "; the provider publishes " + (kids.empty() ? "none" : boost::join(kids, ", ")) + TakeMessages();
     }
 
     Report &report_;
@@ -189,7 +192,7 @@ class TokenCheck {
     Json::Value claims_;
 };
 
-/// The token, and its claims and its signature, which are secrets on their own.
+/// Hides the token, and its claims and its signature alone.
 void HideToken(Report &report, const std::string &token) {
     report.Hide(token);
     const std::size_t claims = token.find('.') + 1;

@@ -1,13 +1,17 @@
 #include "doctor/watch.h"
 
 #include <dlfcn.h>
+#include <netdb.h>
+#include <sys/socket.h>
 
 #include <boost/algorithm/string/predicate.hpp>
 #include <chrono>
 #include <cstdarg>
 #include <cstdio>
+#include <set>
 #include <utility>
 
+#include "doctor/address.h"
 #include "doctor/report.h"
 
 namespace Doctor {
@@ -19,14 +23,47 @@ std::vector<Transfer> transfers;
 TransferRules rules;
 int refusals = 0;
 
-/// Of a header line the server's time, if it is the line that tells it (RFC 9110, section 6.6.1).
-std::size_t ReadDate(char *line, std::size_t /*one*/, std::size_t length, void *date) {
+std::set<std::string> silentHosts;
+
+/// A running transfer.
+struct Watched {
+    Transfer transfer;
+    long headerBytes = 0;
+};
+
+/// Reads "Date" (RFC 9110, section 6.6.1).
+std::size_t ReadHeader(char *line, std::size_t /*one*/, std::size_t length, void *watched) {
+    auto &[transfer, headerBytes] = *static_cast<Watched *>(watched);
+    headerBytes += static_cast<long>(length);
+    if (headerBytes > kLongestResponse) {
+        transfer.isTooLong = true;
+        return 0;
+    }
     const std::string text(line, length);
     constexpr char kDate[] = "date:";
     if (boost::istarts_with(text, kDate)) {
-        *static_cast<std::time_t *>(date) = curl_getdate(text.c_str() + sizeof kDate - 1, nullptr);
+        transfer.date = curl_getdate(text.c_str() + sizeof kDate - 1, nullptr);
     }
     return length;
+}
+
+/// Stops a transfer whose content is too long.
+int LimitContent(void *watched, curl_off_t /*expected*/, curl_off_t received, curl_off_t /*toSend*/,
+                 curl_off_t /*sent*/) {
+    Transfer &transfer = static_cast<Watched *>(watched)->transfer;
+    transfer.isTooLong = transfer.isTooLong || received > kLongestResponse;
+    return transfer.isTooLong ? 1 : 0;
+}
+
+/// Opens a socket, and records the address that it is for.
+curl_socket_t OpenSocket(void *watched, curlsocktype /*purpose*/, curl_sockaddr *address) {
+    char host[NI_MAXHOST];
+    char port[NI_MAXSERV];
+    if (getnameinfo(&address->addr, address->addrlen, host, sizeof host, port, sizeof port,
+                    NI_NUMERICHOST | NI_NUMERICSERV) == 0) {
+        static_cast<Watched *>(watched)->transfer.addresses.push_back(std::string(host) + " port " + port);
+    }
+    return socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
 }
 
 Certificate ReadCertificate(const curl_slist *fields) {
@@ -36,12 +73,16 @@ Certificate ReadCertificate(const curl_slist *fields) {
             value = field.substr(std::string(name).size());
         }
     };
+    std::string begins;
     std::string expires;
     for (; fields != nullptr; fields = fields->next) {
         valueOf(fields->data, "Subject:", certificate.subject);
         valueOf(fields->data, "Issuer:", certificate.issuer);
+        valueOf(fields->data, "X509v3 Subject Alternative Name:", certificate.names);
+        valueOf(fields->data, "Start date:", begins);
         valueOf(fields->data, "Expire date:", expires);
     }
+    certificate.begins = begins.empty() ? -1 : curl_getdate(begins.c_str(), nullptr);
     certificate.expires = expires.empty() ? -1 : curl_getdate(expires.c_str(), nullptr);
     return certificate;
 }
@@ -80,24 +121,74 @@ class Progress {
     Progress &operator=(const Progress &) = delete;
 };
 
-CURLcode Perform(CURL *handle) {
-    Transfer transfer;
+Stage StageOf(CURL *handle, const Transfer &transfer) {
+    curl_off_t connected = 0;
+    curl_off_t secured = 0;
+    curl_easy_getinfo(handle, CURLINFO_CONNECT_TIME_T, &connected);
+    curl_easy_getinfo(handle, CURLINFO_APPCONNECT_TIME_T, &secured);
+    return secured > 0                   ? Stage::kSecured
+           : connected > 0               ? Stage::kConnected
+           : !transfer.addresses.empty() ? Stage::kResolved
+                                         : Stage::kBegun;
+}
+
+void ReadResult(CURL *handle, Transfer &transfer) {
+    long systemError = 0;
+    curl_easy_getinfo(handle, CURLINFO_OS_ERRNO, &systemError);
+    transfer.systemError = static_cast<int>(systemError);
+    curl_easy_getinfo(handle, CURLINFO_SSL_VERIFYRESULT, &transfer.verification);
+    curl_easy_getinfo(handle, CURLINFO_HTTP_CONNECTCODE, &transfer.proxyStatus);
+    curl_easy_getinfo(handle, CURLINFO_RESPONSE_CODE, &transfer.status);
+    transfer.contentType = TextOf(handle, CURLINFO_CONTENT_TYPE);
+    transfer.location = TextOf(handle, CURLINFO_REDIRECT_URL);
+    transfer.certificates = ReadCertificates(handle);
+    transfer.stage = StageOf(handle, transfer);
+}
+
+bool IsSilence(CURLcode result) {
+    return result == CURLE_COULDNT_RESOLVE_HOST || result == CURLE_COULDNT_RESOLVE_PROXY ||
+           result == CURLE_COULDNT_CONNECT || result == CURLE_OPERATION_TIMEDOUT;
+}
+
+void Run(CURL *handle, Watched &watched) {
+    Transfer &transfer = watched.transfer;
+    char error[CURL_ERROR_SIZE] = {};
+    curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error);
     curl_easy_setopt(handle, CURLOPT_TIMEOUT, rules.timeout);
+    curl_easy_setopt(handle, CURLOPT_CONNECTTIMEOUT, (rules.timeout + 1) / 2);
+    curl_easy_setopt(handle, CURLOPT_QUICK_EXIT, 1L);  // a resolver that hangs would exceed the timeout
     curl_easy_setopt(handle, CURLOPT_CERTINFO, 1L);
-    curl_easy_setopt(handle, CURLOPT_HEADERFUNCTION, ReadDate);
-    curl_easy_setopt(handle, CURLOPT_HEADERDATA, &transfer.date);
+    curl_easy_setopt(handle, CURLOPT_HEADERFUNCTION, ReadHeader);
+    curl_easy_setopt(handle, CURLOPT_HEADERDATA, &watched);
+    curl_easy_setopt(handle, CURLOPT_XFERINFOFUNCTION, LimitContent);
+    curl_easy_setopt(handle, CURLOPT_XFERINFODATA, &watched);
+    curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 0L);
+    curl_easy_setopt(handle, CURLOPT_OPENSOCKETFUNCTION, OpenSocket);
+    curl_easy_setopt(handle, CURLOPT_OPENSOCKETDATA, &watched);
+    const Progress progress(transfer.url);
+    const auto begin = std::chrono::steady_clock::now();
+    static const auto perform = reinterpret_cast<CURLcode (*)(CURL *)>(dlsym(RTLD_NEXT, "curl_easy_perform"));
+    transfer.result = perform(handle);
+    transfer.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
+    transfer.error = *error != '\0' ? error : curl_easy_strerror(transfer.result);
+    curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, nullptr);
+    ReadResult(handle, transfer);
+}
+
+CURLcode Perform(CURL *handle) {
+    Watched watched;
+    Transfer &transfer = watched.transfer;
     transfer.url = TextOf(handle, CURLINFO_EFFECTIVE_URL);
-    if (refusals > 0) {
+    const Address address = SplitAddress(transfer.url);
+    const std::string host = address.host + ' ' + address.port;
+    transfer.isSkipped = silentHosts.count(host) != 0;
+    if (refusals > 0 || transfer.isSkipped) {
         transfer.result = CURLE_ABORTED_BY_CALLBACK;
     } else {
-        const Progress progress(transfer.url);
-        const auto begin = std::chrono::steady_clock::now();
-        static const auto perform = reinterpret_cast<CURLcode (*)(CURL *)>(dlsym(RTLD_NEXT, "curl_easy_perform"));
-        transfer.result = perform(handle);
-        transfer.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
-        curl_easy_getinfo(handle, CURLINFO_RESPONSE_CODE, &transfer.status);
-        transfer.location = TextOf(handle, CURLINFO_REDIRECT_URL);
-        transfer.certificates = ReadCertificates(handle);
+        Run(handle, watched);
+        if (IsSilence(transfer.result)) {
+            silentHosts.insert(host);
+        }
     }
     transfers.push_back(transfer);
     return transfer.result;

@@ -14,18 +14,34 @@ namespace Doctor {
 struct Certificate {
     std::string subject;
     std::string issuer;
-    std::time_t expires = -1;  // -1 where libcurl tells no date
+    std::string names;         // subject alternative names
+    std::time_t begins = -1;   // -1 if unknown
+    std::time_t expires = -1;  // -1 if unknown
 };
+
+/// The last step of a transfer that succeeded.
+enum class Stage { kBegun, kResolved, kConnected, kSecured };
 
 struct Transfer {
     std::string url;
     CURLcode result = CURLE_OK;
+    std::string error;                   // libcurl's description of this failure
+    int systemError = 0;                 // errno of a failed connection
+    long verification = 0;               // OpenSSL's result for the certificate
+    long proxyStatus = 0;                // of the proxy's response to CONNECT
+    std::vector<std::string> addresses;  // to which a connection was tried
+    Stage stage = Stage::kBegun;
+    bool isSkipped = false;  // the host did not answer an earlier transfer
+    bool isTooLong = false;  // the response exceeds the limit
     long status = 0;
-    std::string location;  // where the answer sends a browser, whole; empty where it does not
+    std::string contentType;
+    std::string location;  // absolute; empty unless the response is a redirect
     double seconds = 0;
-    std::time_t date = -1;                  // by the server's clock, from its "Date"; -1 where it told none
-    std::vector<Certificate> certificates;  // the server's own first; none where TLS was not established
+    std::time_t date = -1;                  // of the "Date" header; -1 if there is none
+    std::vector<Certificate> certificates;  // the server's own first; empty without TLS
 };
+
+constexpr long kLongestResponse = 4L << 20;  // in bytes, of headers and of content
 
 /// The lines that would have gone to the system's log, since they were last taken.
 std::vector<std::string> TakeLogLines();
@@ -40,8 +56,8 @@ std::string TakeMessages();
 std::vector<Transfer> TakeTransfers();
 
 struct TransferRules {
-    long timeout = 10;          // in seconds, for each; the library itself waits without a limit
-    bool showProgress = false;  // on standard error, for as long as it takes
+    long timeout = 10;          // in seconds, for each response. Half of it is the limit for connecting
+    bool showProgress = false;  // on standard error
 };
 void SetTransferRules(const TransferRules &rules);
 

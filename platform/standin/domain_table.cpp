@@ -14,23 +14,16 @@ namespace TAVO::Platform {
 
 namespace {
 
-/// A JSON object: DNS domain names and their NetBIOS names.
-constexpr char kDomainTable[] = "/usr/tavo/etc/domains.conf";
-
 /// Returns null if the file is missing or not JSON. Throws if memory runs out: the table overrides the directory, so it
 /// must not count as missing.
 Json::Value ReadTable() {
-    Json::Value table;
     try {
         std::ifstream file(kDomainTable);
         if (!file && errno == ENOMEM) {
             throw std::bad_alloc();
         }
         const std::string text{std::istreambuf_iterator<char>(file), {}};
-        const std::unique_ptr<Json::CharReader> reader(Json::CharReaderBuilder().newCharReader());
-        if (reader->parse(text.data(), text.data() + text.size(), &table, nullptr)) {
-            return table;
-        }
+        return ParseDomainTable(text, nullptr);
     } catch (const std::ios_base::failure &) {
         // The path is a directory.
     }
@@ -38,6 +31,12 @@ Json::Value ReadTable() {
 }
 
 }  // namespace
+
+Json::Value ParseDomainTable(const std::string &text, std::string *errors) {
+    Json::Value table;
+    const std::unique_ptr<Json::CharReader> reader(Json::CharReaderBuilder().newCharReader());
+    return reader->parse(text.data(), text.data() + text.size(), &table, errors) ? table : Json::Value();
+}
 
 std::optional<std::string> FindInDomainTable(const std::string &domain) {
     const Json::Value table = ReadTable();

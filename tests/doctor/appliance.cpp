@@ -37,6 +37,7 @@ void KeepTokenSecret(const std::string &token) {
 
 Json::Value GoodClaims(Profile profile) {
     Json::Value claims = TokenClaims(profile);
+    claims["aud"] = kClientID;
     claims["exp"] = Json::Int64(std::time(nullptr) + kLifetime);
     if (profile == Profile::kAzure) {
         claims["tid"] = kTenant;

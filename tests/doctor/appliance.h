@@ -18,7 +18,7 @@
 namespace Test {
 
 constexpr char kClientSecret[] = "q7Zp-Lw2x&K%9vTe Rb4n+Ym8s";
-constexpr char kClientID[] = "the client";
+constexpr char kClientID[] = "7b1c9f0e-2d3a-4c5b-8e6f-1a2b3c4d5e6f";
 constexpr char kCode[] = "0.AXkA-good/code&of-one=sign-in";
 constexpr char kTenant[] = "4f6d2c1e-9b7a-4c3d-8e5f-0a1b2c3d4e5f";
 constexpr char kReturnURI[] = "https://nas.example/webman/sso/return.cgi";

@@ -173,12 +173,12 @@ void ExpectInOrder(const Report &report, const std::string &stop) {
     }
 }
 
+}  // namespace
+
 Strings With(Strings arguments, const std::string &more) {
     arguments.push_back(more);
     return arguments;
 }
-
-}  // namespace
 
 void KeepSecret(const std::string &text, std::size_t piece) {
     for (const std::string &form : {text, TAVO::SSO::URLEncode(text)}) {

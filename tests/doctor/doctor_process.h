@@ -52,6 +52,9 @@ struct Report {
     Strings Findings() const;  // their ids
 };
 
+/// The arguments, and one more.
+Strings With(Strings arguments, const std::string &more);
+
 /// Runs the doctor for machines and for people: what the latter read is looked at as in `RunDoctor`.
 Report Ask(const Strings &arguments, const std::string &input = "");
 

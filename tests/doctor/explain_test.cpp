@@ -124,7 +124,7 @@ TEST(Explain, ReportsAnUnknownText) {
         EXPECT_EQ(Explanations(text), Strings()) << text;
     }
     EXPECT_EQ(RunDoctor({"explain", "a text of someone else"}).output,
-              "This text is unknown. Try a whole line of the log, or an exception's text.\n");
+              "Unknown text. Use a whole line of the log, or the text of an exception.\n");
 }
 
 TEST(Explain, ListsEveryRow) {

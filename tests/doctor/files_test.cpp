@@ -49,7 +49,7 @@ TEST_F(Files, SecretWithoutQuotationMarksIsNotPrinted) {
 TEST(ClientSecret, ThatIsShorterThanAKeyOfHS256IsNoted) {
     Appliance appliance(Profile::kWebSphere);
     appliance.SetClient("client_secret", std::string(31, 'k'));
-    EXPECT_THAT(Ask({}).Find("client.client_secret", "note").found, HasSubstr("31 bytes: "));
+    EXPECT_THAT(Ask({}).Find("client.client_secret", "note").found, HasSubstr("31 bytes. "));
     appliance.SetClient("client_secret", std::string(32, 'k'));
     EXPECT_EQ(Ask({}).Find("client.client_secret", "good").found, "is set, 32 bytes");
 }
@@ -62,15 +62,15 @@ TEST(ClientSecret, ThatSignsNoTokenMayBeShort) {
 
 TEST_F(Files, TextInThePlaceOfABooleanIsNoted) {
     appliance.SetClient("sso_enable", "yes");
-    EXPECT_THAT(Ask({}).Find("client.sso_enable", "note").found, HasSubstr("no boolean"));
+    EXPECT_THAT(Ask({}).Find("client.sso_enable", "note").found, HasSubstr("not a boolean"));
 }
 
 TEST_F(Files, NumberInThePlaceOfATextIsAFinding) {
-    EXPECT_THAT(FirstFindingWith("client_id", 4711).found, HasSubstr("no text"));
+    EXPECT_THAT(FirstFindingWith("client_id", 4711).found, HasSubstr("not a string"));
 }
 
 TEST_F(Files, MissingKeyIsAFinding) {
-    EXPECT_THAT(FirstFindingWith("redirect_uri", Json::Value()).found, HasSubstr("is no text"));
+    EXPECT_THAT(FirstFindingWith("redirect_uri", Json::Value()).found, HasSubstr("is not a string"));
     appliance.ChangeClientFile(R"({"azure_redirect_uri": null})");
     EXPECT_EQ(OnlyFinding().found, "is missing");
 }
@@ -103,7 +103,7 @@ TEST_F(Files, TokenEndpointWithoutTLSIsAFindingAndGetsNoSecret) {
 }
 
 TEST_F(Files, EndpointThatIsNoAddressIsAFinding) {
-    EXPECT_THAT(FirstFindingWith("authorization_endpoint", "https://").found, HasSubstr("no address"));
+    EXPECT_THAT(FirstFindingWith("authorization_endpoint", "https://").found, HasSubstr("is not a URL"));
 }
 
 TEST_F(Files, QueryInTheAuthorizationEndpointIsAFinding) {
@@ -112,7 +112,7 @@ TEST_F(Files, QueryInTheAuthorizationEndpointIsAFinding) {
 }
 
 TEST_F(Files, BlankAroundAValueIsAFinding) {
-    EXPECT_THAT(FirstFindingWith("tenant_id", std::string(kTenant) + " ").found, HasSubstr("blanks"));
+    EXPECT_THAT(FirstFindingWith("tenant_id", std::string(kTenant) + " ").found, HasSubstr("a blank"));
 }
 
 TEST_F(Files, RedirectURIOfAnotherPathIsAFindingUnlessTheProgramIsThere) {
@@ -157,12 +157,12 @@ TEST_F(Files, DirectoryInThePlaceOfTheClientsFileIsAFinding) {
 
 TEST_F(Files, ListInThePlaceOfTheClientsKeysIsAFinding) {
     WriteFile(kAzureFile, "[\"azure_client_id\", \"the client\"]");
-    EXPECT_THAT(Ask({}).Find("client.file", "finding").found, EndsWith("is JSON, but no object"));
+    EXPECT_THAT(Ask({}).Find("client.file", "finding").found, EndsWith("is JSON, but not an object"));
 }
 
 TEST_F(Files, TableOfDomainsThatIsNoJSONIsAFinding) {
     WriteFile(kDomainTable, "corp.example = CORP\n");
-    EXPECT_THAT(Ask({}).Find("directory.table", "finding").found, HasSubstr("line 1, column 1: "));
+    EXPECT_THAT(Ask({}).Find("directory.table", "finding").found, HasSubstr("Line 1, Column 1"));
 }
 
 TEST_F(Files, DomainThatNobodyConvertsIsAFinding) {

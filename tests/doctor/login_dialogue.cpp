@@ -39,7 +39,7 @@ std::vector<Check> ReadChecks(const std::string &output) {
             checks.push_back({"", mark, subject.substr(0, subject.find_last_not_of(' ') + 1),
                               line.substr(kMarkWidth + kSubjectWidth + 2), "", ""});
         } else if (!checks.empty()) {
-            checks.back().library += After(line, "the library says: ", "\n");
+            checks.back().library += After(line, "library: ", "\n");
             checks.back().remedy += After(line, " do: ", "\n");
         }
     }
@@ -49,7 +49,7 @@ std::vector<Check> ReadChecks(const std::string &output) {
 }  // namespace
 
 LoginDialogue::LoginDialogue(const Strings &arguments)
-    : dialogue_(Dialogue::Over::kPipes, arguments),
+    : dialogue_(Dialogue::Over::kPipes, With(arguments, "--verbose")),
       address_(After(dialogue_.ReadUntil(kEndOfPrompt), "\n\n  https://", "\n")) {
     EXPECT_NE(address_, "") << "no address to open in a browser";
 }

@@ -68,7 +68,7 @@ TEST_P(LoginOf, AnAddressWithoutACodeIsAFinding) {
     for (const char *query : {"", "?", "?state=s", "?code=", "?code=a&code=b"}) {
         LoginDialogue dialogue;
         EXPECT_THAT(dialogue.Paste(kReturnURI + std::string(query)).FirstFinding().found,
-                    HasSubstr("no address with one code"))
+                    HasSubstr("not an address with one code"))
             << query;
     }
     LoginDialogue dialogue;
@@ -114,14 +114,14 @@ TEST_P(LoginOf, NobodyIsGivenUpWithoutAnAddress) {
 TEST_P(LoginOf, AMachineIsRefused) {
     const DoctorRun run = RunDoctor({"login", "--json"});
     EXPECT_EQ(run.status, 2);
-    EXPECT_THAT(run.errors, HasSubstr("login talks with a person"));
+    EXPECT_THAT(run.errors, HasSubstr("login is a dialogue"));
 }
 
 TEST(Login, NeedsAProfile) {
     RemoveFiles();
     const DoctorRun run = RunDoctor({"login"});
     EXPECT_EQ(run.status, 2);
-    EXPECT_THAT(run.errors, HasSubstr("no profile is in force"));
+    EXPECT_THAT(run.errors, HasSubstr("no profile is configured"));
 }
 
 }  // namespace

@@ -103,7 +103,7 @@ TEST_P(Token, OfAnUnknownKeyIsReportedWithThePublishedOnes) {
     if (GetParam() == Profile::kAzure) {
         appliance.AnswerAt("/keys", KeySet(R"({"kid": "second key"})"));
         const Check finding = Ask({"token", "-", "--fetch"}, appliance.Token()).FirstFinding();
-        EXPECT_EQ(finding.found, R"("first key"; the provider has published "second key")");
+        EXPECT_EQ(finding.found, R"("first key"; the provider publishes "second key")");
     }
 }
 
@@ -134,7 +134,7 @@ TEST_P(Token, CannotBeJudgedWithoutAProfile) {
     RemoveFiles();
     const DoctorRun run = RunDoctor({"token", "-"}, appliance.Token());
     EXPECT_EQ(run.status, 2);
-    EXPECT_THAT(run.errors, HasSubstr("no profile is in force"));
+    EXPECT_THAT(run.errors, HasSubstr("no profile is configured"));
     EXPECT_EQ(run.output, "");
 }
 

@@ -51,7 +51,7 @@ const MISTAKES = [
         () => change('azure', (settings) => ({...settings, azure_wellknown: new URL('/', settings.azure_wellknown).href}))],
     ['has another provider\'s token endpoint', 'azure', 'discovery.token_endpoint',
         () => change('azure', (settings) => ({...settings, azure_token_endpoint: `${settings.azure_token_endpoint}/v2`}))],
-    ['does not trust the provider\'s authority', 'azure', 'discovery.reachable',
+    ['does not trust the provider\'s authority', 'azure', 'discovery.certificate',
         () => copyFileSync(makeAuthority(mkdtempSync('/tmp/another-')).file, SYSTEM_BUNDLE)],
     ['forgets the table of domains', 'azure', 'directory.source', () => rmSync('/usr/tavo/etc/domains.conf')],
 ];

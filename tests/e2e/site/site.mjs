@@ -23,7 +23,7 @@ export function makeUsers(named) {
 /** The clients of both profiles, as registered at the provider, with the addresses of the appliance. */
 export function makeClients(addresses) {
     return [
-        {id: 'appliance-azure', secret: randomSecret(), algorithm: 'RS256', tenant: randomUUID(), ...addresses},
+        {id: randomUUID(), secret: randomSecret(), algorithm: 'RS256', tenant: randomUUID(), ...addresses},
         {id: 'appliance-websphere', secret: randomSecret(), algorithm: 'HS256', ...addresses},
     ];
 }
