@@ -146,7 +146,9 @@ void CheckTenantOfIssuer(Report &report, Client &client, const std::string &issu
         return;
     }
     if (tenant == expected) {
-        report.Good(kID, kSubject, "as configured");
+        if (!issued.empty()) {
+            report.Good(kID, kSubject, "as configured");
+        }
         return;
     }
     const bool isCase = boost::iequals(tenant, expected);

@@ -131,7 +131,7 @@ int CheckEverything(Report &report, const Options &options) {
     const Doctor::RunAs runAs = RunAsOf(options);
     if (runAs == Doctor::RunAs::kOrdinaryUser) {
         report.Section("User");
-        report.Finding("process.user", "user", "not root, so the client's file cannot be read",
+        report.Finding("process.user", "user", "not root. Run with sudo: only root can read the client's file",
                        "Run: sudo tavosso-doctor");
     }
     if (const std::optional<Profile> profile = FindProfile(report, options)) {
@@ -142,6 +142,7 @@ int CheckEverything(Report &report, const Options &options) {
         if (*profile == Profile::kAzure) {
             Doctor::CheckDirectory(report, options.domain, runAs);
         }
+        Doctor::CheckFrontEnd(report, client);
     }
     report.Unproved("that a user can sign in");
     report.Finish("check", "Next step: sudo tavosso-doctor login");

@@ -62,9 +62,11 @@ class ProviderCheck {
             return;
         }
         CheckDiscovery();
-        CheckAuthorization();
         if (client_.Azure() != nullptr) {
             CheckTenantOfIssuer(report_, client_, TAVO::Web::StringMember(discovery_, "issuer"));
+        }
+        CheckAuthorization();
+        if (client_.Azure() != nullptr) {
             CheckKeys();
         }
         CheckTokenEndpoint();

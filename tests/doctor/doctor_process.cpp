@@ -90,12 +90,16 @@ class Start {
     pid_t Doctor(const Strings &arguments, const Strings &variables) {
         Strings words{TAVOSSO_DOCTOR};
         words.insert(words.end(), arguments.begin(), arguments.end());
+        return Command(words, variables);
+    }
+
+    pid_t Command(Strings words, const Strings &variables) {
         Strings environment = variables;
         for (char **variable = environ; *variable != nullptr; ++variable) {
             environment.emplace_back(*variable);
         }
         pid_t process = -1;
-        Require(posix_spawn(&process, TAVOSSO_DOCTOR, &actions_, &attributes_, Pointers(words).data(),
+        Require(posix_spawn(&process, words.front().c_str(), &actions_, &attributes_, Pointers(words).data(),
                             Pointers(environment).data()) == 0,
                 "posix_spawn");
         return process;
@@ -189,7 +193,9 @@ void KeepSecret(const std::string &text, std::size_t piece) {
     }
 }
 
-DoctorRun RunDoctor(const Strings &arguments, const std::string &input) {
+namespace {
+
+DoctorRun RunCommand(const Strings &words, const std::string &input) {
     const int in = MakeFile(input);
     const int out = MakeFile();
     const int errors = MakeFile();
@@ -198,13 +204,23 @@ DoctorRun RunDoctor(const Strings &arguments, const std::string &input) {
     start.Give(out, STDOUT_FILENO);
     start.Give(errors, STDERR_FILENO);
     DoctorRun run;
-    run.status = WaitFor(start.Doctor(arguments, {}));
+    run.status = WaitFor(start.Command(words, {}));
     close(in);
     run.output = ReadFile(out);
     run.errors = ReadFile(errors);
     ExpectHarmless(run);
     return run;
 }
+
+}  // namespace
+
+DoctorRun RunDoctor(const Strings &arguments, const std::string &input) {
+    Strings words{TAVOSSO_DOCTOR};
+    words.insert(words.end(), arguments.begin(), arguments.end());
+    return RunCommand(words, input);
+}
+
+DoctorRun RunDoctorThrough(const Strings &command) { return RunCommand(With(command, TAVOSSO_DOCTOR), ""); }
 
 Check Report::Find(const std::string &id, const std::string &mark) const {
     const auto check = std::find_if(checks.begin(), checks.end(),

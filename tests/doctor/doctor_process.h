@@ -28,6 +28,9 @@ void KeepSecret(const std::string &text, std::size_t piece = 12);
 /// here, whatever the test is about.
 DoctorRun RunDoctor(const Strings &arguments, const std::string &input = "");
 
+/// Runs the doctor as the argument of another command.
+DoctorRun RunDoctorThrough(const Strings &command);
+
 /// One check of a report.
 struct Check {
     std::string id;

@@ -1,0 +1,195 @@
+// The front end on this machine: its address, its return program and its folders.
+#include <arpa/inet.h>
+#include <ifaddrs.h>
+#include <sys/stat.h>
+#include <sys/statvfs.h>
+
+#include <algorithm>
+#include <boost/algorithm/string/predicate.hpp>
+#include <cerrno>
+#include <memory>
+#include <set>
+#include <system_error>
+
+#include "doctor/address.h"
+#include "doctor/checks.h"
+#include "doctor/rights.h"
+#include "doctor/transfer_checks.h"
+#include "doctor/watch.h"
+
+namespace Doctor {
+
+namespace {
+
+constexpr char kHostID[] = "frontend.host";
+constexpr char kHostSubject[] = "host of the redirect URI";
+constexpr char kReturnID[] = "frontend.return";
+constexpr char kReturnSubject[] = "return program";
+constexpr char kFolderID[] = "frontend.folder";
+constexpr char kFolderSubject[] = "folder of the front end";
+constexpr char kVar[] = "/usr/tavo/var";
+constexpr long kErrors = 400;  // and above
+
+struct FreeInterfaces {
+    void operator()(ifaddrs *interfaces) const { freeifaddrs(interfaces); }
+};
+
+std::string TextOf(const sockaddr &address) {
+    char text[INET6_ADDRSTRLEN] = {};
+    if (address.sa_family == AF_INET) {
+        inet_ntop(AF_INET, &reinterpret_cast<const sockaddr_in &>(address).sin_addr, text, sizeof text);
+    } else if (address.sa_family == AF_INET6) {
+        inet_ntop(AF_INET6, &reinterpret_cast<const sockaddr_in6 &>(address).sin6_addr, text, sizeof text);
+    }
+    return text;
+}
+
+std::set<std::string> OwnAddresses() {
+    std::set<std::string> addresses;
+    ifaddrs *list = nullptr;
+    if (getifaddrs(&list) != 0) {
+        return addresses;
+    }
+    const std::unique_ptr<ifaddrs, FreeInterfaces> owner(list);
+    for (const ifaddrs *interface = list; interface != nullptr; interface = interface->ifa_next) {
+        if (interface->ifa_addr != nullptr) {
+            addresses.insert(TextOf(*interface->ifa_addr));
+        }
+    }
+    return addresses;
+}
+
+/// Sends a HEAD request, which neither starts nor finishes a login. Sends no secret, so the certificate is not
+/// verified.
+Transfer RequestHead(Report &report, const std::string &url) {
+    const std::unique_ptr<CURL, void (*)(CURL *)> handle(curl_easy_init(), curl_easy_cleanup);
+    if (handle) {
+        curl_easy_setopt(handle.get(), CURLOPT_URL, url.c_str());
+        curl_easy_setopt(handle.get(), CURLOPT_NOBODY, 1L);
+        curl_easy_setopt(handle.get(), CURLOPT_PROXY, "");
+        curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYPEER, 0L);
+        curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYHOST, 0L);
+        curl_easy_perform(handle.get());
+    }
+    return LastTransfer(report);
+}
+
+/// Returns whether one of the addresses, "ADDRESS port PORT", is of this machine.
+bool IsThisMachine(const std::vector<std::string> &addresses) {
+    const std::set<std::string> own = OwnAddresses();
+    return std::any_of(addresses.begin(), addresses.end(), [&](const std::string &address) {
+        return own.count(address.substr(0, address.find(' '))) != 0 || boost::starts_with(address, "127.");
+    });
+}
+
+void CheckReturnProgram(Report &report, Client &client) {
+    const std::string url = client->GetRedirectURI();
+    const Address address = SplitAddress(url);
+    if (!address.isValid || address.scheme != "https") {
+        report.NotChecked(kReturnID, kReturnSubject, "the redirect URI has no https:// URL");
+        return;
+    }
+    const Transfer transfer = RequestHead(report, url);
+    if (transfer.addresses.empty() || !IsThisMachine(transfer.addresses)) {
+        report.Note(kHostID, kHostSubject,
+                    Quoted(address.host) +
+                        (transfer.addresses.empty()
+                             ? " cannot be resolved here"
+                             : " is " + transfer.addresses.front() + ", not an address of this machine") +
+                        ": it cannot be told whether browsers reach this machine",
+                    "If no router or proxy forwards this address to this machine, correct the redirect URI here and at "
+                    "the provider.");
+        return;
+    }
+    report.Good(kHostID, kHostSubject, Quoted(address.host) + " is this machine");
+    if (transfer.result != CURLE_OK) {
+        report.Finding(kReturnID, kReturnSubject,
+                       "no web server answers at " + transfer.addresses.front() + ": " + transfer.error,
+                       "Start the web server, with TLS on port " + address.port +
+                           ". For lighttpd, run: sudo systemctl restart lighttpd; systemctl status lighttpd");
+    } else if (transfer.status >= kErrors) {
+        report.Finding(kReturnID, kReturnSubject, url + " answers HTTP " + std::to_string(transfer.status),
+                       transfer.status >= 500
+                           ? "The program failed. Read the web server's error log."
+                           : "Configure the web server to run the return program at this path. For "
+                             "lighttpd, run: sudo lighty-enable-mod tavosso-frontend; sudo systemctl "
+                             "restart lighttpd");
+    } else {
+        report.Good(kReturnID, kReturnSubject, "answers HTTP " + std::to_string(transfer.status));
+    }
+}
+
+/// Reports a full or read-only file system.
+bool CheckSpace(Report &report) {
+    constexpr char kID[] = "frontend.space";
+    constexpr char kSubject[] = "space for the front end";
+    struct statvfs system = {};
+    if (statvfs(kVar, &system) != 0) {
+        return true;
+    }
+    if ((system.f_flag & ST_RDONLY) != 0) {
+        report.Finding(kID, kSubject, std::string(kVar) + " is on a read-only file system",
+                       std::string("Find the cause: dmesg. Then mount it writable. Run: findmnt -T ") + kVar);
+        return false;
+    }
+    // Some file systems do not count their files.
+    if (system.f_bavail == 0 || (system.f_files != 0 && system.f_favail == 0)) {
+        report.Finding(kID, kSubject, std::string("the file system of ") + kVar + " is full",
+                       std::string("Remove files. Run: df -h ") + kVar + "; df -i " + kVar);
+        return false;
+    }
+    report.Good(kID, kSubject, "the file system is writable");
+    return true;
+}
+
+/// Returns whether one of the front end's private folders is as it creates them, or does not exist yet.
+bool CheckPrivateFolder(Report &report, const std::string &path, const struct stat &parent) {
+    struct stat status = {};
+    if (lstat(path.c_str(), &status) != 0) {
+        return true;
+    }
+    const bool isPrivate =
+        S_ISDIR(status.st_mode) && status.st_uid == parent.st_uid && (status.st_mode & (S_IRWXG | S_IRWXO)) == 0;
+    if (!isPrivate) {
+        report.Finding(
+            kFolderID, kFolderSubject,
+            path + ": " + DescribeRights(status) + ". It must be a folder of mode 0700, and of the owner of " + kVar,
+            "Run: sudo rm -r " + path + ". The front end creates it again.");
+    }
+    return isPrivate;
+}
+
+void CheckFolders(Report &report) {
+    struct stat status = {};
+    if (lstat(kVar, &status) != 0) {
+        report.Note(kFolderID, kFolderSubject, std::string(kVar) + ": " + std::generic_category().message(errno),
+                    std::string("For the example front end, run: sudo install -d -m 0755 ") + kVar);
+        return;
+    }
+    if (!S_ISDIR(status.st_mode) || (status.st_mode & (S_IWGRP | S_IWOTH)) != 0) {
+        report.Finding(
+            kFolderID, kFolderSubject,
+            std::string(kVar) + ": " + DescribeRights(status) + ". It must be a folder that other users cannot change",
+            std::string("Run: sudo chmod 0755 ") + kVar + ". If it is a link or file, remove it first.");
+        return;
+    }
+    if (!CheckSpace(report)) {
+        return;
+    }
+    for (const char *folder : {"/frontend", "/frontend/logins", "/frontend/sessions"}) {
+        if (!CheckPrivateFolder(report, std::string(kVar) + folder, status)) {
+            return;
+        }
+    }
+    report.Good(kFolderID, kFolderSubject, std::string(kVar) + ": " + DescribeRights(status));
+}
+
+}  // namespace
+
+void CheckFrontEnd(Report &report, Client &client) {
+    report.Section("Front end");
+    CheckReturnProgram(report, client);
+    CheckFolders(report);
+}
+
+}  // namespace Doctor
