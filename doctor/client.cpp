@@ -54,7 +54,7 @@ std::optional<std::string> RefusalOfProfile() {
     } catch (const std::exception &failure) {
         refusal = failure.what();
     }
-    // The client's first step is a transfer: where there was none, nobody got to the client.
+    // The first step of the client is a transfer. Without one, the profile was refused.
     const bool isAccepted = !TakeTransfers().empty();
     TakeLogLines();
     return isAccepted ? std::nullopt : std::optional(refusal);

@@ -10,7 +10,7 @@
 #include <variant>
 #include <vector>
 
-// The library's own clients: whatever they can decide is decided by them.
+// The library's own clients, so that their decisions are the library's.
 namespace Doctor {
 
 enum class Profile { kAzure, kWebSphere };
@@ -23,16 +23,16 @@ Profile ProfileNamed(const std::string &name);
 /// The signatures that the profile's client can verify.
 std::vector<std::string> AlgorithmsOf(Profile profile);
 
-/// In bytes, of a key of HS256 (RFC 7518, section 3.2). The library takes any.
+/// In bytes, for HS256 (RFC 7518, section 3.2). The library accepts any.
 constexpr std::size_t kShortestWebSphereKey = 32;
 
-/// In the place of a request that was not asked for.
+/// A request was not allowed.
 class not_fetched : public std::exception {
   public:
     const char *what() const noexcept override { return "not fetched"; }
 };
 
-/// The Azure client, whose requests can be forbidden: its verification then ends where it would make the first one.
+/// The Azure client. Verification ends before its first request unless `mayFetch`.
 class AzureClient : public TAVO::SSO::AzureSSOClient {
   public:
     bool mayFetch = true;
@@ -43,7 +43,7 @@ class AzureClient : public TAVO::SSO::AzureSSOClient {
     void RequestWellknownInfo(Json::Value &out) override;
 };
 
-/// The client of the profile in force, as the library makes it of its file.
+/// The client of a profile, with the settings of its file.
 class Client {
   public:
     explicit Client(Profile profile);
@@ -62,16 +62,15 @@ class Client {
     Library client_;
 };
 
-/// What a login says to the profile file: the text of the exception that ends it before a client is asked for anything;
-/// nothing where it goes on.
+/// Returns the text of the exception that ends a login before it reaches the client, or nothing.
 std::optional<std::string> RefusalOfProfile();
 
-/// What "error" and "error_description" of an answer tell, in the front end's words. It is as long as they are: of a
-/// secret in them that was cut, the rest could not be found and hidden any more.
+/// Returns "error" and "error_description" in the words of the front end. Does not cut them: part of a secret could not
+/// be hidden.
 std::string ErrorText(const Json::Value &answer);
 
-/// What an exception of the library says. An error answer of the provider, which may hold anything, is reduced to the
-/// members that tell of the error (RFC 6749, section 5.2).
+/// Returns the text of an exception of the library. Of an error response of the provider, which may contain anything,
+/// returns the error and its description only (RFC 6749, section 5.2).
 std::string TextOf(const std::exception &failure);
 
 }  // namespace Doctor

@@ -1,8 +1,13 @@
 #include "doctor/explain.h"
 
+#include <boost/algorithm/string/classification.hpp>
 #include <boost/algorithm/string/erase.hpp>
+#include <boost/algorithm/string/predicate.hpp>
+#include <boost/algorithm/string/trim.hpp>
+#include <functional>
 #include <iostream>
 
+#include "doctor/provider_errors.h"
 #include "web/failure.h"
 #include "web/failure_lookup.h"
 
@@ -24,6 +29,7 @@ struct Table {
 
 const std::vector<Table> &Tables() {
     const Column level{"level", &TAVO::Web::FailureRow::type};
+    const Column source{"source", &TAVO::Web::FailureRow::type};
     const Column type{"class", &TAVO::Web::FailureRow::type};
     const Column thrownBy{"thrown by", &TAVO::Web::FailureRow::thrownBy};
     const Column cause{"cause", &TAVO::Web::FailureRow::cause};
@@ -35,11 +41,26 @@ const std::vector<Table> &Tables() {
         {TAVO::Web::FailureKind::kReason, "reasons of the front end", "reason", {cause, remedy}},
         {TAVO::Web::FailureKind::kException, "exceptions of the library", "text", {type, thrownBy, cause, remedy}},
         {TAVO::Web::FailureKind::kTransfer, "results of libcurl", "result", {cause, remedy}},
+        {TAVO::Web::FailureKind::kProviderError, "error codes of the provider", "code", {cause, remedy, source}},
     };
     return tables;
 }
 
 const Table &TableOf(const TAVO::Web::FailureRow &failure) { return Tables()[static_cast<std::size_t>(failure.kind)]; }
+
+const std::vector<TAVO::Web::FailureRow> &RowsWith(TAVO::Web::FailureKind kind) {
+    return kind == TAVO::Web::FailureKind::kProviderError ? ProviderErrors() : TAVO::Web::FailureTable();
+}
+
+std::vector<std::reference_wrapper<const TAVO::Web::FailureRow>> RowsOf(const Table &table) {
+    std::vector<std::reference_wrapper<const TAVO::Web::FailureRow>> rows;
+    for (const TAVO::Web::FailureRow &failure : RowsWith(table.kind)) {
+        if (failure.kind == table.kind) {
+            rows.emplace_back(failure);
+        }
+    }
+    return rows;
+}
 
 constexpr char kForeignText[] = "a text of another library";
 
@@ -56,10 +77,7 @@ void PrintMarkdown(const Table &table) {
         line += " | ---";
     }
     std::cout << " |\n" << line << " |\n";
-    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
-        if (failure.kind != table.kind) {
-            continue;
-        }
+    for (const TAVO::Web::FailureRow &failure : RowsOf(table)) {
         const char *separator = "| ";
         for (const std::string &text : TextsOf(failure)) {
             std::cout << separator << (text == kForeignText ? text : '`' + text + '`');
@@ -78,24 +96,19 @@ void PrintMarkdown(const Table &table) {
     std::cout << "\n<!-- end -->\n";
 }
 
-}  // namespace
-
-std::vector<Explanation> LookUp(const std::string &text) {
+/// Returns the most specific text of each kind that matches.
+std::vector<Explanation> FindTexts(const std::string &text, bool (*matches)(const std::string &, const char *)) {
     std::vector<Explanation> found;
     for (const Table &table : Tables()) {
         Explanation best{nullptr, ""};
-        for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
+        for (const TAVO::Web::FailureRow &failure : RowsOf(table)) {
             for (const char *about : failure.texts) {
-                // A text of placeholders alone would explain anything.
-                if (failure.kind == table.kind && TAVO::Web::EndsInText(text, about) &&
-                    TAVO::Web::Specificity(about) > TAVO::Web::Specificity(best.about.c_str())) {
+                // A text of placeholders only matches everything.
+                if (TAVO::Web::Specificity(about) > TAVO::Web::Specificity(best.about.c_str()) &&
+                    table.kind < TAVO::Web::FailureKind::kTransfer && matches(text, about)) {
                     best = {&failure, about};
                 }
             }
-        }
-        if (const TAVO::Web::FailureRow *transfer = TAVO::Web::FindTransfer(TAVO::Web::FindTransferText(text));
-            table.kind == TAVO::Web::FailureKind::kTransfer && transfer != nullptr) {
-            best = {transfer, transfer->texts.front()};
         }
         if (best.failure != nullptr) {
             found.push_back(best);
@@ -104,11 +117,60 @@ std::vector<Explanation> LookUp(const std::string &text) {
     return found;
 }
 
+std::vector<Explanation> FindTransfer(const std::string &text) {
+    const TAVO::Web::FailureRow *transfer = TAVO::Web::FindTransfer(TAVO::Web::FindTransferText(text));
+    return transfer != nullptr ? std::vector<Explanation>{{transfer, transfer->texts.front()}}
+                               : std::vector<Explanation>();
+}
+
+std::vector<Explanation> FindCodes(const std::string &text) {
+    std::vector<Explanation> found;
+    for (const TAVO::Web::FailureRow &error : ProviderErrors()) {
+        if (ContainsCode(text, error.texts.front())) {
+            found.push_back({&error, error.texts.front()});
+        }
+    }
+    return found;
+}
+
+/// Returns the failures for which the relay page shows this sentence.
+std::vector<Explanation> FindSentence(const std::string &text) {
+    const std::string sentence = boost::trim_right_copy_if(text, boost::is_any_of(". \n"));
+    std::vector<Explanation> found;
+    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
+        const bool isShown =
+            failure.kind == TAVO::Web::FailureKind::kReason || failure.kind == TAVO::Web::FailureKind::kException;
+        if (isShown && boost::iequals(sentence + '.', TAVO::Web::SentenceOf(failure.code))) {
+            found.push_back({&failure, TextsOf(failure).front()});
+        }
+    }
+    return found;
+}
+
+}  // namespace
+
+std::vector<Explanation> LookUp(const std::string &text) {
+    std::vector<Explanation> found = FindTexts(text, TAVO::Web::EndsInText);
+    if (found.empty()) {
+        found = FindTexts(text, TAVO::Web::EndsInTypedText);
+    }
+    for (const std::vector<Explanation> &more : {FindTransfer(text), FindCodes(text)}) {
+        found.insert(found.end(), more.begin(), more.end());
+    }
+    if (found.empty()) {
+        const std::string reason = ReasonOfSentence(text);
+        found = reason.empty() ? FindSentence(text) : LookUp(reason);
+    }
+    return found;
+}
+
 std::vector<Explanation> AllExplanations() {
     std::vector<Explanation> all;
-    for (const TAVO::Web::FailureRow &failure : TAVO::Web::FailureTable()) {
-        for (const std::string &text : TextsOf(failure)) {
-            all.push_back({&failure, text});
+    for (const Table &table : Tables()) {
+        for (const TAVO::Web::FailureRow &failure : RowsOf(table)) {
+            for (const std::string &text : TextsOf(failure)) {
+                all.push_back({&failure, text});
+            }
         }
     }
     return all;

@@ -8,7 +8,8 @@
 
 #include "web/failure_table.h"
 
-// Prints the table of failures, and what it has about a text. The texts are in web/failure_table.cpp.
+// Prints the table of failures (web/failure_table.cpp) and of error codes (provider_errors.cpp), or the rows for a
+// text.
 namespace Doctor {
 
 struct Explanation {
@@ -16,19 +17,19 @@ struct Explanation {
     std::string about;  // the text of the table
 };
 
-/// Of each kind of failure, the most specific text of the table that `text` ends in.
+/// Returns the rows for a text. Ignores case and a final full stop if there is no exact match.
 std::vector<Explanation> LookUp(const std::string &text);
 
-/// Each text of the table.
+/// Returns all texts.
 std::vector<Explanation> AllExplanations();
 
-/// As a terminal shows it.
+/// For a terminal.
 std::string WithoutBackticks(const std::string &text);
 
 void PrintExplanations(const std::vector<Explanation> &explanations);
 Json::Value ExplanationsAsJson(const std::vector<Explanation> &explanations);
 
-/// The tables of the documents, each between the comments that mark it there.
+/// Prints the tables of the documents, between the comments that mark them there.
 void PrintMarkdown();
 
 }  // namespace Doctor

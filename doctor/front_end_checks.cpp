@@ -96,7 +96,7 @@ void CheckReturnProgram(Report &report, Client &client) {
                         (transfer.addresses.empty()
                              ? " cannot be resolved here"
                              : " is " + transfer.addresses.front() + ", not an address of this machine") +
-                        ": it cannot be told whether browsers reach this machine",
+                        ": whether browsers reach this machine is unknown",
                     "If no router or proxy forwards this address to this machine, correct the redirect URI here and at "
                     "the provider.");
         return;

@@ -109,10 +109,10 @@ class LoginWalk {
         const auto code = TAVO::Web::OnlyValue(answer, "code");
         report_.Hide(code.value_or(""));
         if (!error.empty()) {
-            Json::Value told;
-            told["error"] = error;
-            told["error_description"] = TAVO::Web::OnlyValue(answer, "error_description").value_or("");
-            report_.Finding("login.answer", "answer of the provider", ErrorText(told),
+            Json::Value answered;
+            answered["error"] = error;
+            answered["error_description"] = TAVO::Web::OnlyValue(answer, "error_description").value_or("");
+            report_.Finding("login.answer", "answer of the provider", ErrorText(answered),
                             "Run: tavosso-doctor explain " + Quoted(error));
             return false;
         }

@@ -6,8 +6,7 @@
 
 namespace Doctor {
 
-/// Walks a login from the terminal: gives the address to open, takes the one that the browser was sent back to, from
-/// standard input, and goes on with the library's own steps. False where no address was given.
+/// Walks through a login in the terminal. Returns false if no address was entered.
 bool WalkLogin(Report &report, Client &client);
 
 }  // namespace Doctor

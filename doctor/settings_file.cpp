@@ -176,7 +176,8 @@ void ReportRights(Report &report, const std::string &id, const SettingsFile &fil
         return;  // a finding of the file
     }
     if (holdsSecret && (status.st_mode & (S_IRGRP | S_IROTH)) != 0) {
-        report.Finding(id, kSubject, DescribeRights(status) + ": other users can read the client secret",
+        report.Finding(id, kSubject,
+                       file.path + ": " + DescribeRights(status) + ": other users can read the client secret",
                        "Run: sudo chmod 600 " + file.path + ". Then request a new client secret from the provider.");
         return;
     }

@@ -7,8 +7,7 @@
 #include <string>
 #include <vector>
 
-// What the library does while the doctor has it work: its log lines and its transfers. The calls of the library can be
-// interposed; so what is told here is of the very request that a login makes, under the same options.
+// Observes the log lines and transfers of the library. Its calls are interposed, so the requests are those of a login.
 namespace Doctor {
 
 struct Certificate {
@@ -43,16 +42,16 @@ struct Transfer {
 
 constexpr long kLongestResponse = 4L << 20;  // in bytes, of headers and of content
 
-/// The lines that would have gone to the system's log, since they were last taken.
+/// Returns the log lines since the last call.
 std::vector<std::string> TakeLogLines();
 
-/// A line without the source and its line, which tell an administrator nothing.
+/// Returns a log line without source and line number.
 std::string MessageOf(const std::string &logLine);
 
-/// The messages of these lines, each behind a semicolon: for the end of what is told as found.
+/// Returns the messages of the log lines, each after a semicolon.
 std::string TakeMessages();
 
-/// The transfers since they were last taken.
+/// Returns the transfers since the last call.
 std::vector<Transfer> TakeTransfers();
 
 struct TransferRules {
@@ -61,7 +60,7 @@ struct TransferRules {
 };
 void SetTransferRules(const TransferRules &rules);
 
-/// As long as one lives, every transfer fails before anyone is asked.
+/// While an object exists, every transfer fails without a request.
 class RefuseTransfers {
   public:
     RefuseTransfers();

@@ -1,11 +1,13 @@
 #include "web/failure_lookup.h"
 
 #include <algorithm>
+#include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/predicate.hpp>
 #include <boost/algorithm/string/replace.hpp>
 #include <boost/algorithm/string/trim.hpp>
 #include <cctype>
 #include <iterator>
+#include <locale>
 
 namespace TAVO::Web {
 
@@ -80,6 +82,17 @@ bool EndsInText(const std::string &line, const char *ofTable) {
     Pieces pieces = SplitAtPlaceholders(ofTable);
     pieces.insert(pieces.begin(), "");
     return Consists(boost::trim_right_copy(line), pieces);
+}
+
+bool EndsInTypedText(const std::string &line, const char *ofTable) {
+    Pieces pieces = SplitAtPlaceholders(ofTable);
+    pieces.insert(pieces.begin(), "");
+    for (std::string &piece : pieces) {
+        boost::to_lower(piece, std::locale::classic());
+    }
+    boost::trim_right_if(pieces.back(), boost::is_any_of("."));
+    const std::string text = boost::trim_right_copy_if(line, boost::is_any_of(". \t\r\n"));
+    return Consists(boost::to_lower_copy(text, std::locale::classic()), pieces);
 }
 
 std::size_t Specificity(const char *ofTable) {

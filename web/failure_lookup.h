@@ -19,6 +19,9 @@ bool IsText(const std::string &text, const char *ofTable);
 /// Returns whether `line` ends in this text of the table. Log lines begin with a time and a program.
 bool EndsInText(const std::string &line, const char *ofTable);
 
+/// Returns the same, ignoring case and a final full stop: for texts that a person has typed.
+bool EndsInTypedText(const std::string &line, const char *ofTable);
+
 /// Returns the number of characters outside placeholders. A text with more of them is more specific.
 std::size_t Specificity(const char *ofTable);
 

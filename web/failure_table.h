@@ -15,9 +15,10 @@ enum class FailureKind {
     kLibraryLine,   // of the system log
     kPlatformLine,  // the stand-in's
     kFrontEndLine,
-    kReason,     // of the front end, for a failed sign-in
-    kException,  // of the library
-    kTransfer,   // libcurl's result
+    kReason,         // of the front end, for a failed sign-in
+    kException,      // of the library
+    kTransfer,       // libcurl's result
+    kProviderError,  // not in this table; the doctor has its own
 };
 
 /// The table's text for the exception with an error response of the token endpoint (RFC 6749, section 5.2).

@@ -290,12 +290,13 @@ void ExpectToStopAtTheOnlyFinding(const Report &report) {
     EXPECT_EQ(LibraryIn(report).empty(), stop.empty());
 }
 
-Dialogue::Dialogue(Over over, const Strings &arguments, const Strings &variables) {
+Dialogue::Dialogue(Over over, const Strings &arguments, const Strings &variables, unsigned short columns) {
     Start start;
     if (over == Over::kTerminal) {
         int terminal = -1;
         char path[64];
-        Require(openpty(&output_, &terminal, path, nullptr, nullptr) == 0, "openpty");
+        const winsize size{24, columns, 0, 0};
+        Require(openpty(&output_, &terminal, path, nullptr, &size) == 0, "openpty");
         fcntl(output_, F_SETFD, FD_CLOEXEC);
         firstLocalModes_ = LocalModes();
         start.GiveTerminal(path);

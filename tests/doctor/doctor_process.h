@@ -80,7 +80,8 @@ class Dialogue {
     enum class Over { kPipes, kTerminal };
 
     /// The variables, each as NAME=VALUE, stand in its environment beside this process's own.
-    Dialogue(Over over, const Strings &arguments, const Strings &variables = {});
+    /// `columns` is the width of the terminal; 0 if unknown.
+    Dialogue(Over over, const Strings &arguments, const Strings &variables = {}, unsigned short columns = 0);
     ~Dialogue();
     Dialogue(const Dialogue &) = delete;
     Dialogue &operator=(const Dialogue &) = delete;

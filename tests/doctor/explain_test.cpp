@@ -102,7 +102,7 @@ TEST(Explain, KnowsAProvidersAnswerByItsError) {
                 Contains(TAVO::Web::kErrorAnswer));
     for (const char *text :
          {"The provider refused: access_denied (not today)", "The provider refused: unknown error"}) {
-        EXPECT_THAT(Explanations(text), ElementsAre("The provider refused: REASON"));
+        EXPECT_THAT(Explanations(text), Contains("The provider refused: REASON"));
     }
 }
 
@@ -117,6 +117,32 @@ TEST(Explain, KnowsLinesAsTheLogHasThem) {
 TEST(Explain, ExplainsTheReasonInTheFrontEndsLineToo) {
     EXPECT_THAT(Explanations("return.cgi[1]: frontend: sign-in failed: kid does not exist in Azure verified kyes"),
                 ElementsAre("frontend: sign-in failed: REASON", "kid does not exist in Azure verified kyes"));
+}
+
+struct TypedText {
+    const char *text;
+    const char *about;
+};
+
+TEST(Explain, AcceptsTextsAsPeopleTypeThem) {
+    const TypedText typed[] = {
+        {"id_token expired", "id_token expired."},
+        {"ID_TOKEN EXPIRED.", "id_token expired."},
+        {"Tenant id invalid", "tenant ID invalid"},
+        {"sso does not enable", "sso does not enable."},
+        {"invalid_client", "invalid_client"},
+        {"Invalid_Grant", "invalid_grant"},
+        {"\"error\":\"login_required\"", "login_required"},
+        {"AADSTS7000215: Invalid client secret provided.", "AADSTS7000215"},
+        {"aadsts50011", "AADSTS50011"},
+        {"Your sign-in took too long, or was already completed. Sign in again",
+         "This sign-in took too long, or was already completed."},
+        {"Your organisation does not accept this device. Contact your administrator.", "invalid_client"},
+    };
+    for (const auto &[text, about] : typed) {
+        EXPECT_THAT(Explanations(text), Contains(about)) << text;
+    }
+    EXPECT_THAT(Explanations("AADSTS700016"), Not(Contains("AADSTS70001"))) << "codes are words";
 }
 
 TEST(Explain, ReportsAnUnknownText) {

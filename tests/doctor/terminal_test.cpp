@@ -1,7 +1,9 @@
 #include <gmock/gmock.h>
 #include <termios.h>
 
+#include <boost/algorithm/string/trim.hpp>
 #include <csignal>
+#include <sstream>
 #include <string>
 
 #include "tests/doctor/appliance.h"
@@ -35,6 +37,29 @@ TEST_F(Terminal, ShowsColours) { EXPECT_THAT(OutputOn(kTerminal, {}), HasSubstr(
 TEST_F(Terminal, ShowsNoColoursUnderNO_COLOR) {
     EXPECT_THAT(OutputOn(kTerminal, {}, {"NO_COLOR=1"}), Not(HasSubstr("\033[32m")));
     EXPECT_THAT(OutputOn(kTerminal, {}, {"NO_COLOR="}), HasSubstr(kGreen)) << "an empty one counts as none";
+}
+
+TEST_F(Terminal, ShowsNoColoursOnADumbTerminal) {
+    EXPECT_THAT(OutputOn(kTerminal, {}, {"TERM=dumb"}), Not(HasSubstr("\033")));
+}
+
+TEST_F(Terminal, WrapsLinesAtItsWidth) {
+    appliance.SetClient("redirect_uri", "https://nas.example/another/page");
+    constexpr unsigned short kColumns = 70;
+    Dialogue dialogue(kTerminal, {"--verbose"}, {"NO_COLOR=1", "TERM=dumb"}, kColumns);
+    std::istringstream lines(dialogue.Finish().output);
+    bool isWrapped = false;
+    for (std::string line; std::getline(lines, line);) {
+        boost::trim_right(line);
+        // A long word, such as an address, stays whole.
+        const std::string words = boost::trim_left_copy(line);
+        const bool isBreakable = line.rfind(' ') > 40 && line.rfind("  ") < 20;
+        isWrapped = isWrapped || (line.compare(0, 9, "         ") == 0 && words.compare(0, 4, "do: ") != 0);
+        if (isBreakable) {
+            EXPECT_LE(line.size(), kColumns) << line;
+        }
+    }
+    EXPECT_TRUE(isWrapped);
 }
 
 TEST_F(Terminal, ShowsJSONAsItIs) { EXPECT_THAT(OutputOn(kTerminal, {"--json"}), Not(HasSubstr("\033"))); }

@@ -57,6 +57,12 @@ test('keeps local origins for another try', () => {
     }
 });
 
+test('shows sentences that the doctor explains', () => {
+    for (const sentence of EXPLANATIONS.values()) {
+        execFileSync(process.argv[2], ['explain', sentence]); // fails if it does not
+    }
+});
+
 test('explains known reasons and cuts long ones', () => {
     const {explanation, reason} = after({success: 'false', reason: 'TAVOWinsUserNameFqdn2Netbios failed.'});
     assert.match(explanation, /^This device does not recognise your account's domain\./);

@@ -39,7 +39,7 @@ const FOREIGN = ['CURL', 'a text of another library', 'std::bad_alloc', '{... "e
 // Composed of several texts; unit tests compare these lines.
 const isComposed = (about) => /setres[ug]id|\.\.$/.test(about);
 const texts = explanations.filter(({about, table}) =>
-    table !== 'results of libcurl' && !FOREIGN.includes(about) && !isComposed(about)).map(({about}) => about);
+    !['results of libcurl', 'error codes of the provider'].includes(table) && !FOREIGN.includes(about) && !isComposed(about)).map(({about}) => about);
 /** Whether the sources contain the text between the placeholders. The prefix is composed from "%s:%d". */
 const isInSource = (about) => about.replace(/^\w+:N /, '').split(/\b[A-Z]{3,6}\b/)
     .every((piece) => sources.includes(piece.replace(/: $/, '')));
