@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 
+#include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <regex>
@@ -60,6 +61,32 @@ TEST(Commands, AreInTheHelpTheManualPageAndCompleted) {
         EXPECT_THAT(manual, HasSubstr(".It Cm " + command + "\n")) << command;
         EXPECT_EQ(Complete(command), command);
     }
+}
+
+/// The sources of the doctor.
+std::string Sources() {
+    std::string sources;
+    for (const auto &entry : std::filesystem::directory_iterator(TAVOSSO_SOURCES "/doctor")) {
+        sources += Read(entry.path());
+    }
+    return sources;
+}
+
+TEST(Checks, InTheDocumentationExist) {
+    const std::string document = Read(TAVOSSO_SOURCES "/docs/doctor.md");
+    const std::string sources = Sources();
+    static const std::regex id("`([a-z_]+)\\.([a-z_]+)`");
+    int count = 0;
+    for (std::sregex_iterator found(document.begin(), document.end(), id); found != std::sregex_iterator(); ++found) {
+        const std::string group = found->str(1);
+        const std::string name = found->str(2);
+        // Some ids are composed of a group and a name.
+        const bool isComposed =
+            sources.find("." + name + '"') != std::string::npos || sources.find('"' + name + '"') != std::string::npos;
+        EXPECT_TRUE(isComposed && sources.find('"' + group) != std::string::npos) << group << '.' << name;
+        ++count;
+    }
+    EXPECT_GT(count, 60);
 }
 
 TEST(Completion, OffersWhatTheCommandTakes) {

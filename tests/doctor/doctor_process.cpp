@@ -220,7 +220,11 @@ DoctorRun RunDoctor(const Strings &arguments, const std::string &input) {
     return RunCommand(words, input);
 }
 
-DoctorRun RunDoctorThrough(const Strings &command) { return RunCommand(With(command, TAVOSSO_DOCTOR), ""); }
+DoctorRun RunDoctorThrough(const Strings &command, const Strings &arguments) {
+    Strings words = With(command, TAVOSSO_DOCTOR);
+    words.insert(words.end(), arguments.begin(), arguments.end());
+    return RunCommand(words, "");
+}
 
 Check Report::Find(const std::string &id, const std::string &mark) const {
     const auto check = std::find_if(checks.begin(), checks.end(),
@@ -362,6 +366,8 @@ DoctorRun Dialogue::Finish() {
     }
     return run;
 }
+
+void Dialogue::Signal(int signal) const { kill(process_, signal); }
 
 int Dialogue::WaitForEnd() { return WaitFor(std::exchange(process_, -1)); }
 

@@ -29,7 +29,7 @@ void KeepSecret(const std::string &text, std::size_t piece = 12);
 DoctorRun RunDoctor(const Strings &arguments, const std::string &input = "");
 
 /// Runs the doctor as the argument of another command.
-DoctorRun RunDoctorThrough(const Strings &command);
+DoctorRun RunDoctorThrough(const Strings &command, const Strings &arguments = {});
 
 /// One check of a report.
 struct Check {
@@ -93,6 +93,8 @@ class Dialogue {
 
     /// Nothing more will be written. Waits for its end.
     DoctorRun Finish();
+
+    void Signal(int signal) const;
 
     /// Its status, as long as the terminal is still there to look at.
     int WaitForEnd();

@@ -59,6 +59,26 @@ TEST(ProvidersCertificate, ThatSoonExpiresIsAFinding) {
     EXPECT_THAT(report.FirstFinding().found, HasSubstr(", 5 days left"));
 }
 
+TEST(ProvidersCertificate, OfAnAuthorityThatSoonExpiresIsAFinding) {
+    CertificateText text = AuthorityText("Intermediate authority");
+    text.notAfter = TimeText("%Y%m%d%H%M%SZ", std::time(nullptr) + 3 * kDay + kHour);
+    const Credentials intermediate = Certify(text, &Authority());
+    CertificateText own;
+    own.alternativeName = kHost;
+    Credentials server = Certify(own, &intermediate);
+    server.intermediate = intermediate.certificate;
+    const Appliance appliance(Profile::kAzure, server);
+    EXPECT_THAT(OnlyFinding().found, AllOf(HasSubstr("Intermediate authority"), HasSubstr(", 3 days left")));
+}
+
+TEST(ProvidersCertificate, WithoutAnEndDateIsGood) {
+    CertificateText text;
+    text.alternativeName = kHost;
+    text.notAfter = "99991231235959Z";  // RFC 5280, section 4.1.2.5
+    const Appliance appliance(Profile::kAzure, Certify(text, &Authority()));
+    EXPECT_THAT(Ask({}).Findings(), IsEmpty());
+}
+
 TEST(ProvidersCertificate, ThatHasExpiredIsAFinding) {
     const Appliance appliance(Profile::kAzure, ExpiredCertificateFor(kHost));
     EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").found, HasSubstr("it expired on 2"));
@@ -108,6 +128,24 @@ TEST_F(AProvider, ClockThatIsAheadIsAFinding) {
 TEST_F(AProvider, ClockThatIsTheSameIsGood) {
     TellTime(std::time(nullptr));
     EXPECT_EQ(Ask({}).Find("clock", "good").id, "clock");
+}
+
+TEST_F(AProvider, ClockIsReadInAnyCaseOfTheHeader) {
+    for (const char *name : {"Date", "date", "DATE"}) {
+        std::string answer = HTTPAnswer(KeySet());
+        answer.insert(answer.find("\r\n"), "\r\n" + std::string(name) + ": " +
+                                               TimeText("%a, %d %b %Y %H:%M:%S GMT", std::time(nullptr) - kHour));
+        appliance.AnswerAt("/keys", [answer](const std::string & /*request*/) { return answer; });
+        EXPECT_EQ(OnlyFinding().id, "clock") << name;
+    }
+}
+
+TEST_F(AProvider, AddressInCapitalsIsAsked) {
+    std::string url = appliance.URL("/discovery");
+    appliance.SetClient("wellknown", "HTTPS" + url.substr(5));
+    EXPECT_EQ(Ask({}).Find("discovery.reachable", "good").id, "discovery.reachable");
+    appliance.SetClient("token_endpoint", "HTTPS" + appliance.URL("/token_endpoint").substr(5));
+    EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").id, "token_endpoint.client");
 }
 
 TEST_F(AProvider, EndpointThatIsNotTheConfiguredOneIsAFinding) {

@@ -103,6 +103,14 @@ TEST_F(OtherUsers, OrdinaryUserReadsFirstToRunWithSudo) {
     EXPECT_THAT(output, Not(HasSubstr("web server")));
 }
 
+TEST_F(OtherUsers, GroupsOfRootAreDropped) {
+    constexpr gid_t kGroup = 4242;
+    ASSERT_EQ(chown(kProfileFile, 0, kGroup), 0);
+    ASSERT_EQ(chmod(kProfileFile, 0640), 0);
+    const DoctorRun run = RunDoctorThrough({"/usr/bin/setpriv", "--groups=4242"}, {"--user", "nobody"});
+    EXPECT_THAT(run.output, HasSubstr("profile.conf cannot be read: Permission denied"));
+}
+
 TEST_F(OtherUsers, FolderThatRefusesRootIsNamed) {
     ASSERT_EQ(chown("/usr/tavo/etc", kNobody, kNobody), 0);
     ASSERT_EQ(chmod("/usr/tavo/etc", 0700), 0);

@@ -1,6 +1,7 @@
 #include <gmock/gmock.h>
 
 #include <string>
+#include <utility>
 
 #include "sso/sso.h"
 #include "tests/doctor/appliance.h"
@@ -65,6 +66,55 @@ TEST_P(Output, HoldsNoSecretThatStandsInThePlaceOfAnotherValue) {
         Appliance other(GetParam());
         other.SetClient(key, std::string("https://127.0.0.1/") + kClientSecret);
         EXPECT_FALSE(Ask({}).checks.empty());
+    }
+}
+
+TEST_P(Output, HidesTheShortestSecret) {
+    for (const auto &[secret, isHidden] : {std::pair("Xq7#vK", true), std::pair("Xq7#v", false)}) {
+        Appliance other(GetParam());
+        other.SetClient("client_secret", secret);
+        other.RefuseCodes("invalid_client", std::string("before ") + secret + " behind");
+        const std::string found = Ask({}).Find("token_endpoint.client", "finding").found;
+        EXPECT_EQ(found.find(secret) == std::string::npos, isHidden) << found;
+        EXPECT_EQ(found.find("before [hidden] behind") != std::string::npos, isHidden) << found;
+    }
+}
+
+TEST_P(Output, HidesBeforeItCuts) {
+    for (std::size_t before = 940; before < 1000; before += 3) {
+        appliance.RefuseCodes("invalid_client", std::string(before, '.') + kClientSecret);
+        EXPECT_NE(AskMachine({}).Find("token_endpoint.client", "finding").id, "");
+    }
+}
+
+TEST_P(Output, HoldsNoSignatureAlone) {
+    const std::string token = appliance.Token();
+    const std::string signature = token.substr(token.rfind('.') + 1);
+    KeepSecret(signature);
+    appliance.SetClient("client_id", signature);
+    EXPECT_THAT(Ask({"token", "-"}, token).Find("token.audience", "finding").found, HasSubstr("[hidden]"));
+}
+
+TEST_P(Output, HoldsNoInvisibleCharacter) {
+    // Both ends of each range of invisible and bidirectional characters, and their printable neighbours.
+    const std::string invisible[] = {"\u00ad", "\u061c", "\u180e",     "\u200b",    "\u200f", "\u2028",
+                                     "\u2029", "\u202a", "\u202e",     "\u2060",    "\u206f", "\ufeff",
+                                     "\ufff9", "\ufffb", "\U000e0000", "\U000e007f"};
+    const std::string printable[] = {"\u00ac", "\u00ae", "\u2010", "\u2027", "\u202f", "\u2070"};
+    std::string description;
+    for (const std::string &character : invisible) {
+        description += character + '.';
+    }
+    for (const std::string &character : printable) {
+        description += character;
+    }
+    appliance.RefuseCodes("invalid_client", description);
+    const std::string output = RunDoctor({}).output;
+    for (const std::string &character : invisible) {
+        EXPECT_EQ(output.find(character), std::string::npos) << ::testing::PrintToString(character);
+    }
+    for (const std::string &character : printable) {
+        EXPECT_NE(output.find(character), std::string::npos) << ::testing::PrintToString(character);
     }
 }
 

@@ -96,6 +96,25 @@ TEST_F(Terminal, IsAsItWasAfterALoginThatIsGivenUp) {
     EXPECT_EQ(dialogue.LocalModes(), before);
 }
 
+TEST_F(Terminal, IsAsItWasAfterASignal) {
+    for (const int signal : {SIGHUP, SIGQUIT, SIGTERM}) {
+        Dialogue dialogue(kTerminal, {"login"});
+        const unsigned int before = dialogue.FirstLocalModes();
+        dialogue.ReadUntil("It is not shown.");
+        dialogue.Signal(signal);
+        EXPECT_EQ(dialogue.WaitForEnd(), 128 + signal);
+        EXPECT_EQ(dialogue.LocalModes(), before) << signal;
+    }
+}
+
+TEST_F(Terminal, KeepsInputThatArrivesBeforeThePrompt) {
+    Dialogue dialogue(kTerminal, {"login"});
+    dialogue.Write(kReturnURI + std::string("?error=typed_early\n"));
+    dialogue.ReadUntil("It is not shown.");
+    dialogue.Write("\n");  // ends the dialogue if the address was lost
+    EXPECT_THAT(dialogue.Finish().output, HasSubstr("typed_early"));
+}
+
 }  // namespace
 
 }  // namespace Test

@@ -125,6 +125,7 @@ TEST_P(Token, ThatCannotBeReadEndsTheCommand) {
     EXPECT_EQ(missing.status, 2);
     EXPECT_THAT(missing.errors, HasSubstr("/tmp/no such file cannot be read"));
 
+    EXPECT_EQ(RunDoctor({"token", "-"}, std::string(1 << 20, 'a')).status, 1) << "of exactly the longest size";
     const DoctorRun large = RunDoctor({"token", "-"}, std::string((1 << 20) + 1, 'a'));
     EXPECT_EQ(large.status, 2);
     EXPECT_THAT(large.errors, HasSubstr("longer than 1 MiB"));

@@ -14,6 +14,7 @@ namespace Test {
 struct Credentials {
     std::shared_ptr<EVP_PKEY> key;
     std::shared_ptr<X509> certificate;
+    std::shared_ptr<X509> intermediate = nullptr;  // sent by a server after its own
 };
 
 /// The content of a certificate. The defaults are those of a valid server.

@@ -51,6 +51,9 @@ std::shared_ptr<SSL_CTX> MakeTLS(const Credentials &credentials, int onlyVersion
     Require(SSL_CTX_use_certificate(context.get(), credentials.certificate.get()) == 1 &&
                 SSL_CTX_use_PrivateKey(context.get(), credentials.key.get()) == 1,
             "credentials of a server");
+    Require(credentials.intermediate == nullptr ||
+                SSL_CTX_add1_chain_cert(context.get(), credentials.intermediate.get()) == 1,
+            "certificate of the intermediate authority");
     Require(SSL_CTX_set_min_proto_version(context.get(), onlyVersion) == 1 &&
                 SSL_CTX_set_max_proto_version(context.get(), onlyVersion) == 1,
             "version of TLS");

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <openssl/evp.h>
 
+#include <locale>
 #include <string>
 #include <vector>
 
@@ -182,6 +183,25 @@ TEST_F(DomainConversion, ReplacesDNSNameIgnoringCase) {
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice"), "ACME\\alice");
     EXPECT_EQ(Convert("corp.Example.net\\Alice"), "ACME\\Alice");
     EXPECT_EQ(Convert("LAB.EXAMPLE.NET\\bob"), "LAB\\bob");
+}
+
+/// A locale in which all letters are equal, ignoring case.
+class OneLetter : public std::ctype<char> {
+  protected:
+    char do_toupper(char c) const override { return std::isalpha(static_cast<unsigned char>(c)) != 0 ? 'X' : c; }
+    const char *do_toupper(char *begin, const char *end) const override {
+        for (; begin != end; ++begin) {
+            *begin = do_toupper(*begin);
+        }
+        return end;
+    }
+};
+
+TEST_F(DomainConversion, IgnoresLocaleOfProcess) {
+    const std::locale before = std::locale::global(std::locale(std::locale::classic(), new OneLetter));
+    EXPECT_EQ(Refusal("KORP.EXAMPLE.NET\\alice"), UnknownDomain("KORP.EXAMPLE.NET"));
+    EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice"), "ACME\\alice");
+    std::locale::global(before);
 }
 
 TEST_F(DomainConversion, KeepsUserUnchanged) {

@@ -12,6 +12,7 @@
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <filesystem>
 #include <iterator>
 #include <string>
@@ -88,6 +89,31 @@ class Disposition {
     struct sigaction before_ = {};
 };
 
+/// Ends the program if a test hangs. A timer, because tests use the alarm of this process; children do not inherit it.
+class Deadline {
+  public:
+    Deadline() {
+        sigevent event = {};
+        event.sigev_notify = SIGEV_SIGNAL;
+        event.sigev_signo = SIGABRT;
+        itimerspec limit = {};
+        limit.it_value.tv_sec = 60;
+        isSet_ = timer_create(CLOCK_MONOTONIC, &event, &timer_) == 0 && timer_settime(timer_, 0, &limit, nullptr) == 0;
+        EXPECT_TRUE(isSet_);
+    }
+    ~Deadline() {
+        if (isSet_) {
+            timer_delete(timer_);
+        }
+    }
+    Deadline(const Deadline &) = delete;
+    Deadline &operator=(const Deadline &) = delete;
+
+  private:
+    timer_t timer_ = {};
+    bool isSet_ = false;
+};
+
 class WinbindLookup : public testing::Test {
   protected:
     void SetUp() override {
@@ -120,6 +146,7 @@ class WinbindLookup : public testing::Test {
     }
 
   private:
+    const Deadline deadline_;
     std::ptrdiff_t descriptors_ = 0;
 };
 
@@ -202,7 +229,7 @@ TEST_F(WinbindLookup, FailsIfChildCrashes) {
     EXPECT_EQ(Convert(), "does not answer");
 }
 
-// These tests measure no time. Without the alarm, the child would wait forever and the test would time out.
+// These tests measure no time. Without the alarm, the child would wait forever and the deadline would end the program.
 
 TEST_F(WinbindLookup, FailsAfterAlarmOfChild) {
     answer = [](const char *, struct wbcDomainInfo &) -> wbcErr { WaitForever(); };
