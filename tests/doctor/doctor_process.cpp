@@ -294,19 +294,20 @@ void ExpectToStopAtTheOnlyFinding(const Report &report) {
     EXPECT_EQ(LibraryIn(report).empty(), stop.empty());
 }
 
-Dialogue::Dialogue(Over over, const Strings &arguments, const Strings &variables, unsigned short columns) {
+Dialogue::Dialogue(Over over, const Strings &arguments, const Strings &variables, const TerminalState &state) {
     Start start;
     if (over == Over::kTerminal) {
         int terminal = -1;
         char path[64];
-        const winsize size{24, columns, 0, 0};
+        const winsize size{24, state.columns, 0, 0};
         Require(openpty(&output_, &terminal, path, nullptr, &size) == 0, "openpty");
         fcntl(output_, F_SETFD, FD_CLOEXEC);
         firstLocalModes_ = LocalModes();
+        input_ = fcntl(output_, F_DUPFD_CLOEXEC, 0);
+        Write(state.typed);
         start.GiveTerminal(path);
         process_ = start.Doctor(arguments, variables);
         close(terminal);
-        input_ = dup(output_);
         return;
     }
     int in[2];

@@ -74,14 +74,19 @@ std::string LibraryIn(const Report &report);
 /// those behind it are not checked.
 void ExpectToStopAtTheOnlyFinding(const Report &report);
 
+/// A terminal before the doctor starts.
+struct TerminalState {
+    unsigned short columns = 0;  // 0: unknown
+    std::string typed;
+};
+
 /// A doctor that one talks with.
 class Dialogue {
   public:
     enum class Over { kPipes, kTerminal };
 
     /// The variables, each as NAME=VALUE, stand in its environment beside this process's own.
-    /// `columns` is the width of the terminal; 0 if unknown.
-    Dialogue(Over over, const Strings &arguments, const Strings &variables = {}, unsigned short columns = 0);
+    Dialogue(Over over, const Strings &arguments, const Strings &variables = {}, const TerminalState &state = {});
     ~Dialogue();
     Dialogue(const Dialogue &) = delete;
     Dialogue &operator=(const Dialogue &) = delete;

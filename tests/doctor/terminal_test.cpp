@@ -46,7 +46,7 @@ TEST_F(Terminal, ShowsNoColoursOnADumbTerminal) {
 TEST_F(Terminal, WrapsLinesAtItsWidth) {
     appliance.SetClient("redirect_uri", "https://nas.example/another/page");
     constexpr unsigned short kColumns = 70;
-    Dialogue dialogue(kTerminal, {"--verbose"}, {"NO_COLOR=1", "TERM=dumb"}, kColumns);
+    Dialogue dialogue(kTerminal, {"--verbose"}, {"NO_COLOR=1", "TERM=dumb"}, {kColumns, ""});
     std::istringstream lines(dialogue.Finish().output);
     bool isWrapped = false;
     for (std::string line; std::getline(lines, line);) {
@@ -108,11 +108,10 @@ TEST_F(Terminal, IsAsItWasAfterASignal) {
 }
 
 TEST_F(Terminal, KeepsInputThatArrivesBeforeThePrompt) {
-    Dialogue dialogue(kTerminal, {"login"});
-    dialogue.Write(kReturnURI + std::string("?error=typed_early\n"));
+    Dialogue dialogue(kTerminal, {"login"}, {}, {0, kReturnURI + std::string("?error=typed_early\n")});
     dialogue.ReadUntil("It is not shown.");
     dialogue.Write("\n");  // ends the dialogue if the address was lost
-    EXPECT_THAT(dialogue.Finish().output, HasSubstr("typed_early"));
+    EXPECT_THAT(dialogue.Finish().output, HasSubstr("The provider refused: typed_early"));
 }
 
 }  // namespace
