@@ -21,7 +21,7 @@ class AzureSettings : public ::testing::Test {
     Appliance appliance{Profile::kAzure};
 };
 
-TEST_F(AzureSettings, TenantThatIsNoGUIDIsAFinding) {
+TEST_F(AzureSettings, RejectsTenantThatIsNoGUID) {
     for (const char *tenant : {"common", "organizations", "corp.onmicrosoft.com"}) {
         appliance.SetClient("tenant_id", tenant);
         const Check finding = Ask({}).Find("client.tenant_id", "finding");
@@ -39,7 +39,7 @@ TEST_F(AzureSettings, TenantInCapitalsIsAFinding) {
     EXPECT_EQ(OnlyFinding().id, "discovery.tenant") << "without a tenant in the issuer";
 }
 
-TEST_F(AzureSettings, ClientIDThatIsNoGUIDIsNotPrinted) {
+TEST_F(AzureSettings, HidesClientIDThatIsNoGUID) {
     constexpr char kOther[] = "Qx8~not-a-client-id-but-a-secret";
     KeepSecret(kOther);
     appliance.SetClient("client_id", kOther);
@@ -59,7 +59,7 @@ TEST_F(AzureSettings, SwappedIDAndSecretAreNotPrinted) {
     EXPECT_THAT(RunDoctor({"login"}).errors, HasSubstr("azure_client_id is not a GUID"));
 }
 
-TEST_F(AzureSettings, MixedVersionsAreAFindingWithTheValueToSet) {
+TEST_F(AzureSettings, ReportsMixedVersionsWithValueToSet) {
     appliance.AnswerAt("/token", [](const std::string & /*request*/) { return std::string(); });
     appliance.MoveEndpoint("token_endpoint", appliance.URL("/oauth2/v2.0/token"));
     const Check finding = Ask({}).Find("client.version", "finding");
@@ -68,14 +68,14 @@ TEST_F(AzureSettings, MixedVersionsAreAFindingWithTheValueToSet) {
     EXPECT_EQ(finding.remedy, "Set azure_token_endpoint to \"" + appliance.URL("/oauth2/token") + "\"");
 }
 
-TEST_F(AzureSettings, Version2IsNotedWithTheOptionalClaim) {
+TEST_F(AzureSettings, NotesOptionalClaimOfVersion2) {
     for (const char *key : {"wellknown", "authorization_endpoint", "token_endpoint"}) {
         appliance.SetClient(key, appliance.URL(std::string("/v2.0/") + key));
     }
     EXPECT_THAT(Ask({}).Find("client.version", "note").remedy, HasSubstr("optional claim \"email\""));
 }
 
-TEST_F(AzureSettings, AddressForSeveralTenantsIsAFindingWithTheValueToSet) {
+TEST_F(AzureSettings, ReportsAddressForSeveralTenants) {
     std::string url = appliance.URL("/token_endpoint");
     url.replace(url.find(kTenant), std::string(kTenant).size(), "common");
     appliance.SetClient("token_endpoint", url);

@@ -244,7 +244,7 @@ TEST_F(Network, EndlessResponseIsStopped) {
     EXPECT_THAT(Ask({}).Find("discovery.reachable", "finding").found, HasSubstr("longer than 4 MiB"));
 }
 
-TEST_F(Network, ClientIsAcceptedOnlyIfAWrongSecretIsRejected) {
+TEST_F(Network, ReportsAcceptanceOnlyIfWrongSecretIsRejected) {
     EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").found, "the provider accepts the client's id and secret");
     appliance.RefuseCodes("invalid_grant");
     EXPECT_THAT(Ask({}).Find("token_endpoint.client", "good").found, HasSubstr("did not reject"));

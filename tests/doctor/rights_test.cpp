@@ -60,7 +60,7 @@ TEST_F(Rights, FoldersOfTheFrontEndMustBePrivate) {
     EXPECT_THAT(OnlyFinding().found, HasSubstr("/usr/tavo/var: mode 0777"));
 }
 
-TEST_F(Rights, FullFileSystemOfTheFrontEndIsAFinding) {
+TEST_F(Rights, ReportsFullFileSystem) {
     std::filesystem::create_directories(kVar);
     ASSERT_EQ(mount("tmpfs", kVar, "tmpfs", 0, "size=4k,mode=0755"), 0);
     WriteFile(std::string(kVar) + "/large", std::string(4096, 'x'));
@@ -70,7 +70,7 @@ TEST_F(Rights, FullFileSystemOfTheFrontEndIsAFinding) {
     EXPECT_EQ(umount(kVar), 0);
 }
 
-TEST_F(Rights, RedirectURIOnThisMachineNeedsAReturnProgram) {
+TEST_F(Rights, ReportsMissingReturnProgram) {
     appliance.AnswerAt("/return.cgi", "", "200 OK");
     std::string uri = appliance.URL("");
     uri = uri.substr(0, uri.find('/', 8)) + "/webman/sso/return.cgi";

@@ -80,7 +80,7 @@ TEST(Text, PastedCharacterInAValueIsAFinding) {
     EXPECT_THAT(Ask({}).FirstFinding().found, HasSubstr("contains a smart quote"));
 }
 
-TEST(Text, TableOfDomainsIsReadLikeTheStandInReadsIt) {
+TEST(Text, ReadsTableOfDomainsLikeStandIn) {
     const Appliance appliance(Profile::kAzure);
     WriteFile(kDomainTable, "\xef\xbb\xbf{\"corp.example\": \"CORP\",}");
     const Report report = Ask({"--domain", "alice@corp.example"});
