@@ -37,7 +37,7 @@ std::string KeysOf(const std::vector<Endpoint> &endpoints) {
     return boost::join(keys, ", ");
 }
 
-/// Returns the word in an address that stands for several tenants; empty if there is none.
+/// Returns the word for several tenants in an address; empty if there is none.
 std::string SharedTenantIn(const std::string &url) {
     for (const std::string word : {"common", "organizations", "consumers"}) {
         if (boost::icontains(url, '/' + word + '/')) {

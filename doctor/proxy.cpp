@@ -17,7 +17,7 @@ std::string Variable(const std::string &name) {
     return value != nullptr ? value : "";
 }
 
-/// no_proxy lists hosts and domains. An asterisk alone stands for all of them.
+/// no_proxy lists hosts and domains. An asterisk alone means all hosts.
 bool IsExcepted(const std::string &host) {
     const std::string exceptions = Variable("no_proxy").empty() ? Variable("NO_PROXY") : Variable("no_proxy");
     std::vector<std::string> names;

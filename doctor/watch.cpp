@@ -104,7 +104,7 @@ std::string TextOf(CURL *handle, CURLINFO which) {
     return text != nullptr ? text : "";
 }
 
-/// A line of its own on a terminal, and gone when the answer is there.
+/// Shown on a terminal until the answer arrives.
 class Progress {
   public:
     explicit Progress(const std::string &url) {

@@ -24,11 +24,11 @@ std::string ErrorAnswer(const std::string &error, const std::string &description
     return HTTPAnswer(Compact(answer), status);
 }
 
-/// Nobody but whoever they are for may have these.
+/// Test output must not contain these.
 void KeepTokenSecret(const std::string &token) {
     const std::size_t claims = token.find('.');
     if (claims != std::string::npos) {
-        // A state is encoded as claims are, and has a nonce as well: twelve bytes can be the same.
+        // State and claims are encoded alike and both have a nonce, so twelve bytes can be equal.
         KeepSecret(token.substr(claims + 1), 20);
     }
 }

@@ -13,8 +13,8 @@
 #include "tests/loopback/loopback_provider.h"
 #include "tests/support/server.h"
 
-// A machine that is completely set up, and its provider, by which everyone who looks finds the same: as often as it is
-// asked, and in whatever order. Under the real clock, for the doctor is a process of its own.
+// A completely configured machine and its provider. The provider answers any number of requests in any order. It uses
+// the real clock, because the doctor is another process.
 namespace Test {
 
 constexpr char kClientSecret[] = "q7Zp-Lw2x&K%9vTe Rb4n+Ym8s";
@@ -23,42 +23,42 @@ constexpr char kCode[] = "0.AXkA-good/code&of-one=sign-in";
 constexpr char kTenant[] = "4f6d2c1e-9b7a-4c3d-8e5f-0a1b2c3d4e5f";
 constexpr char kReturnURI[] = "https://nas.example/webman/sso/return.cgi";
 
-/// What a token says that was made now.
+/// Claims of a token issued now.
 Json::Value GoodClaims(Profile profile);
 
-/// Signed as the header's "alg" says.
+/// Signs with the header's "alg".
 std::string MakeToken(const Json::Value &header, const Json::Value &claims);
 std::string GoodToken(Profile profile);
 
 class Appliance {
   public:
-    using Answer = std::function<std::string(const std::string &request)>;  // both byte by byte
+    using Answer = std::function<std::string(const std::string &request)>;  // both verbatim
 
     explicit Appliance(Profile profile, const Credentials &credentials = CertificateFor("IP:127.0.0.1"));
 
     Profile profile() const { return profile_; }
     std::string ClientFile() const;
 
-    /// The key as the client's file has it: "azure_" or "websphere_", and its name.
+    /// The key in the client's file: "azure_" or "websphere_" and the name.
     std::string Key(const std::string &name) const;
 
-    /// JSON text over the client's file and the discovery document; a null takes a member away.
+    /// Merges JSON into the client's file and the discovery document. A null removes a member.
     void ChangeClientFile(const std::string &changes);
     void ChangeDiscovery(const std::string &changes);
 
     void SetClient(const std::string &name, const Json::Value &value);
 
-    /// In the client's file and in what the provider publishes.
+    /// Sets an endpoint in the client's file and in the discovery document.
     void MoveEndpoint(const std::string &name, const std::string &url);
 
-    /// What the provider answers at the end of a path: "/discovery", "/keys" or "/token".
+    /// Sets the response for paths that end in "/discovery", "/keys" or "/token".
     void AnswerAt(const std::string &path, Answer answer);
     void AnswerAt(const std::string &path, const std::string &body, const std::string &status = "200 OK");
 
-    /// Whatever the code is.
+    /// The response of the token endpoint to any code.
     void RefuseCodes(const std::string &error, const std::string &description = "");
 
-    /// The token that the provider gives for the one good code.
+    /// The token that the provider returns for its code.
     void GiveToken(const std::string &token);
     void GiveToken(const std::string &headerChanges, const std::string &claimChanges);
     std::string Token() const { return token_; }
@@ -85,7 +85,7 @@ class Appliance {
     std::atomic<int> connections_{0};
     std::mutex mutex_;
     std::map<std::string, Answer> answers_;
-    Server server_;  // the last: its thread uses all the others
+    Server server_;  // last, because its thread uses the other members
 };
 
 }  // namespace Test

@@ -43,7 +43,7 @@ std::string Complete(const std::string &words) {
     return Test::OutputOf("bash -c '" + script + "'");
 }
 
-TEST(Options, AreInTheManualPageAndCompleted) {
+TEST(Options, AreDocumentedAndCompleted) {
     const std::string manual = Read(TAVOSSO_SOURCES "/docs/man/tavosso-doctor.8");
     for (const Strings &command : {Strings{}, {"token"}, {"login"}, {"explain"}}) {
         for (const std::string &option : OptionsOf(command)) {
@@ -53,7 +53,7 @@ TEST(Options, AreInTheManualPageAndCompleted) {
     }
 }
 
-TEST(Commands, AreInTheHelpTheManualPageAndCompleted) {
+TEST(Commands, AreDocumentedAndCompleted) {
     const std::string help = RunDoctor({"--help"}).output;
     const std::string manual = Read(TAVOSSO_SOURCES "/docs/man/tavosso-doctor.8");
     for (const std::string &command : kCommands) {
@@ -89,7 +89,7 @@ TEST(Checks, InTheDocumentationExist) {
     EXPECT_GT(count, 60);
 }
 
-TEST(Completion, OffersWhatTheCommandTakes) {
+TEST(Completion, OffersOptionsOfCommand) {
     EXPECT_EQ(Complete("to"), "token");
     EXPECT_EQ(Complete("login --f"), "");
     EXPECT_EQ(Complete("token READ"), "README.md");

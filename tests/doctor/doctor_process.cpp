@@ -38,7 +38,7 @@ void Require(bool condition, const char *what) {
     }
 }
 
-/// A file without a name.
+/// An unnamed file.
 int MakeFile(const std::string &content = "") {
     const int file = memfd_create("doctor", MFD_CLOEXEC);
     Require(file >= 0 && write(file, content.data(), content.size()) == static_cast<ssize_t>(content.size()) &&
@@ -47,7 +47,7 @@ int MakeFile(const std::string &content = "") {
     return file;
 }
 
-/// What is left to read; closes the file. A terminal that nobody holds any more ends with an error.
+/// Reads the rest and closes the file. Reading a terminal that no process has open any more fails.
 std::string ReadAll(int file) {
     std::string content;
     char bytes[4096];
@@ -63,7 +63,7 @@ std::string ReadFile(int file) {
     return ReadAll(file);
 }
 
-/// What a process starts with.
+/// How a process is started.
 class Start {
   public:
     Start() {
@@ -79,7 +79,7 @@ class Start {
 
     void Give(int file, int as) { posix_spawn_file_actions_adddup2(&actions_, file, as); }
 
-    /// In a session of its own, whose terminal it is.
+    /// As the leader of a new session with this controlling terminal.
     void GiveTerminal(const char *path) {
         posix_spawnattr_setflags(&attributes_, POSIX_SPAWN_SETSID);
         posix_spawn_file_actions_addopen(&actions_, STDIN_FILENO, path, O_RDWR, 0);
@@ -125,7 +125,7 @@ int WaitFor(pid_t process) {
     return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
 }
 
-/// Tells which secret by its number: it is not for the test's output either.
+/// Reports a secret by its number, to keep it out of the test's output.
 void ExpectNoSecret(const std::string &text) {
     for (std::size_t i = 0; i < secrets.size(); ++i) {
         const auto &[secret, piece] = secrets[i];
@@ -138,7 +138,7 @@ void ExpectNoSecret(const std::string &text) {
     }
 }
 
-/// Of ASCII, or one of C1, which a terminal may obey as well: in UTF-8, or as a single byte.
+/// A control character of ASCII or C1, in UTF-8 or as a single byte. Terminals may interpret each.
 bool HoldsControl(const std::string &text) {
     const auto byteAt = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
     for (std::size_t i = 0; i < text.size(); ++i) {
@@ -167,7 +167,7 @@ void ExpectDocumented(const std::vector<Check> &checks) {
     }
 }
 
-/// The library has passed what is before its stop, and has not come to what is behind it.
+/// Checks before the library's stop are good, later ones are not checked.
 void ExpectInOrder(const Report &report, const std::string &stop) {
     bool isBehind = false;
     for (const Check &check : report.checks) {

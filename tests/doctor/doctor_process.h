@@ -8,27 +8,26 @@
 #include <string>
 #include <vector>
 
-// The built tavosso-doctor, as an administrator runs it: a process of its own, with this machine's clock.
+// Runs the built tavosso-doctor as a separate process with this machine's clock.
 namespace Test {
 
 using Strings = std::vector<std::string>;
 
-/// What a process has left behind.
+/// Output and status of a process.
 struct DoctorRun {
-    int status = -1;  // the signal's number and 128 where one ended it, as a shell tells it
+    int status = -1;  // 128 and the signal's number if a signal ended it
     std::string output;
     std::string errors;
 };
 
-/// Makes it a failure of the test if any run from now on prints a piece of this text, or of its percent-encoding. A
-/// piece is so many bytes that nothing else holds them by chance.
+/// Fails the test if a later run prints a piece of this text or of its percent-encoding. Pieces are too long to occur
+/// by chance.
 void KeepSecret(const std::string &text, std::size_t piece = 12);
 
-/// Runs the doctor to its end, without a terminal. That it prints neither a secret nor a control character is looked at
-/// here, whatever the test is about.
+/// Runs the doctor without a terminal. Fails the test if it prints a secret or a control character.
 DoctorRun RunDoctor(const Strings &arguments, const std::string &input = "");
 
-/// Runs the doctor as the argument of another command.
+/// Runs the doctor through another command.
 DoctorRun RunDoctorThrough(const Strings &command, const Strings &arguments = {});
 
 /// One check of a report.
@@ -46,65 +45,65 @@ struct Report {
     Json::Value json;
     std::vector<Check> checks;
 
-    /// The check of this id with this mark, if there is one; else an empty one.
+    /// Returns the check with this id and mark, or an empty one.
     Check Find(const std::string &id, const std::string &mark) const;
 
-    /// The first finding of any id; an empty check if there is none.
+    /// Returns the first finding, or an empty check.
     Check FirstFinding() const;
 
     Strings Findings() const;  // their ids
 };
 
-/// The arguments, and one more.
+/// Appends an argument.
 Strings With(Strings arguments, const std::string &more);
 
-/// Runs the doctor for machines and for people: what the latter read is looked at as in `RunDoctor`.
+/// Runs the doctor with --json and without. Verifies both outputs like `RunDoctor`.
 Report Ask(const Strings &arguments, const std::string &input = "");
 
-/// The one finding that there is.
+/// Returns the only finding.
 Check OnlyFinding(const Strings &arguments = {});
 
-/// For machines alone, where many are asked.
+/// Runs the doctor only with --json, for tests with many runs.
 Report AskMachine(const Strings &arguments, const std::string &input = "");
 
-/// Of a token's report the library's own word, empty where it takes the token.
+/// Returns the library's text in the report of a token. Empty if the library accepts it.
 std::string LibraryIn(const Report &report);
 
-/// Of a token's report with --fetch: the steps before the library's stop are good, that one is the only finding, and
-/// those behind it are not checked.
+/// Verifies a token's report with --fetch: steps before the library's stop are good, that step is the only finding, and
+/// later ones are not checked.
 void ExpectToStopAtTheOnlyFinding(const Report &report);
 
-/// A terminal before the doctor starts.
+/// The state of a terminal before the doctor starts.
 struct TerminalState {
     unsigned short columns = 0;  // 0: unknown
     std::string typed;
 };
 
-/// A doctor that one talks with.
+/// A running doctor on a terminal.
 class Dialogue {
   public:
     enum class Over { kPipes, kTerminal };
 
-    /// The variables, each as NAME=VALUE, stand in its environment beside this process's own.
+    /// Adds the variables, each as NAME=VALUE, to this process's environment.
     Dialogue(Over over, const Strings &arguments, const Strings &variables = {}, const TerminalState &state = {});
     ~Dialogue();
     Dialogue(const Dialogue &) = delete;
     Dialogue &operator=(const Dialogue &) = delete;
 
-    /// Waits until it has printed this, or has ended. Gives all that it has printed so far.
+    /// Waits until it has printed this or has ended. Returns its output so far.
     std::string ReadUntil(const std::string &text);
 
     void Write(const std::string &bytes) const;
 
-    /// Nothing more will be written. Waits for its end.
+    /// Closes its input and waits for its end.
     DoctorRun Finish();
 
     void Signal(int signal) const;
 
-    /// Its status, as long as the terminal is still there to look at.
+    /// Returns its status while the terminal still exists.
     int WaitForEnd();
 
-    /// Of the terminal, in the kernel's bits; and what they were before the doctor began.
+    /// The terminal's local modes, now and before the doctor started.
     unsigned int LocalModes() const;
     unsigned int FirstLocalModes() const { return firstLocalModes_; }
 

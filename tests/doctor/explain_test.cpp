@@ -65,7 +65,7 @@ Strings Explanations(const std::string &text) {
     return about;
 }
 
-TEST(Explain, FindsTheRowOfEveryText) {
+TEST(Explain, FindsRowOfEveryText) {
     for (const char *placeholder : TAVO::Web::kPlaceholders) {
         EXPECT_EQ(kWords.count(placeholder), 1U) << placeholder;
     }
@@ -89,7 +89,7 @@ TEST(Explain, PrintsTheRow) {
     EXPECT_THAT(run.output, Not(HasSubstr("`")));
 }
 
-TEST(Explain, KnowsTheWordsOfLibcurl7And8) {
+TEST(Explain, RecognisesTextsOfLibcurl7And8) {
     for (const char *text : {"Couldn't resolve host name", "Could not resolve hostname"}) {
         EXPECT_THAT(Explanations(text), ElementsAre("CURLE_COULDNT_RESOLVE_HOST")) << text;
     }
@@ -97,7 +97,7 @@ TEST(Explain, KnowsTheWordsOfLibcurl7And8) {
                 ElementsAre("sso:N request token uri CURL.", "CURLE_COULDNT_CONNECT"));
 }
 
-TEST(Explain, KnowsAProvidersAnswerByItsError) {
+TEST(Explain, RecognisesProviderResponseByItsError) {
     EXPECT_THAT(Explanations(R"({"error": "invalid_client", "error_description": "AADSTS7000215"})"),
                 Contains(TAVO::Web::kErrorAnswer));
     for (const char *text :
@@ -106,7 +106,7 @@ TEST(Explain, KnowsAProvidersAnswerByItsError) {
     }
 }
 
-TEST(Explain, KnowsLinesAsTheLogHasThem) {
+TEST(Explain, RecognisesLogLines) {
     for (const std::string line : {"return.cgi[4711]: sso:69 Couldn't connect to server",
                                    "return.cgi[4711]: frontend: sign-in failed: id_token expired."}) {
         EXPECT_EQ(Explanations(line).size(), 2U) << line;
@@ -114,7 +114,7 @@ TEST(Explain, KnowsLinesAsTheLogHasThem) {
     }
 }
 
-TEST(Explain, ExplainsTheReasonInTheFrontEndsLineToo) {
+TEST(Explain, ExplainsReasonInFrontEndLine) {
     EXPECT_THAT(Explanations("return.cgi[1]: frontend: sign-in failed: kid does not exist in Azure verified kyes"),
                 ElementsAre("frontend: sign-in failed: REASON", "kid does not exist in Azure verified kyes"));
 }
@@ -145,7 +145,7 @@ TEST(Explain, AcceptsTextsAsPeopleTypeThem) {
     EXPECT_THAT(Explanations("AADSTS700016"), Not(Contains("AADSTS70001"))) << "codes are words";
 }
 
-TEST(Explain, ReportsAnUnknownText) {
+TEST(Explain, ReportsUnknownText) {
     for (const std::string text : {"systemd[1]: Started lighttpd.service", "", " ", "*", "[", "\\", "{}"}) {
         EXPECT_EQ(Explanations(text), Strings()) << text;
     }

@@ -15,13 +15,13 @@
 #include "tests/support/token.h"
 #include "web/failure_lookup.h"
 
-// Whatever a login can end with: the doctor, run first, names the cause, and the login then ends so. Each row is
-// printed with what the doctor found.
+// For each text that a login can fail with: the doctor reports the cause first, then the login fails with that text.
+// Prints each row with the doctor's finding.
 namespace Test {
 
 namespace {
 
-/// What an administrator would run, and what it is asked by here.
+/// The command that an administrator would run.
 enum class Command { kPass, kToken, kLogin };
 
 constexpr Profile kAzure = Profile::kAzure;
@@ -41,9 +41,9 @@ constexpr char kAlgorithm[] = "ALG algorithm is not supported";
 struct Row {
     std::string name;
     Profile profile;
-    std::string text;  // as the table of failures has it
+    std::string text;  // in the table of failures
     Command command;
-    std::string check;  // of `login`, whose report has no ids, the subject
+    std::string check;  // the id; for `login`, whose report has no ids, the subject
     void (*arrange)(Appliance &appliance);
 };
 
@@ -51,20 +51,20 @@ void PrintTo(const Row &row, std::ostream *stream) { *stream << row.name; }
 
 void WriteProfile(const std::string &content) { WriteFile(kProfileFile, content); }
 
-/// An address where nobody listens, as long as the program runs.
+/// An address that refuses connections while the program runs.
 std::string NobodysURL() {
     static const Port port;
     return "https://127.0.0.1:" + std::to_string(port.number()) + "/";
 }
 
-/// Another server than the provider's, of the same host. It lives as long as the program.
+/// A second server on the provider's host. It runs until the program ends.
 template <Credentials (*make)(const std::string &)>
 std::string OtherServersURL() {
     static const Server server(make("IP:127.0.0.1"));
     return server.URL("/");
 }
 
-/// The provider takes it as well: it gives its token whatever it is sent.
+/// The provider accepts it too, because it returns its token for any request.
 void SetSecretEverywhere(Appliance &appliance, const std::string &secret) {
     appliance.AnswerAt("/token_endpoint", TokenResponse(appliance.Token()));
     appliance.SetClient("client_secret", secret);
@@ -262,7 +262,7 @@ std::vector<Row> Rows() {
     return rows;
 }
 
-/// What the doctor shows of an exception: of a provider's answer the error alone.
+/// The part of an exception that the doctor prints: only the error of a provider's response.
 std::string Shown(const std::string &thrown) {
     if (thrown.front() != '{') {
         return thrown;
@@ -281,7 +281,7 @@ void PrintRow(const Row &row, const Check &check) {
 
 class FailureRow : public ::testing::TestWithParam<Row> {};
 
-TEST_P(FailureRow, IsExplainedBeforeTheLoginEndsSo) {
+TEST_P(FailureRow, IsDiagnosedBeforeLoginFails) {
     const Row &row = GetParam();
     Appliance appliance(row.profile);
     row.arrange(appliance);
@@ -298,7 +298,7 @@ TEST_P(FailureRow, IsExplainedBeforeTheLoginEndsSo) {
             EXPECT_EQ(report.json["stops_at"], row.check);
             ExpectToStopAtTheOnlyFinding(report);
         } else {
-            // That of a certificate comes with the transfer that failed.
+            // The certificate's check reports the failed transfer.
             EXPECT_EQ(GroupOf(report.FirstFinding().id), GroupOf(row.check));
         }
     }
@@ -325,7 +325,7 @@ std::set<std::string> TextsOfLogins() {
     return texts;
 }
 
-TEST(FailureRows, CoverEveryTextThatEndsALogin) {
+TEST(FailureRows, CoverEveryTextOfFailedLogins) {
     std::set<std::string> withRow;
     for (const Row &row : Rows()) {
         withRow.insert(row.text);
@@ -338,13 +338,13 @@ class Healthy : public ::testing::TestWithParam<Profile> {};
 INSTANTIATE_TEST_SUITE_P(Doctor, Healthy, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
                          [](const auto &profile) { return Name(profile.param); });
 
-TEST_P(Healthy, MachineHasNoFindingsAndTheUserSignsIn) {
+TEST_P(Healthy, MachineHasNoFindingsAndSignsIn) {
     const Appliance appliance(GetParam());
     EXPECT_EQ(Ask({}).Findings(), Strings());
     EXPECT_EQ(appliance.LogIn(), LoggedIn(UserName(GetParam())));
 }
 
-TEST_P(Healthy, TokenHasNoFindingsAndTheUserSignsIn) {
+TEST_P(Healthy, TokenHasNoFindingsAndSignsIn) {
     const Appliance appliance(GetParam());
     const Report report = Ask({"token", "-", "--fetch"}, appliance.Token());
     EXPECT_EQ(report.Findings(), Strings());

@@ -10,7 +10,7 @@
 #include "tests/doctor/appliance.h"
 #include "tests/doctor/doctor_process.h"
 
-// What an administrator can get wrong in the files, and what is told of it.
+// Errors in the configuration files and the findings for them.
 namespace Test {
 
 namespace {
@@ -24,7 +24,7 @@ using ::testing::Not;
 
 constexpr uid_t kNobody = 65534;
 
-class Files : public ::testing::Test {
+class FileCheck : public ::testing::Test {
   protected:
     Check FirstFindingWith(const std::string &clientKey, const Json::Value &value) {
         appliance.SetClient(clientKey, value);
@@ -36,17 +36,17 @@ class Files : public ::testing::Test {
     Appliance appliance{Profile::kAzure};
 };
 
-TEST_F(Files, ErrorInJSONIsToldByLineAndColumn) {
+TEST_F(FileCheck, ReportsLineAndColumnOfJSONError) {
     WriteFile(kAzureFile, "{\n  \"azure_client_id\": \"the client\",\n  \"azure_tenant_id\" \"the tenant\"\n}\n");
     EXPECT_THAT(Ask({}).Find("client.file", "finding").found, HasSubstr("line 3, column 21: "));
 }
 
-TEST_F(Files, SecretWithoutQuotationMarksIsNotPrinted) {
+TEST_F(FileCheck, HidesSecretWithoutQuotationMarks) {
     WriteFile(kAzureFile, "{\"azure_client_secret\": -" + std::string(kClientSecret) + "}");
     EXPECT_EQ(Ask({}).FirstFinding().id, "client.file");
 }
 
-TEST(ClientSecret, ThatIsShorterThanAKeyOfHS256IsNoted) {
+TEST(ClientSecret, IsNotedIfShorterThanHS256Key) {
     Appliance appliance(Profile::kWebSphere);
     appliance.SetClient("client_secret", std::string(31, 'k'));
     EXPECT_THAT(Ask({}).Find("client.client_secret", "note").found, HasSubstr("31 bytes. "));
@@ -54,47 +54,47 @@ TEST(ClientSecret, ThatIsShorterThanAKeyOfHS256IsNoted) {
     EXPECT_EQ(Ask({}).Find("client.client_secret", "good").found, "is set, 32 bytes");
 }
 
-TEST(ClientSecret, ThatSignsNoTokenMayBeShort) {
+TEST(ClientSecret, MayBeShortForAzure) {
     Appliance appliance(Profile::kAzure);
     appliance.SetClient("client_secret", "a short one");
     EXPECT_EQ(Ask({}).Find("client.client_secret", "good").found, "is set, 11 bytes");
 }
 
-TEST_F(Files, TextInThePlaceOfABooleanIsNoted) {
+TEST_F(FileCheck, NotesStringInsteadOfBoolean) {
     appliance.SetClient("sso_enable", "yes");
     EXPECT_THAT(Ask({}).Find("client.sso_enable", "note").found, HasSubstr("not a boolean"));
 }
 
-TEST_F(Files, NumberInThePlaceOfATextIsAFinding) {
+TEST_F(FileCheck, ReportsNumberInsteadOfString) {
     EXPECT_THAT(FirstFindingWith("client_id", 4711).found, HasSubstr("not a string"));
 }
 
-TEST_F(Files, MissingKeyIsAFinding) {
+TEST_F(FileCheck, ReportsMissingKey) {
     EXPECT_THAT(FirstFindingWith("redirect_uri", Json::Value()).found, HasSubstr("is not a string"));
     appliance.ChangeClientFile(R"({"azure_redirect_uri": null})");
     EXPECT_EQ(OnlyFinding().found, "is missing");
 }
 
-TEST_F(Files, UnknownKeyIsToldWithTheOneThatItIsLike) {
+TEST_F(FileCheck, SuggestsSimilarKey) {
     appliance.ChangeClientFile(R"({"azure_Client_id": "the client", "azure_client_id": null})");
     const Report report = Ask({});
     EXPECT_THAT(report.Findings(), ElementsAre("client.unknown_key", "client.client_id", "token_endpoint.client"));
     EXPECT_THAT(report.FirstFinding().remedy, HasSubstr("\"azure_client_id\""));
 }
 
-TEST_F(Files, UnknownKeyThatIsLikeNoneIsNoted) {
+TEST_F(FileCheck, NotesUnknownKey) {
     appliance.ChangeClientFile(R"({"written_by": "the administrator"})");
     const Report report = Ask({});
     EXPECT_THAT(report.Find("client.unknown_key", "note").found, HasSubstr("\"written_by\""));
     EXPECT_THAT(report.Findings(), IsEmpty());
 }
 
-TEST_F(Files, UnknownKeyOfTheProfileIsToldWithTheOneThatItIsLike) {
+TEST_F(FileCheck, SuggestsSimilarKeyOfProfile) {
     WriteFile(kProfileFile, R"({"sso_enable": true, "sso_profile": "azure", "SSO_Profile": "websphere"})");
     EXPECT_THAT(OnlyFinding().remedy, HasSubstr("\"sso_profile\""));
 }
 
-TEST_F(Files, TokenEndpointWithoutTLSIsAFindingAndGetsNoSecret) {
+TEST_F(FileCheck, SendsNoSecretToEndpointWithoutTLS) {
     appliance.MoveEndpoint("token_endpoint", "http" + appliance.URL("/token_endpoint").substr(5));
     const Report report = Ask({});
     EXPECT_THAT(report.Findings(), ElementsAre("client.token_endpoint"));
@@ -102,39 +102,39 @@ TEST_F(Files, TokenEndpointWithoutTLSIsAFindingAndGetsNoSecret) {
     EXPECT_THAT(appliance.Requests(), Not(Contains(HasSubstr("client_secret"))));
 }
 
-TEST_F(Files, EndpointThatIsNoAddressIsAFinding) {
+TEST_F(FileCheck, ReportsInvalidEndpoint) {
     EXPECT_THAT(FirstFindingWith("authorization_endpoint", "https://").found, HasSubstr("is not a URL"));
 }
 
-TEST_F(Files, QueryInTheAuthorizationEndpointIsAFinding) {
+TEST_F(FileCheck, ReportsQueryInAuthorizationEndpoint) {
     appliance.MoveEndpoint("authorization_endpoint", appliance.URL("/authorization_endpoint?p=policy"));
     EXPECT_THAT(OnlyFinding().found, HasSubstr("query"));
 }
 
-TEST_F(Files, BlankAroundAValueIsAFinding) {
+TEST_F(FileCheck, ReportsBlanksAroundValue) {
     EXPECT_THAT(FirstFindingWith("tenant_id", std::string(kTenant) + " ").found, HasSubstr("a blank"));
 }
 
-TEST_F(Files, RedirectURIOfAnotherPathIsAFindingUnlessTheProgramIsThere) {
+TEST_F(FileCheck, ReportsRedirectURIToOtherProgram) {
     EXPECT_THAT(FirstFindingWith("redirect_uri", "https://nas.example/sso/back.cgi").found,
                 HasSubstr("\"/sso/back.cgi\""));
     EXPECT_THAT(Ask({"--return-program", "/sso/back.cgi"}).Findings(), IsEmpty());
 }
 
-TEST_F(Files, EndpointOfAnotherTenantIsAFinding) {
+TEST_F(FileCheck, ReportsEndpointOfOtherTenant) {
     appliance.MoveEndpoint("end_session_endpoint", appliance.URL("/end"));
     appliance.SetClient("authorization_endpoint", "https://127.0.0.1/99999999-9b7a-4c3d-8e5f-0a1b2c3d4e5f/authorize");
     EXPECT_THAT(Ask({}).Find("client.tenant", "finding").found, HasSubstr("99999999-9b7a-4c3d-8e5f-0a1b2c3d4e5f"));
 }
 
-TEST_F(Files, SecretThatOthersCanReadIsAFinding) {
+TEST_F(FileCheck, ReportsSecretReadableByOthers) {
     for (const mode_t mode : {0640U, 0604U}) {
         ASSERT_EQ(chmod(kAzureFile, mode), 0);
         EXPECT_THAT(OnlyFinding().found, HasSubstr("read the client secret"));
     }
 }
 
-TEST_F(Files, FileThatOthersCanWriteIsAFinding) {
+TEST_F(FileCheck, ReportsFileWritableByOthers) {
     ASSERT_EQ(chmod(kAzureFile, 0620), 0);
     EXPECT_THAT(OnlyFinding().found, HasSubstr("can change it"));
     ASSERT_EQ(chmod(kAzureFile, 0600), 0);
@@ -142,36 +142,36 @@ TEST_F(Files, FileThatOthersCanWriteIsAFinding) {
     EXPECT_EQ(OnlyFinding().id, "profile.rights");
 }
 
-TEST_F(Files, DirectoryInThePlaceOfTheProfileIsAFinding) {
+TEST_F(FileCheck, ReportsDirectoryInsteadOfProfile) {
     ASSERT_EQ(std::remove(kProfileFile), 0);
     ASSERT_EQ(mkdir(kProfileFile, 0755), 0);
     EXPECT_THAT(OnlyFinding().found, HasSubstr("Is a directory"));
     EXPECT_EQ(appliance.LogIn().text, "read profile file failed.");
 }
 
-TEST_F(Files, DirectoryInThePlaceOfTheClientsFileIsAFinding) {
+TEST_F(FileCheck, ReportsDirectoryInsteadOfClientFile) {
     ASSERT_EQ(std::remove(kAzureFile), 0);
     ASSERT_EQ(mkdir(kAzureFile, 0755), 0);
     EXPECT_THAT(Ask({}).Find("client.file", "finding").found, HasSubstr("Is a directory"));
 }
 
-TEST_F(Files, ListInThePlaceOfTheClientsKeysIsAFinding) {
+TEST_F(FileCheck, ReportsListInsteadOfObject) {
     WriteFile(kAzureFile, "[\"azure_client_id\", \"the client\"]");
     EXPECT_THAT(Ask({}).Find("client.file", "finding").found, EndsWith("is JSON, but not an object"));
 }
 
-TEST_F(Files, TableOfDomainsThatIsNoJSONIsAFinding) {
+TEST_F(FileCheck, ReportsDomainTableThatIsNotJSON) {
     WriteFile(kDomainTable, "corp.example = CORP\n");
     EXPECT_THAT(Ask({}).Find("directory.table", "finding").found, HasSubstr("Line 1, Column 1"));
 }
 
-TEST_F(Files, DomainThatNobodyConvertsIsAFinding) {
+TEST_F(FileCheck, ReportsUnknownDomain) {
     EXPECT_EQ(Ask({"--domain", "corp.example"}).Find("directory.domain", "good").found, "is \"CORP\", by the table");
     EXPECT_EQ(OnlyFinding({"--domain", "elsewhere.example"}).id, "directory.domain");
 }
 
-/// What a program can see that does not run as root.
-class RightsOfAUser : public Files {
+/// Findings for programs that do not run as root.
+class RightsOfUser : public FileCheck {
   protected:
     void SetUp() override {
         const std::string probe = "/tmp/probe";
@@ -182,12 +182,12 @@ class RightsOfAUser : public Files {
     }
 };
 
-TEST_F(RightsOfAUser, FileOfAnotherOwnerIsAFinding) {
+TEST_F(RightsOfUser, ReportsFileOfOtherOwner) {
     ASSERT_EQ(chown(kAzureFile, kNobody, kNobody), 0);
     EXPECT_THAT(OnlyFinding().found, HasSubstr("can change it"));
 }
 
-TEST_F(RightsOfAUser, ProfileForRootAloneIsAFinding) {
+TEST_F(RightsOfUser, ReportsUnreadableProfile) {
     EXPECT_THAT(Ask({}).Findings(), IsEmpty());
     const Check finding = OnlyFinding({"--user", "nobody"});
     EXPECT_EQ(finding.id, "profile.file");
@@ -195,7 +195,7 @@ TEST_F(RightsOfAUser, ProfileForRootAloneIsAFinding) {
     EXPECT_EQ(finding.library, "read profile file failed.");
 }
 
-TEST_F(RightsOfAUser, ClientsFileForRootAloneIsAFinding) {
+TEST_F(RightsOfUser, ReportsUnreadableClientFile) {
     ASSERT_EQ(chmod(kProfileFile, 0644), 0);
     const Report report = Ask({"--user", "nobody"});
     EXPECT_EQ(report.FirstFinding().id, "client.ids");

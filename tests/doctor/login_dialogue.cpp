@@ -11,7 +11,7 @@ namespace Test {
 
 namespace {
 
-constexpr std::size_t kMarkWidth = 7;      // with the blank behind it
+constexpr std::size_t kMarkWidth = 7;      // including the following blank
 constexpr std::size_t kSubjectWidth = 30;  // and two blanks
 
 std::string After(const std::string &text, const std::string &begin, const std::string &end) {
@@ -23,7 +23,7 @@ std::string After(const std::string &text, const std::string &begin, const std::
     return text.substr(from, text.find(end, from) - from);
 }
 
-/// The name that a report for machines has for it; empty where the line is none of a check.
+/// The mark in JSON. Empty if the line is not a check.
 std::string MarkOf(const std::string &line) {
     const std::string mark = line.substr(0, kMarkWidth);
     return mark == "[FAIL] " ? "finding" : mark == "[note] " ? "note" : mark == "[ ok ] " ? "good" : "";

@@ -5,23 +5,23 @@
 
 #include "tests/doctor/doctor_process.h"
 
-// `tavosso-doctor login`, and the person at the terminal with a browser.
+// `tavosso-doctor login` with a simulated user.
 namespace Test {
 
 constexpr char kEndOfPrompt[] = "It is not shown.\n";
 
 class LoginDialogue {
   public:
-    /// Reads the address that the browser is to open.
+    /// Reads the address for the browser.
     explicit LoginDialogue(const Strings &arguments = {"login"});
 
-    /// A parameter of that address, in percent-encoding.
+    /// Returns a parameter of that address, percent-encoded.
     std::string Parameter(const std::string &name) const;
 
-    /// Where a provider sends the browser to that knows the user.
+    /// The return address for a known user.
     std::string ReturnAddress(const std::string &code) const;
 
-    /// Pastes the address. The checks of the report have subjects, and no ids.
+    /// Pastes the address. The report's checks have subjects but no ids.
     Report Paste(const std::string &address);
 
   private:
@@ -29,7 +29,7 @@ class LoginDialogue {
     std::string address_;
 };
 
-/// A login whose user the provider knows.
+/// Runs a login of a known user.
 Report WalkLogin();
 
 }  // namespace Test

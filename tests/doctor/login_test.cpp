@@ -8,7 +8,7 @@
 #include "tests/doctor/login_dialogue.h"
 #include "tests/support/files.h"
 
-// `tavosso-doctor login`, with a person who signs in at the provider.
+// `tavosso-doctor login` with a user who signs in at the provider.
 namespace Test {
 
 namespace {
@@ -19,9 +19,9 @@ using ::testing::IsEmpty;
 using ::testing::Not;
 using ::testing::StartsWith;
 
-class LoginOf : public ::testing::TestWithParam<Profile> {
+class LoginWalk : public ::testing::TestWithParam<Profile> {
   protected:
-    /// As a provider does: the token tells of which login it is.
+    /// Puts the login's nonce into the token, like a provider.
     void SignIn(const LoginDialogue &dialogue) {
         appliance.GiveToken("{}", "{\"nonce\": \"" + dialogue.Parameter("nonce") + "\"}");
     }
@@ -31,10 +31,10 @@ class LoginOf : public ::testing::TestWithParam<Profile> {
     Appliance appliance{GetParam()};
 };
 
-INSTANTIATE_TEST_SUITE_P(Doctor, LoginOf, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
+INSTANTIATE_TEST_SUITE_P(Doctor, LoginWalk, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
                          [](const auto &profile) { return Name(profile.param); });
 
-TEST_P(LoginOf, AKnownUserHasNoFindings) {
+TEST_P(LoginWalk, HasNoFindingsForKnownUser) {
     LoginDialogue dialogue;
     SignIn(dialogue);
     const Report report = dialogue.Paste(dialogue.ReturnAddress(kCode));
@@ -43,20 +43,20 @@ TEST_P(LoginOf, AKnownUserHasNoFindings) {
     EXPECT_EQ(report.checks.back().subject, "nonce");
 }
 
-TEST_P(LoginOf, AnotherLoginsTokenIsAFinding) {
+TEST_P(LoginWalk, ReportsTokenOfOtherLogin) {
     const Report report = WalkLogin();
     EXPECT_EQ(report.FirstFinding().subject, "nonce");
     EXPECT_EQ(report.status, 1);
 }
 
-TEST_P(LoginOf, AnotherLoginsStateIsAFindingAndTheCodeIsNotSent) {
+TEST_P(LoginWalk, SendsNoCodeForForeignState) {
     LoginDialogue dialogue;
     const Report report = dialogue.Paste(std::string(kReturnURI) + "?code=c&state=c3RhdGU%3D");
     EXPECT_EQ(report.FirstFinding().subject, "state");
     ExpectNoTokenRequest();
 }
 
-TEST_P(LoginOf, ARefusedUserIsAFindingInTheProvidersWords) {
+TEST_P(LoginWalk, ReportsProviderErrorVerbatim) {
     LoginDialogue dialogue;
     const Report report =
         dialogue.Paste(std::string(kReturnURI) + "?error=access_denied&error_description=not+today&state=s");
@@ -64,7 +64,7 @@ TEST_P(LoginOf, ARefusedUserIsAFindingInTheProvidersWords) {
     EXPECT_EQ(report.status, 1);
 }
 
-TEST_P(LoginOf, AnAddressWithoutACodeIsAFinding) {
+TEST_P(LoginWalk, ReportsAddressWithoutCode) {
     for (const char *query : {"", "?", "?state=s", "?code=", "?code=a&code=b"}) {
         LoginDialogue dialogue;
         EXPECT_THAT(dialogue.Paste(kReturnURI + std::string(query)).FirstFinding().found,
@@ -76,26 +76,26 @@ TEST_P(LoginOf, AnAddressWithoutACodeIsAFinding) {
     ExpectNoTokenRequest();
 }
 
-TEST_P(LoginOf, ACodeThatIsRefusedIsAFinding) {
+TEST_P(LoginWalk, ReportsRejectedCode) {
     LoginDialogue dialogue;
     const Report report = dialogue.Paste(dialogue.ReturnAddress("a code that was used"));
     EXPECT_EQ(report.FirstFinding().subject, "exchange of the code");
     EXPECT_EQ(report.FirstFinding().found, "The provider refused: invalid_grant");
 }
 
-TEST_P(LoginOf, AnAnswerWithoutATokenIsAFinding) {
+TEST_P(LoginWalk, ReportsResponseWithoutToken) {
     appliance.AnswerAt("/token_endpoint", R"({"access_token": "without OpenID Connect"})");
     EXPECT_THAT(WalkLogin().FirstFinding().found, HasSubstr("no \"id_token\""));
 }
 
-TEST_P(LoginOf, ATokenThatCannotBeVerifiedStopsWhereTheLibraryStops) {
+TEST_P(LoginWalk, StopsAtFailedTokenCheck) {
     appliance.GiveToken("{}", R"({"aud": "another client"})");
     const Check finding = WalkLogin().FirstFinding();
     EXPECT_THAT(finding.subject, HasSubstr("\"aud\""));
     EXPECT_EQ(finding.library, "client ID invalid");
 }
 
-TEST_P(LoginOf, AnotherRedirectURIIsSentToTheProvider) {
+TEST_P(LoginWalk, SendsGivenRedirectURI) {
     LoginDialogue dialogue({"login", "--redirect-uri", "https://other.example/back"});
     EXPECT_EQ(dialogue.Parameter("redirect_uri"), TAVO::SSO::URLEncode("https://other.example/back"));
     SignIn(dialogue);
@@ -103,7 +103,7 @@ TEST_P(LoginOf, AnotherRedirectURIIsSentToTheProvider) {
     EXPECT_THAT(appliance.Requests()[0], HasSubstr(TAVO::SSO::URLEncode("https://other.example/back")));
 }
 
-TEST_P(LoginOf, NobodyIsGivenUpWithoutAnAddress) {
+TEST_P(LoginWalk, StopsWithoutAddress) {
     for (const std::string input : {"", "\n", " \n"}) {
         const DoctorRun run = RunDoctor({"login"}, input);
         EXPECT_EQ(run.status, 2);
@@ -111,13 +111,13 @@ TEST_P(LoginOf, NobodyIsGivenUpWithoutAnAddress) {
     }
 }
 
-TEST_P(LoginOf, AMachineIsRefused) {
+TEST_P(LoginWalk, RejectsJSONOutput) {
     const DoctorRun run = RunDoctor({"login", "--json"});
     EXPECT_EQ(run.status, 2);
     EXPECT_THAT(run.errors, HasSubstr("login is a dialogue"));
 }
 
-TEST(Login, NeedsAProfile) {
+TEST(Login, RequiresProfile) {
     RemoveFiles();
     const DoctorRun run = RunDoctor({"login"});
     EXPECT_EQ(run.status, 2);

@@ -9,7 +9,7 @@
 #include "tests/support/server.h"
 #include "tests/support/token.h"
 
-// What is wrong with a provider, and what is told of it.
+// Errors of a provider and the findings for them.
 namespace Test {
 
 namespace {
@@ -41,7 +41,7 @@ Credentials CertificateUntil(std::time_t time) {
     return Certify(text, &Authority());
 }
 
-/// A key set of these.
+/// A key set with these keys.
 std::string KeysOf(std::initializer_list<Json::Value> keys) {
     Json::Value keySet;
     for (const Json::Value &key : keys) {
@@ -52,14 +52,14 @@ std::string KeysOf(std::initializer_list<Json::Value> keys) {
 
 Json::Value GoodKey() { return ProviderKey().JWK(kKeyID); }
 
-TEST(ProvidersCertificate, ThatSoonExpiresIsAFinding) {
+TEST(ProviderCertificate, ReportsCertificateThatExpiresSoon) {
     const Appliance appliance(Profile::kAzure, CertificateUntil(std::time(nullptr) + 5 * kDay + kHour));
     const Report report = Ask({});
     EXPECT_THAT(report.Findings(), ElementsAre("discovery.certificate")) << "once per certificate";
     EXPECT_THAT(report.FirstFinding().found, HasSubstr(", 5 days left"));
 }
 
-TEST(ProvidersCertificate, OfAnAuthorityThatSoonExpiresIsAFinding) {
+TEST(ProviderCertificate, ReportsAuthorityThatExpiresSoon) {
     CertificateText text = AuthorityText("Intermediate authority");
     text.notAfter = TimeText("%Y%m%d%H%M%SZ", std::time(nullptr) + 3 * kDay + kHour);
     const Credentials intermediate = Certify(text, &Authority());
@@ -71,7 +71,7 @@ TEST(ProvidersCertificate, OfAnAuthorityThatSoonExpiresIsAFinding) {
     EXPECT_THAT(OnlyFinding().found, AllOf(HasSubstr("Intermediate authority"), HasSubstr(", 3 days left")));
 }
 
-TEST(ProvidersCertificate, WithoutAnEndDateIsGood) {
+TEST(ProviderCertificate, AcceptsMissingEndDate) {
     CertificateText text;
     text.alternativeName = kHost;
     text.notAfter = "99991231235959Z";  // RFC 5280, section 4.1.2.5
@@ -79,18 +79,18 @@ TEST(ProvidersCertificate, WithoutAnEndDateIsGood) {
     EXPECT_THAT(Ask({}).Findings(), IsEmpty());
 }
 
-TEST(ProvidersCertificate, ThatHasExpiredIsAFinding) {
+TEST(ProviderCertificate, ReportsExpiredCertificate) {
     const Appliance appliance(Profile::kAzure, ExpiredCertificateFor(kHost));
     EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").found, HasSubstr("it expired on 2"));
 }
 
-TEST(ProvidersCertificate, ForAnotherHostIsToldWithTheHost) {
+TEST(ProviderCertificate, ReportsHostsOfCertificate) {
     const Appliance appliance(Profile::kAzure, CertificateFor("DNS:localhost"));
     EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").found,
                 HasSubstr("the host name \"127.0.0.1\" is not among its names: DNS:localhost"));
 }
 
-TEST(ProvidersCertificate, ThatIsRefusedGetsNoSecret) {
+TEST(ProviderCertificate, SendsNoSecretIfRejected) {
     for (const Credentials &credentials : {SelfSignedCertificateFor(kHost), ExpiredCertificateFor(kHost)}) {
         for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
             const Appliance appliance(profile, credentials);
@@ -102,7 +102,7 @@ TEST(ProvidersCertificate, ThatIsRefusedGetsNoSecret) {
     }
 }
 
-class AProvider : public ::testing::Test {
+class ProviderCheck : public ::testing::Test {
   protected:
     void TellTime(std::time_t time) {
         std::string answer = HTTPAnswer(KeySet());
@@ -113,24 +113,24 @@ class AProvider : public ::testing::Test {
     Appliance appliance{Profile::kAzure};
 };
 
-TEST_F(AProvider, ClockThatIsBehindIsAFinding) {
+TEST_F(ProviderCheck, ReportsSlowClock) {
     TellTime(std::time(nullptr) - kHour);
     const Check finding = OnlyFinding();
     EXPECT_EQ(finding.id, "clock");
     EXPECT_THAT(finding.found, HasSubstr(" s ahead of the provider's"));
 }
 
-TEST_F(AProvider, ClockThatIsAheadIsAFinding) {
+TEST_F(ProviderCheck, ReportsFastClock) {
     TellTime(std::time(nullptr) + kHour);
     EXPECT_THAT(OnlyFinding().found, HasSubstr(" s behind the provider's"));
 }
 
-TEST_F(AProvider, ClockThatIsTheSameIsGood) {
+TEST_F(ProviderCheck, AcceptsEqualClock) {
     TellTime(std::time(nullptr));
     EXPECT_EQ(Ask({}).Find("clock", "good").id, "clock");
 }
 
-TEST_F(AProvider, ClockIsReadInAnyCaseOfTheHeader) {
+TEST_F(ProviderCheck, ReadsDateHeaderInAnyCase) {
     for (const char *name : {"Date", "date", "DATE"}) {
         std::string answer = HTTPAnswer(KeySet());
         answer.insert(answer.find("\r\n"), "\r\n" + std::string(name) + ": " +
@@ -140,7 +140,7 @@ TEST_F(AProvider, ClockIsReadInAnyCaseOfTheHeader) {
     }
 }
 
-TEST_F(AProvider, AddressInCapitalsIsAsked) {
+TEST_F(ProviderCheck, RequestsAddressInCapitals) {
     std::string url = appliance.URL("/discovery");
     appliance.SetClient("wellknown", "HTTPS" + url.substr(5));
     EXPECT_EQ(Ask({}).Find("discovery.reachable", "good").id, "discovery.reachable");
@@ -148,7 +148,7 @@ TEST_F(AProvider, AddressInCapitalsIsAsked) {
     EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").id, "token_endpoint.client");
 }
 
-TEST_F(AProvider, EndpointThatIsNotTheConfiguredOneIsAFinding) {
+TEST_F(ProviderCheck, ReportsEndpointThatDiffersFromDiscovery) {
     for (const std::string endpoint : {"authorization_endpoint", "token_endpoint"}) {
         Appliance other(Profile::kAzure);
         other.ChangeDiscovery(R"({")" + endpoint + R"(": "https://login.example/other"})");
@@ -159,24 +159,24 @@ TEST_F(AProvider, EndpointThatIsNotTheConfiguredOneIsAFinding) {
     }
 }
 
-TEST_F(AProvider, LogoutThatIsNotTheConfiguredOneIsNotedForItMayBeAPageOfItsOwn) {
+TEST_F(ProviderCheck, NotesOtherLogoutEndpoint) {
     appliance.ChangeDiscovery(R"({"end_session_endpoint": "https://login.example/other"})");
     const Report report = Ask({});
     EXPECT_THAT(report.Findings(), IsEmpty());
     EXPECT_THAT(report.Find("discovery.end_session_endpoint", "note").found, HasSubstr("https://login.example/other"));
 }
 
-TEST_F(AProvider, AlgorithmsThatAreNotOfferedAreAFinding) {
+TEST_F(ProviderCheck, ReportsMissingAlgorithms) {
     appliance.ChangeDiscovery(R"({"id_token_signing_alg_values_supported": ["ES256", "PS256"]})");
     EXPECT_EQ(OnlyFinding().id, "discovery.algorithms");
 }
 
-TEST_F(AProvider, ClientAuthenticationThatIsNotOfferedIsAFinding) {
+TEST_F(ProviderCheck, ReportsMissingClientAuthentication) {
     appliance.ChangeDiscovery(R"({"token_endpoint_auth_methods_supported": ["client_secret_basic"]})");
     EXPECT_EQ(OnlyFinding().id, "discovery.client_authentication");
 }
 
-TEST_F(AProvider, KeysThatCannotBeUsedAreNotedBesideOneThatCan) {
+TEST_F(ProviderCheck, NotesUnusableKeysBesideUsableOne) {
     Json::Value withoutN = ProviderKey().JWK("third key");
     withoutN.removeMember("n");
     const Json::Value ofACurve = Parse(R"({"kty": "EC", "kid": "second key", "crv": "P-256", "x": "AQ", "y": "AQ"})");
@@ -187,7 +187,7 @@ TEST_F(AProvider, KeysThatCannotBeUsedAreNotedBesideOneThatCan) {
     EXPECT_EQ(report.Find("keys.set", "good").found, "1 of 4 keys are usable");
 }
 
-TEST_F(AProvider, WeakKeyIsAFinding) {
+TEST_F(ProviderCheck, ReportsWeakKey) {
     const RSAKey weak(1024);
     appliance.AnswerAt("/keys", KeysOf({GoodKey(), weak.JWK("weak key")}));
     const Check finding = OnlyFinding();
@@ -195,26 +195,26 @@ TEST_F(AProvider, WeakKeyIsAFinding) {
     EXPECT_THAT(finding.found, AllOf(HasSubstr("\"weak key\""), HasSubstr("1024 bits")));
 }
 
-TEST_F(AProvider, SecondKeyOfTheSameNameIsNoted) {
+TEST_F(ProviderCheck, NotesDuplicateKeyID) {
     appliance.AnswerAt("/keys", KeysOf({GoodKey(), GoodKey()}));
     const Report report = Ask({});
     EXPECT_THAT(report.Findings(), IsEmpty());
     EXPECT_THAT(report.Find("keys.duplicate", "note").found, HasSubstr("the library uses the first key"));
 }
 
-TEST_F(AProvider, CodeThatIsRefusedIsTheAnswerToAGoodClient) {
+TEST_F(ProviderCheck, ExpectsInvalidGrantForValidClient) {
     EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").library, "");
     EXPECT_THAT(appliance.Requests(), Contains(HasSubstr("code=tavosso-doctor-made-this-up")));
 }
 
-TEST_F(AProvider, FirstRequestOfALoginThatIsRefusedIsAFinding) {
+TEST_F(ProviderCheck, ReportsRejectedAuthorizationRequest) {
     appliance.AnswerAt("/authorization_endpoint", "redirect_uri did not match", "400 Bad Request");
     const Check finding = OnlyFinding();
     EXPECT_EQ(finding.id, "authorization_endpoint.request");
     EXPECT_THAT(finding.found, HasSubstr("HTTP 400"));
 }
 
-TEST_F(AProvider, FirstRequestOfALoginThatIsSentBackWithAnErrorIsAFinding) {
+TEST_F(ProviderCheck, ReportsAuthorizationRequestReturnedWithError) {
     appliance.AnswerAt("/authorization_endpoint", [](const std::string & /*request*/) {
         return "HTTP/1.1 302 Found\r\nLocation: " + std::string(kReturnURI) +
                "?error=unauthorized_client\r\nContent-Length: 0\r\n\r\n";
@@ -224,7 +224,7 @@ TEST_F(AProvider, FirstRequestOfALoginThatIsSentBackWithAnErrorIsAFinding) {
     EXPECT_THAT(finding.found, HasSubstr("\"unauthorized_client\""));
 }
 
-TEST_F(AProvider, ClientThatIsRefusedIsAFinding) {
+TEST_F(ProviderCheck, ReportsRejectedClient) {
     for (const char *error : {"invalid_client", "unauthorized_client"}) {
         appliance.RefuseCodes(error);
         const Check finding = OnlyFinding();
@@ -233,19 +233,19 @@ TEST_F(AProvider, ClientThatIsRefusedIsAFinding) {
     }
 }
 
-TEST_F(AProvider, RequestThatIsRefusedIsNotedForItMayBeTheMadeUpCode) {
+TEST_F(ProviderCheck, NotesRejectedTestCode) {
     appliance.RefuseCodes("invalid_request");
     EXPECT_NE(Ask({}).Find("token_endpoint.client", "note").remedy, "");
 }
 
-TEST_F(AProvider, AnyOtherErrorIsAFindingInTheProvidersWords) {
+TEST_F(ProviderCheck, ReportsOtherErrorsVerbatim) {
     appliance.RefuseCodes("temporarily_unavailable", "we are moving");
     const Check finding = OnlyFinding();
     EXPECT_EQ(finding.found, "The provider refused: temporarily_unavailable (we are moving)");
     EXPECT_EQ(finding.library, finding.found);
 }
 
-TEST_F(AProvider, ThatHangsIsAFindingAfterTheTimeOut) {
+TEST_F(ProviderCheck, ReportsHangingProviderAfterTimeout) {
     Server hanging(CertificateFor(kHost));
     const auto hang = [](Connection &connection) {
         connection.ReceiveRequest();

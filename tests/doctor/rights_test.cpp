@@ -32,7 +32,7 @@ class Rights : public ::testing::Test {
     Appliance appliance{Profile::kAzure};
 };
 
-TEST_F(Rights, FolderThatOthersCanWriteIsAFinding) {
+TEST_F(Rights, ReportsFolderWritableByOthers) {
     ASSERT_EQ(chmod("/usr/tavo/etc", 0777), 0);
     const Check finding = Ask({}).FirstFinding();
     EXPECT_EQ(finding.id, "profile.rights");
@@ -40,16 +40,16 @@ TEST_F(Rights, FolderThatOthersCanWriteIsAFinding) {
     EXPECT_THAT(finding.remedy, HasSubstr("chmod go-w /usr/tavo/etc"));
 }
 
-TEST_F(Rights, TableThatOthersCanWriteIsAFinding) {
+TEST_F(Rights, ReportsDomainTableWritableByOthers) {
     ASSERT_EQ(chmod(kDomainTable, 0666), 0);
     EXPECT_EQ(OnlyFinding().id, "directory.rights");
 }
 
-TEST_F(Rights, MissingFolderOfTheFrontEndIsNoted) {
+TEST_F(Rights, NotesMissingFrontEndFolder) {
     EXPECT_THAT(Ask({}).Find("frontend.folder", "note").remedy, HasSubstr("install -d -m 0755 /usr/tavo/var"));
 }
 
-TEST_F(Rights, FoldersOfTheFrontEndMustBePrivate) {
+TEST_F(Rights, RequiresPrivateFrontEndFolders) {
     std::filesystem::create_directories(std::string(kVar) + "/frontend/logins");
     ASSERT_EQ(chmod("/usr/tavo/var/frontend", 0700), 0);
     ASSERT_EQ(chmod("/usr/tavo/var/frontend/logins", 0700), 0);

@@ -11,8 +11,8 @@
 #include "tests/support/files.h"
 #include "tests/support/token.h"
 
-// Whatever a provider answers and a file holds: the doctor ends by itself, and its output neither gives a secret away
-// nor does anything to a terminal. `RunDoctor` looks at the output of every run.
+// For any response of a provider and any file content, the doctor terminates, prints no secret and controls no
+// terminal. `RunDoctor` verifies the output of each run.
 namespace Test {
 
 namespace {
@@ -40,9 +40,9 @@ class Output : public ::testing::TestWithParam<Profile> {
 INSTANTIATE_TEST_SUITE_P(Doctor, Output, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
                          [](const auto &profile) { return Name(profile.param); });
 
-TEST_P(Output, HoldsNoSecretWhereTheProviderSendsTheRequestBack) {
+TEST_P(Output, HidesSecretInEchoedRequest) {
     for (const bool isDecoded : {false, true}) {
-        // Wherever a text is cut: what is left of a secret is not for printing either.
+        // A cut secret must not be printed either.
         for (std::size_t before = 0; before <= 200; before += 8) {
             appliance.AnswerAt("/token_endpoint", [=](const std::string &request) {
                 const std::string form = isDecoded ? PercentDecode(FormOf(request)) : FormOf(request);
@@ -53,14 +53,14 @@ TEST_P(Output, HoldsNoSecretWhereTheProviderSendsTheRequestBack) {
     }
 }
 
-TEST_P(Output, HoldsNoSecretWhereTheProviderMakesItsErrorOfIt) {
+TEST_P(Output, HidesSecretInProviderError) {
     for (const char *path : {"/token_endpoint", "/discovery", "/keys"}) {
         appliance.AnswerAt(path, Compact(ErrorAnswer(kClientSecret, kClientSecret)));
     }
     EXPECT_EQ(Ask({}).Find("token_endpoint.client", "finding").found, "The provider refused: [hidden] ([hidden])");
 }
 
-TEST_P(Output, HoldsNoSecretThatStandsInThePlaceOfAnotherValue) {
+TEST_P(Output, HidesSecretInOtherKey) {
     for (const char *key : {"client_id", "wellknown", "token_endpoint", "authorization_endpoint", "redirect_uri"}) {
         SCOPED_TRACE(key);
         Appliance other(GetParam());
@@ -80,14 +80,14 @@ TEST_P(Output, HidesTheShortestSecret) {
     }
 }
 
-TEST_P(Output, HidesBeforeItCuts) {
+TEST_P(Output, HidesSecretsBeforeCutting) {
     for (std::size_t before = 940; before < 1000; before += 3) {
         appliance.RefuseCodes("invalid_client", std::string(before, '.') + kClientSecret);
         EXPECT_NE(AskMachine({}).Find("token_endpoint.client", "finding").id, "");
     }
 }
 
-TEST_P(Output, HoldsNoSignatureAlone) {
+TEST_P(Output, HidesLoneSignature) {
     const std::string token = appliance.Token();
     const std::string signature = token.substr(token.rfind('.') + 1);
     KeepSecret(signature);
@@ -95,7 +95,7 @@ TEST_P(Output, HoldsNoSignatureAlone) {
     EXPECT_THAT(Ask({"token", "-"}, token).Find("token.audience", "finding").found, HasSubstr("[hidden]"));
 }
 
-TEST_P(Output, HoldsNoInvisibleCharacter) {
+TEST_P(Output, RemovesInvisibleCharacters) {
     // Both ends of each range of invisible and bidirectional characters, and their printable neighbours.
     const std::string invisible[] = {"\u00ad", "\u061c", "\u180e",     "\u200b",    "\u200f", "\u2028",
                                      "\u2029", "\u202a", "\u202e",     "\u2060",    "\u206f", "\ufeff",
@@ -118,7 +118,7 @@ TEST_P(Output, HoldsNoInvisibleCharacter) {
     }
 }
 
-TEST_P(Output, HoldsNoCodeThatIsSentBack) {
+TEST_P(Output, HidesCodeInResponse) {
     appliance.AnswerAt("/token_endpoint", [](const std::string &request) {
         const std::string form = PercentDecode(FormOf(request));
         return HTTPAnswer(Compact(ErrorAnswer("invalid_grant", std::string(100, '.') + form)));
@@ -133,13 +133,13 @@ TEST_P(Output, HoldsNoCodeThatIsSentBack) {
               "answer of the provider");
 }
 
-TEST_P(Output, HoldsNoTokenThatStandsInTheFile) {
+TEST_P(Output, HidesTokenInConfiguration) {
     appliance.SetClient("client_id", appliance.Token());
     EXPECT_THAT(Ask({"token", "-"}, appliance.Token()).Find("token.audience", "finding").found,
                 HasSubstr("client_id is \"[hidden]\""));
 }
 
-TEST_P(Output, HoldsNoControlCharacterOfAProvider) {
+TEST_P(Output, RemovesControlCharactersOfProviders) {
     for (const char *member : {"issuer", "jwks_uri", "authorization_endpoint", "token_endpoint", "end_session_endpoint",
                                "id_token_signing_alg_values_supported", "token_endpoint_auth_methods_supported"}) {
         Appliance other(GetParam());
@@ -161,12 +161,12 @@ TEST_P(Output, HoldsNoControlCharacterOfAProvider) {
     EXPECT_EQ(Ask({}).status, 1);
 }
 
-TEST_P(Output, HoldsNoControlCharacterOfAFile) {
+TEST_P(Output, RemovesControlCharactersOfFiles) {
     for (const char *key : {"client_id", "tenant_id", "wellknown", "token_endpoint", "authorization_endpoint",
                             "redirect_uri", "client_secret", kNasty}) {
         Appliance other(GetParam());
         other.SetClient(key, kNasty);
-        EXPECT_NE(Ask({}).status, 2) << key;  // a key of no meaning is no finding
+        EXPECT_NE(Ask({}).status, 2) << key;  // an unusable key is not an error of the command
         EXPECT_EQ(RunDoctor({"login"}).status, 2) << key;
     }
     WriteFile(kProfileFile, "{\"sso_enable\": true, " + NastyJSON() + ": 1, \"sso_profile\": " + NastyJSON() + "}");
@@ -175,7 +175,7 @@ TEST_P(Output, HoldsNoControlCharacterOfAFile) {
     EXPECT_EQ(Ask({}).status, 1);
 }
 
-TEST_P(Output, HoldsNoControlCharacterOfAToken) {
+TEST_P(Output, RemovesControlCharactersOfTokens) {
     for (const char *member : {"aud", "tid", "sub", "unique_name", "exp"}) {
         appliance.GiveToken("{}", "{\"" + std::string(member) + "\": " + NastyJSON() + "}");
         EXPECT_NE(Ask({"token", "-", "--fetch"}, appliance.Token()).status, 2) << member;
@@ -186,12 +186,12 @@ TEST_P(Output, HoldsNoControlCharacterOfAToken) {
     }
 }
 
-TEST_P(Output, HoldsNoControlCharacterOfAReturn) {
+TEST_P(Output, RemovesControlCharactersOfReturnAddress) {
     LoginDialogue dialogue;
     EXPECT_EQ(dialogue.Paste(std::string(kReturnURI) + "?error=%1b%5b2J&error_description=%07%c2%9b31m").status, 1);
 }
 
-TEST_P(Output, IsThereWhateverTheProviderAnswers) {
+TEST_P(Output, IsCompleteForAnyResponse) {
     constexpr char kZeros[] = "{\"error\": \"a\0b\", \"issuer\": \"\\u0000\"}\0";
     const std::string answers[] = {
         "",
@@ -218,7 +218,7 @@ TEST_P(Output, IsThereWhateverTheProviderAnswers) {
     }
 }
 
-TEST_P(Output, IsThereWhateverTheKeysAre) {
+TEST_P(Output, IsCompleteForAnyKeySet) {
     for (const char *changes :
          {R"({"n": "AQ"})", R"({"n": "AAAA", "e": "AA"})", R"({"n": 7, "e": []})", R"({"kid": []})", R"({"kid": 7})",
           R"({"n": "%%%%"})", R"({"e": ""})", R"({"kty": {}, "alg": 1})"}) {

@@ -8,7 +8,7 @@
 #include "tests/doctor/doctor_process.h"
 #include "tests/doctor/login_dialogue.h"
 
-// What depends on the terminal, on a real one.
+// Behaviour that depends on the terminal, on a real one.
 namespace Test {
 
 namespace {
@@ -32,14 +32,12 @@ std::string OutputOn(Dialogue::Over over, const Strings &arguments, const String
 
 TEST_F(Terminal, ShowsColours) { EXPECT_THAT(OutputOn(kTerminal, {}), HasSubstr(kGreen)); }
 
-TEST_F(Terminal, ShowsNoColoursUnderNO_COLOR) {
+TEST_F(Terminal, HasNoColoursWithNoColorVariable) {
     EXPECT_THAT(OutputOn(kTerminal, {}, {"NO_COLOR=1"}), Not(HasSubstr("\033[32m")));
     EXPECT_THAT(OutputOn(kTerminal, {}, {"NO_COLOR="}), HasSubstr(kGreen)) << "an empty one counts as none";
 }
 
-TEST_F(Terminal, ShowsNoColoursOnADumbTerminal) {
-    EXPECT_THAT(OutputOn(kTerminal, {}, {"TERM=dumb"}), Not(HasSubstr("\033")));
-}
+TEST_F(Terminal, HasNoColoursIfDumb) { EXPECT_THAT(OutputOn(kTerminal, {}, {"TERM=dumb"}), Not(HasSubstr("\033"))); }
 
 TEST_F(Terminal, WrapsLinesAtItsWidth) {
     appliance.SetClient("redirect_uri", "https://nas.example.com/");
@@ -48,13 +46,11 @@ TEST_F(Terminal, WrapsLinesAtItsWidth) {
                                   "         not the address of the return program: its path is \"/\"\r\n"));
 }
 
-TEST_F(Terminal, ShowsJSONAsItIs) { EXPECT_THAT(OutputOn(kTerminal, {"--json"}), Not(HasSubstr("\033"))); }
+TEST_F(Terminal, PrintsJSONUnchanged) { EXPECT_THAT(OutputOn(kTerminal, {"--json"}), Not(HasSubstr("\033"))); }
 
-TEST_F(Terminal, ElsewhereThereAreNoColours) {
-    EXPECT_THAT(OutputOn(Dialogue::Over::kPipes, {}), Not(HasSubstr("\033")));
-}
+TEST_F(Terminal, IsRequiredForColours) { EXPECT_THAT(OutputOn(Dialogue::Over::kPipes, {}), Not(HasSubstr("\033"))); }
 
-TEST_F(Terminal, DoesNotShowTheAddressThatIsPasted) {
+TEST_F(Terminal, HidesPastedAddress) {
     Dialogue dialogue(kTerminal, {"login"});
     const unsigned int before = dialogue.FirstLocalModes();
     ASSERT_EQ(before & kShowsInput, kShowsInput);
@@ -66,14 +62,14 @@ TEST_F(Terminal, DoesNotShowTheAddressThatIsPasted) {
     EXPECT_EQ(dialogue.Finish().status, 1);
 }
 
-TEST_F(Terminal, TakesAnAddressOf6000Bytes) {
+TEST_F(Terminal, AcceptsAddressOf6000Bytes) {
     Dialogue dialogue(kTerminal, {"login"});
     dialogue.ReadUntil("It is not shown.");
     dialogue.Write(kReturnURI + ("?code=" + std::string(6000, 'c')) + "&error=seen_to_the_end\n");
     EXPECT_THAT(dialogue.Finish().output, HasSubstr("seen_to_the_end"));
 }
 
-TEST_F(Terminal, IsAsItWasAfterALoginThatIsGivenUp) {
+TEST_F(Terminal, IsRestoredAfterAbortedLogin) {
     Dialogue dialogue(kTerminal, {"login"});
     const unsigned int before = dialogue.FirstLocalModes();
     dialogue.ReadUntil("It is not shown.");
@@ -82,7 +78,7 @@ TEST_F(Terminal, IsAsItWasAfterALoginThatIsGivenUp) {
     EXPECT_EQ(dialogue.LocalModes(), before);
 }
 
-TEST_F(Terminal, IsAsItWasAfterASignal) {
+TEST_F(Terminal, IsRestoredAfterSignal) {
     for (const int signal : {SIGHUP, SIGQUIT, SIGTERM}) {
         Dialogue dialogue(kTerminal, {"login"});
         const unsigned int before = dialogue.FirstLocalModes();
@@ -93,7 +89,7 @@ TEST_F(Terminal, IsAsItWasAfterASignal) {
     }
 }
 
-TEST_F(Terminal, KeepsInputThatArrivesBeforeThePrompt) {
+TEST_F(Terminal, KeepsInputBeforePrompt) {
     Dialogue dialogue(kTerminal, {"login"}, {}, {0, kReturnURI + std::string("?error=typed_early\n")});
     dialogue.ReadUntil("It is not shown.");
     dialogue.Write("\n");  // ends the dialogue if the address was lost

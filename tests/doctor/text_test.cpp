@@ -56,7 +56,7 @@ TEST_P(BrokenText, IsNamed) {
     EXPECT_EQ(finding.library, "read profile file failed.");
 }
 
-TEST(Text, RepeatedKeyIsAFinding) {
+TEST(Text, ReportsRepeatedKey) {
     const Appliance appliance(Profile::kAzure);
     WriteFile(kProfileFile, "{\"sso_enable\": true,\n\"sso_profile\": \"websphere\",\n\"sso_profile\": \"azure\"}");
     const Check finding = OnlyFinding();
@@ -64,7 +64,7 @@ TEST(Text, RepeatedKeyIsAFinding) {
     EXPECT_THAT(finding.found, HasSubstr("line 3: the key \"sso_profile\" occurs twice"));
 }
 
-TEST(Text, ByteThatIsNotUTF8IsAFinding) {
+TEST(Text, ReportsByteThatIsNotUTF8) {
     const Appliance appliance(Profile::kAzure);
     WriteFile(kProfileFile, "{\"sso_enable\": true,\n\"sso_profile\": \"azure\", \"note\": \"\xfc\"}");
     const Check finding = OnlyFinding();
@@ -72,7 +72,7 @@ TEST(Text, ByteThatIsNotUTF8IsAFinding) {
     EXPECT_THAT(finding.found, HasSubstr("line 2, column 34: a byte that is not UTF-8"));
 }
 
-TEST(Text, PastedCharacterInAValueIsAFinding) {
+TEST(Text, ReportsPastedCharacter) {
     Appliance appliance(Profile::kAzure);
     appliance.SetClient("tenant_id", std::string(kTenant) + "\xc2\xa0");
     EXPECT_THAT(Ask({}).FirstFinding().found, HasSubstr("contains a no-break space"));
@@ -90,7 +90,7 @@ TEST(Text, ReadsTableOfDomainsLikeStandIn) {
                 HasSubstr("\nalice@corp.example signs in as \"CORP\\alice\", by the table.\n"));
 }
 
-TEST(Text, EntryWithoutNameIsNotTheSource) {
+TEST(Text, IgnoresTableEntryWithoutName) {
     const Appliance appliance(Profile::kAzure);
     WriteFile(kDomainTable, "{\"corp.example\": \"CORP\", \"lab.example\": 7}");
     const Report report = Ask({"--domain", "lab.example"});

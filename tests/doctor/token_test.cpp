@@ -13,7 +13,7 @@
 #include "tests/support/failure.h"
 #include "tests/support/files.h"
 
-// `tavosso-doctor token`: the library's verdict, and what the token has at that step.
+// `tavosso-doctor token`: the library's result and the values that it compared.
 namespace Test {
 
 namespace {
@@ -38,13 +38,13 @@ std::string VerificationBy(const std::string &token) {
         .text;
 }
 
-/// What the library says of a token, empty where it takes it.
+/// The text of the library's exception for a token. Empty if it accepts the token.
 std::string Verification(Profile profile, const std::string &token) {
     return profile == Profile::kAzure ? VerificationBy<TAVO::SSO::AzureSSOClient>(token)
                                       : VerificationBy<TAVO::SSO::WebSphereSSOClient>(token);
 }
 
-/// One byte is another one, and none that the doctor would take for the end of a line.
+/// Replaces one byte by another one that is not a line break.
 class Mutations {
   public:
     explicit Mutations(unsigned int seed) : random_(seed) {}
@@ -74,7 +74,7 @@ class Token : public ::testing::TestWithParam<Profile> {
 INSTANTIATE_TEST_SUITE_P(Doctor, Token, ::testing::Values(Profile::kAzure, Profile::kWebSphere),
                          [](const auto &profile) { return Name(profile.param); });
 
-TEST_P(Token, WithAnyByteChangedStopsWhereTheLibraryDoes) {
+TEST_P(Token, StopsWhereLibraryStopsForAnyChangedByte) {
     const unsigned int seed = std::random_device()();
     std::cout << "seed " << seed << std::endl;
     Mutations mutations(seed);
@@ -83,14 +83,14 @@ TEST_P(Token, WithAnyByteChangedStopsWhereTheLibraryDoes) {
         const std::string token = mutations.Of(appliance.Token());
         const Report report = AskMachine({"token", "-", "--fetch"}, token);
         const std::string text = Verification(GetParam(), token);
-        // The algorithm's name is in one of the texts, with whatever the byte has become in it.
+        // One text contains the algorithm's name with the changed byte.
         EXPECT_TRUE(LibraryIn(report) == text || !IsPlain(text)) << text;
         EXPECT_EQ(LibraryIn(report).empty(), text.empty());
         ExpectToStopAtTheOnlyFinding(report);
     }
 }
 
-TEST_P(Token, WithoutLeaveToFetchIsReadWithoutAskingAnyone) {
+TEST_P(Token, SendsNoRequestWithoutFetch) {
     const Report report = Ask({"token", "-"}, appliance.Token());
     EXPECT_THAT(report.Findings(), IsEmpty());
     const bool needsKeys = GetParam() == Profile::kAzure;
@@ -99,7 +99,7 @@ TEST_P(Token, WithoutLeaveToFetchIsReadWithoutAskingAnyone) {
     EXPECT_EQ(appliance.Connections(), 0);
 }
 
-TEST_P(Token, OfAnUnknownKeyIsReportedWithThePublishedOnes) {
+TEST_P(Token, ReportsUnknownKeyWithPublishedKeys) {
     if (GetParam() == Profile::kAzure) {
         appliance.AnswerAt("/keys", KeySet(R"({"kid": "second key"})"));
         const Check finding = Ask({"token", "-", "--fetch"}, appliance.Token()).FirstFinding();
@@ -107,7 +107,7 @@ TEST_P(Token, OfAnUnknownKeyIsReportedWithThePublishedOnes) {
     }
 }
 
-TEST_P(Token, ThatHasExpiredStopsThereWithoutAskingAnyone) {
+TEST_P(Token, StopsAtExpiryWithoutRequests) {
     appliance.GiveToken("{}", R"({"exp": 1700000000})");
     const Report report = Ask({"token", "-"}, appliance.Token());
     EXPECT_EQ(report.json["stops_at"], "token.expiry");
@@ -115,12 +115,12 @@ TEST_P(Token, ThatHasExpiredStopsThereWithoutAskingAnyone) {
     EXPECT_EQ(appliance.Connections(), 0);
 }
 
-TEST_P(Token, IsReadFromAFileToo) {
+TEST_P(Token, IsReadFromFile) {
     WriteFile("/tmp/token", appliance.Token() + "\r\n");
     EXPECT_THAT(Ask({"token", "/tmp/token", "--fetch"}).Findings(), IsEmpty());
 }
 
-TEST_P(Token, ThatCannotBeReadEndsTheCommand) {
+TEST_P(Token, MustBeReadable) {
     const DoctorRun missing = RunDoctor({"token", "/tmp/no such file"});
     EXPECT_EQ(missing.status, 2);
     EXPECT_THAT(missing.errors, HasSubstr("/tmp/no such file cannot be read"));
@@ -131,7 +131,7 @@ TEST_P(Token, ThatCannotBeReadEndsTheCommand) {
     EXPECT_THAT(large.errors, HasSubstr("longer than 1 MiB"));
 }
 
-TEST_P(Token, CannotBeJudgedWithoutAProfile) {
+TEST_P(Token, RequiresProfile) {
     RemoveFiles();
     const DoctorRun run = RunDoctor({"token", "-"}, appliance.Token());
     EXPECT_EQ(run.status, 2);
@@ -139,14 +139,14 @@ TEST_P(Token, CannotBeJudgedWithoutAProfile) {
     EXPECT_EQ(run.output, "");
 }
 
-TEST_P(Token, WithoutAClaimIsToldToLackIt) {
+TEST_P(Token, ReportsMissingClaim) {
     appliance.GiveToken("{}", R"({"aud": null})");
     EXPECT_THAT(Ask({"token", "-", "--fetch"}, appliance.Token()).FirstFinding().found, StartsWith("missing; "));
     appliance.GiveToken("{}", R"({"unique_name": null, "sub": null})");
     EXPECT_EQ(Ask({"token", "-", "--fetch"}, appliance.Token()).FirstFinding().found, "missing");
 }
 
-TEST_P(Token, OfManyUnusualClaimsIsReadToTheEnd) {
+TEST_P(Token, AcceptsUnusualClaims) {
     for (const char *claims :
          {R"({"exp": {}})", R"({"aud": {"a": [1]}})", R"({"tid": 1.5, "sub": null})",
           R"({"unique_name": ["a@b"], "email": 7, "sub": {}})", R"({"exp": "99999999999999999999"})",
@@ -158,7 +158,7 @@ TEST_P(Token, OfManyUnusualClaimsIsReadToTheEnd) {
     }
 }
 
-TEST_P(Token, OfPartsThatAreNoObjectsIsReadToTheEnd) {
+TEST_P(Token, ReportsPartsThatAreNotObjects) {
     for (const char *token : {"W10.W10.e30", "MQ.MQ.MQ", "bnVsbA.bnVsbA.e30", "e30.e30.e30", "..", "...", "e30.e30."}) {
         const Report report = Ask({"token", "-", "--fetch"}, token);
         EXPECT_EQ(LibraryIn(report), Verification(GetParam(), token)) << token;

@@ -17,7 +17,7 @@ using ::testing::IsEmpty;
 using ::testing::Not;
 using ::testing::StartsWith;
 
-TEST(CommandLine, ThatIsWrongIsRefusedOnStandardError) {
+TEST(CommandLine, ReportsErrorsOnStandardError) {
     const Strings wrong[] = {
         {"examine"},
         {"--no-such-option"},
@@ -46,21 +46,21 @@ TEST(CommandLine, ThatIsWrongIsRefusedOnStandardError) {
     }
 }
 
-TEST(CommandLine, OptionsStandBeforeAndBehindTheCommand) {
+TEST(CommandLine, AcceptsOptionsBeforeAndAfterCommand) {
     const DoctorRun before = RunDoctor({"--json", "explain", "id_token expired."});
     const DoctorRun behind = RunDoctor({"explain", "id_token expired.", "--json"});
     EXPECT_THAT(before.output, StartsWith("{"));
     EXPECT_EQ(before.output, behind.output);
 }
 
-TEST(Summary, HasOneLineForEachHealthyGroup) {
+TEST(Summary, HasOneLinePerHealthyGroup) {
     Appliance appliance(Profile::kAzure);
     EXPECT_THAT(RunDoctor({}).output, AllOf(HasSubstr("[ ok ] Profile: "), HasSubstr("[ ok ] Client (azure): "),
                                             Not(HasSubstr("azure_token_endpoint"))));
     EXPECT_THAT(RunDoctor({"--verbose"}).output, HasSubstr("[ ok ] azure_token_endpoint"));
 }
 
-TEST(Summary, BeginsWithTheFindings) {
+TEST(Summary, BeginsWithFindings) {
     Appliance appliance(Profile::kAzure);
     appliance.SetClient("token_endpoint", "");
     for (const Strings &arguments : {Strings{}, {"--verbose"}, {"--quiet"}}) {
@@ -88,7 +88,7 @@ TEST(ProfileOption, ChecksAProfileThatIsSwitchedOff) {
     EXPECT_THAT(Ask({"token", "-", "--profile", "azure"}, appliance.Token()).Findings(), IsEmpty());
 }
 
-TEST(CommandLine, AsksForHelpAndVersion) {
+TEST(CommandLine, PrintsHelpAndVersion) {
     const DoctorRun help = RunDoctor({"--help"});
     EXPECT_EQ(help.status, 0);
     for (const char *word :

@@ -159,7 +159,7 @@ describe('An Azure login', () => {
         const logged = await site.log.until(/^return\.cgi: platform:\d+ /);
         assert.match(logged, line);
         assert.equal(await reason, NOT_CONVERTED);
-        site.asked.splice(0); // the walk expects only the requests of its own login
+        site.asked.splice(0); // the walk expects only requests of this login
     }
 
     test('uses the NetBIOS name from the directory', async () => {
