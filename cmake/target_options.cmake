@@ -6,7 +6,6 @@ option(TAVOSSO_SANITIZE "Build everything with AddressSanitizer and UndefinedBeh
 option(TAVOSSO_FUZZ "Build everything for libFuzzer, and the fuzz targets (clang only)" OFF)
 
 check_cxx_compiler_flag(-fcf-protection=full TAVOSSO_HAS_CF_PROTECTION)
-check_cxx_compiler_flag(-mbranch-protection=standard TAVOSSO_HAS_BRANCH_PROTECTION)
 check_pie_supported(LANGUAGES CXX)
 
 # Options of every target.
@@ -19,7 +18,7 @@ function(tavosso_options target)
         # Not _FORTIFY_SOURCE: it renames the library's calls, and the packager sets it.
         target_compile_options(${target} PRIVATE -fstack-protector-strong -fstack-clash-protection
             $<$<BOOL:${TAVOSSO_HAS_CF_PROTECTION}>:-fcf-protection=full>
-            $<$<BOOL:${TAVOSSO_HAS_BRANCH_PROTECTION}>:-mbranch-protection=standard>)
+            $<$<STREQUAL:${CMAKE_SYSTEM_PROCESSOR},aarch64>:-mbranch-protection=standard>)
         target_link_options(${target} PRIVATE LINKER:-z,relro LINKER:-z,now LINKER:-z,noexecstack
             $<$<BOOL:${TAVOSSO_HAS_CF_PROTECTION}>:LINKER:-z,shstk>)
     endif()

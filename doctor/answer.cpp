@@ -1,6 +1,6 @@
 #include "doctor/answer.h"
 
-#include <boost/algorithm/string/find.hpp>
+#include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/trim.hpp>
 
 #include "doctor/client.h"
@@ -14,11 +14,14 @@ namespace {
 constexpr long kServerErrors = 500;  // and above
 
 std::string TitleOf(const std::string &html) {
-    const auto begin = boost::ifind_first(html, "<title>");
-    const auto end = boost::ifind_first(html, "</title>");
-    return begin.empty() || end.empty() || end.begin() < begin.end()
-               ? ""
-               : boost::trim_copy(std::string(begin.end(), end.begin()));
+    const std::string tag = "<title>";
+    const std::string lower = boost::to_lower_copy(html);
+    const std::size_t begin = lower.find(tag);
+    const std::size_t end = lower.find("</title>", begin);
+    if (begin == std::string::npos || end == std::string::npos) {
+        return "";
+    }
+    return boost::trim_copy(html.substr(begin + tag.size(), end - begin - tag.size()));
 }
 
 }  // namespace

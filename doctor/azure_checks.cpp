@@ -39,8 +39,8 @@ std::string KeysOf(const std::vector<Endpoint> &endpoints) {
 
 /// Returns the word for several tenants in an address; empty if there is none.
 std::string SharedTenantIn(const std::string &url) {
-    for (const std::string word : {"common", "organizations", "consumers"}) {
-        if (boost::icontains(url, '/' + word + '/')) {
+    for (const char *word : {"common", "organizations", "consumers"}) {
+        if (boost::icontains(url, std::string("/") + word + '/')) {
             return word;
         }
     }

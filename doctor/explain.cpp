@@ -147,9 +147,8 @@ std::vector<Explanation> FindSentence(const std::string &text) {
     return found;
 }
 
-}  // namespace
-
-std::vector<Explanation> LookUp(const std::string &text) {
+/// Returns the failures whose text, or a result of libcurl or an error code in it, is in `text`.
+std::vector<Explanation> FindFailures(const std::string &text) {
     std::vector<Explanation> found = FindTexts(text, TAVO::Web::EndsInText);
     if (found.empty()) {
         found = FindTexts(text, TAVO::Web::EndsInTypedText);
@@ -157,9 +156,16 @@ std::vector<Explanation> LookUp(const std::string &text) {
     for (const std::vector<Explanation> &more : {FindTransfer(text), FindCodes(text)}) {
         found.insert(found.end(), more.begin(), more.end());
     }
+    return found;
+}
+
+}  // namespace
+
+std::vector<Explanation> LookUp(const std::string &text) {
+    std::vector<Explanation> found = FindFailures(text);
     if (found.empty()) {
         const std::string reason = ReasonOfSentence(text);
-        found = reason.empty() ? FindSentence(text) : LookUp(reason);
+        found = reason.empty() ? FindSentence(text) : FindFailures(reason);
     }
     return found;
 }

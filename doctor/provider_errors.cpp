@@ -1,11 +1,10 @@
 #include "doctor/provider_errors.h"
 
-#include <algorithm>
-#include <boost/algorithm/string/find.hpp>
+#include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/predicate.hpp>
 #include <boost/algorithm/string/trim.hpp>
 #include <cctype>
-#include <iterator>
+#include <utility>
 
 namespace Doctor {
 
@@ -110,25 +109,26 @@ const std::vector<TAVO::Web::FailureRow> &ProviderErrors() {
 }
 
 bool ContainsCode(const std::string &text, const std::string &code) {
-    const auto found = boost::ifind_first(text, code);
-    return !found.empty() && (found.begin() == text.begin() || !IsWordCharacter(*(found.begin() - 1))) &&
-           (found.end() == text.end() || !IsWordCharacter(*found.end()));
+    const std::size_t begin = boost::to_lower_copy(text).find(boost::to_lower_copy(code));
+    if (begin == std::string::npos) {
+        return false;
+    }
+    const std::size_t end = begin + code.size();
+    return (begin == 0 || !IsWordCharacter(text[begin - 1])) && (end == text.size() || !IsWordCharacter(text[end]));
 }
 
 std::string ReasonOfSentence(const std::string &sentence) {
-    struct Translation {
-        const char *sentence;
-        const char *reason;
-    };
-    constexpr Translation kTranslations[] = {
+    const std::pair<const char *, const char *> reasons[] = {
         {"The sign-in was cancelled, or your organisation does not allow you to use this device.", "access_denied"},
         {"Your organisation does not accept this device. Contact your administrator.", "invalid_client"},
         {"Too many users are signed in on this device. Try again later.", "Too many users are signed in."},
     };
-    const auto *found = std::find_if(std::begin(kTranslations), std::end(kTranslations), [&](const auto &translation) {
-        return boost::iequals(boost::trim_copy(sentence), translation.sentence);
-    });
-    return found != std::end(kTranslations) ? found->reason : "";
+    for (const auto &[shown, reason] : reasons) {
+        if (boost::iequals(boost::trim_copy(sentence), shown)) {
+            return reason;
+        }
+    }
+    return "";
 }
 
 }  // namespace Doctor

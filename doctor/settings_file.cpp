@@ -186,7 +186,7 @@ void ReportRights(Report &report, const std::string &id, const SettingsFile &fil
     for (const std::string &path : paths) {
         if (stat(path.c_str(), &status) == 0 && !IsChangedByRootOnly(status)) {
             report.Finding(id, kSubject, path + ": " + DescribeRights(status) + ": users other than root can change it",
-                           "Run: sudo chown root " + path + "; sudo chmod go-w " + path);
+                           std::string("Run: sudo chown root ").append(path).append("; sudo chmod go-w ").append(path));
             return;
         }
     }
