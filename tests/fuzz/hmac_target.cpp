@@ -23,8 +23,9 @@ bool Accepts(const std::string &input) {
     const Decoded key = DecodeBase64(lines[1]);
     const bool verifies =
         !key.bytes.empty() && HMACSignature(key.bytes, UpToNUL(parts[0] + "." + parts[1]), digest) == UpToNUL(parts[2]);
-    // Versions of OpenSSL decode a malformed key differently.
-    Require(verifies || !accepted || !key.wellFormed, "an invalid signature was accepted");
+    // Versions of OpenSSL decode long malformed keys differently.
+    const bool isCertain = key.wellFormed || keyText.size() <= 1024;
+    Require(verifies || !accepted || !isCertain, "an invalid signature was accepted");
     Require(accepted || !verifies || !key.wellFormed, "a valid signature was rejected");
     RequireOneOf(failure,
                  {Test::kNothingThrown, Test::Fails<TAVO::JWT::jwt_verify_failed>("verify hmac signature failed")});

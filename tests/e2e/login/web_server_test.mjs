@@ -1,6 +1,7 @@
 // Attacks on the web server: request bodies, other paths, missing headers, header injection and environment variables.
 // Runs as root of private namespaces.
 import assert from 'node:assert/strict';
+import {execFileSync} from 'node:child_process';
 import {once} from 'node:events';
 import {cpSync, mkdtempSync, readdirSync, readFileSync, watch, writeFileSync} from 'node:fs';
 import http2 from 'node:http2';
@@ -91,10 +92,11 @@ function request(target, {method = 'GET', headers = {}, body = ''} = {}) {
     return `${method} ${target} HTTP/1.1\r\n${all.map(([name, value]) => `${name}: ${value}\r\n`).join('')}\r\n${body}`;
 }
 
-/** Versions of lighttpd differ in some statuses. */
-function expectStatus(actual, expected) {
-    assert.ok([expected].flat().includes(actual), `status ${actual}, expected ${expected}`);
-}
+// Versions of lighttpd differ in some statuses. Measured: 1.4.69, 1.4.79 and 1.4.85.
+const [, patch] = /1\.4\.(\d+)/.exec(execFileSync('/usr/sbin/lighttpd', ['-v'], {encoding: 'utf8'}));
+const BODY_WITHOUT_LENGTH_OVER_HTTP2 = patch < 79 ? 411 : 413;
+const UNKNOWN_VERSION = patch < 79 ? 505 : 400;
+const RAW_CR_IN_QUERY = patch < 85 ? [200, 302, 405] : [200, 302, 400, 405];
 
 describe('The web server', () => {
     let site;
@@ -145,7 +147,7 @@ describe('The web server', () => {
             const watcher = watch(site.uploads);
             const stored = once(watcher, 'change').then(([, name]) => assert.fail(`the server stores ${name}`));
             try {
-                expectStatus(await Promise.race([sendAndReadStatus(), stored]), expected);
+                assert.equal(await Promise.race([sendAndReadStatus(), stored]), expected);
                 assert.deepEqual(readdirSync(site.uploads), []);
             } finally {
                 watcher.close();
@@ -161,7 +163,7 @@ describe('The web server', () => {
 
         test('of a huge length, over HTTP/2', () => expectNothingStored(413, () =>
             statusOverHttp2({':method': 'POST', ':path': '/index.cgi', 'content-length': '1000000000000'}, part)));
-        test('of no length, over HTTP/2', () => expectNothingStored([411, 413], () =>
+        test('of no length, over HTTP/2', () => expectNothingStored(BODY_WITHOUT_LENGTH_OVER_HTTP2, () =>
             statusOverHttp2({':method': 'POST', ':path': '/index.cgi'}, part)));
     });
 
@@ -221,12 +223,12 @@ describe('The web server', () => {
             [431, 'a long header', request('/index.cgi', {headers: {Cookie: 'x'.repeat(10_000)}})],
             [501, 'an unknown method', request('/index.cgi', {method: 'NONSENSE'})],
             [504, 'a program that does not answer', request('/webman/sso/stuck.cgi')],
-            [[400, 505], 'an unknown version', 'GET / HTTP/4.2\r\nHost: localhost\r\n\r\n'],
+            [UNKNOWN_VERSION, 'an unknown version', 'GET / HTTP/4.2\r\nHost: localhost\r\n\r\n'],
         ];
         for (const [status, kind, bytes] of answers) {
-            test(`${[status].flat().join(' or ')}: ${kind}`, async () => {
+            test(`${status}: ${kind}`, async () => {
                 const answer = await send(bytes);
-                expectStatus(answer.status, status);
+                assert.equal(answer.status, status);
                 const found = answer.headers.filter(([name]) => name in PROTECTION).sort();
                 assert.deepEqual(found, Object.entries(PROTECTION));
             });
@@ -250,8 +252,8 @@ describe('The web server', () => {
                 for (const target of targets) {
                     const answer = await send(request(`${target}/x${lineBreak}${injected.replace(' ', '%20')}`));
                     assert.deepEqual(valuesOf(answer, 'injected'), [], target);
-                    // Newer versions of lighttpd reject a raw CR.
-                    expectStatus(answer.status, lineBreak === '\r' ? [200, 302, 400, 405] : [200, 302, 405]);
+                    const statuses = lineBreak === '\r' ? RAW_CR_IN_QUERY : [200, 302, 405];
+                    assert.ok(statuses.includes(answer.status), `${target}: status ${answer.status}`);
                 }
             });
         }
