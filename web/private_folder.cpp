@@ -264,7 +264,7 @@ bool PrivateFolder::CountOneMore() {
 
     Json::Value counted;
     counted["swept"] = Json::Int64{isRecent ? swept : now};
-    counted["count"] = Json::UInt64{hasRoom ? count + 1 : count};
+    counted["count"] = hasRoom ? count + 1 : count;
     if (ftruncate(counter.Number(), 0) != 0 || lseek(counter.Number(), 0, SEEK_SET) != 0) {
         ThrowSystemError("The front end's counter cannot be written");
     }
