@@ -11,6 +11,7 @@
 #include "doctor/azure_checks.h"
 #include "doctor/checks.h"
 #include "doctor/key_set.h"
+#include "doctor/provider_errors.h"
 #include "doctor/transfer_checks.h"
 #include "doctor/watch.h"
 #include "web/request.h"
@@ -304,21 +305,15 @@ class ProviderCheck {
             check.found = "this is not a token endpoint: " + DescribeAnswer(transfer, response);
             check.remedy = "Set " + prefix_ + R"(token_endpoint to the "token_endpoint" of the discovery document)" +
                            PublishedTokenEndpoint();
-        } else if (error == "invalid_grant") {
-            check.mark = Mark::kGood;
-            check.found = DescribeAcceptance();
-            check.library.clear();  // the expected answer
         } else if (error == "invalid_client" || error == "unauthorized_client") {
             check.remedy = "Compare " + prefix_ +
                            "client_id with the provider's. If it is correct, create a new client "
                            "secret there, which may have expired, and set " +
                            prefix_ + "client_secret to it. The provider must accept client_secret_post.";
-        } else if (error == "invalid_request") {
-            // Some providers check the form of the code before the client.
-            check.mark = Mark::kNote;
-            check.remedy = "The provider may have rejected the test code only. Run: sudo tavosso-doctor login";
-        } else {
+        } else if (IsKnown(error) && error != "invalid_grant" && error != "invalid_request") {
             check.remedy = "Run: tavosso-doctor explain " + Quoted(error);
+        } else {
+            ReportRejectedCode(check, error);
         }
         report_.Add(check);
     }
@@ -328,17 +323,30 @@ class ProviderCheck {
         return published.empty() ? "" : ": " + Quoted(published);
     }
 
-    /// A provider that rejects a wrong secret before it checks the code has accepted the right one.
-    std::string DescribeAcceptance() {
+    /// The provider rejected the test code: by `invalid_grant`, or by a word of its own.
+    void ReportRejectedCode(Check &check, const std::string &error) {
+        if (IsOtherWithWrongSecret(error)) {
+            check.mark = Mark::kGood;
+            check.found = "the provider accepts the client's id and secret";
+            check.library.clear();  // the expected answer
+        } else if (error == "invalid_grant") {
+            check.mark = Mark::kGood;
+            check.found = "the provider did not reject the client's id and secret, but it may not have checked them";
+            check.library.clear();
+            report_.Unproved("that the client secret is correct: the provider checks the code before the secret");
+        } else {
+            check.mark = Mark::kNote;
+            check.remedy = "The provider may have rejected the test code only. Run: sudo tavosso-doctor login";
+        }
+    }
+
+    /// A provider that answers a wrong secret with another error has accepted the right one.
+    bool IsOtherWithWrongSecret(const std::string &error) {
         std::string response;
         client_->RequestTokenEndpoint(response, WithSecret(client_->GetIDTokenReqParams(), kTestSecret));
         const Transfer transfer = LastTransfer(report_);
-        const std::string error = TAVO::Web::StringMember(TAVO::Web::ParseObject(response), "error");
-        if (transfer.result == CURLE_OK && (error == "invalid_client" || transfer.status == kUnauthorized)) {
-            return "the provider accepts the client's id and secret";
-        }
-        report_.Unproved("that the client secret is correct: the provider checks the code before the secret");
-        return "the provider did not reject the client's id and secret, but it may not have checked them";
+        const std::string other = TAVO::Web::StringMember(TAVO::Web::ParseObject(response), "error");
+        return transfer.result == CURLE_OK && other != error && (!other.empty() || transfer.status == kUnauthorized);
     }
 
     std::string LibraryOn(const std::string &response) {

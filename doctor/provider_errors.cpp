@@ -1,5 +1,6 @@
 #include "doctor/provider_errors.h"
 
+#include <algorithm>
 #include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/predicate.hpp>
 #include <boost/algorithm/string/trim.hpp>
@@ -106,6 +107,12 @@ const std::vector<TAVO::Web::FailureRow> &ProviderErrors() {
             "Run `tavosso-doctor`. Check the values in `azure.conf`.", kAzureAD),
     };
     return errors;
+}
+
+bool IsKnown(const std::string &code) {
+    const std::vector<TAVO::Web::FailureRow> &errors = ProviderErrors();
+    return std::any_of(errors.begin(), errors.end(),
+                       [&](const TAVO::Web::FailureRow &error) { return error.texts.front() == code; });
 }
 
 bool ContainsCode(const std::string &text, const std::string &code) {

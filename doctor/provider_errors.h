@@ -11,6 +11,8 @@ namespace Doctor {
 /// Error codes of OAuth 2.0, OpenID Connect and Azure AD. `type` is the source of the description.
 const std::vector<TAVO::Web::FailureRow> &ProviderErrors();
 
+bool IsKnown(const std::string &code);
+
 /// Returns whether a text contains an error code as a word, in any case.
 bool ContainsCode(const std::string &text, const std::string &code);
 

@@ -9,6 +9,7 @@
 #include "tests/doctor/appliance.h"
 #include "tests/doctor/doctor_process.h"
 #include "tests/support/authority.h"
+#include "tests/support/encoding.h"
 #include "tests/support/files.h"
 #include "tests/support/server.h"
 #include "tests/support/token.h"
@@ -242,6 +243,17 @@ TEST_F(Network, EndlessResponseIsStopped) {
     const std::string answer = HTTPAnswer("{\"a\": \"" + std::string(5 << 20, 'x') + "\"}");
     appliance.AnswerAt("/discovery", [answer](const std::string & /*request*/) { return answer; });
     EXPECT_THAT(Ask({}).Find("discovery.reachable", "finding").found, HasSubstr("longer than 4 MiB"));
+}
+
+TEST_F(Network, ProvidersOwnWordForWrongCodeIsNoFinding) {
+    appliance.AnswerAt("/token_endpoint", [](const std::string &request) {
+        const bool isClientRight = PercentDecode(request).find(kClientSecret) != std::string::npos;
+        return HTTPAnswer(isClientRight ? R"({"error": "invalid_code"})" : R"({"error": "unauthorized_client"})",
+                          "403 Forbidden");
+    });
+    EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").found, "the provider accepts the client's id and secret");
+    appliance.RefuseCodes("invalid_code");
+    EXPECT_THAT(Ask({}).Find("token_endpoint.client", "note").remedy, HasSubstr("tavosso-doctor login"));
 }
 
 TEST_F(Network, ReportsAcceptanceOnlyIfWrongSecretIsRejected) {

@@ -57,7 +57,7 @@ TEST_P(Output, HidesSecretInProviderError) {
     for (const char *path : {"/token_endpoint", "/discovery", "/keys"}) {
         appliance.AnswerAt(path, Compact(ErrorAnswer(kClientSecret, kClientSecret)));
     }
-    EXPECT_EQ(Ask({}).Find("token_endpoint.client", "finding").found, "The provider refused: [hidden] ([hidden])");
+    EXPECT_EQ(Ask({}).Find("token_endpoint.client", "note").found, "The provider refused: [hidden] ([hidden])");
 }
 
 TEST_P(Output, HidesSecretInOtherKey) {
