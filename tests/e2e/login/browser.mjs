@@ -92,18 +92,29 @@ export class Browser {
     }
 
     /** Sends a request. Does not follow redirects. */
-    async request(method, url, form) {
-        const body = form && new URLSearchParams(form).toString();
+    request(method, url, form) {
+        const sent = form && {
+            type: 'application/x-www-form-urlencoded', text: new URLSearchParams(form).toString(),
+        };
+        return this.#send(method, url, sent, Object.keys(form ?? {}));
+    }
+
+    /** Sends JSON, as the script of a page does. */
+    requestWithJson(method, url, values) {
+        return this.#send(method, url, {type: 'application/json', text: JSON.stringify(values)}, Object.keys(values));
+    }
+
+    async #send(method, url, body, fields) {
         const headers = {Cookie: this.cookies.for(url).map(({name, value}) => `${name}=${value}`).join('; ')};
-        if (form) {
-            Object.assign(headers, {'Content-Type': 'application/x-www-form-urlencoded', Origin: url.origin});
+        if (body) {
+            Object.assign(headers, {'Content-Type': body.type, Origin: url.origin});
         }
-        const answer = await this.#exchange(method, url, headers, body);
+        const answer = await this.#exchange(method, url, headers, body?.text);
         for (const cookie of answer.headers['set-cookie'] ?? []) {
             this.cookies.store(url, cookie);
         }
         this.history.push(answer);
-        this.#report({method, url, fields: Object.keys(form ?? {}), answer});
+        this.#report({method, url, fields, answer});
         return answer;
     }
 
