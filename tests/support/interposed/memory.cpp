@@ -109,5 +109,13 @@ void *operator new(std::size_t size) {
     }
     return memory;
 }
+// The sanitizer would otherwise provide it, and reject the release by free.
+void *operator new(std::size_t size, const std::nothrow_t & /*tag*/) noexcept {
+    try {
+        return operator new(size);
+    } catch (const std::bad_alloc &) {
+        return nullptr;
+    }
+}
 void operator delete(void *memory) noexcept { std::free(memory); }
 void operator delete(void *memory, std::size_t /*size*/) noexcept { std::free(memory); }
