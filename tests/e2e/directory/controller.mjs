@@ -59,7 +59,12 @@ export class Controller {
         await run('/usr/bin/python3', [PROVISION, controller.#folder]);
         mkdirSync('/run/samba', {mode: 0o755});
         controller.#samba = new Server('samba', controller.#settings);
-        await controller.startWinbindd();
+        try {
+            await controller.startWinbindd();
+        } catch (failure) {
+            await controller.stop();
+            throw failure;
+        }
         controller.seconds = ((performance.now() - began) / 1000).toFixed(1);
         return controller;
     }

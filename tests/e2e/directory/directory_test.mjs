@@ -56,7 +56,7 @@ before(async () => {
     controller = await Controller.start();
     console.log(`domain controller started in ${controller.seconds} s`);
 });
-after(() => controller.stop());
+after(() => controller?.stop());
 
 beforeEach(() => {
     writeDomains({});
