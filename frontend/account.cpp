@@ -17,7 +17,7 @@ void GoAndSignIn(Web::Response &response) {
 }
 
 std::string Entry(const std::string &term, const std::string &text) {
-    return text.empty() ? "" : "<dt>" + term + "</dt>\n<dd>" + Web::EscapeHtml(text) + "</dd>\n";
+    return text.empty() ? "" : "<dt>" + term + "</dt>\n<dd><bdi>" + Web::EscapeHtml(text) + "</bdi></dd>\n";
 }
 
 void ShowAccount(Web::Response &response) {
@@ -26,11 +26,12 @@ void ShowAccount(Web::Response &response) {
         GoAndSignIn(response);
         return;
     }
-    Frontend::ShowPage(response, "200 OK", "Your account",
-                       "<h1>Your account</h1>\n<dl>\n" + Entry("Name", session->displayName) +
-                           Entry("User name on this device", session->user) +
-                           Entry("Signed in with", session->profile) +
-                           "</dl>\n<p><a href=\"/index.cgi\">Back to the start page</a></p>\n");
+    const Frontend::Messages messages(Frontend::Variable("HTTP_ACCEPT_LANGUAGE"));
+    Frontend::ShowPage(response, "200 OK", messages, "account.title",
+                       "<dl>\n" + Entry(messages["account.name"], session->displayName) +
+                           Entry(messages["account.user"], session->user) +
+                           Entry(messages["account.profile"], session->profile) + "</dl>\n<p><a href=\"/index.cgi\">" +
+                           messages["account.back"] + "</a></p>\n");
 }
 
 }  // namespace

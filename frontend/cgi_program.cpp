@@ -48,9 +48,9 @@ void LimitProcess() {
 
 void RefuseMethod(Web::Response &response, const std::string &methods) {
     response.AddHeader("Allow", methods);
-    ShowPage(response, "405 Method Not Allowed", "This page cannot be opened directly",
-             "<h1>This page cannot be opened directly</h1>\n"
-             "<p><a href=\"/index.cgi\">Go to the start page</a></p>\n");
+    const Messages messages(Variable("HTTP_ACCEPT_LANGUAGE"));
+    ShowPage(response, "405 Method Not Allowed", messages, "method.title",
+             "<p><a href=\"/index.cgi\">" + messages["method.start_page"] + "</a></p>\n");
 }
 
 }  // namespace

@@ -1,6 +1,8 @@
 // The start page: shows the signed-in user, or a link to sign in.
 #include <sso/sso.h>
 
+#include <boost/algorithm/string/replace.hpp>
+
 #include "frontend/cgi_program.h"
 #include "frontend/environment.h"
 #include "frontend/page.h"
@@ -10,49 +12,53 @@
 #include "web/text.h"
 
 namespace Web = TAVO::Web;
+using Frontend::Messages;
 
 namespace {
 
-void ShowUser(Web::Response &response, const Frontend::Session &session) {
-    Frontend::ShowPage(response, "200 OK", "Signed in",
-                       "<h1>Welcome</h1>\n<p>You are signed in as <strong>" + Web::EscapeHtml(session.user) +
-                           "</strong>.</p>\n<p><a href=\"/account.cgi\">Your account</a></p>\n"
-                           "<form method=\"post\" action=\"/webman/sso/logout.cgi\">\n"
-                           "<button type=\"submit\">Sign out</button>\n</form>\n");
+void ShowUser(Web::Response &response, const Messages &messages, const Frontend::Session &session) {
+    const std::string user = "<strong><bdi>" + Web::EscapeHtml(session.user) + "</bdi></strong>";
+    Frontend::ShowPage(response, "200 OK", messages, "signed_in.title",
+                       "<p>" + boost::replace_first_copy(messages["signed_in.user"], "{user}", user) +
+                           "</p>\n<p><a href=\"/account.cgi\">" + messages["signed_in.account"] +
+                           "</a></p>\n<form method=\"post\" action=\"/webman/sso/logout.cgi\">\n"
+                           "<button type=\"submit\">" +
+                           messages["signed_in.sign_out"] + "</button>\n</form>\n");
 }
 
-void ShowSignIn(Web::Response &response, const std::string &origin) {
-    Frontend::ShowPage(response, "200 OK", "Sign in",
-                       "<h1>Sign in</h1>\n<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=" +
-                           Web::EscapeHtml(TAVO::SSO::URLEncode(origin)) +
-                           "\">Sign in with your organisation account</a></p>\n");
+void ShowSignIn(Web::Response &response, const Messages &messages, const std::string &origin) {
+    Frontend::ShowPage(
+        response, "200 OK", messages, "start.title",
+        "<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=" + Web::EscapeHtml(TAVO::SSO::URLEncode(origin)) +
+            "\">" + messages["start.action"] + "</a></p>\n");
 }
 
-void ShowThatSignInIsUnavailable(Web::Response &response, const std::string &why) {
-    Frontend::ShowPage(response, "200 OK", "Sign in",
-                       "<h1>Sign in</h1>\n<p>" + why + "</p>\n<p>Contact your administrator.</p>\n");
+void ShowThatSignInIsUnavailable(Web::Response &response, const Messages &messages, const char *why) {
+    Frontend::ShowPage(response, "200 OK", messages, "start.title",
+                       "<p>" + messages[why] + "</p>\n<p>" + messages["start.ask"] + "</p>\n");
 }
 
-void ShowWayToSignIn(Web::Response &response) {
+void ShowWayToSignIn(Web::Response &response, const Messages &messages) {
     const Web::Parameters parameters = Web::ParseQuery(Frontend::Variable("QUERY_STRING"));
     switch (Web::HowFarSetUp()) {
         case Web::SetUp::kComplete:
-            ShowSignIn(response, Web::SafeOrigin(Web::OnlyValue(parameters, "origin").value_or("")));
+            ShowSignIn(response, messages, Web::SafeOrigin(Web::OnlyValue(parameters, "origin").value_or("")));
             break;
         case Web::SetUp::kIncomplete:
-            ShowThatSignInIsUnavailable(response, "Single sign-on is not completely set up on this device.");
+            ShowThatSignInIsUnavailable(response, messages, "start.not_set_up");
             break;
         case Web::SetUp::kOff:
-            ShowThatSignInIsUnavailable(response, "Single sign-on is switched off on this device.");
+            ShowThatSignInIsUnavailable(response, messages, "start.switched_off");
             break;
     }
 }
 
 void ShowStartPage(Web::Response &response) {
+    const Messages messages(Frontend::Variable("HTTP_ACCEPT_LANGUAGE"));
     if (const auto session = Frontend::FindSession(response, Frontend::Variable("HTTP_COOKIE"))) {
-        ShowUser(response, *session);
+        ShowUser(response, messages, *session);
     } else {
-        ShowWayToSignIn(response);
+        ShowWayToSignIn(response, messages);
     }
 }
 

@@ -32,9 +32,10 @@ std::string ProviderLogout(const Frontend::Session &session) {
 void LeaveForProvider(Web::Response &response, const std::string &address) {
     // Not a redirect: browsers apply "form-action 'self'" to the redirects after a form.
     response.AddHeader("Refresh", "0; url=" + address);
-    Frontend::ShowPage(response, "200 OK", "Signing out",
-                       "<h1>Signing out</h1>\n<p>You are signed out of this device. <a href=\"" +
-                           Web::EscapeHtml(address) + "\">Sign out of your organisation account too</a></p>\n");
+    const Frontend::Messages messages(Frontend::Variable("HTTP_ACCEPT_LANGUAGE"));
+    Frontend::ShowPage(response, "200 OK", messages, "sign_out.title",
+                       "<p>" + messages["sign_out.done"] + "</p>\n<p><a href=\"" + Web::EscapeHtml(address) + "\">" +
+                           messages["sign_out.provider"] + "</a></p>\n");
 }
 
 // Browsers send one of these headers with a form. Other sites cannot forge them.
@@ -45,9 +46,10 @@ bool ComesFromThisSite() {
 }
 
 void RefuseForeignRequest(Web::Response &response) {
-    Frontend::ShowPage(
-        response, "403 Forbidden", "Sign out",
-        "<h1>Sign out</h1>\n<p>To sign out, use the button on the <a href=\"/index.cgi\">start page</a>.</p>\n");
+    const Frontend::Messages messages(Frontend::Variable("HTTP_ACCEPT_LANGUAGE"));
+    Frontend::ShowPage(response, "403 Forbidden", messages, "signed_in.sign_out",
+                       "<p>" + messages["sign_out.refused"] + "</p>\n<p><a href=\"/index.cgi\">" +
+                           messages["method.start_page"] + "</a></p>\n");
 }
 
 void SignOut(Web::Response &response) {

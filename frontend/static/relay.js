@@ -1,6 +1,7 @@
 // The relay page: shows the result of a login or logout and continues. Its input is the fragment of its address, which
 // is untrusted: it shows text as text and follows only paths of this site.
 import {explain} from './reasons.js';
+import {preferredLanguage} from './language.js';
 
 const START_PAGE = '/index.cgi';
 const SIGN_IN = '/webman/sso/login.cgi?origin=';
@@ -15,10 +16,10 @@ const ownPath = (origin) => (origin.length <= LONGEST_ORIGIN && OWN_PATH.test(or
 
 function describeSuccess(origin) {
     return {
-        headline: 'You are signed in',
-        explanation: 'Opening the page that you requested.',
+        headline: 'success.title',
+        explanation: 'success.text',
         reason: '',
-        action: 'Continue',
+        action: 'success.action',
         onward: ownPath(origin),
         atOnce: true,
     };
@@ -27,10 +28,10 @@ function describeSuccess(origin) {
 function describeFailure(reason, origin) {
     const shown = reason.slice(0, LONGEST_REASON).replace(UNPRINTABLE, ' ');
     return {
-        headline: 'Sign-in failed',
+        headline: 'failure.title',
         explanation: explain(shown),
         reason: shown,
-        action: 'Try again',
+        action: 'failure.action',
         onward: SIGN_IN + encodeURIComponent(ownPath(origin)),
         atOnce: false,
     };
@@ -38,16 +39,19 @@ function describeFailure(reason, origin) {
 
 function describeLogout() {
     return {
-        headline: 'You are signed out',
-        explanation: 'You can close this page.',
+        headline: 'signed_out.title',
+        explanation: 'signed_out.text',
         reason: '',
-        action: 'Continue',
+        action: 'signed_out.action',
         onward: START_PAGE,
         atOnce: false,
     };
 }
 
-/** Returns what to show for a fragment ("#..."), and where to continue; `atOnce` after a success. */
+/**
+ * Returns what to show for a fragment ("#..."), as ids of messages except for `reason`, and where to continue; `atOnce`
+ * after a success.
+ */
 export function describe(fragment) {
     const values = new URLSearchParams(fragment.replace(/^#/, ''));
     const origin = values.get('origin') ?? '';
@@ -61,21 +65,28 @@ export function describe(fragment) {
     }
 }
 
-function show({headline, explanation, reason, action, onward, atOnce}) {
+async function show({headline, explanation, reason, action, onward, atOnce}) {
+    const {default: messages} = await import(`./messages/${preferredLanguage(navigator.languages)}.js`);
     const element = (id) => document.getElementById(id);
-    document.title = headline;
-    element('headline').textContent = headline;
-    element('explanation').textContent = explanation;
+    document.documentElement.lang = messages.language;
+    document.documentElement.dir = messages.direction;
+    document.title = messages[headline];
+    element('product').textContent = messages.product;
+    element('headline').textContent = messages[headline];
+    element('explanation').textContent = messages[explanation];
+    element('unfold').textContent = messages['failure.details'];
     element('reason').textContent = reason;
     element('details').hidden = reason === '';
-    element('onward').textContent = action;
+    element('onward').textContent = messages[action];
     element('onward').href = onward;
+    element('start').textContent = messages['account.back'];
     element('back').hidden = onward === START_PAGE || atOnce;
-    if (atOnce) {
-        location.replace(onward);
-    }
 }
 
 if (globalThis.document) {
-    show(describe(location.hash));
+    const outcome = describe(location.hash);
+    if (outcome.atOnce) {
+        location.replace(outcome.onward);
+    }
+    await show(outcome);
 }

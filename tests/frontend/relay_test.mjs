@@ -3,14 +3,18 @@
 //   node relay_test.mjs DOCTOR
 import assert from 'node:assert/strict';
 import {execFileSync} from 'node:child_process';
-import {readFileSync} from 'node:fs';
+import {readdirSync, readFileSync} from 'node:fs';
 import {test} from 'node:test';
 
 import {EXPLANATIONS} from '../../frontend/static/reasons.js';
+import {preferredLanguage} from '../../frontend/static/language.js';
 import {describe} from '../../frontend/static/relay.js';
 
 const START_PAGE = '/index.cgi';
 const SITE = 'https://appliance.example';
+const MESSAGES = new URL('../../frontend/messages/', import.meta.url);
+const catalogues = Object.fromEntries(readdirSync(MESSAGES).map(
+    (file) => [file.replace(/\.json$/, ''), JSON.parse(readFileSync(new URL(file, MESSAGES)))]));
 const {foreign, own} = JSON.parse(readFileSync(new URL('origins.json', import.meta.url)));
 
 // Rows of the failure table that are not shown verbatim: the front end shows the error of a provider's answer, and some
@@ -19,7 +23,12 @@ const ALTERED = ['{... "error": ...}', 'The provider refused: REASON', 'a text o
 const failures = JSON.parse(execFileSync(process.argv[2], ['explain', '--list', '--json'], {encoding: 'utf8'}))
     .explanations.filter(({table}) => ['exceptions of the library', 'reasons of the front end'].includes(table));
 
-const after = (values) => describe(`#${new URLSearchParams(values)}`);
+/** What the page shows in English. */
+function after(values) {
+    const {headline, explanation, action, ...others} = describe(`#${new URLSearchParams(values)}`);
+    const {[headline]: title, [explanation]: text, [action]: button} = catalogues.en;
+    return {headline: title, explanation: text, action: button, ...others};
+}
 
 test('replaces foreign origins with the start page', () => {
     assert.ok(foreign.length >= 200);
@@ -58,8 +67,8 @@ test('keeps local origins for another try', () => {
 });
 
 test('shows sentences that the doctor explains', () => {
-    for (const sentence of EXPLANATIONS.values()) {
-        execFileSync(process.argv[2], ['explain', sentence]); // fails if it does not
+    for (const id of EXPLANATIONS.values()) {
+        execFileSync(process.argv[2], ['explain', catalogues.en[id]]); // fails if it does not
     }
 });
 
@@ -145,6 +154,34 @@ test('explains only texts of the failure table', () => {
     }
 });
 
+test('has every message in every language', () => {
+    const {en, ...others} = catalogues;
+    assert.deepEqual(Object.keys(others).sort(), ['de', 'es', 'fr', 'ja', 'zh']);
+    const sources = ['index', 'account', 'logout', 'cgi_program', 'page', 'static/relay.js', 'static/reasons.js'].map(
+        (name) => readFileSync(new URL(`../../frontend/${name}${/\./.test(name) ? '' : '.cpp'}`, import.meta.url), 'utf8'));
+    for (const [id, text] of Object.entries(en)) {
+        assert.ok(sources.some((source) => source.includes(id)), `${id} is not used`);
+        for (const [language, texts] of Object.entries(others)) {
+            const placeholder = /\{user\}/.test(text);
+            assert.ok(texts[id], `${id} (${language})`);
+            assert.equal(/\{user\}/.test(texts[id]), placeholder, `${id} (${language})`);
+        }
+    }
+    for (const texts of Object.values(others)) {
+        assert.deepEqual(Object.keys(texts), Object.keys(en));
+    }
+});
+
+test('chooses the first language with messages', () => {
+    assert.equal(preferredLanguage(['nl-NL', 'fr-CH', 'de']), 'fr');
+    assert.equal(preferredLanguage(['zh-Hans-CN']), 'zh');
+    assert.equal(preferredLanguage(['nl']), 'en');
+    assert.equal(preferredLanguage([]), 'en');
+    for (const language of Object.keys(catalogues)) {
+        assert.equal(preferredLanguage([language]), language);
+    }
+});
+
 test('ignores names of object members', () => {
     for (const reason of ['constructor', '__proto__', 'toString']) {
         assert.match(after({success: 'false', reason}).explanation, /^Something went wrong/);
@@ -153,6 +190,7 @@ test('ignores names of object members', () => {
 
 test('is smaller than 20 KB', () => {
     const size = (file) => readFileSync(new URL(`../../frontend/static/${file}`, import.meta.url)).length;
-    const sizes = ['relay.html', 'relay.js', 'reasons.js', 'style.css', 'mark.svg'].map(size);
-    assert.ok(sizes.reduce((sum, each) => sum + each, 0) < 20_000);
+    const sizes = ['relay.html', 'relay.js', 'reasons.js', 'language.js', 'style.css', 'mark.svg'].map(size);
+    const catalogueSizes = Object.values(catalogues).map((texts) => Buffer.byteLength(JSON.stringify(texts, null, 4)));
+    assert.ok(sizes.reduce((sum, each) => sum + each, 0) + Math.max(...catalogueSizes) < 20_000);
 });

@@ -5,6 +5,8 @@
 #include <fstream>
 #include <stdexcept>
 
+#include "frontend/catalogues.h"
+#include "frontend/language.h"
 #include "frontend/session.h"
 #include "tests/fuzz/oracle.h"
 #include "tests/fuzz/target.h"
@@ -140,6 +142,7 @@ void RequireHarmless(const std::string &text) {
     Require(origin[0] == '/' && origin[1] != '/' && origin.find('\\') == std::string::npos && origin.size() <= 512 &&
                 origin.find_first_of(" \"") == std::string::npos && TAVO::Web::IsPrintable(origin),
             "the origin is not a local path");
+    Require(Frontend::FindCatalogue(Frontend::PreferredLanguage(text)) != nullptr, "the language has no catalogue");
 }
 
 /// Of a provider's answer, only the error and its description may be shown.

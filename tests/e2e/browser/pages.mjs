@@ -74,7 +74,7 @@ const TITLES = {
     'the start page, single sign-on off': 'Sign in',
     'the start page, single sign-on incomplete': 'Sign in',
     "the provider's form": 'Example organisation',
-    'the start page, signed in': 'Signed in',
+    'the start page, signed in': 'Welcome',
     'the account page': 'Your account',
     'the sign-out page': 'Signing out',
     'the relay page after a success': 'You are signed in',
@@ -86,6 +86,9 @@ const TITLES = {
 function stayOn(visitor, elsewhere) {
     return visitor.page.route(elsewhere, (route) => route.fulfill({status: 204}));
 }
+
+// Tags of HTML for the locales of browsers.
+const LANGUAGES = {'en-GB': 'en', 'de-AT': 'de', 'fr-CA': 'fr', 'es-MX': 'es', 'ja-JP': 'ja', 'zh-CN': 'zh-Hans', 'nl-NL': 'en'};
 
 async function findViolations(page) {
     const {violations} = await page.evaluate(() => globalThis.axe.run());
@@ -103,17 +106,44 @@ function defineAccessibility(stage) {
                 await page.setViewportSize({width, height: 800});
                 await page.emulateMedia({colorScheme});
                 assert.deepEqual(await findViolations(page), [], `${width} pixels wide, ${colorScheme}`);
-                const overhang = await page.evaluate(() => document.documentElement.scrollWidth - innerWidth);
-                assert.ok(overhang <= 0, `${overhang} pixels beyond the right edge of ${width}`);
+                assert.ok(await overhang(page) <= 0, `beyond the right edge of ${width}`);
             }
         }));
+    }
+}
+
+async function overhang(page) {
+    return page.evaluate(() => document.documentElement.scrollWidth - innerWidth);
+}
+
+function defineLanguages(stage) {
+    for (const [locale, language] of Object.entries(LANGUAGES)) {
+        it(`speaks the language of the browser: ${locale}`, () => stage.visit(async ({page}) => {
+            const pages = {start: '/index.cgi', failure: FAILURE, 'sign-out': RELAY_PAGE};
+            for (const [name, address] of Object.entries(pages)) {
+                await page.goto(new URL(address, stage.origin).href);
+                await page.locator(`html[lang="${language}"]`).waitFor();
+                await page.evaluate(stage.axe);
+                assert.deepEqual(await findViolations(page), [], name);
+                await page.screenshot({path: path.join(stage.pictures, `${name}.${locale}.png`)});
+                for (const direction of ['ltr', 'rtl']) {
+                    await page.evaluate((dir) => {
+                        document.documentElement.dir = dir;
+                    }, direction);
+                    assert.ok(await overhang(page) <= 0, `${name} is too wide, ${direction}`);
+                }
+                assert.equal(await page.title(), await page.getByRole('heading', {level: 1}).textContent());
+                // about:blank in between, because a new fragment alone does not load the page.
+                await page.goto('about:blank');
+            }
+        }, {locale, viewport: {width: 360, height: 640}}));
     }
 }
 
 function defineHeaders(stage) {
     const addresses = [
         '/', '/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi', '/webman/sso/logout.cgi',
-        ...['relay.html', 'relay.js', 'reasons.js', 'style.css', 'mark.svg'].map((file) => `/webman/ssoclient/${file}`),
+        ...['relay.html', 'relay.js', 'reasons.js', 'language.js', 'messages/en.js', 'style.css', 'mark.svg'].map((file) => `/webman/ssoclient/${file}`),
         '/webman/ssoclient/', '/nowhere', '/nowhere.cgi',
     ];
     it('has security headers', () => stage.visit(async (visitor) => {
@@ -172,6 +202,7 @@ function definePictures(stage) {
 
 export function definePages(stage) {
     defineAccessibility(stage);
+    defineLanguages(stage);
     defineHeaders(stage);
     definePictures(stage);
 }

@@ -148,13 +148,13 @@ describe('An attacker', () => {
         const browser = newBrowser();
         assert.equal((await signIn(browser, 'verified')).success, 'true');
         wasLogged(AUTH | INFO, 'return.cgi: frontend: signed in: ACME\\alice');
-        assert.match((await browser.open(at('/account.cgi'))).text, /<dd>ACME\\alice<\/dd>/);
+        assert.match((await browser.open(at('/account.cgi'))).text, /<bdi>ACME\\alice<\/bdi>/);
     });
 
     test('cannot use a truncated session file', async () => {
         const browser = newBrowser();
         await signIn(browser, 'alice');
-        assert.match((await browser.open(at('/account.cgi'))).text, /<dt>Name<\/dt>\n<dd>Alice Example<\/dd>/);
+        assert.match((await browser.open(at('/account.cgi'))).text, /<dt>Name<\/dt>\n<dd><bdi>Alice Example<\/bdi><\/dd>/);
         truncateSync(sessionFile(browser));
         assert.equal(await isSignedIn(browser), false);
     });

@@ -69,7 +69,7 @@ export class Walk {
     /** The user that the start page shows. */
     async userOf(browser) {
         const start = await browser.open(this.origin + START_PAGE);
-        return /<strong>(.*)<\/strong>/.exec(start.text)?.[1];
+        return /<strong><bdi>(.*)<\/bdi><\/strong>/.exec(start.text)?.[1];
     }
 
     /** Fails to sign in after the provider's page. Returns the reason that the user reads. */
@@ -162,8 +162,11 @@ export class Walk {
     async #runRelayScript(browser, page) {
         assert.equal(page.url.origin + page.url.pathname, this.origin + RELAY_PAGE);
         const source = /<script type="module" src="([^"]+)"><\/script>/.exec(page.text)[1];
-        const {describe} = await import(await this.#fetchModule(browser, new URL(source, page.url)));
-        const view = describe(page.url.hash);
+        const load = async (file) => import(await this.#fetchModule(browser, new URL(file, page.url)));
+        const {describe} = await load(source);
+        const {default: messages} = await load('messages/en.js');
+        const {headline, explanation, ...others} = describe(page.url.hash);
+        const view = {headline: messages[headline], explanation: messages[explanation], ...others};
         const details = view.reason && `, details "${view.reason}"`;
         this.report.fact(`the relay page shows "${view.headline}. ${view.explanation}"${details}; it links to ${view.onward}`);
         return view;

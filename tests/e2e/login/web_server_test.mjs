@@ -27,14 +27,14 @@ const PROTECTION = {
 };
 const SERVED = [
     '/', '/index.cgi', '/account.cgi', '/webman/sso/login.cgi', '/webman/sso/return.cgi', '/webman/sso/logout.cgi',
-    ...['error.html', 'mark.svg', 'reasons.js', 'relay.html', 'relay.js', 'style.css']
+    ...['error.html', 'language.js', 'mark.svg', 'messages/en.js', 'reasons.js', 'relay.html', 'relay.js', 'style.css']
         .map((name) => `/webman/ssoclient/${name}`),
 ];
 // Files that a crash, an editor or an administrator may leave in the web root.
 const PLANTED = [
     'core', 'index.html', '.profile', 'index.cgi~', 'webman/core', 'webman/sso/core', 'webman/sso/core.4711',
     'webman/sso/x', 'webman/sso/.hidden', 'webman/sso/login.cgi.orig', 'webman/ssoclient/core',
-    'webman/ssoclient/relay.html.orig', 'webman/ssoclient/.hidden.js',
+    'webman/ssoclient/relay.html.orig', 'webman/ssoclient/.hidden.js', 'webman/ssoclient/messages/core', 'webman/ssoclient/messages/de.js.orig',
 ];
 const PLANTED_PROGRAMS = ['other.cgi', 'webman/other.cgi', 'webman/sso/.cgi', 'webman/sso/Core.cgi',
     'webman/sso/copy.of.login.cgi', 'webman/ssoclient/other.cgi'];
