@@ -1,14 +1,21 @@
 #ifndef TAVOSSO_TESTS_SUPPORT_COMMAND_OUTPUT_H
 #define TAVOSSO_TESTS_SUPPORT_COMMAND_OUTPUT_H
 
+#include <sys/wait.h>
+
 #include <cstdio>
 #include <stdexcept>
 #include <string>
 
 namespace Test {
 
-/// Runs a shell command and returns what it writes to standard output. Throws if it cannot be run or fails.
-inline std::string OutputOf(const std::string &command) {
+struct CommandResult {
+    int status;  // 128 and the signal's number if a signal ended it
+    std::string output;
+};
+
+/// Runs a shell command, and reads what it writes to standard output. Throws if it cannot be run.
+inline CommandResult RunShell(const std::string &command) {
     FILE *pipe = popen(command.c_str(), "r");
     if (pipe == nullptr) {
         throw std::runtime_error("cannot run " + command);
@@ -18,10 +25,17 @@ inline std::string OutputOf(const std::string &command) {
     for (std::size_t size; (size = std::fread(chunk, 1, sizeof chunk, pipe)) > 0;) {
         output.append(chunk, size);
     }
-    if (pclose(pipe) != 0) {
+    const int status = pclose(pipe);
+    return {WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status), output};
+}
+
+/// Returns what a shell command writes to standard output. Throws if it cannot be run or fails.
+inline std::string OutputOf(const std::string &command) {
+    const CommandResult result = RunShell(command);
+    if (result.status != 0) {
         throw std::runtime_error("failed: " + command);
     }
-    return output;
+    return result.output;
 }
 
 }  // namespace Test
