@@ -1,7 +1,7 @@
 // The stand-in's conversion of domain names, and logins that use it, with a real domain controller for CORP.EXAMPLE.NET
 // (NetBIOS name ACME). Runs as root of private namespaces.
 import assert from 'node:assert/strict';
-import {spawn} from 'node:child_process';
+import {spawn, spawnSync} from 'node:child_process';
 import {once} from 'node:events';
 import {readFileSync} from 'node:fs';
 import readline from 'node:readline';
@@ -11,7 +11,7 @@ import {makeWalk, startEverything} from '../login/login_stage.mjs';
 import {useProfile, writeDomains} from '../site/front_end.mjs';
 import {Controller} from './controller.mjs';
 
-const [webroot, nodeModules, convertProgram] = process.argv.slice(2);
+const [webroot, nodeModules, convertProgram, platformCheck, standIn] = process.argv.slice(2);
 const NOBODY = 65534;
 const NOT_CONVERTED = 'TAVOWinsUserNameFqdn2Netbios failed.';
 // Other ids are available only if the namespace maps all of them, which needs root.
@@ -141,6 +141,27 @@ describe('A running program', () => {
         await expectRefused('CORP.EXAMPLE.NET', 'is not available');
         await controller.startWinbindd();
         await expectConverted('CORP.EXAMPLE.NET\\alice', 'ACME\\alice');
+    });
+});
+
+describe('The stand-in', () => {
+    function expectPromisesKept(args) {
+        const {status, stdout} = spawnSync(platformCheck, [...args, standIn], {encoding: 'utf8'});
+        assert.match(stdout, /\n\d+ promises: [1-9]\d* kept, 0 broken, /);
+        assert.equal(status, 0);
+    }
+
+    test('keeps all promises of the platform', () =>
+        expectPromisesKept(['--lookup', 'CORP.EXAMPLE.NET\\alice=ACME\\alice']));
+
+    test('keeps its promises while winbindd hangs', async () => {
+        await controller.stopWinbindd();
+        try {
+            expectPromisesKept([]);
+            assert.ok(controller.isWinbinddStopped);
+        } finally {
+            controller.continueWinbindd();
+        }
     });
 });
 
