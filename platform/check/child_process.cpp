@@ -184,6 +184,7 @@ Result RunInChild(const std::function<void()> &task, std::chrono::seconds limit)
     const bool hasEnded = AwaitEnd(child, blocked, limit);
     // Also ends the children of the child. Its id cannot be reused before it is reaped.
     kill(-child, SIGKILL);
+    kill(child, SIGKILL);  // it may have changed its process group
     int status = 0;
     Require(waitpid(child, &status, 0) == child, "waitpid");
     return ResultOf(hasEnded, status, limit);

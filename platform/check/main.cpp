@@ -22,7 +22,7 @@ enum ExitStatus { kAllKept = 0, kBroken = 1, kCannotRun = 2 };
 /// The command line.
 struct Options {
     std::vector<std::string> libraries = {"libtavosso.so.6"};  // is linked to the platform
-    std::string lookup;
+    std::optional<std::string> lookup;
     long timeout = 10;
 };
 
@@ -64,7 +64,8 @@ void Verify(const Promise &promise, const Subject &subject) {
     } catch (const PlatformCheck::promise_broken &) {
         throw;
     } catch (const std::exception &exception) {
-        throw PlatformCheck::promise_broken(std::string("an exception leaves the function: ") + exception.what());
+        throw PlatformCheck::promise_broken(std::string("an exception leaves the function: ") +
+                                            PlatformCheck::Quoted(exception.what()));
     }
 }
 
@@ -90,8 +91,8 @@ void Print(const char *mark, const Promise &promise, const std::string &reason) 
 
 int CheckAll(const Options &options) {
     std::optional<Conversion> conversion;
-    if (!options.lookup.empty()) {
-        conversion = ReadConversion(options.lookup);
+    if (options.lookup) {
+        conversion = ReadConversion(*options.lookup);
     }
     RequireLoadable(options);
     int kept = 0;

@@ -105,11 +105,10 @@ void CaptureIds(ProcessState &state) {
     getresgid(&group[0], &group[1], &group[2]);
     state["the user ids"] = Joined(user[0], user[1], user[2]);
     state["the group ids"] = Joined(group[0], group[1], group[2]);
-    const int count = getgroups(0, nullptr);
-    std::vector<gid_t> groups(static_cast<std::size_t>(count < 0 ? 0 : count));
-    getgroups(static_cast<int>(groups.size()), groups.data());
-    for (const gid_t other : groups) {
-        state["the supplementary groups"] += Joined(other);
+    std::vector<gid_t> groups(NGROUPS_MAX);
+    const int count = getgroups(static_cast<int>(groups.size()), groups.data());
+    for (int i = 0; i < count; ++i) {
+        state["the supplementary groups"] += Joined(groups[static_cast<std::size_t>(i)]);
     }
 }
 
