@@ -1,14 +1,12 @@
 #include "platform/check/process_state.h"
 
 #include <fcntl.h>
-#include <grp.h>
 #include <sys/stat.h>
 #include <sys/time.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
-#include <cerrno>
 #include <climits>
 #include <clocale>
 #include <csignal>

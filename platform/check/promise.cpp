@@ -9,7 +9,7 @@ namespace PlatformCheck {
 
 namespace {
 
-constexpr std::size_t kMostShown = 40;
+constexpr std::size_t kMostShown = 60;
 
 std::string Escaped(char c) {
     if (c == '"' || c == '\\') {

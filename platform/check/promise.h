@@ -50,7 +50,7 @@ void ExpectEqual(const std::string &found, const std::string &expected, const st
 /// Throws promise_broken if the calls leave something of the process changed.
 void ExpectProcessUnchanged(const std::function<void()> &calls);
 
-/// Returns a C literal of at most 40 bytes, with the length of a longer text.
+/// Returns a C literal of at most 60 bytes, with the length of a longer text.
 std::string Quoted(const std::string &bytes);
 
 }  // namespace PlatformCheck
