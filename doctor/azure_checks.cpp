@@ -47,25 +47,43 @@ std::string SharedTenantIn(const std::string &url) {
     return {};
 }
 
+/// Returns the first address of another tenant, or the end.
+std::vector<Endpoint>::const_iterator FindOtherTenant(const std::vector<Endpoint> &endpoints,
+                                                      const std::string &tenant) {
+    return std::find_if(endpoints.begin(), endpoints.end(), [&](const Endpoint &endpoint) {
+        const std::string found = FindGUID(endpoint.url);
+        return !found.empty() && !boost::iequals(found, tenant);
+    });
+}
+
+/// Returns the first address for several tenants, or the end.
+std::vector<Endpoint>::const_iterator FindSharedTenant(const std::vector<Endpoint> &endpoints) {
+    return std::find_if(endpoints.begin(), endpoints.end(),
+                        [](const Endpoint &endpoint) { return !SharedTenantIn(endpoint.url).empty(); });
+}
+
 /// Reports the first address of another tenant.
 bool ReportOtherTenant(Report &report, const std::vector<Endpoint> &endpoints, const std::string &tenant) {
-    for (const Endpoint &endpoint : endpoints) {
-        const std::string found = FindGUID(endpoint.url);
-        if (!found.empty() && !boost::iequals(found, tenant)) {
-            report.Finding(kTenantID, kTenantSubject,
-                           endpoint.key + " belongs to the tenant " + found + ", azure_tenant_id is " + Quoted(tenant),
-                           "Decide which tenant the users belong to. Set azure_tenant_id to its directory ID, and copy "
-                           "the addresses of that tenant.");
-            return true;
-        }
+    const auto other = FindOtherTenant(endpoints, tenant);
+    if (other == endpoints.end()) {
+        return false;
     }
-    return false;
+    const std::string found = FindGUID(other->url);
+    const bool isAlone = std::any_of(endpoints.begin(), endpoints.end(), [&](const Endpoint &endpoint) {
+        return boost::iequals(FindGUID(endpoint.url), tenant);
+    });
+    report.Finding(
+        kTenantID, kTenantSubject,
+        other->key + " belongs to the tenant " + Quoted(found) + ", azure_tenant_id is " + Quoted(tenant),
+        isAlone ? "Set " + other->key + " to " + Quoted(boost::ireplace_first_copy(other->url, found, tenant))
+                : "Set azure_tenant_id to " + Quoted(boost::to_lower_copy(found)) +
+                      ". If the users belong to the other tenant, copy its addresses from the provider instead.");
+    return true;
 }
 
 /// Reports the first address for several tenants, if others are for one.
 bool ReportSharedTenant(Report &report, const std::vector<Endpoint> &endpoints, const std::string &tenant) {
-    const auto isShared = [](const Endpoint &endpoint) { return !SharedTenantIn(endpoint.url).empty(); };
-    const auto shared = std::find_if(endpoints.begin(), endpoints.end(), isShared);
+    const auto shared = FindSharedTenant(endpoints);
     if (shared == endpoints.end()) {
         return false;
     }
@@ -82,12 +100,14 @@ bool ReportSharedTenant(Report &report, const std::vector<Endpoint> &endpoints, 
 }
 
 void CheckTenant(Report &report, const std::vector<Endpoint> &endpoints, const std::string &tenant) {
-    if (ReportOtherTenant(report, endpoints, tenant) || ReportSharedTenant(report, endpoints, tenant)) {
+    // Another tenant is reported with its key.
+    const bool isUsable = IsGUID(tenant);
+    if ((isUsable && ReportOtherTenant(report, endpoints, tenant)) || ReportSharedTenant(report, endpoints, tenant) ||
+        !isUsable) {
         return;
     }
-    const bool isNamed = std::any_of(endpoints.begin(), endpoints.end(), [&](const Endpoint &endpoint) {
-        return !tenant.empty() && boost::icontains(endpoint.url, tenant);
-    });
+    const bool isNamed = std::any_of(endpoints.begin(), endpoints.end(),
+                                     [&](const Endpoint &endpoint) { return boost::icontains(endpoint.url, tenant); });
     if (isNamed) {
         report.Good(kTenantID, kTenantSubject, "the addresses contain " + Quoted(tenant));
     } else {
@@ -129,6 +149,24 @@ void CheckVersion(Report &report, std::vector<Endpoint> endpoints) {
 
 }  // namespace
 
+std::string TenantOfAddresses(Client &client) {
+    for (const Endpoint &endpoint : EndpointsOf(client)) {
+        if (const std::string tenant = FindGUID(endpoint.url); !tenant.empty()) {
+            return boost::to_lower_copy(tenant);
+        }
+    }
+    return {};
+}
+
+bool DoAddressesAgree(Client &client) {
+    const std::vector<Endpoint> endpoints = EndpointsOf(client);
+    const std::string tenant = client.Azure()->GetTenantID();
+    const bool isOther = IsGUID(tenant) && FindOtherTenant(endpoints, tenant) != endpoints.end();
+    const auto version2 = std::count_if(endpoints.begin(), endpoints.end(), IsVersion2);
+    return !isOther && FindSharedTenant(endpoints) == endpoints.end() &&
+           (version2 == 0 || version2 == static_cast<std::ptrdiff_t>(endpoints.size()));
+}
+
 void CheckAzureAddresses(Report &report, Client &client) {
     const std::vector<Endpoint> endpoints = EndpointsOf(client);
     CheckTenant(report, endpoints, client.Azure()->GetTenantID());
@@ -139,6 +177,9 @@ void CheckTenantOfIssuer(Report &report, Client &client, const std::string &issu
     constexpr char kID[] = "discovery.tenant";
     constexpr char kSubject[] = "tenant of the provider";
     const std::string tenant = client.Azure()->GetTenantID();
+    if (!TenantOfAddresses(client).empty() && !boost::iequals(TenantOfAddresses(client), tenant)) {
+        return;  // reported with the addresses
+    }
     const std::string issued = FindGUID(issuer);
     // Azure AD writes identifiers in lower case.
     const std::string expected = issued.empty() && IsGUID(tenant) ? boost::to_lower_copy(tenant) : issued;
@@ -156,7 +197,7 @@ void CheckTenantOfIssuer(Report &report, Client &client, const std::string &issu
                    "the provider writes " + Quoted(expected) + ", azure_tenant_id is " + Quoted(tenant) +
                        (isCase ? ". The library compares capitals, too" : ""),
                    "Set azure_tenant_id to " + Quoted(expected) +
-                       (isCase ? "" : ", or azure_wellknown to the document of your tenant"));
+                       (isCase || !IsGUID(tenant) ? "" : ", or azure_wellknown to the document of your tenant"));
 }
 
 }  // namespace Doctor

@@ -28,8 +28,9 @@ enum class Kind {
     kSecret,
     kEndpoint,  // used verbatim
     kQueried,   // used with a query appended
+    kLogout,    // the same, by logouts only
     kRedirectURI,
-    kSpare,  // not used by logins
+    kSpare,  // used neither by logins nor by logouts
 };
 
 struct Key {
@@ -47,7 +48,7 @@ constexpr Key kAzureKeys[] = {
     {"authorization_endpoint", Kind::kQueried, [](Client &client) { return client->GetAuthEndpoint(); }},
     {"token_endpoint", Kind::kEndpoint, [](Client &client) { return client->GetTokenEndpoint(); }},
     {"redirect_uri", Kind::kRedirectURI, [](Client &client) { return client->GetRedirectURI(); }},
-    {"logout_endpoint", Kind::kQueried, [](Client &client) { return client->GetLogoutEndpoint(); }},
+    {"logout_endpoint", Kind::kLogout, [](Client &client) { return client->GetLogoutEndpoint(); }},
 };
 
 constexpr Key kWebSphereKeys[] = {
@@ -78,6 +79,11 @@ class KeyCheck {
             return;
         }
         value_ = key.read(client_);
+        if (key.kind == Kind::kSpare) {
+            report_.Good(id_, name_, "neither sign-in nor sign-out uses it");
+            return;
+        }
+        suffix_ = key.kind == Kind::kLogout ? ". Sign-in works, sign-out at the provider does not" : "";
         if (value_.empty()) {
             CheckEmpty(key);
             return;
@@ -103,13 +109,11 @@ class KeyCheck {
                 break;
             case Kind::kEndpoint:
             case Kind::kQueried:
+            case Kind::kLogout:
                 CheckEndpoint(key.kind);
                 break;
             case Kind::kRedirectURI:
                 CheckRedirectURI();
-                break;
-            case Kind::kSpare:
-                report_.Good(id_, name_, Quoted(value_) + "; sign-in does not use it");
                 break;
             default:
                 report_.Good(id_, name_, Quoted(value_));
@@ -117,7 +121,9 @@ class KeyCheck {
     }
 
   private:
-    void Finding(const std::string &found, const std::string &remedy) { report_.Finding(id_, name_, found, remedy); }
+    void Finding(const std::string &found, const std::string &remedy) {
+        report_.Finding(id_, name_, found + suffix_, remedy);
+    }
 
     void CheckSwitch() {
         const Json::Value &value = file_.content[name_];
@@ -134,9 +140,7 @@ class KeyCheck {
         const std::string found = !file_.content.isMember(name_) ? "is missing"
                                   : value.isString()             ? "is empty"
                                                                  : "is not a string, so it counts as empty";
-        if (key.kind == Kind::kSpare) {
-            report_.Good(id_, name_, found + "; sign-in does not use it");
-        } else if (id_ == "client.logout_endpoint") {
+        if (key.kind == Kind::kLogout) {
             report_.Note(id_, name_, found + ": signing out ends the session of this machine only",
                          "Set " + name_ + R"( to the "end_session_endpoint" of the discovery document.)");
         } else {
@@ -158,9 +162,11 @@ class KeyCheck {
             report_.Good(id_, name_, Quoted(value_));
             return;
         }
-        Finding(
-            Quoted(value_) + R"( is not a GUID. A token's "tid" always is)",
-            "Set " + name_ + " to " + SourceOf(Kind::kGUID) + R"(, such as "9f3c7a52-1b0e-4d43-8f0a-6c5d4e3f2a1b".)");
+        const std::string tenant = TenantOfAddresses(client_);
+        Finding(Quoted(value_) + R"( is not a GUID. A token's "tid" always is)",
+                "Set " + name_ + " to " +
+                    (tenant.empty() ? SourceOf(Kind::kGUID) + R"(, such as "9f3c7a52-1b0e-4d43-8f0a-6c5d4e3f2a1b".)"
+                                    : Quoted(tenant) + ", the tenant in the addresses."));
     }
 
     void CheckClientID() {
@@ -197,9 +203,10 @@ class KeyCheck {
             Finding(Quoted(value_) + " is not a URL",
                     "Set " + name_ + " to " + SourceOf(kind) + R"(, beginning with "https://".)");
         } else if (address.scheme != "https") {
-            Finding(Quoted(value_) + " is not an https:// URL: others on the network can read secret, codes and tokens",
+            Finding(Quoted(value_) + " is not an https:// URL" +
+                        (kind == Kind::kLogout ? "" : ": others on the network can read secret, codes and tokens"),
                     "Set " + name_ + " to the https:// URL of the provider.");
-        } else if (kind == Kind::kQueried && (!address.query.empty() || !address.fragment.empty())) {
+        } else if (kind != Kind::kEndpoint && (!address.query.empty() || !address.fragment.empty())) {
             Finding(Quoted(value_) + " has a query or a fragment. The library appends a second query",
                     "Set " + name_ + " to " + Quoted(value_.substr(0, value_.find_first_of("?#"))) + ".");
         } else {
@@ -209,13 +216,16 @@ class KeyCheck {
 
     void CheckRedirectURI() {
         const Address address = SplitAddress(value_);
+        const bool isDefaultPort = address.port == (address.scheme == "http" ? "80" : "443");
+        const std::string correct =
+            Quoted("https://" + (address.isValid ? address.host : "HOST") +
+                   (!address.isValid || isDefaultPort ? "" : ':' + address.port) + returnProgram_);
         if (!address.isValid || address.scheme != "https" || !address.fragment.empty()) {
             Finding(Quoted(value_) + " must be an https:// URL without a fragment",
-                    "Set " + name_ + " to the redirect URI that is registered at the provider: https://HOST" +
-                        returnProgram_);
+                    "Set " + name_ + " to " + correct + " here and at the provider.");
         } else if (address.path != returnProgram_) {
             Finding(Quoted(value_) + " is not the address of the return program: its path is " + Quoted(address.path),
-                    "Set " + name_ + " to " + Quoted("https://" + address.host + returnProgram_) +
+                    "Set " + name_ + " to " + correct +
                         " here and at the provider. If the return program has another path, name it with "
                         "--return-program.");
         } else {
@@ -230,6 +240,7 @@ class KeyCheck {
     std::string name_;
     std::string id_;
     std::string value_;
+    std::string suffix_;  // of findings
 };
 
 void ReportIDs(Report &report, RunAs runAs) {
@@ -244,7 +255,7 @@ void ReportIDs(Report &report, RunAs runAs) {
                 report.Finding(kID, kSubject, "cannot be raised to root's to read the file",
                                runAs == RunAs::kRoot
                                    ? "Check for a security module or seccomp filter: aa-status, getenforce."
-                                   : RemedyForRefusal("", runAs));
+                                   : kStartAsRoot);
             }
             return;
         }

@@ -4,6 +4,7 @@
 #include <boost/algorithm/string/join.hpp>
 #include <cctype>
 #include <cerrno>
+#include <cmath>
 #include <optional>
 #include <system_error>
 
@@ -35,19 +36,17 @@ class Diagnostician {
 
     Diagnosis Diagnose() const {
         if (transfer_.isTooLong) {
-            return {"the response is longer than " + std::to_string(kLongestResponse >> 20) + " MiB",
-                    "Compare " + key_ + " with the address that the provider publishes."};
+            return {"the response is longer than " + std::to_string(kLongestResponse >> 20) + " MiB", CompareAddress()};
         }
         if (transfer_.proxyStatus >= 300) {
-            return {"the proxy " + proxy_.value_or(Proxy()).server + " answers HTTP " +
-                        std::to_string(transfer_.proxyStatus),
+            return {"the proxy " + ProxyServer() + " answers HTTP " + std::to_string(transfer_.proxyStatus),
                     ProxyRemedy()};
         }
         switch (transfer_.result) {
             case CURLE_COULDNT_RESOLVE_HOST:
                 return Unresolved();
             case CURLE_COULDNT_RESOLVE_PROXY:
-                return {"the host name of the proxy cannot be resolved", ProxyRemedy()};
+                return {"the host name of the proxy " + ProxyServer() + " cannot be resolved", ProxyRemedy()};
             case CURLE_COULDNT_CONNECT:
                 return NotConnected();
             case CURLE_OPERATION_TIMEDOUT:
@@ -56,6 +55,8 @@ class Diagnostician {
                 return {"no TLS connection: the port is not that of a TLS server, or there is no common TLS version",
                         "Check the port in " + key_ + ". A proxy or firewall that inspects TLS must let " + Host() +
                             " pass."};
+            case CURLE_OUT_OF_MEMORY:
+                return {"memory ran out, or a header of the response is too long", CompareAddress()};
             case CURLE_GOT_NOTHING:
             case CURLE_RECV_ERROR:
             case CURLE_SEND_ERROR:
@@ -68,12 +69,21 @@ class Diagnostician {
     }
 
   private:
+    /// A proxy is connected instead of the provider.
+    std::string Whom() const { return proxy_ ? "the proxy " : ""; }
+
     std::string Host() const { return address_.host + " port " + address_.port; }
 
-    /// The time that passed, in whole seconds.
-    std::string NoAnswer() const {
-        return "no answer within " + std::to_string(static_cast<long>(transfer_.seconds)) + " s";
+    std::string CompareAddress() const {
+        return "Compare " + key_ +
+               " with the address that the provider publishes. If it is correct, report this to the "
+               "provider.";
     }
+
+    /// The time that passed, in whole seconds.
+    std::string NoAnswer() const { return "no answer within " + std::to_string(std::lround(transfer_.seconds)) + " s"; }
+
+    std::string ProxyServer() const { return proxy_ ? proxy_->server : ""; }
 
     std::string ProxyRemedy() const {
         return proxy_ ? "Correct or unset " + proxy_->variable + " (" + proxy_->server +
@@ -98,7 +108,10 @@ class Diagnostician {
     Diagnosis NotConnected() const {
         const std::string reason =
             transfer_.systemError != 0 ? ": " + std::generic_category().message(transfer_.systemError) : "";
-        const std::string cause = "cannot connect to " + (tried_.empty() ? Host() : tried_) + reason;
+        const std::string cause = "cannot connect to " + Whom() + (tried_.empty() ? Host() : tried_) + reason;
+        if (proxy_) {
+            return {cause, ProxyRemedy()};
+        }
         switch (transfer_.systemError) {
             case ENETUNREACH:
             case EHOSTUNREACH:
@@ -123,19 +136,22 @@ class Diagnostician {
                 "Check the name server in /etc/resolv.conf, and allow port 53 outwards in the firewall." + OrProxy()};
         }
         if (transfer_.stage == Stage::kResolved) {
-            return {NoAnswer() + " from " + tried_, "Allow outgoing connections to port " + address_.port +
-                                                        " in the firewall. If an address contains colons, check IPv6: "
-                                                        "ip -6 route." +
-                                                        OrProxy()};
+            return {NoAnswer() + " from " + Whom() + tried_,
+                    "Allow outgoing connections to port " + address_.port +
+                        " in the firewall. If an address contains colons, check IPv6: "
+                        "ip -6 route." +
+                        OrProxy()};
         }
-        return {NoAnswer() + " from " + tried_ + ", which accepts connections",
-                "Run the command again with a longer --timeout. If it repeats, report it to the provider."};
+        return {NoAnswer() + " from " + Whom() + tried_ + ", which accepts connections",
+                "Check the port in " + key_ +
+                    ". If it is correct, run the command again with a longer --timeout. If it repeats, report it to "
+                    "the provider."};
     }
 
     Diagnosis OfTable() const {
         const TAVO::Web::FailureRow *row = TAVO::Web::FindTransfer(transfer_.result);
         return row != nullptr ? Diagnosis{row->cause, WithoutBackticks(row->remedy)}
-                              : Diagnosis{"the transfer failed", "Check " + key_ + " and the network."};
+                              : Diagnosis{"the transfer failed", CompareAddress()};
     }
 
     const Transfer &transfer_;

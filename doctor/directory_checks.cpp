@@ -23,8 +23,10 @@ constexpr char kTableID[] = "directory.table";
 constexpr char kTableSubject[] = "table of domains";
 constexpr std::size_t kMostShown = 5;
 
-constexpr char kRemedy[] =
-    R"(Join the domain and start winbindd, or add the domain to /usr/tavo/etc/domains.conf: {"corp.example.net": "CORP"})";
+std::string RemedyFor(const std::string &domain) {
+    return "Join the domain and start winbindd, or add the domain with its NetBIOS name to " +
+           std::string(kDomainTable) + ": {" + Quoted(domain) + R"(: "NAME"})";
+}
 
 struct Conversion {
     std::string name;  // DOMAIN\user; empty if it failed
@@ -59,8 +61,11 @@ SettingsFile ReadTable(RunAs runAs) {
     if (!file.content.isObject()) {
         const TextProblem mistake = FindMistake(file.text);
         file.content = Json::Value();
-        file.problem = file.path + " is not a JSON object: " +
-                       (mistake.what.empty() ? boost::trim_copy_if(errors, boost::is_any_of("* \n")) : mistake.what);
+        boost::trim_if(errors, boost::is_any_of("* \n"));
+        file.problem = file.path + ' ' +
+                       (errors.empty()         ? "is JSON, but not an object"
+                        : mistake.what.empty() ? "is not JSON: " + errors
+                                               : mistake.what);
         file.remedy = mistake.what.empty() ? R"(Write an object: {"corp.example.net": "CORP"})" : mistake.remedy;
     }
     return file;
@@ -126,9 +131,11 @@ void CheckSource(Report &report, const SettingsFile &table) {
     }
     // The test domain is not the subject.
     const std::string reason = log.substr(log.rfind(", and ") == std::string::npos ? 0 : log.rfind(", and ") + 6);
-    if (table.content.empty()) {
+    if (!table.problem.empty() && !table.isMissing) {
+        report.NotChecked(kID, kSubject, "the table cannot be read, and " + reason);
+    } else if (table.content.empty()) {
         report.Finding(kID, kSubject, "no domain can be converted: the table is empty or missing, and " + reason,
-                       kRemedy);
+                       RemedyFor("corp.example.net"));
     } else {
         report.Note(kID, kSubject, "only the domains of the table are converted: " + reason);
     }
@@ -144,7 +151,7 @@ void CheckDomain(Report &report, const std::string &domainOrUser) {
     const Conversion conversion = Convert(report, user, domain);
     if (conversion.name.empty()) {
         report.Finding(kID, subject, "is not converted" + (conversion.log.empty() ? "" : ": " + conversion.log),
-                       kRemedy);
+                       RemedyFor(domain));
         return;
     }
     const std::string source = TAVO::Platform::FindInDomainTable(domain) ? "the table" : "the directory (winbindd)";

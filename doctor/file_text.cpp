@@ -93,14 +93,14 @@ TextProblem FindMistake(const std::string &text) {
             offset = end - 1;
             continue;
         }
-        const std::string position = PositionOf(text, offset);
+        const std::string position = "is not JSON: " + PositionOf(text, offset);
         if (const NamedCharacter *character = PastedAt(text, offset)) {
             const bool isSpace = boost::contains(character->name, "space");
             return {position + ": " + character->name + " outside a string",
-                    isSpace ? "Replace it by an ordinary blank." : R"(Replace it by an ordinary quotation mark: ")"};
+                    isSpace ? "Replace it by an ordinary blank." : R"(Replace it by an ordinary quotation mark (").)"};
         }
         if (text[offset] == '\'') {
-            return {position + ": single quote", R"(Replace it by a double quotation mark: ")"};
+            return {position + ": single quote", R"(Replace it by a double quotation mark (").)"};
         }
         if (IsTrailingComma(text, offset)) {
             return {position + ": comma after the last member", "Remove the comma."};

@@ -15,7 +15,7 @@ struct TextProblem {
 /// Returns "line L, column C" of a byte, counted in characters from 1.
 std::string PositionOf(const std::string &text, std::size_t offset);
 
-/// Returns why a text is not JSON, if an editor's habit is the cause.
+/// Returns why a text is not JSON, such as "is empty", if an editor's habit is the cause.
 TextProblem FindMistake(const std::string &text);
 
 /// Returns the first byte that is not UTF-8. The library accepts it.

@@ -28,7 +28,8 @@ constexpr char kReturnSubject[] = "return program";
 constexpr char kFolderID[] = "frontend.folder";
 constexpr char kFolderSubject[] = "folder of the front end";
 constexpr char kVar[] = "/usr/tavo/var";
-constexpr long kErrors = 400;  // and above
+constexpr char kStartPage[] = "/index.cgi";  // of the example front end
+constexpr long kErrors = 400;                // and above
 
 struct FreeInterfaces {
     void operator()(ifaddrs *interfaces) const { freeifaddrs(interfaces); }
@@ -82,12 +83,14 @@ bool IsThisMachine(const std::vector<std::string> &addresses) {
     });
 }
 
-void CheckReturnProgram(Report &report, Client &client) {
+/// Checks the return program. Returns whether the example front end runs on this machine: it redirects a HEAD request
+/// to its start page.
+bool CheckReturnProgram(Report &report, Client &client) {
     const std::string url = client->GetRedirectURI();
     const Address address = SplitAddress(url);
     if (!address.isValid || address.scheme != "https") {
         report.NotChecked(kReturnID, kReturnSubject, "the redirect URI has no https:// URL");
-        return;
+        return false;
     }
     const Transfer transfer = RequestHead(report, url);
     if (transfer.addresses.empty() || !IsThisMachine(transfer.addresses)) {
@@ -99,7 +102,7 @@ void CheckReturnProgram(Report &report, Client &client) {
                         ": whether browsers reach this machine is unknown",
                     "If no router or proxy forwards this address to this machine, correct the redirect URI here and at "
                     "the provider.");
-        return;
+        return false;
     }
     report.Good(kHostID, kHostSubject, Quoted(address.host) + " is this machine");
     if (transfer.result != CURLE_OK) {
@@ -117,6 +120,7 @@ void CheckReturnProgram(Report &report, Client &client) {
     } else {
         report.Good(kReturnID, kReturnSubject, "answers HTTP " + std::to_string(transfer.status));
     }
+    return SplitAddress(transfer.location).path == kStartPage;
 }
 
 /// Reports a full or read-only file system.
@@ -153,17 +157,23 @@ bool CheckPrivateFolder(Report &report, const std::string &path, const struct st
     if (!isPrivate) {
         report.Finding(
             kFolderID, kFolderSubject,
-            path + ": " + DescribeRights(status) + ". It must be a folder of mode 0700, and of the owner of " + kVar,
-            "Run: sudo rm -r " + path + ". The front end creates it again.");
+            path + ": " + DescribeRights(status) + "; " + kVar + ": " + DescribeRights(parent) +
+                ". It must be a folder of mode 0700, and both must belong to the user of the web server's programs",
+            "Run: sudo rm -r " + path + ". The front end creates it again." +
+                (parent.st_uid == 0 ? ""
+                                    : std::string(" If the programs run as root, also run: sudo chown root ") + kVar));
     }
     return isPrivate;
 }
 
-void CheckFolders(Report &report) {
+void CheckFolders(Report &report, bool isRequired) {
     struct stat status = {};
     if (lstat(kVar, &status) != 0) {
-        report.Note(kFolderID, kFolderSubject, std::string(kVar) + ": " + std::generic_category().message(errno),
-                    std::string("For the example front end, run: sudo install -d -m 0755 ") + kVar);
+        report.Add(
+            {kFolderID, kFolderSubject, isRequired ? Mark::kFinding : Mark::kNote,
+             std::string(kVar) + ": " + std::generic_category().message(errno),
+             std::string(isRequired ? "Run" : "For the example front end, run") + ": sudo install -d -m 0755 " + kVar,
+             ""});
         return;
     }
     if (!S_ISDIR(status.st_mode) || (status.st_mode & (S_IWGRP | S_IWOTH)) != 0) {
@@ -188,8 +198,8 @@ void CheckFolders(Report &report) {
 
 void CheckFrontEnd(Report &report, Client &client) {
     report.Section("Front end");
-    CheckReturnProgram(report, client);
-    CheckFolders(report);
+    const bool isExample = CheckReturnProgram(report, client);
+    CheckFolders(report, isExample);
 }
 
 }  // namespace Doctor

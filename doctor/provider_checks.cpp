@@ -10,6 +10,7 @@
 #include "doctor/answer.h"
 #include "doctor/azure_checks.h"
 #include "doctor/checks.h"
+#include "doctor/explain.h"
 #include "doctor/key_set.h"
 #include "doctor/provider_errors.h"
 #include "doctor/transfer_checks.h"
@@ -24,12 +25,20 @@ namespace {
 constexpr long kSuccess = 200;
 constexpr long kUnauthorized = 401;
 constexpr long kRefusals = 400;  // and above
+constexpr long kNotFound = 404;
 
 // No provider issues these.
 constexpr char kTestCode[] = "tavosso-doctor-made-this-up";
 constexpr char kTestSecret[] = "tavosso-doctor-made-this-up-too";
 
 constexpr char kWellknownPath[] = "/.well-known/openid-configuration";
+
+const std::string kWait = "Wait until the provider works again. The settings of this machine are not the cause.";
+
+/// The beginning of a remedy for a redirect.
+std::string NotFollowed(const Transfer &transfer) {
+    return transfer.location.empty() ? "" : "The library does not follow redirects. ";
+}
 
 std::size_t Append(char *bytes, std::size_t size, std::size_t count, void *response) {
     static_cast<std::string *>(response)->append(bytes, size * count);
@@ -57,20 +66,23 @@ class ProviderCheck {
         : report_(report), client_(client), prefix_(NameOf(client.profile()) + '_'), transfers_(report) {}
 
     void Run() {
-        report_.Section("Provider");
+        report_.Section("Network");
         if (!transfers_.CheckMachine(client_->GetTokenEndpoint())) {
             report_.NotChecked("discovery.reachable", "provider", "no certificate can be verified");
             return;
         }
-        CheckDiscovery();
         if (client_.Azure() != nullptr) {
-            CheckTenantOfIssuer(report_, client_, TAVO::Web::StringMember(discovery_, "issuer"));
-        }
-        CheckAuthorization();
-        if (client_.Azure() != nullptr) {
+            CheckDiscovery(Mark::kFinding);
+            CheckTenantOfIssuer(report_, client_, Published("issuer"));
+            CheckAuthorization();
             CheckKeys();
+            CheckTokenEndpoint();
+        } else {
+            CheckAuthorization();
+            CheckTokenEndpoint();
+            // Last: a host that does not answer is not asked again, and WebSphere's logins do not use the document.
+            CheckDiscovery(Mark::kNote);
         }
-        CheckTokenEndpoint();
     }
 
   private:
@@ -91,31 +103,34 @@ class ProviderCheck {
         return fetched;
     }
 
-    void CheckDiscovery() {
-        constexpr char kSubject[] = "discovery document";
+    /// A document that is only compared with the file is not a finding if it cannot be fetched.
+    void CheckDiscovery(Mark mark) {
+        report_.Section("Discovery document");
+        const std::string subject = mark == Mark::kNote ? "discovery document (unused)" : "discovery document";
         const std::string address = client_->GetWellknownEndpoint();
         if (address.empty()) {
-            report_.NotChecked("discovery.reachable", kSubject, prefix_ + "wellknown is not set");
+            report_.NotChecked("discovery.reachable", subject, prefix_ + "wellknown is not set");
             return;
         }
         client_->RequestWellknownInfo(discovery_);
         const Transfer transfer = LastTransfer(report_);
-        if (!transfers_.Check("discovery", kSubject, prefix_ + "wellknown", transfer)) {
+        if (!transfers_.Check("discovery", subject, prefix_ + "wellknown", transfer, mark)) {
             return;
         }
         const bool isDocument =
             discovery_.isObject() && (discovery_.isMember("issuer") || discovery_.isMember("jwks_uri") ||
                                       discovery_.isMember("authorization_endpoint"));
         if (!isDocument || transfer.status != kSuccess) {
-            report_.Finding(
-                "discovery.document", kSubject,
-                address + " returns no discovery document: " + DescribeAnswer(transfer, Fetch(address).content),
-                RemedyForDiscovery(transfer, address));
+            report_.Add(
+                {"discovery.document", subject, mark,
+                 address + " returns no discovery document: " + DescribeAnswer(transfer, Fetch(address).content),
+                 RemedyForDiscovery(transfer, address), ""});
+            discovery_ = Json::Value();
             return;
         }
         CheckIssuer();
-        CheckEndpoint("authorization_endpoint", client_->GetAuthEndpoint());
-        CheckEndpoint("token_endpoint", client_->GetTokenEndpoint());
+        CheckEndpoint("authorization_endpoint", client_->GetAuthEndpoint(), mark);
+        CheckEndpoint("token_endpoint", client_->GetTokenEndpoint(), mark);
         if (!client_->GetLogoutEndpoint().empty()) {
             // An organisation may have its own logout page.
             CheckEndpoint("end_session_endpoint", client_->GetLogoutEndpoint(), Mark::kNote);
@@ -130,19 +145,21 @@ class ProviderCheck {
 
     std::string RemedyForDiscovery(const Transfer &transfer, const std::string &address) {
         if (IsProvidersError(transfer)) {
-            return "Wait until the provider works again. The settings of this machine are not the cause.";
+            return kWait;
         }
-        const std::string published = FindDiscovery(address);
-        return published.empty() ? "Copy the address of the discovery document from the provider. It usually ends in " +
-                                       std::string(kWellknownPath)
-                                 : "Set " + prefix_ + "wellknown to " + Quoted(published);
+        const std::string published = FindDiscovery(address, transfer.location);
+        if (!published.empty()) {
+            return "Set " + prefix_ + "wellknown to " + Quoted(published);
+        }
+        return NotFollowed(transfer) +
+               "Copy the address of the discovery document from the provider. It usually ends in " + kWellknownPath;
     }
 
     /// Tries the usual variants of an address. Returns the one of a discovery document, or an empty text.
-    std::string FindDiscovery(const std::string &address) {
+    std::string FindDiscovery(const std::string &address, const std::string &location) {
         const std::string base = WithoutTrailingSlashes(address);
         const std::string issuer = WithoutTrailingSlashes(TAVO::Web::StringMember(discovery_, "issuer"));
-        for (const std::string &variant : {base, base + kWellknownPath, issuer + kWellknownPath}) {
+        for (const std::string &variant : {base, base + kWellknownPath, issuer + kWellknownPath, location}) {
             const bool isNew = variant != address && boost::istarts_with(variant, "https://");
             if (isNew && IsDiscoveryDocument(TAVO::Web::ParseObject(Fetch(variant).content))) {
                 return variant;
@@ -166,13 +183,15 @@ class ProviderCheck {
         }
     }
 
-    void CheckEndpoint(const std::string &member, const std::string &configured, Mark mark = Mark::kFinding) {
+    void CheckEndpoint(const std::string &member, const std::string &configured, Mark mark) {
         const std::string published = TAVO::Web::StringMember(discovery_, member.c_str());
         const std::string id = "discovery." + member;
         if (published.empty()) {
             report_.Note(id, member, "the provider does not publish it");
         } else if (published == configured) {
             report_.Good(id, member, "as configured");
+        } else if (client_.Azure() != nullptr && !DoAddressesAgree(client_)) {
+            report_.NotChecked(id, member, "the addresses in the file do not agree");
         } else {
             report_.Add({id, member, mark,
                          "the provider publishes " + Quoted(published) + ", the file has " + Quoted(configured),
@@ -233,19 +252,50 @@ class ProviderCheck {
         constexpr char kID[] = "authorization_endpoint.request";
         constexpr char kSubject[] = "first request of a login";
         const Transfer &transfer = fetched.transfer;
-        const auto error = TAVO::Web::OnlyValue(TAVO::Web::ParseQuery(SplitAddress(transfer.location).query), "error");
-        if (transfer.status < kRefusals && !error) {
+        const auto query = TAVO::Web::ParseQuery(SplitAddress(transfer.location).query);
+        const std::string error = TAVO::Web::OnlyValue(query, "error").value_or("");
+        if (transfer.status < kRefusals && error.empty()) {
             report_.Good(kID, kSubject, "not rejected: HTTP " + std::to_string(transfer.status));
             return;
         }
+        Json::Value answer;
+        answer["error"] = error;
+        answer["error_description"] = TAVO::Web::OnlyValue(query, "error_description").value_or("");
         report_.Finding(
             kID, kSubject,
-            "the provider rejects it: " + (error ? Quoted(*error) : DescribeAnswer(transfer, fetched.content)),
-            IsProvidersError(transfer)
-                ? "Wait until the provider works again. The settings of this machine are not the cause."
-                : "Compare the client id, and " + Quoted(client_->GetRedirectURI()) +
-                      ", with those registered at the provider. For the provider's error page, run: sudo "
-                      "tavosso-doctor login");
+            error.empty() ? "the provider rejects it: " + DescribeAnswer(transfer, fetched.content) : ErrorText(answer),
+            RemedyForAuthorization(transfer, ErrorText(answer)));
+    }
+
+    std::string RemedyForAuthorization(const Transfer &transfer, const std::string &error) {
+        constexpr char kMember[] = "authorization_endpoint";
+        if (IsProvidersError(transfer)) {
+            return kWait;
+        }
+        if (const TAVO::Web::FailureRow *row = FindProviderError(error)) {
+            return WithoutBackticks(row->remedy);
+        }
+        if (transfer.status == kNotFound && Published(kMember) != client_->GetAuthEndpoint()) {
+            return SetEndpoint(kMember);
+        }
+        return "Compare the client id, and " + Quoted(client_->GetRedirectURI()) +
+               ", with those registered at the provider. For the provider's error page, run: sudo tavosso-doctor login";
+    }
+
+    /// Returns an address of the discovery document. Fetches the document for WebSphere, whose logins do not use it.
+    std::string Published(const char *member) {
+        if (client_.Azure() == nullptr && discovery_.isNull() && !client_->GetWellknownEndpoint().empty()) {
+            client_->RequestWellknownInfo(discovery_);
+            LastTransfer(report_);
+        }
+        return TAVO::Web::StringMember(discovery_, member);
+    }
+
+    std::string SetEndpoint(const std::string &member) {
+        const std::string published = Published(member.c_str());
+        return published.empty()
+                   ? "Set " + prefix_ + member + " to the \"" + member + "\" of the provider's discovery document."
+                   : "Set " + prefix_ + member + " to " + Quoted(published);
     }
 
     void CheckKeys() {
@@ -272,8 +322,11 @@ class ProviderCheck {
         } else {
             report_.Finding("keys.set", kSubject,
                             address + " returns no key set: " + DescribeAnswer(transfer, Fetch(address).content),
-                            "Check that azure_wellknown is the address of your provider's discovery document. If it "
-                            "is, report this to the provider.");
+                            IsProvidersError(transfer)
+                                ? kWait
+                                : NotFollowed(transfer) +
+                                      "Check that azure_wellknown is the address of your provider's discovery "
+                                      "document. If it is, report this to the provider.");
         }
     }
 
@@ -297,30 +350,32 @@ class ProviderCheck {
                     LibraryOn(response)};
         const Json::Value answer = TAVO::Web::ParseObject(response);
         const std::string error = TAVO::Web::StringMember(answer, "error");
+        const TAVO::Web::FailureRow *row = FindProviderError(ErrorText(answer));
         check.found = ErrorText(answer);
         if (IsProvidersError(transfer)) {
             check.found = DescribeAnswer(transfer, response);
-            check.remedy = "Wait until the provider works again. The settings of this machine are not the cause.";
+            check.remedy = kWait;
         } else if (error.empty()) {
             check.found = "this is not a token endpoint: " + DescribeAnswer(transfer, response);
-            check.remedy = "Set " + prefix_ + R"(token_endpoint to the "token_endpoint" of the discovery document)" +
-                           PublishedTokenEndpoint();
+            check.remedy = NotFollowed(transfer) +
+                           (Published("token_endpoint") == client_->GetTokenEndpoint()
+                                ? "The discovery document has the same address. Report this to the provider."
+                                : SetEndpoint("token_endpoint"));
+        } else if (error == "invalid_grant") {
+            ReportRejectedCode(check, error);
+        } else if (row != nullptr && row->texts.front() != error) {
+            check.remedy = WithoutBackticks(row->remedy);  // a code of Azure AD in the description
         } else if (error == "invalid_client" || error == "unauthorized_client") {
             check.remedy = "Compare " + prefix_ +
                            "client_id with the provider's. If it is correct, create a new client "
                            "secret there, which may have expired, and set " +
                            prefix_ + "client_secret to it. The provider must accept client_secret_post.";
-        } else if (IsKnown(error) && error != "invalid_grant" && error != "invalid_request") {
-            check.remedy = "Run: tavosso-doctor explain " + Quoted(error);
+        } else if (row != nullptr && error != "invalid_request") {
+            check.remedy = WithoutBackticks(row->remedy);
         } else {
             ReportRejectedCode(check, error);
         }
         report_.Add(check);
-    }
-
-    std::string PublishedTokenEndpoint() const {
-        const std::string published = TAVO::Web::StringMember(discovery_, "token_endpoint");
-        return published.empty() ? "" : ": " + Quoted(published);
     }
 
     /// The provider rejected the test code: by `invalid_grant`, or by a word of its own.

@@ -109,12 +109,6 @@ const std::vector<TAVO::Web::FailureRow> &ProviderErrors() {
     return errors;
 }
 
-bool IsKnown(const std::string &code) {
-    const std::vector<TAVO::Web::FailureRow> &errors = ProviderErrors();
-    return std::any_of(errors.begin(), errors.end(),
-                       [&](const TAVO::Web::FailureRow &error) { return error.texts.front() == code; });
-}
-
 bool ContainsCode(const std::string &text, const std::string &code) {
     const std::size_t begin = boost::to_lower_copy(text).find(boost::to_lower_copy(code));
     if (begin == std::string::npos) {
@@ -122,6 +116,15 @@ bool ContainsCode(const std::string &text, const std::string &code) {
     }
     const std::size_t end = begin + code.size();
     return (begin == 0 || !IsWordCharacter(text[begin - 1])) && (end == text.size() || !IsWordCharacter(text[end]));
+}
+
+const TAVO::Web::FailureRow *FindProviderError(const std::string &text) {
+    // The codes of Azure AD are last. They accompany one of OAuth 2.0.
+    const std::vector<TAVO::Web::FailureRow> &errors = ProviderErrors();
+    const auto error = std::find_if(errors.rbegin(), errors.rend(), [&](const TAVO::Web::FailureRow &row) {
+        return ContainsCode(text, row.texts.front());
+    });
+    return error != errors.rend() ? &*error : nullptr;
 }
 
 std::string ReasonOfSentence(const std::string &sentence) {

@@ -11,10 +11,11 @@ namespace Doctor {
 /// Error codes of OAuth 2.0, OpenID Connect and Azure AD. `type` is the source of the description.
 const std::vector<TAVO::Web::FailureRow> &ProviderErrors();
 
-bool IsKnown(const std::string &code);
-
 /// Returns whether a text contains an error code as a word, in any case.
 bool ContainsCode(const std::string &text, const std::string &code);
+
+/// Returns the row of the most specific error code in a text, or null.
+const TAVO::Web::FailureRow *FindProviderError(const std::string &text);
 
 /// Returns the text to look up for a sentence that only the script of the relay page has; empty for other texts.
 std::string ReasonOfSentence(const std::string &sentence);

@@ -75,6 +75,21 @@ std::string ProblemOf(const std::string &text, Json::Value &content) {
 
 #pragma GCC diagnostic pop
 
+/// What to do if the rights of this process do not suffice to read a file. `refusing` is the file or a folder above it.
+std::string RemedyForRefusal(const std::string &path, const std::string &refusing, RunAs runAs) {
+    if (runAs == RunAs::kOrdinaryUser) {
+        return "Run: sudo tavosso-doctor";
+    }
+    if (runAs == RunAs::kRoot) {
+        return "Compare: namei -l " + path +
+               ". If the modes allow root, a security module refuses: check aa-status, getenforce and the system log.";
+    }
+    if (refusing != path) {
+        return "Run: sudo chmod a+rx " + refusing;
+    }
+    return path == kAzureFile || path == kWebSphereFile ? kStartAsRoot : "Run: sudo chmod a+r " + path;
+}
+
 void ExplainError(SettingsFile &file, int error, RunAs runAs) {
     const std::string page = "tavosso-" + file.path.substr(file.path.rfind('/') + 1);
     if (error == ENOENT) {
@@ -91,24 +106,11 @@ void ExplainError(SettingsFile &file, int error, RunAs runAs) {
         if (stat(refusing.c_str(), &status) == 0) {
             file.problem += "; " + refusing + " refuses: " + DescribeRights(status);
         }
-        file.remedy = RemedyForRefusal(file.path, runAs);
+        file.remedy = RemedyForRefusal(file.path, refusing, runAs);
     }
 }
 
 }  // namespace
-
-std::string RemedyForRefusal(const std::string &path, RunAs runAs) {
-    switch (runAs) {
-        case RunAs::kOrdinaryUser:
-            return "Run: sudo tavosso-doctor";
-        case RunAs::kChosenUser:
-            return "Start the programs of the web server as root, or with root as saved user and group id.";
-        case RunAs::kRoot:
-            break;
-    }
-    return "Compare: namei -l " + path +
-           ". If the modes allow root, a security module refuses: check aa-status, getenforce and the system log.";
-}
 
 SettingsFile ReadTextFile(const std::string &path, RunAs runAs) {
     SettingsFile file;
@@ -133,9 +135,7 @@ SettingsFile ReadSettingsFile(const std::string &path, RunAs runAs) {
     if (!problem.empty()) {
         const TextProblem mistake = FindMistake(file.text);
         file.content = Json::Value();
-        file.problem = path + (mistake.what.empty()                       ? " " + problem
-                               : boost::starts_with(mistake.what, "line") ? " is not JSON: " + mistake.what
-                                                                          : " " + mistake.what);
+        file.problem = path + ' ' + (mistake.what.empty() ? problem : mistake.what);
         file.remedy = mistake.what.empty() ? "Correct this place. The library treats the file as missing."
                                            : mistake.remedy + " The library treats the file as missing.";
     }

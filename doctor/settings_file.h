@@ -31,8 +31,9 @@ struct SettingsFile {
     std::string remedy;
 };
 
-/// What to do if the rights of this process do not suffice to read a file.
-std::string RemedyForRefusal(const std::string &path, RunAs runAs);
+/// The remedy if a program without root's rights reads the client's file.
+constexpr char kStartAsRoot[] =
+    "Start the programs of the web server as root, or with root as saved user and group id.";
 
 /// Reads the text only.
 SettingsFile ReadTextFile(const std::string &path, RunAs runAs);

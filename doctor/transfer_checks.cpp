@@ -91,7 +91,11 @@ Rejection WhyRejected(const Transfer &transfer, const std::vector<Certificate> &
         case X509_V_ERR_UNABLE_TO_GET_ISSUER_CERT:
         case X509_V_ERR_UNABLE_TO_GET_ISSUER_CERT_LOCALLY:
         case X509_V_ERR_UNABLE_TO_VERIFY_LEAF_SIGNATURE:
-            return {"its authority is unknown to this machine", kAddAuthority};
+            return {"its authority is unknown to this machine",
+                    std::string(kAddAuthority) +
+                        (chain.size() == 1 ? ". The server sends no intermediate certificate. If the authority is a "
+                                             "public one, the provider must add it."
+                                           : "")};
         default:
             return {X509_verify_cert_error_string(transfer.verification),
                     "The provider must replace the certificate. Send this line to the provider."};
@@ -153,7 +157,7 @@ bool TransferChecks::CheckAuthorities() {
 }
 
 bool TransferChecks::Check(const std::string &id, const std::string &subject, const std::string &key,
-                           const Transfer &transfer) {
+                           const Transfer &transfer, Mark mark) {
     if (transfer.isSkipped) {
         report_.NotChecked(id + ".reachable", subject,
                            SplitAddress(transfer.url).host + " did not answer an earlier request");
@@ -161,39 +165,39 @@ bool TransferChecks::Check(const std::string &id, const std::string &subject, co
     }
     if (transfer.result == CURLE_OK) {
         report_.Good(id + ".reachable", subject, transfer.url);
-        CheckExpiry(id, transfer);
+        CheckExpiry(id, transfer, mark);
         CheckClock(transfer);
         return true;
     }
     if (transfer.result == CURLE_PEER_FAILED_VERIFICATION) {
-        ReportRejectedCertificate(id, key, transfer);
+        ReportRejectedCertificate(id, key, transfer, mark);
         report_.NotChecked(id + ".reachable", subject, "the certificate is rejected");
         return false;
     }
     const Diagnosis diagnosis = Diagnose(transfer, key);
-    report_.Finding(id + ".reachable", subject, transfer.url + ": " + diagnosis.cause + " (" + transfer.error + ")",
-                    diagnosis.remedy);
+    report_.Add({id + ".reachable", subject, mark, transfer.url + ": " + diagnosis.cause + " (" + transfer.error + ")",
+                 diagnosis.remedy, ""});
     return false;
 }
 
-void TransferChecks::ReportRejectedCertificate(const std::string &id, const std::string &key,
-                                               const Transfer &transfer) {
+void TransferChecks::ReportRejectedCertificate(const std::string &id, const std::string &key, const Transfer &transfer,
+                                               Mark mark) {
     const Transfer unverified = FetchUnverified(report_, transfer.url);
     const std::vector<Certificate> &chain = unverified.certificates;
     if (chain.empty()) {
-        report_.Finding(id + ".certificate", kCertificateSubject, transfer.error + "; " + ThisClock(),
-                        "Report this to the provider.");
+        report_.Add({id + ".certificate", kCertificateSubject, mark, transfer.error + "; " + ThisClock(),
+                     "Report this to the provider.", ""});
         return;
     }
     const Rejection rejection = WhyRejected(transfer, chain, key);
     if (reportedCertificates_.insert(Describe(chain.front())).second) {
-        report_.Finding(id + ".certificate", kCertificateSubject,
-                        rejection.cause + "; " + Describe(chain.front()) + "; " + ThisClock(), rejection.remedy);
+        report_.Add({id + ".certificate", kCertificateSubject, mark,
+                     rejection.cause + "; " + Describe(chain.front()) + "; " + ThisClock(), rejection.remedy, ""});
     }
     CheckClock(unverified);
 }
 
-void TransferChecks::CheckExpiry(const std::string &id, const Transfer &transfer) {
+void TransferChecks::CheckExpiry(const std::string &id, const Transfer &transfer, Mark mark) {
     if (transfer.certificates.empty()) {
         return;  // without TLS, which is a finding of the file
     }
@@ -204,8 +208,8 @@ void TransferChecks::CheckExpiry(const std::string &id, const Transfer &transfer
     const long left = first.expires - std::time(nullptr);
     const std::string found = Describe(first) + ", " + std::to_string(left / kDay) + " days left";
     if (first.expires != -1 && left < kSoon) {
-        report_.Finding(id + ".certificate", kCertificateSubject, found + "; " + ThisClock(),
-                        "The provider must renew the certificate before it expires. Every login fails afterwards.");
+        report_.Add({id + ".certificate", kCertificateSubject, mark, found + "; " + ThisClock(),
+                     "The provider must renew the certificate before it expires.", ""});
     } else {
         report_.Good(id + ".certificate", kCertificateSubject, found);
     }

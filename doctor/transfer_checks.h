@@ -20,15 +20,16 @@ class TransferChecks {
     /// Reports a proxy, and whether this machine has certificate authorities. Returns the latter.
     bool CheckMachine(const std::string &url);
 
-    /// Reports why there was no response, or the certificate. `key` is the setting with the address. Returns whether
-    /// there was a response.
-    bool Check(const std::string &id, const std::string &subject, const std::string &key, const Transfer &transfer);
+    /// Reports why there was no response, or the certificate. `key` is the setting with the address. A failure that
+    /// does not affect sign-in is a note. Returns whether there was a response.
+    bool Check(const std::string &id, const std::string &subject, const std::string &key, const Transfer &transfer,
+               Mark mark = Mark::kFinding);
 
   private:
     void CheckProxy(const std::string &url);
     bool CheckAuthorities();
-    void ReportRejectedCertificate(const std::string &id, const std::string &key, const Transfer &transfer);
-    void CheckExpiry(const std::string &id, const Transfer &transfer);
+    void ReportRejectedCertificate(const std::string &id, const std::string &key, const Transfer &transfer, Mark mark);
+    void CheckExpiry(const std::string &id, const Transfer &transfer, Mark mark);
     void CheckClock(const Transfer &transfer);
 
     Report &report_;

@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 #include <netdb.h>
 #include <sys/socket.h>
+#include <unistd.h>
 
 #include <boost/algorithm/string/predicate.hpp>
 #include <chrono>
@@ -22,6 +23,8 @@ std::vector<std::string> logLines;
 std::vector<Transfer> transfers;
 TransferRules rules;
 int refusals = 0;
+
+constexpr long kRefusals = 300;  // and above, of a proxy
 
 std::set<std::string> silentHosts;
 
@@ -64,6 +67,19 @@ curl_socket_t OpenSocket(void *watched, curlsocktype /*purpose*/, curl_sockaddr 
         static_cast<Watched *>(watched)->transfer.addresses.push_back(std::string(host) + " port " + port);
     }
     return socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
+}
+
+/// The transfer whose sockets are being closed; null for the connections that libcurl keeps until the end.
+Transfer *connecting = nullptr;
+
+/// Closes a socket, and records whether it was connected. libcurl does not report this if TLS fails.
+int CloseSocket(void * /*unused*/, curl_socket_t closed) {
+    sockaddr_storage peer = {};
+    socklen_t length = sizeof peer;
+    if (connecting != nullptr && getpeername(closed, reinterpret_cast<sockaddr *>(&peer), &length) == 0) {
+        connecting->isConnected = true;
+    }
+    return close(closed);
 }
 
 Certificate ReadCertificate(const curl_slist *fields) {
@@ -122,12 +138,10 @@ class Progress {
 };
 
 Stage StageOf(CURL *handle, const Transfer &transfer) {
-    curl_off_t connected = 0;
     curl_off_t secured = 0;
-    curl_easy_getinfo(handle, CURLINFO_CONNECT_TIME_T, &connected);
     curl_easy_getinfo(handle, CURLINFO_APPCONNECT_TIME_T, &secured);
     return secured > 0                   ? Stage::kSecured
-           : connected > 0               ? Stage::kConnected
+           : transfer.isConnected        ? Stage::kConnected
            : !transfer.addresses.empty() ? Stage::kResolved
                                          : Stage::kBegun;
 }
@@ -145,9 +159,10 @@ void ReadResult(CURL *handle, Transfer &transfer) {
     transfer.stage = StageOf(handle, transfer);
 }
 
-bool IsSilence(CURLcode result) {
-    return result == CURLE_COULDNT_RESOLVE_HOST || result == CURLE_COULDNT_RESOLVE_PROXY ||
-           result == CURLE_COULDNT_CONNECT || result == CURLE_OPERATION_TIMEDOUT;
+bool IsSilence(const Transfer &transfer) {
+    return transfer.result == CURLE_COULDNT_RESOLVE_HOST || transfer.result == CURLE_COULDNT_RESOLVE_PROXY ||
+           transfer.result == CURLE_COULDNT_CONNECT || transfer.result == CURLE_OPERATION_TIMEDOUT ||
+           transfer.proxyStatus >= kRefusals;
 }
 
 void Run(CURL *handle, Watched &watched) {
@@ -165,10 +180,13 @@ void Run(CURL *handle, Watched &watched) {
     curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 0L);
     curl_easy_setopt(handle, CURLOPT_OPENSOCKETFUNCTION, OpenSocket);
     curl_easy_setopt(handle, CURLOPT_OPENSOCKETDATA, &watched);
+    curl_easy_setopt(handle, CURLOPT_CLOSESOCKETFUNCTION, CloseSocket);
     const Progress progress(transfer.url);
     const auto begin = std::chrono::steady_clock::now();
     static const auto perform = reinterpret_cast<CURLcode (*)(CURL *)>(dlsym(RTLD_NEXT, "curl_easy_perform"));
+    connecting = &transfer;
     transfer.result = perform(handle);
+    connecting = nullptr;
     transfer.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
     transfer.error = *error != '\0' ? error : curl_easy_strerror(transfer.result);
     curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, nullptr);
@@ -186,7 +204,7 @@ CURLcode Perform(CURL *handle) {
         transfer.result = CURLE_ABORTED_BY_CALLBACK;
     } else {
         Run(handle, watched);
-        if (IsSilence(transfer.result)) {
+        if (IsSilence(transfer)) {
             silentHosts.insert(host);
         }
     }

@@ -29,6 +29,7 @@ struct Transfer {
     long verification = 0;               // OpenSSL's result for the certificate
     long proxyStatus = 0;                // of the proxy's response to CONNECT
     std::vector<std::string> addresses;  // to which a connection was tried
+    bool isConnected = false;            // also if TLS failed
     Stage stage = Stage::kBegun;
     bool isSkipped = false;  // the host did not answer an earlier transfer
     bool isTooLong = false;  // the response exceeds the limit

@@ -193,9 +193,9 @@ void KeepSecret(const std::string &text, std::size_t piece) {
     }
 }
 
-namespace {
-
-DoctorRun RunCommand(const Strings &words, const std::string &input) {
+DoctorRun RunDoctor(const Strings &arguments, const std::string &input, const Strings &through) {
+    Strings words = With(through, TAVOSSO_DOCTOR);
+    words.insert(words.end(), arguments.begin(), arguments.end());
     const int in = MakeFile(input);
     const int out = MakeFile();
     const int errors = MakeFile();
@@ -210,20 +210,6 @@ DoctorRun RunCommand(const Strings &words, const std::string &input) {
     run.errors = ReadFile(errors);
     ExpectHarmless(run);
     return run;
-}
-
-}  // namespace
-
-DoctorRun RunDoctor(const Strings &arguments, const std::string &input) {
-    Strings words{TAVOSSO_DOCTOR};
-    words.insert(words.end(), arguments.begin(), arguments.end());
-    return RunCommand(words, input);
-}
-
-DoctorRun RunDoctorThrough(const Strings &command, const Strings &arguments) {
-    Strings words = With(command, TAVOSSO_DOCTOR);
-    words.insert(words.end(), arguments.begin(), arguments.end());
-    return RunCommand(words, "");
 }
 
 Check Report::Find(const std::string &id, const std::string &mark) const {
@@ -261,8 +247,8 @@ Check OnlyFinding(const Strings &arguments) {
     return report.FirstFinding();
 }
 
-Report AskMachine(const Strings &arguments, const std::string &input) {
-    const DoctorRun run = RunDoctor(With(arguments, "--json"), input);
+Report AskMachine(const Strings &arguments, const std::string &input, const Strings &through) {
+    const DoctorRun run = RunDoctor(With(arguments, "--json"), input, through);
     EXPECT_EQ(run.errors, "");
     Report report;
     report.status = run.status;

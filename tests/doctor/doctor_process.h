@@ -24,11 +24,9 @@ struct DoctorRun {
 /// by chance.
 void KeepSecret(const std::string &text, std::size_t piece = 12);
 
-/// Runs the doctor without a terminal. Fails the test if it prints a secret or a control character.
-DoctorRun RunDoctor(const Strings &arguments, const std::string &input = "");
-
-/// Runs the doctor through another command.
-DoctorRun RunDoctorThrough(const Strings &command, const Strings &arguments = {});
+/// Runs the doctor without a terminal, perhaps through another command. Fails the test if it prints a secret or a
+/// control character.
+DoctorRun RunDoctor(const Strings &arguments, const std::string &input = "", const Strings &through = {});
 
 /// One check of a report.
 struct Check {
@@ -64,7 +62,7 @@ Report Ask(const Strings &arguments, const std::string &input = "");
 Check OnlyFinding(const Strings &arguments = {});
 
 /// Runs the doctor only with --json, for tests with many runs.
-Report AskMachine(const Strings &arguments, const std::string &input = "");
+Report AskMachine(const Strings &arguments, const std::string &input = "", const Strings &through = {});
 
 /// Returns the library's text in the report of a token. Empty if the library accepts it.
 std::string LibraryIn(const Report &report);

@@ -18,6 +18,7 @@ using ::testing::AllOf;
 using ::testing::Contains;
 using ::testing::Each;
 using ::testing::ElementsAre;
+using ::testing::EndsWith;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
@@ -25,20 +26,12 @@ using ::testing::StartsWith;
 
 constexpr char kHost[] = "IP:127.0.0.1";
 constexpr std::time_t kHour = 3600;
-constexpr std::time_t kDay = 24 * kHour;
 
 std::string TimeText(const char *format, std::time_t time) {
     char text[64];
     std::tm utc{};
     gmtime_r(&time, &utc);
     return {text, std::strftime(text, sizeof text, format, &utc)};
-}
-
-Credentials CertificateUntil(std::time_t time) {
-    CertificateText text;
-    text.alternativeName = kHost;
-    text.notAfter = TimeText("%Y%m%d%H%M%SZ", time);
-    return Certify(text, &Authority());
 }
 
 /// A key set with these keys.
@@ -52,25 +45,6 @@ std::string KeysOf(std::initializer_list<Json::Value> keys) {
 
 Json::Value GoodKey() { return ProviderKey().JWK(kKeyID); }
 
-TEST(ProviderCertificate, ReportsCertificateThatExpiresSoon) {
-    const Appliance appliance(Profile::kAzure, CertificateUntil(std::time(nullptr) + 5 * kDay + kHour));
-    const Report report = Ask({});
-    EXPECT_THAT(report.Findings(), ElementsAre("discovery.certificate")) << "once per certificate";
-    EXPECT_THAT(report.FirstFinding().found, HasSubstr(", 5 days left"));
-}
-
-TEST(ProviderCertificate, ReportsAuthorityThatExpiresSoon) {
-    CertificateText text = AuthorityText("Intermediate authority");
-    text.notAfter = TimeText("%Y%m%d%H%M%SZ", std::time(nullptr) + 3 * kDay + kHour);
-    const Credentials intermediate = Certify(text, &Authority());
-    CertificateText own;
-    own.alternativeName = kHost;
-    Credentials server = Certify(own, &intermediate);
-    server.intermediate = intermediate.certificate;
-    const Appliance appliance(Profile::kAzure, server);
-    EXPECT_THAT(OnlyFinding().found, AllOf(HasSubstr("Intermediate authority"), HasSubstr(", 3 days left")));
-}
-
 TEST(ProviderCertificate, AcceptsMissingEndDate) {
     CertificateText text;
     text.alternativeName = kHost;
@@ -79,23 +53,12 @@ TEST(ProviderCertificate, AcceptsMissingEndDate) {
     EXPECT_THAT(Ask({}).Findings(), IsEmpty());
 }
 
-TEST(ProviderCertificate, ReportsExpiredCertificate) {
-    const Appliance appliance(Profile::kAzure, ExpiredCertificateFor(kHost));
-    EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").found, HasSubstr("it expired on 2"));
-}
-
-TEST(ProviderCertificate, ReportsHostsOfCertificate) {
-    const Appliance appliance(Profile::kAzure, CertificateFor("DNS:localhost"));
-    EXPECT_THAT(Ask({}).Find("discovery.certificate", "finding").found,
-                HasSubstr("the host name \"127.0.0.1\" is not among its names: DNS:localhost"));
-}
-
 TEST(ProviderCertificate, SendsNoSecretIfRejected) {
     for (const Credentials &credentials : {SelfSignedCertificateFor(kHost), ExpiredCertificateFor(kHost)}) {
         for (const Profile profile : {Profile::kAzure, Profile::kWebSphere}) {
             const Appliance appliance(profile, credentials);
             const Report report = Ask({});
-            EXPECT_THAT(report.Findings(), ElementsAre("discovery.certificate")) << "once per certificate";
+            EXPECT_THAT(report.Findings(), ElementsAre(EndsWith(".certificate"))) << "once per certificate";
             EXPECT_THAT(appliance.Requests(), Each(StartsWith("GET ")));
             EXPECT_THAT(appliance.Requests(), Each(Not(HasSubstr("client_"))));
         }
@@ -112,18 +75,6 @@ class ProviderCheck : public ::testing::Test {
 
     Appliance appliance{Profile::kAzure};
 };
-
-TEST_F(ProviderCheck, ReportsSlowClock) {
-    TellTime(std::time(nullptr) - kHour);
-    const Check finding = OnlyFinding();
-    EXPECT_EQ(finding.id, "clock");
-    EXPECT_THAT(finding.found, HasSubstr(" s ahead of the provider's"));
-}
-
-TEST_F(ProviderCheck, ReportsFastClock) {
-    TellTime(std::time(nullptr) + kHour);
-    EXPECT_THAT(OnlyFinding().found, HasSubstr(" s behind the provider's"));
-}
 
 TEST_F(ProviderCheck, AcceptsEqualClock) {
     TellTime(std::time(nullptr));
@@ -146,17 +97,6 @@ TEST_F(ProviderCheck, RequestsAddressInCapitals) {
     EXPECT_EQ(Ask({}).Find("discovery.reachable", "good").id, "discovery.reachable");
     appliance.SetClient("token_endpoint", "HTTPS" + appliance.URL("/token_endpoint").substr(5));
     EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").id, "token_endpoint.client");
-}
-
-TEST_F(ProviderCheck, ReportsEndpointThatDiffersFromDiscovery) {
-    for (const std::string endpoint : {"authorization_endpoint", "token_endpoint"}) {
-        Appliance other(Profile::kAzure);
-        other.ChangeDiscovery(R"({")" + endpoint + R"(": "https://login.example/other"})");
-        const Check finding = OnlyFinding();
-        EXPECT_EQ(finding.id, "discovery." + endpoint);
-        EXPECT_THAT(finding.found, AllOf(HasSubstr("\"https://login.example/other\""),
-                                         HasSubstr("\"" + other.URL("/" + endpoint) + "\"")));
-    }
 }
 
 TEST_F(ProviderCheck, NotesOtherLogoutEndpoint) {
@@ -207,23 +147,6 @@ TEST_F(ProviderCheck, ExpectsInvalidGrantForValidClient) {
     EXPECT_THAT(appliance.Requests(), Contains(HasSubstr("code=tavosso-doctor-made-this-up")));
 }
 
-TEST_F(ProviderCheck, ReportsRejectedAuthorizationRequest) {
-    appliance.AnswerAt("/authorization_endpoint", "redirect_uri did not match", "400 Bad Request");
-    const Check finding = OnlyFinding();
-    EXPECT_EQ(finding.id, "authorization_endpoint.request");
-    EXPECT_THAT(finding.found, HasSubstr("HTTP 400"));
-}
-
-TEST_F(ProviderCheck, ReportsAuthorizationRequestReturnedWithError) {
-    appliance.AnswerAt("/authorization_endpoint", [](const std::string & /*request*/) {
-        return "HTTP/1.1 302 Found\r\nLocation: " + std::string(kReturnURI) +
-               "?error=unauthorized_client\r\nContent-Length: 0\r\n\r\n";
-    });
-    const Check finding = OnlyFinding();
-    EXPECT_EQ(finding.id, "authorization_endpoint.request");
-    EXPECT_THAT(finding.found, HasSubstr("\"unauthorized_client\""));
-}
-
 TEST_F(ProviderCheck, ReportsRejectedClient) {
     for (const char *error : {"invalid_client", "unauthorized_client"}) {
         appliance.RefuseCodes(error);
@@ -243,19 +166,6 @@ TEST_F(ProviderCheck, ReportsOtherErrorsVerbatim) {
     const Check finding = OnlyFinding();
     EXPECT_EQ(finding.found, "The provider refused: temporarily_unavailable (we are moving)");
     EXPECT_EQ(finding.library, finding.found);
-}
-
-TEST_F(ProviderCheck, ReportsHangingProviderAfterTimeout) {
-    Server hanging(CertificateFor(kHost));
-    const auto hang = [](Connection &connection) {
-        connection.ReceiveRequest();
-        connection.ReceiveRaw();  // until the client has gone
-    };
-    hanging.Play(hang);
-    hanging.Play(hang);
-    appliance.SetClient("wellknown", hanging.URL("/discovery"));
-    EXPECT_THAT(Ask({"--timeout", "1"}).Find("discovery.reachable", "finding").found,
-                HasSubstr("no answer within 1 s from 127.0.0.1"));
 }
 
 }  // namespace
