@@ -97,12 +97,21 @@ class Diagnostician {
                       : " If this network requires a proxy, run: sudo https_proxy=http://PROXY:PORT tavosso-doctor";
     }
 
+    /// The name server, or /etc/hosts, may have an old address.
+    std::string CheckResolved() const {
+        const bool isName = tried_.find(address_.host) == std::string::npos && IsPlainHost(address_.host);
+        return isName ? ", and the address of the host, which /etc/hosts overrides: getent ahosts " + address_.host
+                      : "";
+    }
+
     Diagnosis Unresolved() const {
         const std::string test = IsPlainHost(address_.host) ? " Test: getent hosts " + address_.host + "." : "";
-        return {"the host name " + Quoted(address_.host) + " cannot be resolved",
-                "Compare the host name in " + key_ +
-                    " with the provider's. If it is correct, check the name server in " + "/etc/resolv.conf." + test +
-                    OrProxy()};
+        return {
+            "the host name " + Quoted(address_.host) + " cannot be resolved",
+            "Compare the host name in " + key_ +
+                " with the provider's. If it is correct, check the name server in /etc/resolv.conf, /etc/hosts, and "
+                "\"hosts\" in /etc/nsswitch.conf." +
+                test + OrProxy()};
     }
 
     Diagnosis NotConnected() const {
@@ -123,8 +132,8 @@ class Diagnostician {
                 return {cause, "Allow outgoing connections to port " + address_.port +
                                    " in this machine's firewall: nft list ruleset."};
             default:
-                return {cause, "Check host and port in " + key_ +
-                                   ". If they are correct, allow outgoing connections to " + "port " + address_.port +
+                return {cause, "Check host and port in " + key_ + CheckResolved() +
+                                   ". If they are correct, allow outgoing connections to port " + address_.port +
                                    " in the firewall." + OrProxy()};
         }
     }

@@ -85,11 +85,11 @@ bool IsThisMachine(const std::vector<std::string> &addresses) {
 
 /// Checks the return program. Returns whether the example front end runs on this machine: it redirects a HEAD request
 /// to its start page.
-bool CheckReturnProgram(Report &report, Client &client) {
+bool CheckReturnProgram(Report &report, Client &client, const std::string &returnProgram) {
     const std::string url = client->GetRedirectURI();
     const Address address = SplitAddress(url);
-    if (!address.isValid || address.scheme != "https") {
-        report.NotChecked(kReturnID, kReturnSubject, "the redirect URI has no https:// URL");
+    if (!address.isValid || address.scheme != "https" || address.path != returnProgram) {
+        report.NotChecked(kReturnID, kReturnSubject, "the redirect URI is not its https:// URL");
         return false;
     }
     const Transfer transfer = RequestHead(report, url);
@@ -113,36 +113,36 @@ bool CheckReturnProgram(Report &report, Client &client) {
     } else if (transfer.status >= kErrors) {
         report.Finding(kReturnID, kReturnSubject, url + " answers HTTP " + std::to_string(transfer.status),
                        transfer.status >= 500
-                           ? "The program failed. Read the web server's error log."
-                           : "Configure the web server to run the return program at this path. For "
-                             "lighttpd, run: sudo lighty-enable-mod tavosso-frontend; sudo systemctl "
-                             "restart lighttpd");
+                           ? "The program failed or is not executable. Read the web server's error log, and check the "
+                             "rights of the program."
+                           : "Configure the web server to run the return program at this path, and to load its "
+                             "module for CGI programs. For lighttpd, run: sudo lighty-enable-mod tavosso-frontend; "
+                             "sudo systemctl restart lighttpd");
     } else {
         report.Good(kReturnID, kReturnSubject, "answers HTTP " + std::to_string(transfer.status));
     }
     return SplitAddress(transfer.location).path == kStartPage;
 }
 
-/// Reports a full or read-only file system.
-bool CheckSpace(Report &report) {
+/// Reports a full or read-only file system. Returns whether the folder's is neither.
+bool CheckSpace(Report &report, const std::string &folder) {
     constexpr char kID[] = "frontend.space";
     constexpr char kSubject[] = "space for the front end";
     struct statvfs system = {};
-    if (statvfs(kVar, &system) != 0) {
+    if (statvfs(folder.c_str(), &system) != 0) {
         return true;
     }
     if ((system.f_flag & ST_RDONLY) != 0) {
-        report.Finding(kID, kSubject, std::string(kVar) + " is on a read-only file system",
-                       std::string("Find the cause: dmesg. Then mount it writable. Run: findmnt -T ") + kVar);
+        report.Finding(kID, kSubject, folder + " is on a read-only file system",
+                       "Find the cause: dmesg. Then mount it writable. Run: findmnt -T " + folder);
         return false;
     }
     // Some file systems do not count their files.
     if (system.f_bavail == 0 || (system.f_files != 0 && system.f_favail == 0)) {
-        report.Finding(kID, kSubject, std::string("the file system of ") + kVar + " is full",
-                       std::string("Remove files. Run: df -h ") + kVar + "; df -i " + kVar);
+        report.Finding(kID, kSubject, "the file system of " + folder + " is full",
+                       "Remove files. Run: df -h " + folder + "; df -i " + folder + "; sudo du -a " + folder);
         return false;
     }
-    report.Good(kID, kSubject, "the file system is writable");
     return true;
 }
 
@@ -183,22 +183,24 @@ void CheckFolders(Report &report, bool isRequired) {
             std::string("Run: sudo chmod 0755 ") + kVar + ". If it is a link or file, remove it first.");
         return;
     }
-    if (!CheckSpace(report)) {
+    if (!CheckSpace(report, kVar)) {
         return;
     }
-    for (const char *folder : {"/frontend", "/frontend/logins", "/frontend/sessions"}) {
-        if (!CheckPrivateFolder(report, std::string(kVar) + folder, status)) {
+    for (const char *name : {"/frontend", "/frontend/logins", "/frontend/sessions"}) {
+        const std::string folder = std::string(kVar) + name;
+        if (!CheckPrivateFolder(report, folder, status) || !CheckSpace(report, folder)) {
             return;
         }
     }
+    report.Good("frontend.space", "space for the front end", "the file systems are writable");
     report.Good(kFolderID, kFolderSubject, std::string(kVar) + ": " + DescribeRights(status));
 }
 
 }  // namespace
 
-void CheckFrontEnd(Report &report, Client &client) {
+void CheckFrontEnd(Report &report, Client &client, const std::string &returnProgram) {
     report.Section("Front end");
-    const bool isExample = CheckReturnProgram(report, client);
+    const bool isExample = CheckReturnProgram(report, client, returnProgram);
     CheckFolders(report, isExample);
 }
 

@@ -79,11 +79,13 @@ void CheckKeySet(Report &report, const Json::Value &keySet) {
     }
     std::set<std::string> kids;
     std::size_t usable = 0;
+    std::string faults;
     for (const Json::Value &key : keys) {
         const std::string fault = FaultOf(key);
         if (!fault.empty()) {
-            report.Note("keys.unusable", "unusable key", (key.isObject() ? Describe(key) + " " : "one ") + fault,
-                        "None. The library rejects tokens that name this key.");
+            const std::string found = (key.isObject() ? Describe(key) + " " : "one ") + fault;
+            faults += "; " + found;
+            report.Note("keys.unusable", "unusable key", found, "None. The library rejects tokens that name this key.");
         } else if (!kids.insert(key["kid"].asString()).second) {
             report.Note("keys.duplicate", "repeated key",
                         Describe(key) + ": the library uses the first key of this \"kid\"");
@@ -98,7 +100,8 @@ void CheckKeySet(Report &report, const Json::Value &keySet) {
     }
     const std::string found = std::to_string(usable) + " of " + std::to_string(keys.size()) + " keys are usable";
     if (usable == 0) {
-        report.Finding(kSet, kSubject, found, "Configure the provider to sign with RSA keys.");
+        report.Finding(kSet, kSubject, found + faults,
+                       R"(Configure the provider to publish RSA keys with "kid", and to sign with them.)");
     } else {
         report.Good(kSet, kSubject, found);
     }

@@ -11,6 +11,8 @@
 
 #include "doctor/address.h"
 #include "doctor/checks.h"
+#include "doctor/explain.h"
+#include "doctor/provider_errors.h"
 #include "doctor/watch.h"
 #include "web/nonce.h"
 #include "web/request.h"
@@ -112,8 +114,9 @@ class LoginWalk {
             Json::Value answered;
             answered["error"] = error;
             answered["error_description"] = TAVO::Web::OnlyValue(answer, "error_description").value_or("");
+            const TAVO::Web::FailureRow *row = FindProviderError(ErrorText(answered));
             report_.Finding("login.answer", "answer of the provider", ErrorText(answered),
-                            "Run: tavosso-doctor explain " + Quoted(error));
+                            row != nullptr ? WithoutBackticks(row->remedy) : "Report this error to the provider.");
             return false;
         }
         if (!code || code->empty()) {

@@ -142,9 +142,12 @@ int CheckEverything(Report &report, const Options &options) {
         if (*profile == Profile::kAzure) {
             Doctor::CheckDirectory(report, options.domain, runAs);
         }
-        Doctor::CheckFrontEnd(report, client);
+        Doctor::CheckFrontEnd(report, client, options.returnProgram);
     }
     report.Unproved("that a user can sign in");
+    report.Unproved(
+        "that the programs of the web server have the rights and the environment of this command. If they run as "
+        "another user, add: --user NAME");
     report.Finish("check", "Next step: sudo tavosso-doctor login");
     return StatusOf(report);
 }

@@ -92,17 +92,19 @@ std::string RemedyForRefusal(const std::string &path, const std::string &refusin
 
 void ExplainError(SettingsFile &file, int error, RunAs runAs) {
     const std::string page = "tavosso-" + file.path.substr(file.path.rfind('/') + 1);
+    const std::string write = "Write the file. For an example, run: man 5 " + page;
+    struct stat status = {};
+    const bool isLink = lstat(file.path.c_str(), &status) == 0 && S_ISLNK(status.st_mode);
     if (error == ENOENT) {
-        file.isMissing = true;
-        file.problem = file.path + " is missing";
-        file.remedy = "Write the file. For an example, run: man 5 " + page;
+        file.isMissing = !isLink;
+        file.problem = file.path + (isLink ? " is a link to a file that is missing" : " is missing");
+        file.remedy = isLink ? "Run: ls -l " + file.path + ". Restore the file, or remove the link. " + write : write;
         return;
     }
     file.problem = file.path + " cannot be read: " + std::generic_category().message(error);
-    file.remedy = "Run: ls -ld " + file.path + ". It must be a regular file. Remove it and write it again.";
+    file.remedy = "Run: ls -ld " + file.path + ". It must be a regular file. Remove it. " + write;
     if (error == EACCES) {
         const std::string refusing = WhatRefuses(file.path);
-        struct stat status = {};
         if (stat(refusing.c_str(), &status) == 0) {
             file.problem += "; " + refusing + " refuses: " + DescribeRights(status);
         }

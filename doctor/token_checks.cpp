@@ -13,6 +13,7 @@
 
 #include "doctor/checks.h"
 #include "doctor/explain.h"
+#include "doctor/guid.h"
 #include "doctor/watch.h"
 #include "web/failure_lookup.h"
 #include "web/text.h"
@@ -93,13 +94,36 @@ class TokenCheck {
                                [&](const char *text) { return TAVO::Web::IsText(failure_, text); })) {
             stop_ = id;
             report_.Add({id, subject, Mark::kFinding,
-                         found + log_ + (id == "token.key" && log_.empty() ? PublishedKeys() : ""), RemedyOf(failure_),
+                         found + log_ + (id == "token.key" && log_.empty() ? PublishedKeys() : ""), RemedyFor(id),
                          failure_});
         } else if (needsKeys && !mayFetch_) {
             report_.NotChecked(id, subject, found + "; --fetch fetches the provider's keys");
         } else {
             report_.Good(id, subject, found);
         }
+    }
+
+    /// Whether the profile's client can verify the token's signature.
+    bool IsAlgorithmSupported() const {
+        const std::vector<std::string> algorithms = AlgorithmsOf(client_.profile());
+        return std::find(algorithms.begin(), algorithms.end(), TAVO::Web::StringMember(header_, "alg")) !=
+               algorithms.end();
+    }
+
+    /// The remedy for this token's values, or the general one of the failure.
+    std::string RemedyFor(const std::string &id) const {
+        const std::string tenant = TAVO::Web::StringMember(claims_, "tid");
+        if (id == "token.tenant" && IsGUID(tenant)) {
+            return "If the users belong to this tenant, set azure_tenant_id to " + Quoted(tenant);
+        }
+        if (id == "token.audience" && claims_.isObject() && claims_["aud"].isArray()) {
+            return "Configure the provider to send the client id alone as audience, not a list.";
+        }
+        if (id == "token.key" && !IsAlgorithmSupported()) {
+            return "Configure the provider to sign the tokens of this client with " +
+                   AlgorithmsOf(client_.profile()).front() + '.';
+        }
+        return RemedyOf(failure_);
     }
 
     void Compare(const std::string &id, const std::string &claim, const char *stop, const std::string &key,
@@ -123,7 +147,8 @@ class TokenCheck {
                 MayPrintClientID(client_) ? client_->GetClientID() : "[hidden]");
         const std::string kid = Describe(header_, "kid");
         if (isAzure) {
-            Step("token.key", "key: \"kid\"", {"kid does not exist in Azure verified kyes"}, kid, true);
+            Step("token.key", "key: \"kid\"", {"kid does not exist in Azure verified kyes"},
+                 kid + (IsAlgorithmSupported() ? "" : R"(; "alg" is )" + Describe(header_, "alg")), true);
             Step("token.key_numbers", "numbers of the key",
                  {"RSA public 'n' cannot be found!", "RSA public 'e' cannot be found!"}, R"("n" and "e" of )" + kid,
                  true);
@@ -159,7 +184,11 @@ class TokenCheck {
                             : claims.isObject() && claims["unique_name"].isString() ? "unique_name"
                                                                                     : "email";
         Step("token.user_name", "user name: " + Quoted(claim),
-             {"cannot find the user name!", "cannot get the user name!"}, Describe(claims, claim));
+             {"cannot find the user name!", "cannot get the user name!"},
+             Describe(claims, claim) +
+                 (claims.isObject() && claims.isMember("unique_name") && claim == std::string("email")
+                      ? R"(; "unique_name" is not a string: )" + Describe(claims, "unique_name")
+                      : ""));
         // After a failure, userName_ is the name before the conversion.
         Step("token.domain", isAzure ? "domain of the user" : "user", {"TAVOWinsUserNameFqdn2Netbios failed."},
              (stop_.empty() && failure_.empty() ? "signs in as " : "") + Quoted(userName_));

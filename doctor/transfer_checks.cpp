@@ -10,6 +10,7 @@
 #include <fstream>
 #include <iterator>
 #include <limits>
+#include <memory>
 
 #include "doctor/address.h"
 #include "doctor/diagnosis.h"
@@ -51,6 +52,12 @@ const Certificate &FirstToExpire(const std::vector<Certificate> &chain) {
     };
     return *std::min_element(chain.begin(), chain.end(),
                              [&](const auto &a, const auto &b) { return expiry(a) < expiry(b); });
+}
+
+/// Loads a bundle like libcurl. One damaged certificate makes the others unusable.
+bool CanLoad(const std::string &bundle) {
+    const std::unique_ptr<X509_STORE, void (*)(X509_STORE *)> store(X509_STORE_new(), X509_STORE_free);
+    return store && X509_STORE_load_locations(store.get(), bundle.c_str(), nullptr) == 1;
 }
 
 struct Rejection {
@@ -128,8 +135,8 @@ void TransferChecks::CheckProxy(const std::string &url) {
     if (const std::optional<Proxy> proxy = ProxyFor(SplitAddress(url))) {
         report_.Note(
             "network.proxy", "proxy", proxy->variable + " sets the proxy " + proxy->server,
-            "Set the same variable in the web server's settings. This command has the environment of sudo, which "
-            "the web server does not have.");
+            "Set the same variable in the web server's settings; for the example front end, also name it in "
+            "FRONTEND_KEEP_ENVIRONMENT. This command has the environment of sudo, which the web server does not have.");
     }
 }
 
@@ -141,7 +148,7 @@ bool TransferChecks::CheckAuthorities() {
     std::ifstream file(path);
     const bool isReadable = file.good();
     const std::string content{std::istreambuf_iterator<char>(file), {}};
-    const bool isUsable = path.empty() || boost::contains(content, "-----BEGIN");
+    const bool isUsable = path.empty() || CanLoad(path);
     if (isUsable) {
         report_.Good(kID, kSubject, path.empty() ? "libcurl's default" : path);
     } else {
@@ -149,7 +156,7 @@ bool TransferChecks::CheckAuthorities() {
                         path +
                             (!isReadable       ? " is missing or cannot be read"
                              : content.empty() ? " is empty"
-                                               : " contains no certificate") +
+                                               : " contains no certificate, or a damaged one") +
                             ": no certificate can be verified",
                         "Run: sudo apt-get install --reinstall ca-certificates; sudo update-ca-certificates --fresh");
     }
@@ -226,7 +233,8 @@ void TransferChecks::CheckClock(const Transfer &transfer) {
                                                 (offset > 0 ? "ahead of" : "behind") + " the provider's";
     if (std::labs(offset) > kWrongClock) {
         report_.Finding("clock", "clock of this machine", found + "; " + ThisClock(),
-                        "Run: sudo timedatectl set-ntp true");
+                        "Run: sudo timedatectl set-ntp true. If this machine's clock is right, report the provider's "
+                        "to the provider.");
     } else {
         report_.Good("clock", "clock of this machine", found);
     }

@@ -479,7 +479,7 @@ const std::vector<FailureRow> &FailureTable() {
          {"cannot find the user name!"},
          Failure::kUserName,
          R"(The token has neither "unique_name" nor "email" (Azure), or no "sub" (WebSphere), as a string.)",
-         "Configure the provider to send the claim.",
+         "Configure the provider to send the claim, as a string.",
          "std::invalid_argument",
          "a login"},
         {kException,

@@ -486,6 +486,11 @@ std::vector<Break> BreaksOfCertificates() {
          "sudo update-ca-certificates"},
         {"BundleWithoutCertificate", WriteText(kTrustedAuthorities, "no certificate\n"), "network.authorities",
          "contains no certificate", "sudo update-ca-certificates"},
+        {"BundleDamaged",
+         [](Site & /*site*/) {
+             WriteFile(kTrustedAuthorities, "-----BEGIN CERTIFICATE-----\n%%%%\n-----END CERTIFICATE-----\n");
+         },
+         "network.authorities", "or a damaged one", "sudo update-ca-certificates"},
         {"BundleMissing", [](Site & /*site*/) { std::filesystem::remove(kTrustedAuthorities); }, "network.authorities",
          "is missing or cannot be read", "sudo update-ca-certificates"},
         {"ClockFast", Answer("/keys", WithHeader(HTTPAnswer(KeySet()), DateHeader(-kHour))), "clock",
@@ -703,6 +708,13 @@ std::vector<Break> BreaksOfRights() {
              WriteFile(std::string(kVar) + "/large", std::string(4096, 'x'));
          },
          "frontend.space", "the file system of /usr/tavo/var is full", "df -h /usr/tavo/var"},
+        {"FileSystemOfFrontEndFull",
+         [](Site &site) {
+             MakeFolders();
+             Mount(site, "tmpfs", "/usr/tavo/var/frontend", "tmpfs", 0, "size=4k,mode=0700");
+             WriteFile("/usr/tavo/var/frontend/large", std::string(4096, 'x'));
+         },
+         "frontend.space", "the file system of /usr/tavo/var/frontend is full", "sudo du -a /usr/tavo/var/frontend"},
         {"FileSystemReadOnly",
          [](Site &site) {
              std::filesystem::create_directories(kVar);
@@ -723,7 +735,7 @@ std::vector<Break> BreaksOfFrontEnd() {
         {"ReturnProgramMissing", AnswerReturn("404 Not Found"), "frontend.return", "answers HTTP 404",
          "lighty-enable-mod tavosso-frontend"},
         {"ReturnProgramFails", AnswerReturn("500 Internal Server Error"), "frontend.return", "answers HTTP 500",
-         "Read the web server's error log."},
+         "Read the web server's error log, and check the rights of the program."},
         {"WebServerStopped", SetAddress("redirect_uri", NobodysURL() + "webman/sso/return.cgi"), "frontend.return",
          "no web server answers at 127.0.0.1 port ", "sudo systemctl restart lighttpd"},
         {"TokenEndpointWithoutTLS",

@@ -144,6 +144,12 @@ TEST_F(FileCheck, ReportsDirectoryInsteadOfClientFile) {
     EXPECT_THAT(Ask({}).Find("client.file", "finding").found, HasSubstr("Is a directory"));
 }
 
+TEST_F(FileCheck, ReportsLinkToMissingFile) {
+    ASSERT_EQ(std::remove(kAzureFile), 0);
+    ASSERT_EQ(symlink("/usr/tavo/etc/moved.conf", kAzureFile), 0);
+    EXPECT_THAT(Ask({}).Find("client.file", "finding").found, EndsWith("is a link to a file that is missing"));
+}
+
 TEST_F(FileCheck, ReportsListInsteadOfObject) {
     WriteFile(kAzureFile, "[\"azure_client_id\", \"the client\"]");
     EXPECT_THAT(Ask({}).Find("client.file", "finding").found, EndsWith("is JSON, but not an object"));

@@ -61,6 +61,7 @@ TEST_P(LoginWalk, ReportsProviderErrorVerbatim) {
     const Report report =
         dialogue.Paste(std::string(kReturnURI) + "?error=access_denied&error_description=not+today&state=s");
     EXPECT_EQ(report.FirstFinding().found, "The provider refused: access_denied (not today)");
+    EXPECT_EQ(report.FirstFinding().remedy, "Assign the user to the client at the provider.");
     EXPECT_EQ(report.status, 1);
 }
 

@@ -127,6 +127,13 @@ TEST_F(ProviderCheck, NotesUnusableKeysBesideUsableOne) {
     EXPECT_EQ(report.Find("keys.set", "good").found, "1 of 4 keys are usable");
 }
 
+TEST_F(ProviderCheck, ReportsWhyNoKeyIsUsable) {
+    appliance.AnswerAt("/keys", KeySet(R"({"kid": null})"));
+    const Check finding = OnlyFinding();
+    EXPECT_EQ(finding.id, "keys.set");
+    EXPECT_THAT(finding.found, AllOf(HasSubstr("0 of 1 keys are usable"), HasSubstr("has no \"kid\"")));
+}
+
 TEST_F(ProviderCheck, ReportsWeakKey) {
     const RSAKey weak(1024);
     appliance.AnswerAt("/keys", KeysOf({GoodKey(), weak.JWK("weak key")}));

@@ -90,6 +90,29 @@ TEST_P(Token, StopsWhereLibraryStopsForAnyChangedByte) {
     }
 }
 
+TEST(AzureToken, HasRemedyWithItsValues) {
+    constexpr char kOther[] = "99999999-9b7a-4c3d-8e5f-0a1b2c3d4e5f";
+    const struct {
+        std::string header;
+        std::string claims;
+        std::string found;
+        std::string remedy;
+    } rows[] = {
+        {"{}", R"({"tid": ")" + std::string(kOther) + "\"}", kOther, "set azure_tenant_id to \"" + std::string(kOther)},
+        {"{}", R"({"aud": ["a", "b"]})", R"(["a","b"])", "the client id alone"},
+        {R"({"alg": "HS256", "kid": null})", "{}", R"("alg" is "HS256")", "sign the tokens of this client with RS256"},
+        {"{}", R"({"unique_name": ["alice@corp.example"], "email": null})",
+         R"("unique_name" is not a string: ["alice@corp.example"])", "as a string"},
+    };
+    Appliance appliance(Profile::kAzure);
+    for (const auto &row : rows) {
+        appliance.GiveToken(row.header, row.claims);
+        const Check finding = Ask({"token", "-", "--fetch"}, appliance.Token()).FirstFinding();
+        EXPECT_THAT(finding.found, HasSubstr(row.found));
+        EXPECT_THAT(finding.remedy, HasSubstr(row.remedy));
+    }
+}
+
 TEST_P(Token, SendsNoRequestWithoutFetch) {
     const Report report = Ask({"token", "-"}, appliance.Token());
     EXPECT_THAT(report.Findings(), IsEmpty());
