@@ -11,8 +11,10 @@
 #include <cstdio>
 #include <ctime>
 #include <filesystem>
+#include <fstream>
 #include <functional>
 #include <iostream>
+#include <iterator>
 #include <memory>
 #include <string>
 #include <vector>
@@ -112,8 +114,7 @@ void StaySilent(Connection &connection) {
     connection.ReceiveRaw();  // until the client disconnects
 }
 
-/// Answers the request of a client that uses a proxy.
-Script Proxy(const std::string &status) {
+Script AnswerEmpty(const std::string &status) {
     return [status](Connection &connection) {
         connection.ReceiveRequest();
         connection.Send(HTTPAnswer("", status));
@@ -177,6 +178,15 @@ void MakeFolders() {
 
 std::function<void(Site &)> WriteText(const char *path, const std::string &content) {
     return [path, content](Site & /*site*/) { WriteFile(path, content); };
+}
+
+/// Inserts text after the first brace.
+std::function<void(Site &)> InsertIntoClientFile(const std::string &inserted) {
+    return [inserted](Site & /*site*/) {
+        std::ifstream file(kAzureFile);
+        const std::string text{std::istreambuf_iterator<char>(file), {}};
+        WriteFile(kAzureFile, "{" + inserted + text.substr(1));
+    };
 }
 
 std::function<void(Site &)> SetClient(const std::string &name, const Json::Value &value) {
@@ -320,6 +330,8 @@ std::vector<Break> BreaksOfDomains() {
          "is UTF-16 or binary", "Save the file as UTF-8"},
         {"DomainTwice", WriteText(kDomainTable, "{\"corp.example\": \"CORP\",\n\"corp.example\": \"ACME\"}"),
          "directory.duplicate_key", "line 2: the key \"corp.example\" occurs twice", "Remove one of the lines."},
+        {"DomainTableNotUTF8", WriteText(kDomainTable, "{\"corp.example\": \"CORP\", \"b\xfc.example\": \"B\"}"),
+         "directory.encoding", "line 1, column 28: a byte that is not UTF-8", "Save the file as UTF-8"},
         {"DomainUnknown",
          [](Site &site) {
              site.arguments = {"--domain", "alice@lab.example"};
@@ -405,7 +417,7 @@ std::vector<Break> BreaksOfNetwork() {
         {"ProxyUnresolved", [](Site &site) { UseProxy(site, "http://proxy.invalid:3128"); }, "discovery.reachable",
          "the host name of the proxy proxy.invalid port 3128 cannot be resolved",
          "Correct or unset https_proxy (proxy.invalid port 3128)"},
-        {"ProxyForbids", [](Site &site) { UseProxy(site, AddServer(site, Proxy("403 Forbidden")).URL("")); },
+        {"ProxyForbids", [](Site &site) { UseProxy(site, AddServer(site, AnswerEmpty("403 Forbidden")).URL("")); },
          "discovery.reachable", "answers HTTP 403", "Correct or unset https_proxy"},
     };
 }
@@ -482,6 +494,12 @@ std::vector<Break> BreaksOfCertificates() {
          "renew the certificate before it expires",
          {},
          [] { return CertificateByIntermediate(std::time(nullptr) + 3 * kDay + kHour); }},
+        {"KeysBySelfSigned",
+         [](Site &site) {
+             const Server &other = AddServer(site, AnswerEmpty("404 Not Found"), SelfSignedCertificateFor(kHost));
+             site.appliance.ChangeDiscovery(R"({"jwks_uri": ")" + other.URL("/keys") + "\"}");
+         },
+         "keys.certificate", "it is self-signed; ", "Check the host in \"jwks_uri\" in the discovery document."},
         {"BundleEmpty", WriteText(kTrustedAuthorities, ""), "network.authorities", "is empty",
          "sudo update-ca-certificates"},
         {"BundleWithoutCertificate", WriteText(kTrustedAuthorities, "no certificate\n"), "network.authorities",
@@ -542,6 +560,11 @@ std::vector<Break> BreaksOfAnswers() {
          document, "HTTP 404", "Set azure_wellknown to \"$BASE/.well-known/openid-configuration\""},
         {"DiscoveryWithSlash", SetAddress("wellknown", "$BASE/discovery/"), document, "HTTP 404",
          "Set azure_wellknown to \"$BASE/discovery\""},
+        {"DiscoveryWithSlashAndCapitals",
+         [](Site &site) {
+             site.appliance.SetClient("wellknown", "HTTPS" + site.appliance.URL("/discovery/").substr(5));
+         },
+         document, "HTTP 404", "Set azure_wellknown to \"HTTPS://127.0.0.1:"},
         {"DiscoveryNamesItsIssuer",
          [](Site &site) {
              site.appliance.AnswerAt("/discovery", R"({"issuer": ")" + site.appliance.URL("/tenant") + "\"}",
@@ -641,6 +664,10 @@ std::vector<Break> BreaksOfText() {
          "profile.conf is missing", "man 5 tavosso-profile.conf"},
         {"ClientFileWithComma", WriteText(kAzureFile, "{\"azure_client_id\": \"the client\",}"), "client.file",
          "line 1, column 33: comma after the last member", "Remove the comma."},
+        {"ClientKeyTwice", InsertIntoClientFile("\"azure_tenant_id\": \"\",\n"), "client.duplicate_key",
+         "line 2: the key \"azure_tenant_id\" occurs twice", "Remove one of the lines."},
+        {"ClientFileNotUTF8", InsertIntoClientFile("\n// Z\xfcrich\n"), "client.encoding",
+         "line 2, column 5: a byte that is not UTF-8", "Save the file as UTF-8"},
         {"ClientFileMissing", [](Site & /*site*/) { std::filesystem::remove(kAzureFile); }, "client.file",
          "azure.conf is missing", "man 5 tavosso-azure.conf"},
         {"TenantWithNoBreakSpace", SetClient("tenant_id", std::string(kTenant) + "\xc2\xa0"), "client.tenant_id",

@@ -89,6 +89,20 @@ TEST(Checks, InTheDocumentationExist) {
     EXPECT_GT(count, 60);
 }
 
+TEST(Checks, AreDocumented) {
+    const std::string document = Read(TAVOSSO_SOURCES "/docs/doctor.md");
+    const std::string sources = Sources();
+    static const std::regex id(
+        "\"(profile|client|network|discovery|keys|token_endpoint|directory|frontend|process|login|"
+        "token)\\.([a-z_]+)\"");
+    int count = 0;
+    for (std::sregex_iterator found(sources.begin(), sources.end(), id); found != std::sregex_iterator(); ++found) {
+        EXPECT_THAT(document, HasSubstr('`' + found->str(1) + '.' + found->str(2) + '`'));
+        ++count;
+    }
+    EXPECT_GT(count, 40);
+}
+
 TEST(Completion, OffersOptionsOfCommand) {
     EXPECT_EQ(Complete("to"), "token");
     EXPECT_EQ(Complete("login --f"), "");

@@ -87,12 +87,14 @@ TEST_P(Output, HidesSecretsBeforeCutting) {
     }
 }
 
-TEST_P(Output, HidesLoneSignature) {
+TEST_P(Output, HidesClaimsAndSignatureAlone) {
     const std::string token = appliance.Token();
-    const std::string signature = token.substr(token.rfind('.') + 1);
-    KeepSecret(signature);
-    appliance.SetClient("client_id", signature);
-    EXPECT_THAT(Ask({"token", "-"}, token).Find("token.audience", "finding").found, HasSubstr("[hidden]"));
+    const std::size_t claims = token.find('.') + 1;
+    const std::size_t signature = token.rfind('.') + 1;
+    for (const std::string &part : {token.substr(claims, signature - claims - 1), token.substr(signature)}) {
+        appliance.SetClient("client_id", part);
+        EXPECT_THAT(Ask({"token", "-"}, token).Find("token.audience", "finding").found, HasSubstr("[hidden]"));
+    }
 }
 
 TEST_P(Output, RemovesInvisibleCharacters) {

@@ -5,13 +5,13 @@
 #include <gtest/gtest.h>
 #include <openssl/evp.h>
 
-#include <locale>
 #include <string>
 #include <vector>
 
 #include "tests/support/conversion.h"
 #include "tests/support/files.h"
 #include "tests/support/interposed/memory.h"
+#include "tests/support/one_letter_locale.h"
 #include "tests/support/system_log.h"
 
 namespace Test {
@@ -185,23 +185,10 @@ TEST_F(DomainConversion, ReplacesDNSNameIgnoringCase) {
     EXPECT_EQ(Convert("LAB.EXAMPLE.NET\\bob"), "LAB\\bob");
 }
 
-/// A locale in which all letters are equal, ignoring case.
-class OneLetter : public std::ctype<char> {
-  protected:
-    char do_toupper(char c) const override { return std::isalpha(static_cast<unsigned char>(c)) != 0 ? 'X' : c; }
-    const char *do_toupper(char *begin, const char *end) const override {
-        for (; begin != end; ++begin) {
-            *begin = do_toupper(*begin);
-        }
-        return end;
-    }
-};
-
 TEST_F(DomainConversion, IgnoresLocaleOfProcess) {
-    const std::locale before = std::locale::global(std::locale(std::locale::classic(), new OneLetter));
+    const OneLetterLocale locale;
     EXPECT_EQ(Refusal("KORP.EXAMPLE.NET\\alice"), UnknownDomain("KORP.EXAMPLE.NET"));
     EXPECT_EQ(Convert("CORP.EXAMPLE.NET\\alice"), "ACME\\alice");
-    std::locale::global(before);
 }
 
 TEST_F(DomainConversion, KeepsUserUnchanged) {

@@ -19,6 +19,7 @@
 
 #include "platform/platform.h"
 #include "tests/support/files.h"
+#include "tests/support/one_letter_locale.h"
 #include "tests/support/system_log.h"
 
 extern "C" {
@@ -178,6 +179,12 @@ TEST_F(WinbindLookup, RequiresAnswerForRequestedDNSName) {
         return WBC_ERR_SUCCESS;
     };
     EXPECT_EQ(Convert(), "does not know it");
+}
+
+TEST_F(WinbindLookup, IgnoresLocaleOfProcess) {
+    const OneLetterLocale locale;
+    EXPECT_EQ(Convert("KORP.EXAMPLE.NET"), "does not know it");
+    EXPECT_EQ(Convert(), "ACME\\alice");
 }
 
 TEST_F(WinbindLookup, RejectsAnswerWithEmptyOrOverlongName) {
