@@ -200,8 +200,11 @@ class KeyCheck {
     void CheckEndpoint(Kind kind) {
         const Address address = SplitAddress(value_);
         if (!address.isValid) {
+            const std::string completed = "https://" + value_;
             Finding(Quoted(value_) + " is not a URL",
-                    "Set " + name_ + " to " + SourceOf(kind) + R"(, beginning with "https://".)");
+                    "Set " + name_ + " to " +
+                        (SplitAddress(completed).isValid ? Quoted(completed)
+                                                         : SourceOf(kind) + R"(, beginning with "https://".)"));
         } else if (address.scheme != "https") {
             Finding(Quoted(value_) + " is not an https:// URL" +
                         (kind == Kind::kLogout ? "" : ": others on the network can read secret, codes and tokens"),

@@ -765,6 +765,9 @@ std::vector<Break> BreaksOfFrontEnd() {
          "Read the web server's error log, and check the rights of the program."},
         {"WebServerStopped", SetAddress("redirect_uri", NobodysURL() + "webman/sso/return.cgi"), "frontend.return",
          "no web server answers at 127.0.0.1 port ", "sudo systemctl restart lighttpd"},
+        {"LogoutEndpointWithoutScheme", SetClient("logout_endpoint", "login.example/logout"), "client.logout_endpoint",
+         "Sign-in works, sign-out at the provider does not",
+         "Set azure_logout_endpoint to \"https://login.example/logout\""},
         {"TokenEndpointWithoutTLS",
          [](Site &site) {
              site.appliance.MoveEndpoint("token_endpoint", "http" + site.appliance.URL("/token_endpoint").substr(5));
