@@ -754,8 +754,9 @@ std::vector<Break> BreaksOfRights() {
 std::vector<Break> BreaksOfFrontEnd() {
     const std::string redirectURI = "client.redirect_uri";
     return {
-        {"RedirectURIIsStartPage", SetClient("redirect_uri", "https://nas.example/"), redirectURI, "its path is \"/\"",
-         "Set azure_redirect_uri to \"https://nas.example/webman/sso/return.cgi\" here and at the provider"},
+        {"RedirectURIIsStartPage", SetClient("redirect_uri", "https://nas.example:5001/"), redirectURI,
+         "its path is \"/\"",
+         "Set azure_redirect_uri to \"https://nas.example:5001/webman/sso/return.cgi\" here and at the provider"},
         {"RedirectURIWithoutTLS", SetClient("redirect_uri", "http://nas.example/webman/sso/return.cgi"), redirectURI,
          "\"http://nas.example/webman/sso/return.cgi\" must be an https:// URL",
          "https://nas.example/webman/sso/return.cgi"},
