@@ -99,10 +99,10 @@ TEST_P(Output, HidesClaimsAndSignatureAlone) {
 
 TEST_P(Output, RemovesInvisibleCharacters) {
     // Both ends of each range of invisible and bidirectional characters, and their printable neighbours.
-    const std::string invisible[] = {"\u00ad", "\u061c", "\u180e",     "\u200b",    "\u200f", "\u2028",
-                                     "\u2029", "\u202a", "\u202e",     "\u2060",    "\u206f", "\ufeff",
-                                     "\ufff9", "\ufffb", "\U000e0000", "\U000e007f"};
-    const std::string printable[] = {"\u00ac", "\u00ae", "\u2010", "\u2027", "\u202f", "\u2070"};
+    const std::string invisible[] = {"\x1f",   "\x7f",   "\xc2\x80", "\xc2\x9f", "\u00ad",     "\u061c",    "\u180e",
+                                     "\u200b", "\u200f", "\u2028",   "\u2029",   "\u202a",     "\u202e",    "\u2060",
+                                     "\u206f", "\ufeff", "\ufff9",   "\ufffb",   "\U000e0000", "\U000e007f"};
+    const std::string printable[] = {"\u00a0", "\u00ac", "\u00ae", "\u2010", "\u2027", "\u202f", "\u2070"};
     std::string description;
     for (const std::string &character : invisible) {
         description += character + '.';
