@@ -125,6 +125,7 @@ class Diagnostician {
             case ENETUNREACH:
             case EHOSTUNREACH:
             case EADDRNOTAVAIL:
+            case EAFNOSUPPORT:
                 return {cause, "Check this machine's addresses and default route: ip address; ip route; ip -6 route." +
                                    OrProxy()};
             case EPERM:

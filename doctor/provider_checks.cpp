@@ -33,7 +33,7 @@ constexpr char kTestSecret[] = "tavosso-doctor-made-this-up-too";
 
 constexpr char kWellknownPath[] = "/.well-known/openid-configuration";
 
-const std::string kWait = "Wait until the provider works again. The settings of this machine are not the cause.";
+constexpr char kWait[] = "Wait until the provider works again. The settings of this machine are not the cause.";
 
 /// The beginning of a remedy for a redirect.
 std::string NotFollowed(const Transfer &transfer) {

@@ -125,10 +125,10 @@ void UseProxy(Site &site, const std::string &proxy) {
     site.through = {"/usr/bin/env", "no_proxy=", "NO_PROXY=", "https_proxy=" + proxy};
 }
 
-void Mount(Site &site, const char *source, const char *target, const char *type, unsigned long flags,
+void Mount(Site &site, const char *source, const std::string &target, const char *type, unsigned long flags,
            const char *data = nullptr) {
-    ASSERT_EQ(mount(source, target, type, flags, data), 0) << target;
-    site.resources.emplace_back(&site, [target](void *) { umount2(target, MNT_DETACH); });
+    ASSERT_EQ(mount(source, target.c_str(), type, flags, data), 0) << target;
+    site.resources.emplace_back(&site, [target](void *) { umount2(target.c_str(), MNT_DETACH); });
 }
 
 /// A name server that does not answer.
@@ -156,8 +156,16 @@ void SilenceNameServer(Site &site) {
     const auto server = std::make_shared<SilentNameServer>();
     ASSERT_TRUE(server->IsBound());
     site.resources.push_back(server);
+    std::filesystem::path settings = "/etc/resolv.conf";
+    if (std::filesystem::is_symlink(settings)) {
+        // To a file in /run, which is empty here.
+        settings = (settings.parent_path() / std::filesystem::read_symlink(settings)).lexically_normal();
+    }
+    if (!std::filesystem::exists(settings)) {
+        WriteFile(settings, "");
+    }
     WriteFile("/tmp/resolv.conf", "nameserver 127.0.0.1\n");
-    Mount(site, "/tmp/resolv.conf", "/etc/resolv.conf", nullptr, MS_BIND);
+    Mount(site, "/tmp/resolv.conf", settings, nullptr, MS_BIND);
 }
 
 /// Changes the owner of a path to an ordinary user.
@@ -165,6 +173,11 @@ void GiveAway(const std::string &path) {
     if (chown(path.c_str(), kNobody, kNobody) != 0) {
         GTEST_SKIP() << "needs the ids of other users";
     }
+}
+
+void RequireOtherUsers() {
+    WriteFile("/tmp/probe", "");
+    GiveAway("/tmp/probe");
 }
 
 void SetMode(const std::string &path, mode_t mode) { ASSERT_EQ(chmod(path.c_str(), mode), 0) << path; }
@@ -344,7 +357,7 @@ std::vector<Break> BreaksOfUsers() {
     return {
         {"OrdinaryUser",
          [](Site &site) {
-             GiveAway("/tmp");
+             RequireOtherUsers();
              site.through = {"/usr/bin/setpriv", "--reuid=65534", "--regid=65534", "--clear-groups"};
          },
          "process.user",
@@ -360,7 +373,7 @@ std::vector<Break> BreaksOfUsers() {
          "profile.file", "/usr/tavo/etc refuses: mode 0700, owner nobody", "a security module refuses"},
         {"UserCannotReadProfile",
          [](Site &site) {
-             GiveAway("/tmp");
+             RequireOtherUsers();
              site.arguments = {"--user", "nobody"};
          },
          "profile.file", "profile.conf refuses: mode 0600, owner root",
