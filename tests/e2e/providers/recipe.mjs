@@ -8,9 +8,6 @@ import {fileURLToPath} from 'node:url';
 const GUIDE = readFileSync(fileURLToPath(new URL('../../../docs/providers.md', import.meta.url)), 'utf8');
 const READY = 'ready';
 
-// IPv4, because the front end is served there.
-const ENVIRONMENT = {...process.env, NODE_OPTIONS: '--dns-result-order=ipv4first'};
-
 /** The code blocks of a section in one language. */
 export function blocks(heading, language) {
     const section = GUIDE.split(/^## /m).find((text) => text.startsWith(`${heading}\n`));
@@ -30,7 +27,7 @@ export async function run({commands, folder, replacements, names}) {
     const values = names.map((name) => `echo "${name}=$${name}"`).join('\n');
     // Detached, so that the provider in the background can be ended with the shell.
     const shell = spawn('bash', ['-euo', 'pipefail', '-c', `sudo() { "$@"; }\n${script}\n${values}\necho ${READY}\nwait`], {
-        cwd: folder, env: ENVIRONMENT, detached: true, stdio: ['ignore', 'pipe', 'inherit'],
+        cwd: folder, detached: true, stdio: ['ignore', 'pipe', 'inherit'],
     });
     const ended = once(shell, 'exit');
     const printed = new Map();
