@@ -27,10 +27,10 @@ void ShowUser(Web::Response &response, const Messages &messages, const Frontend:
 }
 
 void ShowSignIn(Web::Response &response, const Messages &messages, const std::string &origin) {
-    Frontend::ShowPage(
-        response, "200 OK", messages, "start.title",
-        "<p><a class=\"action\" href=\"/webman/sso/login.cgi?origin=" + Web::EscapeHtml(TAVO::SSO::URLEncode(origin)) +
-            "\">" + messages["start.action"] + "</a></p>\n");
+    Frontend::ShowPage(response, "200 OK", messages, "start.title",
+                       R"(<p><a class="action" href="/webman/sso/login.cgi?origin=)" +
+                           Web::EscapeHtml(TAVO::SSO::URLEncode(origin)) + "\">" + messages["start.action"] +
+                           "</a></p>\n");
 }
 
 void ShowThatSignInIsUnavailable(Web::Response &response, const Messages &messages, const char *why) {

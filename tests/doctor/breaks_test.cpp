@@ -509,8 +509,9 @@ std::vector<Break> BreaksOfCertificates() {
          [] { return CertificateByIntermediate(std::time(nullptr) + 3 * kDay + kHour); }},
         {"KeysBySelfSigned",
          [](Site &site) {
-             const Server &other = AddServer(site, AnswerEmpty("404 Not Found"), SelfSignedCertificateFor(kHost));
-             site.appliance.ChangeDiscovery(R"({"jwks_uri": ")" + other.URL("/keys") + "\"}");
+             const std::string keys =
+                 AddServer(site, AnswerEmpty("404 Not Found"), SelfSignedCertificateFor(kHost)).URL("/keys");
+             site.appliance.ChangeDiscovery(R"({"jwks_uri": ")" + keys + "\"}");
          },
          "keys.certificate", "it is self-signed; ", "Check the host in \"jwks_uri\" in the discovery document."},
         {"BundleEmpty", WriteText(kTrustedAuthorities, ""), "network.authorities", "is empty",
