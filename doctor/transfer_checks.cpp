@@ -212,7 +212,7 @@ void TransferChecks::CheckExpiry(const std::string &id, const Transfer &transfer
     if (!reportedCertificates_.insert(Describe(first)).second) {
         return;
     }
-    const long left = first.expires - std::time(nullptr);
+    const std::time_t left = first.expires - std::time(nullptr);
     const std::string found = Describe(first) + ", " + std::to_string(left / kDay) + " days left";
     if (first.expires != -1 && left < kSoon) {
         report_.Add({id + ".certificate", kCertificateSubject, mark, found + "; " + ThisClock(),

@@ -155,7 +155,7 @@ Result ResultOf(bool hasEnded, int status, std::chrono::seconds limit) {
     if (!hasEnded) {
         return {false, "no answer within " + std::to_string(limit.count()) + " s" + InCall()};
     }
-    switch (report->end) {
+    switch (report->end.load()) {
         case Report::End::kReturned:
             return {true, ""};
         case Report::End::kThrew:
