@@ -30,7 +30,10 @@ void CheckClientFile(Report &report, Client &client, const std::string &returnPr
 void CheckProvider(Report &report, Client &client);
 
 /// The front end on this machine: the host of the redirect URI, the return program, and the folders.
-void CheckFrontEnd(Report &report, Client &client, const std::string &returnProgram);
+void CheckFrontEnd(Report &report, Client &client, const std::string &returnProgram, RunAs runAs);
+
+/// How to make a domain known to the platform.
+std::string RemedyForDomain(const std::string &domain);
 
 /// The platform's sources of domain names. Converts a domain, or the name of a user, if there is one.
 void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser, RunAs runAs);

@@ -23,11 +23,6 @@ constexpr char kTableID[] = "directory.table";
 constexpr char kTableSubject[] = "table of domains";
 constexpr std::size_t kMostShown = 5;
 
-std::string RemedyFor(const std::string &domain) {
-    return "Join the domain and start winbindd, or add the domain with its NetBIOS name to " +
-           std::string(kDomainTable) + ": {" + Quoted(domain) + R"(: "NAME"})";
-}
-
 struct Conversion {
     std::string name;  // DOMAIN\user; empty if it failed
     std::string log;   // of the platform
@@ -135,7 +130,7 @@ void CheckSource(Report &report, const SettingsFile &table) {
         report.NotChecked(kID, kSubject, "the table cannot be read, and " + reason);
     } else if (table.content.empty()) {
         report.Finding(kID, kSubject, "no domain can be converted: the table is empty or missing, and " + reason,
-                       RemedyFor("corp.example.net"));
+                       RemedyForDomain("corp.example.net"));
     } else {
         report.Note(kID, kSubject, "only the domains of the table are converted: " + reason);
     }
@@ -151,7 +146,7 @@ void CheckDomain(Report &report, const std::string &domainOrUser) {
     const Conversion conversion = Convert(report, user, domain);
     if (conversion.name.empty()) {
         report.Finding(kID, subject, "is not converted" + (conversion.log.empty() ? "" : ": " + conversion.log),
-                       RemedyFor(domain));
+                       RemedyForDomain(domain));
         return;
     }
     const std::string source = TAVO::Platform::FindInDomainTable(domain) ? "the table" : "the directory (winbindd)";
@@ -161,6 +156,12 @@ void CheckDomain(Report &report, const std::string &domainOrUser) {
 }
 
 }  // namespace
+
+std::string RemedyForDomain(const std::string &domain) {
+    return "Join the domain and start winbindd, or add the domain with its NetBIOS name to " +
+           std::string(kDomainTable) + ": {" + Quoted(domain) +
+           R"(: "NAME"}. The domain's administrator knows NAME; on a Windows member of the domain, run: echo %USERDOMAIN%)";
+}
 
 void CheckDirectory(Report &report, const std::optional<std::string> &domainOrUser, RunAs runAs) {
     report.Section("Directory");

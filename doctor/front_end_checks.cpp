@@ -113,10 +113,11 @@ bool CheckReturnProgram(Report &report, Client &client, const std::string &retur
     } else if (transfer.status >= kErrors) {
         report.Finding(kReturnID, kReturnSubject, url + " answers HTTP " + std::to_string(transfer.status),
                        transfer.status >= 500
-                           ? "The program failed or is not executable. Read the web server's error log, and check the "
-                             "rights of the program."
+                           ? "The program failed or is not executable. Read the web server's error log (lighttpd: "
+                             "journalctl -t lighttpd), and check that the program is executable."
                            : "Configure the web server to run the return program at this path, and to load its "
-                             "module for CGI programs. For lighttpd, run: sudo lighty-enable-mod tavosso-frontend; "
+                             "module for CGI programs (mod_cgi in server.modules of lighttpd). For lighttpd, run: sudo "
+                             "lighty-enable-mod tavosso-frontend; "
                              "sudo systemctl restart lighttpd");
     } else {
         report.Good(kReturnID, kReturnSubject, "answers HTTP " + std::to_string(transfer.status));
@@ -146,22 +147,21 @@ bool CheckSpace(Report &report, const std::string &folder) {
     return true;
 }
 
+constexpr char kOtherUser[] = " If the programs run as another user than this command, run it with --user NAME.";
+
 /// Returns whether one of the front end's private folders is as it creates them, or does not exist yet.
-bool CheckPrivateFolder(Report &report, const std::string &path, const struct stat &parent) {
+bool CheckPrivateFolder(Report &report, const std::string &path) {
     struct stat status = {};
     if (lstat(path.c_str(), &status) != 0) {
         return true;
     }
     const bool isPrivate =
-        S_ISDIR(status.st_mode) && status.st_uid == parent.st_uid && (status.st_mode & (S_IRWXG | S_IRWXO)) == 0;
+        S_ISDIR(status.st_mode) && status.st_uid == geteuid() && (status.st_mode & (S_IRWXG | S_IRWXO)) == 0;
     if (!isPrivate) {
-        report.Finding(
-            kFolderID, kFolderSubject,
-            path + ": " + DescribeRights(status) + "; " + kVar + ": " + DescribeRights(parent) +
-                ". It must be a folder of mode 0700, and both must belong to the user of the web server's programs",
-            "Run: sudo rm -r " + path + ". The front end creates it again." +
-                (parent.st_uid == 0 ? ""
-                                    : std::string(" If the programs run as root, also run: sudo chown root ") + kVar));
+        report.Finding(kFolderID, kFolderSubject,
+                       path + ": " + DescribeRights(status) +
+                           ". It must be a folder of mode 0700 that belongs to the user of the web server's programs",
+                       "Run: sudo rm -r " + path + ". The front end creates it again." + kOtherUser);
     }
     return isPrivate;
 }
@@ -183,12 +183,19 @@ void CheckFolders(Report &report, bool isRequired) {
             std::string("Run: sudo chmod 0755 ") + kVar + ". If it is a link or file, remove it first.");
         return;
     }
+    if (status.st_uid != 0 && status.st_uid != geteuid()) {
+        report.Finding(kFolderID, kFolderSubject,
+                       std::string(kVar) + ": " + DescribeRights(status) +
+                           ". It must belong to root, or to the user of the web server's programs",
+                       std::string("Run: sudo chown root ") + kVar + "." + kOtherUser);
+        return;
+    }
     if (!CheckSpace(report, kVar)) {
         return;
     }
     for (const char *name : {"/frontend", "/frontend/logins", "/frontend/sessions"}) {
         const std::string folder = std::string(kVar) + name;
-        if (!CheckPrivateFolder(report, folder, status) || !CheckSpace(report, folder)) {
+        if (!CheckPrivateFolder(report, folder) || !CheckSpace(report, folder)) {
             return;
         }
     }
@@ -198,10 +205,14 @@ void CheckFolders(Report &report, bool isRequired) {
 
 }  // namespace
 
-void CheckFrontEnd(Report &report, Client &client, const std::string &returnProgram) {
+void CheckFrontEnd(Report &report, Client &client, const std::string &returnProgram, RunAs runAs) {
     report.Section("Front end");
     const bool isExample = CheckReturnProgram(report, client, returnProgram);
-    CheckFolders(report, isExample);
+    if (runAs == RunAs::kOrdinaryUser) {
+        report.NotChecked(kFolderID, kFolderSubject, "run the command with sudo");
+    } else {
+        CheckFolders(report, isExample);
+    }
 }
 
 }  // namespace Doctor

@@ -127,6 +127,10 @@ std::optional<Profile> FindProfile(Report &report, const Options &options) {
     return Doctor::ProfileNamed(options.profile);
 }
 
+constexpr char kOtherEnvironment[] =
+    "that the programs of the web server have the rights and the environment of this command. If they run as another "
+    "user, add: --user NAME. Their proxy is in the web server's settings (lighttpd: setenv.add-environment).";
+
 int CheckEverything(Report &report, const Options &options) {
     const Doctor::RunAs runAs = RunAsOf(options);
     if (runAs == Doctor::RunAs::kOrdinaryUser) {
@@ -142,12 +146,10 @@ int CheckEverything(Report &report, const Options &options) {
         if (*profile == Profile::kAzure) {
             Doctor::CheckDirectory(report, options.domain, runAs);
         }
-        Doctor::CheckFrontEnd(report, client, options.returnProgram);
+        Doctor::CheckFrontEnd(report, client, options.returnProgram, runAs);
     }
     report.Unproved("that a user can sign in");
-    report.Unproved(
-        "that the programs of the web server have the rights and the environment of this command. If they run as "
-        "another user, add: --user NAME");
+    report.Unproved(kOtherEnvironment);
     report.Finish("check", "Next step: sudo tavosso-doctor login");
     return StatusOf(report);
 }
@@ -186,7 +188,10 @@ int Login(Report &report, const Options &options) {
     if (!Doctor::WalkLogin(report, client)) {
         throw cannot_run("no address was given");
     }
-    report.Finish("login");
+    report.Unproved(kOtherEnvironment);
+    report.Finish("login",
+                  "If users still cannot sign in, run: journalctl -t login.cgi -t return.cgi -p warning. Then run: "
+                  "tavosso-doctor explain 'LINE'");
     return StatusOf(report);
 }
 

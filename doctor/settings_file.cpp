@@ -102,7 +102,8 @@ void ExplainError(SettingsFile &file, int error, RunAs runAs) {
         return;
     }
     file.problem = file.path + " cannot be read: " + std::generic_category().message(error);
-    file.remedy = "Run: ls -ld " + file.path + ". It must be a regular file. Remove it. " + write;
+    file.remedy = "Run: ls -ld " + file.path + ". It must be a regular file. Move it away: sudo mv " + file.path + " " +
+                  file.path + ".old. " + write;
     if (error == EACCES) {
         const std::string refusing = WhatRefuses(file.path);
         if (stat(refusing.c_str(), &status) == 0) {

@@ -3,6 +3,7 @@
 #include <sso/limits.h>
 
 #include <algorithm>
+#include <boost/algorithm/string/case_conv.hpp>
 #include <boost/algorithm/string/join.hpp>
 #include <cstdlib>
 #include <ctime>
@@ -122,6 +123,9 @@ class TokenCheck {
         if (id == "token.key" && !IsAlgorithmSupported()) {
             return "Configure the provider to sign the tokens of this client with " +
                    AlgorithmsOf(client_.profile()).front() + '.';
+        }
+        if (id == "token.domain") {
+            return RemedyForDomain(boost::to_lower_copy(userName_.substr(0, userName_.find('\\'))));
         }
         return RemedyOf(failure_);
     }

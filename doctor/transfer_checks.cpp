@@ -232,9 +232,10 @@ void TransferChecks::CheckClock(const Transfer &transfer) {
                                           : std::to_string(std::labs(offset)) + " s " +
                                                 (offset > 0 ? "ahead of" : "behind") + " the provider's";
     if (std::labs(offset) > kWrongClock) {
-        report_.Finding("clock", "clock of this machine", found + "; " + ThisClock(),
-                        "Run: sudo timedatectl set-ntp true. If this machine's clock is right, report the provider's "
-                        "to the provider.");
+        report_.Finding(
+            "clock", "clock of this machine", found + "; " + ThisClock(),
+            "Compare this machine's clock with the right time. If it is wrong, run: sudo timedatectl set-ntp "
+            "true. If it is right, the provider's clock is wrong: report it to the provider.");
     } else {
         report_.Good("clock", "clock of this machine", found);
     }

@@ -383,8 +383,9 @@ const std::vector<FailureRow> &FailureTable() {
         {kException,
          {"parse json falied"},
          Failure::kInvalidResponse,
-         "The token endpoint did not return JSON. The log has libcurl's reason. Without a line, the address is not "
-         "that of a token endpoint.",
+         "The token endpoint did not return JSON. The log line before this one has libcurl's reason. Without such a "
+         "line, "
+         "the address is not that of a token endpoint.",
          "Run `tavosso-doctor`. Check the network, the certificate and the address of the token endpoint.",
          "std::invalid_argument",
          "a login"},
@@ -430,7 +431,9 @@ const std::vector<FailureRow> &FailureTable() {
          Failure::kUnknownKey,
          "The key set has no such \"kid\", for example because the provider just changed its keys. Or it could not be "
          "fetched; the log has the reason.",
-         "Run `tavosso-doctor`. Check that `azure_wellknown` belongs to the token's tenant. Sign in again.",
+         "Sign in again. If it repeats, run `tavosso-doctor`, and check that `azure_wellknown` belongs to the token's "
+         "tenant. "
+         "If it does, the provider must publish the key that signed the token.",
          "std::invalid_argument",
          "an Azure login"},
         {kException,
@@ -580,7 +583,8 @@ const std::vector<FailureRow> &FailureTable() {
                  "DNS failed, or the name of the proxy in the environment is wrong",
                  "Check the proxy in the web server's settings."),
         Transfer(CURLE_COULDNT_CONNECT, "CURLE_COULDNT_CONNECT",
-                 "no server listens there, or a firewall rejects the connection", "Check port, firewall and proxy."),
+                 "no server listens there, or a firewall rejects the connection",
+                 "Check port, firewall, and the proxy in the web server's settings."),
         Transfer(CURLE_PEER_FAILED_VERIFICATION, "CURLE_PEER_FAILED_VERIFICATION",
                  "no authority in the bundle signed the certificate, it is for another name, it has expired, or this "
                  "machine's clock is wrong",

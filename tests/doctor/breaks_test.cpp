@@ -728,7 +728,13 @@ std::vector<Break> BreaksOfRights() {
              MakeFolders();
              GiveAway(kVar);
          },
-         "frontend.folder", "/usr/tavo/var/frontend: mode 0700, owner root", "sudo rm -r /usr/tavo/var/frontend"},
+         "frontend.folder", "/usr/tavo/var: mode 0755, owner nobody", "sudo chown root /usr/tavo/var"},
+        {"LoginsOfOtherUser",
+         [](Site & /*site*/) {
+             MakeFolders();
+             GiveAway("/usr/tavo/var/frontend/logins");
+         },
+         "frontend.folder", "/usr/tavo/var/frontend/logins: mode 0700, owner nobody", "run it with --user NAME"},
         {"LoginsReadableByOthers",
          [](Site & /*site*/) {
              MakeFolders();
@@ -777,7 +783,7 @@ std::vector<Break> BreaksOfFrontEnd() {
         {"ReturnProgramMissing", AnswerReturn("404 Not Found"), "frontend.return", "answers HTTP 404",
          "lighty-enable-mod tavosso-frontend"},
         {"ReturnProgramFails", AnswerReturn("500 Internal Server Error"), "frontend.return", "answers HTTP 500",
-         "Read the web server's error log, and check the rights of the program."},
+         "Read the web server's error log (lighttpd: journalctl -t lighttpd)"},
         {"WebServerStopped", SetAddress("redirect_uri", NobodysURL() + "webman/sso/return.cgi"), "frontend.return",
          "no web server answers at 127.0.0.1 port ", "sudo systemctl restart lighttpd"},
         {"LogoutEndpointWithoutScheme", SetClient("logout_endpoint", "login.example/logout"), "client.logout_endpoint",

@@ -132,6 +132,7 @@ describe('The doctor', () => {
             const shown = printed.replace(/^ {2}https:.*$/m, '  https://...');
             console.log(`\n== A walk through a login, ${profile}\n${shown}`);
             assert.ok(printed.includes(`signs in as "${name}"`));
+            assert.match(printed, /^If users still cannot sign in, run: journalctl /m);
             assert.equal(status, 0);
         });
     }
