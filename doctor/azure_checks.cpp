@@ -30,6 +30,9 @@ std::vector<Endpoint> EndpointsOf(Client &client) {
             {"azure_token_endpoint", client->GetTokenEndpoint()}};
 }
 
+/// Returns the tenant in an address; empty if there is none. A query may contain the client's id.
+std::string TenantIn(const std::string &url) { return FindGUID(url.substr(0, url.find('?'))); }
+
 std::string KeysOf(const std::vector<Endpoint> &endpoints) {
     std::vector<std::string> keys;
     std::transform(endpoints.begin(), endpoints.end(), std::back_inserter(keys),
@@ -51,7 +54,7 @@ std::string SharedTenantIn(const std::string &url) {
 std::vector<Endpoint>::const_iterator FindOtherTenant(const std::vector<Endpoint> &endpoints,
                                                       const std::string &tenant) {
     return std::find_if(endpoints.begin(), endpoints.end(), [&](const Endpoint &endpoint) {
-        const std::string found = FindGUID(endpoint.url);
+        const std::string found = TenantIn(endpoint.url);
         return !found.empty() && !boost::iequals(found, tenant);
     });
 }
@@ -68,9 +71,9 @@ bool ReportOtherTenant(Report &report, const std::vector<Endpoint> &endpoints, c
     if (other == endpoints.end()) {
         return false;
     }
-    const std::string found = FindGUID(other->url);
+    const std::string found = TenantIn(other->url);
     const bool isAlone = std::any_of(endpoints.begin(), endpoints.end(), [&](const Endpoint &endpoint) {
-        return boost::iequals(FindGUID(endpoint.url), tenant);
+        return boost::iequals(TenantIn(endpoint.url), tenant);
     });
     report.Finding(
         kTenantID, kTenantSubject,
@@ -151,7 +154,7 @@ void CheckVersion(Report &report, std::vector<Endpoint> endpoints) {
 
 std::string TenantOfAddresses(Client &client) {
     for (const Endpoint &endpoint : EndpointsOf(client)) {
-        if (const std::string tenant = FindGUID(endpoint.url); !tenant.empty()) {
+        if (const std::string tenant = TenantIn(endpoint.url); !tenant.empty()) {
             return boost::to_lower_copy(tenant);
         }
     }

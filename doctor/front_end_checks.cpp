@@ -147,7 +147,11 @@ bool CheckSpace(Report &report, const std::string &folder) {
     return true;
 }
 
-constexpr char kOtherUser[] = " If the programs run as another user than this command, run it with --user NAME.";
+// A finding as root can be correct for programs of another user.
+constexpr char kFindUser[] =
+    "Run: ps -o user= -C lighttpd, for the user of the programs. If it is not root, run: sudo tavosso-doctor --user "
+    "USER. "
+    "Otherwise run: ";
 
 /// Returns whether one of the front end's private folders is as it creates them, or does not exist yet.
 bool CheckPrivateFolder(Report &report, const std::string &path) {
@@ -161,7 +165,7 @@ bool CheckPrivateFolder(Report &report, const std::string &path) {
         report.Finding(kFolderID, kFolderSubject,
                        path + ": " + DescribeRights(status) +
                            ". It must be a folder of mode 0700 that belongs to the user of the web server's programs",
-                       "Run: sudo rm -r " + path + ". The front end creates it again." + kOtherUser);
+                       kFindUser + ("sudo rm -r " + path) + ". The front end creates it again.");
     }
     return isPrivate;
 }
@@ -187,7 +191,7 @@ void CheckFolders(Report &report, bool isRequired) {
         report.Finding(kFolderID, kFolderSubject,
                        std::string(kVar) + ": " + DescribeRights(status) +
                            ". It must belong to root, or to the user of the web server's programs",
-                       std::string("Run: sudo chown root ") + kVar + "." + kOtherUser);
+                       std::string(kFindUser) + "sudo chown root " + kVar);
         return;
     }
     if (!CheckSpace(report, kVar)) {

@@ -191,7 +191,7 @@ int Login(Report &report, const Options &options) {
     report.Unproved(kOtherEnvironment);
     report.Finish("login",
                   "If users still cannot sign in, run: journalctl -t login.cgi -t return.cgi -p warning. Then run: "
-                  "tavosso-doctor explain 'LINE'");
+                  R"(tavosso-doctor explain "LINE")");
     return StatusOf(report);
 }
 

@@ -60,6 +60,13 @@ std::string WithSecret(const std::string &body, const std::string &secret) {
     return body.substr(0, begin) + secret + body.substr(std::min(body.find('&', begin), body.size()));
 }
 
+/// Whether an error of the token endpoint is about the code, which the doctor makes up.
+bool ConcernsCode(const TAVO::Web::FailureRow &row) {
+    const std::string code = row.texts.front();
+    return code == "invalid_grant" || code == "AADSTS54005" || code == "AADSTS70000" || code == "AADSTS70008" ||
+           code == "AADSTS9002313";
+}
+
 class ProviderCheck {
   public:
     ProviderCheck(Report &report, Client &client)
@@ -143,6 +150,10 @@ class ProviderCheck {
                    "Configure the provider to accept client_secret_post for this client: the secret in the form.");
     }
 
+    /// Whether addresses of the document, or of its redirect, may be recommended: the client's secret will be sent
+    /// there.
+    bool IsDiscoverySecure() const { return boost::istarts_with(client_->GetWellknownEndpoint(), "https://"); }
+
     std::string RemedyForDiscovery(const Transfer &transfer, const std::string &address) {
         if (IsProvidersError(transfer)) {
             return kWait;
@@ -160,7 +171,8 @@ class ProviderCheck {
         const std::string base = WithoutTrailingSlashes(address);
         const std::string issuer = WithoutTrailingSlashes(TAVO::Web::StringMember(discovery_, "issuer"));
         for (const std::string &variant : {base, base + kWellknownPath, issuer + kWellknownPath, location}) {
-            const bool isNew = variant != address && boost::istarts_with(variant, "https://");
+            const bool isNew = variant != address && boost::istarts_with(variant, "https://") &&
+                               (variant != location || IsDiscoverySecure());
             if (isNew && IsDiscoveryDocument(TAVO::Web::ParseObject(Fetch(variant).content))) {
                 return variant;
             }
@@ -190,6 +202,9 @@ class ProviderCheck {
             report_.Note(id, member, "the provider does not publish it");
         } else if (published == configured) {
             report_.Good(id, member, "as configured");
+        } else if (!IsDiscoverySecure()) {
+            report_.NotChecked(id, member,
+                               "others on the network can change the document: its address is not https://");
         } else if (client_.Azure() != nullptr && !DoAddressesAgree(client_)) {
             report_.NotChecked(id, member, "the addresses in the file do not agree");
         } else {
@@ -284,6 +299,9 @@ class ProviderCheck {
 
     /// Returns an address of the discovery document. Fetches the document for WebSphere, whose logins do not use it.
     std::string Published(const char *member) {
+        if (!IsDiscoverySecure()) {
+            return {};
+        }
         if (client_.Azure() == nullptr && discovery_.isNull() && !client_->GetWellknownEndpoint().empty()) {
             client_->RequestWellknownInfo(discovery_);
             LastTransfer(report_);
@@ -361,7 +379,7 @@ class ProviderCheck {
                            (Published("token_endpoint") == client_->GetTokenEndpoint()
                                 ? "The discovery document has the same address. Report this to the provider."
                                 : SetEndpoint("token_endpoint"));
-        } else if (error == "invalid_grant") {
+        } else if (error == "invalid_grant" || (row != nullptr && ConcernsCode(*row))) {
             ReportRejectedCode(check, error);
         } else if (row != nullptr && row->texts.front() != error) {
             check.remedy = WithoutBackticks(row->remedy);  // a code of Azure AD in the description
@@ -395,13 +413,15 @@ class ProviderCheck {
         }
     }
 
-    /// A provider that answers a wrong secret with another error has accepted the right one.
+    /// A provider that rejects a wrong secret before it checks the code has accepted the right one.
     bool IsOtherWithWrongSecret(const std::string &error) {
         std::string response;
         client_->RequestTokenEndpoint(response, WithSecret(client_->GetIDTokenReqParams(), kTestSecret));
         const Transfer transfer = LastTransfer(report_);
         const std::string other = TAVO::Web::StringMember(TAVO::Web::ParseObject(response), "error");
-        return transfer.result == CURLE_OK && other != error && (!other.empty() || transfer.status == kUnauthorized);
+        const bool isRejected = other == "invalid_client" || other == "unauthorized_client" ||
+                                other == "access_denied" || transfer.status == kUnauthorized;
+        return transfer.result == CURLE_OK && isRejected && other != error;
     }
 
     std::string LibraryOn(const std::string &response) {

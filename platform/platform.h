@@ -59,7 +59,8 @@ int TLIBCBase64Decode(const char *src, size_t len, char *dst, size_t *len_inout)
  * Replaces the DNS name of the domain in DOMAIN\\user by its NetBIOS name, and copies the rest. The library passes the
  * DNS name in capitals.
  *
- * A failure is logged by syslog(3), in one line without the control characters of `src`: the provider chooses the name.
+ * The function itself logs a failure by syslog(3), in one line without the control characters of `src`: the provider
+ * chooses the name.
  *
  * A child process may do the work. It has ended and has been waited for when the function returns. The program may
  * receive SIGCHLD for it, and a program that waits for any child may receive its process id.

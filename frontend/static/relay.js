@@ -66,8 +66,12 @@ export function describe(fragment) {
 }
 
 async function show({headline, explanation, reason, action, onward, atOnce}) {
-    const {default: messages} = await import(`./messages/${preferredLanguage(navigator.languages)}.js`);
     const element = (id) => document.getElementById(id);
+    element('reason').textContent = reason;
+    element('details').hidden = reason === '';
+    element('onward').href = onward;
+    element('back').hidden = onward === START_PAGE || atOnce;
+    const {default: messages} = await import(`./messages/${preferredLanguage(navigator.languages)}.js`);
     document.documentElement.lang = messages.language;
     document.documentElement.dir = messages.direction;
     document.title = messages[headline];
@@ -75,12 +79,8 @@ async function show({headline, explanation, reason, action, onward, atOnce}) {
     element('headline').textContent = messages[headline];
     element('explanation').textContent = messages[explanation];
     element('unfold').textContent = messages['failure.details'];
-    element('reason').textContent = reason;
-    element('details').hidden = reason === '';
     element('onward').textContent = messages[action];
-    element('onward').href = onward;
     element('start').textContent = messages['account.back'];
-    element('back').hidden = onward === START_PAGE || atOnce;
 }
 
 if (globalThis.document) {

@@ -138,6 +138,7 @@ void RejectsNull(const Subject &subject) {
     std::size_t size = kPlatformBuffer;
     NoteCall("null with len 4");
     Expect(subject.functions.decodeBase64(nullptr, 4, buffer.Data(), &size) == 0, "null with len 4: succeeds");
+    Expect(buffer.IsUntouched() && size == kPlatformBuffer, "null with len 4: writes to dst or len_inout");
     NoteCall("dst is null");
     Expect(subject.functions.decodeBase64(kSample, sizeof kSample - 1, nullptr, &size) == 0, "dst is null: succeeds");
     NoteCall("len_inout is null");

@@ -79,12 +79,13 @@ void RejectsNull(const Subject &subject) {
     NoteCall("null with len 1");
     Expect(subject.functions.encodeBase64(nullptr, 1, buffer.Data(), 1, buffer.Size(), 0, 1) == 0,
            "null with len 1: succeeds");
+    Expect(buffer.IsUntouched(), "null with len 1: writes to dst");
     NoteCall("dst is null");
     Expect(subject.functions.encodeBase64(kSample, 4, nullptr, 1, kPlatformBuffer, 0, 1) == 0, "dst is null: succeeds");
 }
 
 void LeavesBufferUntouchedOnFailure(const Subject &subject) {
-    for (std::size_t size = 0; size < Base64(kSample).size(); ++size) {
+    for (std::size_t size = 0; size <= Base64(kSample).size(); ++size) {
         Buffer buffer(size);
         const int result = Encode(subject, kSample, sizeof kSample - 1, buffer.Data(), size);
         Expect(result != 0 || buffer.IsUntouched(), Call(kSample, size) + " fails and writes to dst");

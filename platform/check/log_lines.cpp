@@ -14,7 +14,11 @@ void AddLine(const char *format, std::va_list arguments) {
     char line[4096];
     // clang-tidy 14 does not see that the callers below have started the arguments.
     std::vsnprintf(line, sizeof line, format, arguments);  // NOLINT(clang-analyzer-valist.Uninitialized)
-    lines.emplace_back(line);
+    std::string text = line;
+    if (!text.empty() && text.back() == '\n') {
+        text.pop_back();  // which syslog(3) ignores
+    }
+    lines.push_back(std::move(text));
 }
 
 }  // namespace

@@ -61,19 +61,23 @@ void RejectsNameWithoutUser(const Subject &subject) { ExpectRejected(subject, Do
 
 void RejectsUnknownDomain(const Subject &subject) { ExpectRejected(subject, kUnknownName); }
 
-void RejectsNull(const Subject &subject) {
-    Buffer buffer(kUsableSize);
-    Expect(LookUp(subject, nullptr, buffer.Data(), kUsableSize) < 0, Call(nullptr, kUsableSize) + " is not negative");
-    NoteCall("dst is null");
-    Expect(subject.functions.lookUp(kUnknownName, nullptr, kUsableSize) < 0, "dst is null: the result is not negative");
-}
-
 void ExpectOneLine(const std::string &call) {
     const std::size_t count = TakeLogLines().size();
     Expect(count == 1, call + " logs " + std::to_string(count) + " lines");
 }
 
+void RejectsNull(const Subject &subject) {
+    Buffer buffer(kUsableSize);
+    TakeLogLines();  // of the loading
+    Expect(LookUp(subject, nullptr, buffer.Data(), kUsableSize) < 0, Call(nullptr, kUsableSize) + " is not negative");
+    Expect(buffer.IsUntouched(), Call(nullptr, kUsableSize) + " writes to dst");
+    ExpectOneLine(Call(nullptr, kUsableSize));
+    NoteCall("dst is null");
+    Expect(subject.functions.lookUp(kUnknownName, nullptr, kUsableSize) < 0, "dst is null: the result is not negative");
+}
+
 void LogsOneLineForEachRejection(const Subject &subject) {
+    TakeLogLines();  // of the loading
     for (const std::string &name : RejectedNames(subject)) {
         Buffer buffer(kUsableSize);
         LookUp(subject, name.c_str(), buffer.Data(), kUsableSize);
@@ -82,13 +86,15 @@ void LogsOneLineForEachRejection(const Subject &subject) {
 }
 
 void LogsNoControlCharacter(const Subject &subject) {
-    const std::string name = std::string("A\nB\rC\tD\x1b[2J\x7f.") + kUnknownName;
-    Buffer buffer(kUsableSize);
-    LookUp(subject, name.c_str(), buffer.Data(), kUsableSize);
-    for (const std::string &line : TakeLogLines()) {
-        const bool isPrintable = std::none_of(
-            line.begin(), line.end(), [](char c) { return static_cast<unsigned char>(c) < ' ' || c == '\x7f'; });
-        Expect(isPrintable, Call(name.c_str(), kUsableSize) + " logs " + Quoted(line));
+    const std::string controls = "A\nB\rC\tD\x1b[2J\x7f.";
+    for (const std::string &name : {controls + kUnknownName, controls, '\\' + controls, kUnknownName + controls}) {
+        Buffer buffer(kUsableSize);
+        LookUp(subject, name.c_str(), buffer.Data(), kUsableSize);
+        for (const std::string &line : TakeLogLines()) {
+            const bool isPrintable = std::none_of(
+                line.begin(), line.end(), [](char c) { return static_cast<unsigned char>(c) < ' ' || c == '\x7f'; });
+            Expect(isPrintable, Call(name.c_str(), kUsableSize) + " logs " + Quoted(line));
+        }
     }
 }
 

@@ -22,7 +22,8 @@ namespace PlatformCheck {
 
 namespace {
 
-constexpr int kDescriptors = 1024;  // the system uses the lowest free number
+constexpr int kDescriptors = 1024;     // the system uses the lowest free number
+constexpr int kRestorer = 0x04000000;  // SA_RESTORER of the kernel; the C library sets it whenever an action is set
 
 template <typename... Values>
 std::string Joined(const Values &...values) {
@@ -71,7 +72,8 @@ void CaptureSignals(ProcessState &state) {
         struct sigaction action = {};
         if (sigaction(signal, nullptr, &action) == 0) {
             state["the handling of signal " + std::to_string(signal)] =
-                Joined(reinterpret_cast<const void *>(action.sa_handler), action.sa_flags, Members(action.sa_mask));
+                Joined(reinterpret_cast<const void *>(action.sa_handler), action.sa_flags & ~kRestorer,
+                       Members(action.sa_mask));
         }
     }
     sigset_t blocked = {};

@@ -91,12 +91,14 @@ void RejectsLongText(const Subject &subject) {
 void RejectsNull(const Subject &subject) {
     Buffer buffer(100);
     Expect(Encode(subject, nullptr, buffer.Data(), buffer.Size()) != 0, Call(nullptr, buffer.Size()) + " returns 0");
+    Expect(buffer.IsUntouched(), Call(nullptr, buffer.Size()) + " writes to dst");
     NoteCall(Call("a", 100) + " without dst");
     Expect(subject.functions.encodeURL("a", nullptr, 100) != 0, Call("a", 100) + " without dst returns 0");
 }
 
 void LeavesBufferUntouchedOnFailure(const Subject &subject) {
-    for (std::size_t size = 0; size < std::strlen(kSample); ++size) {
+    const std::size_t needed = Encoded(subject, kSample).size();
+    for (std::size_t size = 0; size < needed; ++size) {
         Buffer buffer(size);
         const int result = Encode(subject, kSample, buffer.Data(), size);
         Expect(result == 0 || buffer.IsUntouched(), Call(kSample, size) + " fails and writes to dst");

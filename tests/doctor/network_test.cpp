@@ -79,6 +79,29 @@ TEST_F(Network, ProvidersOwnWordForWrongCodeIsNoFinding) {
     EXPECT_THAT(Ask({}).Find("token_endpoint.client", "note").remedy, HasSubstr("tavosso-doctor login"));
 }
 
+TEST_F(Network, RejectedTestCodeIsNoFinding) {
+    for (const char *description : {"AADSTS9002313: malformed", "AADSTS70000", "AADSTS70008", "AADSTS54005"}) {
+        appliance.RefuseCodes("invalid_grant", description);
+        EXPECT_THAT(Ask({}).Find("token_endpoint.client", "good").found, HasSubstr("did not reject")) << description;
+        appliance.RefuseCodes("invalid_request", description);
+        EXPECT_THAT(Ask({}).Find("token_endpoint.client", "note").remedy, HasSubstr("login")) << description;
+    }
+}
+
+TEST_F(Network, BusyProviderProvesNoAcceptance) {
+    appliance.AnswerAt("/token_endpoint", [](const std::string &request) {
+        const bool isClientRight = PercentDecode(request).find(kClientSecret) != std::string::npos;
+        return HTTPAnswer(isClientRight ? R"({"error": "invalid_grant"})" : R"({"error": "temporarily_unavailable"})",
+                          isClientRight ? "400 Bad Request" : "503 Service Unavailable");
+    });
+    EXPECT_THAT(Ask({}).Find("token_endpoint.client", "good").found, HasSubstr("did not reject"));
+}
+
+TEST_F(Network, ClientIDInQueryIsNoTenant) {
+    appliance.SetClient("wellknown", appliance.URL("/discovery") + "?appid=00000000-1111-2222-3333-444444444444");
+    EXPECT_THAT(Ask({}).Findings(), testing::IsEmpty());
+}
+
 TEST_F(Network, ReportsAcceptanceOnlyIfWrongSecretIsRejected) {
     EXPECT_EQ(Ask({}).Find("token_endpoint.client", "good").found, "the provider accepts the client's id and secret");
     appliance.RefuseCodes("invalid_grant");

@@ -159,6 +159,12 @@ test('has every message in every language', () => {
     assert.deepEqual(Object.keys(others).sort(), ['de', 'es', 'fr', 'ja', 'zh']);
     const sources = ['index', 'account', 'logout', 'cgi_program', 'page', 'static/relay.js', 'static/reasons.js'].map(
         (name) => readFileSync(new URL(`../../frontend/${name}${/\./.test(name) ? '' : '.cpp'}`, import.meta.url), 'utf8'));
+    const used = /["']((?:start|signed_in|account|sign_out|method|success|failure|signed_out|reason)\.[a-z_]+)["']/g;
+    for (const source of sources) {
+        for (const [, id] of source.matchAll(used)) {
+            assert.ok(id in en, `${id} is not in the catalogue`);
+        }
+    }
     for (const [id, text] of Object.entries(en)) {
         assert.ok(sources.some((source) => source.includes(id)), `${id} is not used`);
         for (const [language, texts] of Object.entries(others)) {

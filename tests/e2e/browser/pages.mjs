@@ -123,6 +123,8 @@ function defineLanguages(stage) {
             for (const [name, address] of Object.entries(pages)) {
                 await page.goto(new URL(address, stage.origin).href);
                 await page.locator(`html[lang="${language}"]`).waitFor();
+                // The heading of the static relay page, which the script replaces.
+                await page.getByText('Single sign-on', {exact: true}).waitFor({state: 'detached'});
                 await page.evaluate(stage.axe);
                 assert.deepEqual(await findViolations(page), [], name);
                 await page.screenshot({path: path.join(stage.pictures, `${name}.${locale}.png`)});
