@@ -63,8 +63,14 @@ std::string WithSecret(const std::string &body, const std::string &secret) {
 /// Whether an error of the token endpoint is about the code, which the doctor makes up.
 bool ConcernsCode(const TAVO::Web::FailureRow &row) {
     const std::string code = row.texts.front();
-    return code == "invalid_grant" || code == "AADSTS54005" || code == "AADSTS70000" || code == "AADSTS70008" ||
-           code == "AADSTS9002313";
+    return code == "invalid_grant" || code == "invalid_request" || code == "AADSTS54005" || code == "AADSTS70000" ||
+           code == "AADSTS70008" || code == "AADSTS9002313";
+}
+
+/// Whether an error of the token endpoint is about the client's id or secret, without details.
+bool IsOfClient(const TAVO::Web::FailureRow &row) {
+    const std::string code = row.texts.front();
+    return code == "invalid_client" || code == "unauthorized_client";
 }
 
 class ProviderCheck {
@@ -379,19 +385,15 @@ class ProviderCheck {
                            (Published("token_endpoint") == client_->GetTokenEndpoint()
                                 ? "The discovery document has the same address. Report this to the provider."
                                 : SetEndpoint("token_endpoint"));
-        } else if (error == "invalid_grant" || (row != nullptr && ConcernsCode(*row))) {
+        } else if (error == "invalid_grant" || row == nullptr || ConcernsCode(*row)) {
             ReportRejectedCode(check, error);
-        } else if (row != nullptr && row->texts.front() != error) {
-            check.remedy = WithoutBackticks(row->remedy);  // a code of Azure AD in the description
-        } else if (error == "invalid_client" || error == "unauthorized_client") {
+        } else if (IsOfClient(*row)) {
             check.remedy = "Compare " + prefix_ +
                            "client_id with the provider's. If it is correct, create a new client "
                            "secret there, which may have expired, and set " +
                            prefix_ + "client_secret to it. The provider must accept client_secret_post.";
-        } else if (row != nullptr && error != "invalid_request") {
-            check.remedy = WithoutBackticks(row->remedy);
         } else {
-            ReportRejectedCode(check, error);
+            check.remedy = WithoutBackticks(row->remedy);
         }
         report_.Add(check);
     }

@@ -40,10 +40,10 @@ std::string PreferredLanguage(const std::string &acceptLanguage) {
     std::string preferred = "en";
     double most = 0;
     for (const std::string &item : items) {
-        const auto [language, weight] = ReadPreference(item);
-        if (weight > most && weight <= 1 && FindCatalogue(language) != nullptr) {
-            preferred = language;
-            most = weight;
+        const Preference preference = ReadPreference(item);
+        if (preference.weight > most && preference.weight <= 1 && FindCatalogue(preference.language) != nullptr) {
+            preferred = preference.language;
+            most = preference.weight;
         }
     }
     return preferred;
