@@ -13,7 +13,8 @@ function(tavosso_options target)
     target_compile_features(${target} PRIVATE cxx_std_17)
     set_target_properties(${target} PROPERTIES CXX_EXTENSIONS OFF)
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR})
-    target_compile_options(${target} PRIVATE -Wall -Wextra -Wshadow -Wconversion)
+    # Without -Wno-psabi, g++ for 32-bit ARM mentions each call whose convention differs from that of g++ 6.
+    target_compile_options(${target} PRIVATE -Wall -Wextra -Wshadow -Wconversion -Wno-psabi)
     if(TAVOSSO_HARDENING)
         # Not _FORTIFY_SOURCE: it renames the library's calls, and the packager sets it.
         target_compile_options(${target} PRIVATE -fstack-protector-strong -fstack-clash-protection

@@ -193,6 +193,10 @@ std::function<void(Site &)> WriteText(const char *path, const std::string &conte
     return [path, content](Site & /*site*/) { WriteFile(path, content); };
 }
 
+std::function<void(Site &)> RunWith(const Strings &arguments) {
+    return [arguments](Site &site) { site.arguments = arguments; };
+}
+
 /// Inserts text after the first brace.
 std::function<void(Site &)> InsertIntoClientFile(const std::string &inserted) {
     return [inserted](Site & /*site*/) {
@@ -345,11 +349,8 @@ std::vector<Break> BreaksOfDomains() {
          "directory.duplicate_key", "line 2: the key \"corp.example\" occurs twice", "Remove one of the lines."},
         {"DomainTableNotUTF8", WriteText(kDomainTable, "{\"corp.example\": \"CORP\", \"b\xfc.example\": \"B\"}"),
          "directory.encoding", "line 1, column 28: a byte that is not UTF-8", "Save the file as UTF-8"},
-        {"DomainUnknown",
-         [](Site &site) {
-             site.arguments = {"--domain", "alice@lab.example"};
-         },
-         "directory.domain", "is not converted", R"(domains.conf: {"lab.example": "NAME"})"},
+        {"DomainUnknown", RunWith({"--domain", "alice@lab.example"}), "directory.domain", "is not converted",
+         R"(domains.conf: {"lab.example": "NAME"})"},
     };
 }
 
