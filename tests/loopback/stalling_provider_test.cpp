@@ -30,6 +30,12 @@ using ::testing::ValuesIn;
 constexpr std::time_t kDay = 24 * 60 * 60;
 constexpr std::time_t kLongestConnecting = 300;  // libcurl's limit, including the TLS handshake
 
+#ifdef SYS_clock_gettime64  // on 32-bit systems
+constexpr long kClockCall = sizeof(std::time_t) > sizeof(long) ? SYS_clock_gettime64 : SYS_clock_gettime;
+#else
+constexpr long kClockCall = SYS_clock_gettime;
+#endif
+
 std::atomic<std::time_t> timePassed{0};
 
 }  // namespace
@@ -37,7 +43,7 @@ std::atomic<std::time_t> timePassed{0};
 }  // namespace Test
 
 extern "C" int clock_gettime(clockid_t clock, timespec *time) {
-    const long result = syscall(SYS_clock_gettime, clock, time);
+    const long result = syscall(Test::kClockCall, clock, time);
     time->tv_sec += Test::timePassed;
     return static_cast<int>(result);
 }

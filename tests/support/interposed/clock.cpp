@@ -8,6 +8,9 @@ namespace Test {
 
 namespace {
 
+// glibc's name of the function if a time_t is longer than a word.
+constexpr const char *kTime = sizeof(std::time_t) > sizeof(long) ? "__time64" : "time";
+
 std::optional<std::time_t> clockTime;
 
 }  // namespace
@@ -21,7 +24,7 @@ extern "C" time_t time(time_t *result) noexcept {
     if (Test::ShouldFail("time", CALLER)) {
         return -1;
     }
-    const time_t now = Test::clockTime ? *Test::clockTime : Test::Next(time, "time")(nullptr);
+    const time_t now = Test::clockTime ? *Test::clockTime : Test::Next(time, Test::kTime)(nullptr);
     if (result != nullptr) {
         *result = now;
     }
