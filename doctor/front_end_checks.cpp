@@ -149,9 +149,8 @@ bool CheckSpace(Report &report, const std::string &folder) {
 
 // A finding as root can be correct for programs of another user.
 constexpr char kFindUser[] =
-    "Run: ps -o user= -C lighttpd, for the user of the programs. If it is not root, run: sudo tavosso-doctor --user "
-    "USER. "
-    "Otherwise run: ";
+    "Run: ps -o user= -C lighttpd, for the user of the programs. "
+    "If it is not root, run: sudo tavosso-doctor --user USER. Otherwise run: ";
 
 /// Returns whether one of the front end's private folders is as it creates them, or does not exist yet.
 bool CheckPrivateFolder(Report &report, const std::string &path) {
