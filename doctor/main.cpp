@@ -224,7 +224,6 @@ int Explain(const Options &options) {
 int main(int argc, char **argv) try {
     Options options;
     CLI::App app("Finds out why users cannot sign in, and prints a remedy for each finding.", "tavosso-doctor");
-    app.footer(kExamples);
     app.set_version_flag("--version", "tavosso-doctor " TAVOSSO_VERSION);
     CLI::Option *json = app.add_flag("--json", options.isJson, "Write one JSON object");
     CLI::Option *verbose =
@@ -255,6 +254,10 @@ int main(int argc, char **argv) try {
 
     try {
         app.parse(argc, argv);
+    } catch (const CLI::CallForHelp &) {
+        // Newer versions of CLI11 would wrap a footer.
+        std::cout << app.help() << kExamples << '\n';
+        return kHealthy;
     } catch (const CLI::ParseError &error) {
         return app.exit(error) == 0 ? kHealthy : kCannotRun;
     }

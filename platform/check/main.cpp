@@ -118,7 +118,6 @@ int CheckAll(const Options &options) {
 int main(int argc, char **argv) try {
     Options options;
     CLI::App app("Checks whether libraries keep the promises of platform/platform.h.", "tavosso-platform-check");
-    app.footer(kExamples);
     app.set_version_flag("--version", "tavosso-platform-check " TAVOSSO_VERSION);
     app.add_option("LIBRARY", options.libraries, "Libraries that define the functions, or are linked to them")
         ->capture_default_str();
@@ -128,6 +127,10 @@ int main(int argc, char **argv) try {
         ->capture_default_str();
     try {
         app.parse(argc, argv);
+    } catch (const CLI::CallForHelp &) {
+        // Newer versions of CLI11 would wrap a footer.
+        std::cout << app.help() << kExamples << '\n';
+        return kAllKept;
     } catch (const CLI::ParseError &error) {
         return app.exit(error) == 0 ? kAllKept : kCannotRun;
     }

@@ -138,7 +138,8 @@ TEST_F(PlatformCheck, PrintsVersionAndHelp) {
     EXPECT_THAT(version.output, testing::MatchesRegex("tavosso-platform-check [0-9]+\\.[0-9]+\\.[0-9]+\n"));
     const Findings help = RunCheck("--help");
     EXPECT_EQ(help.status, 0);
-    EXPECT_THAT(help.output, AllOf(HasSubstr("LIBRARY"), HasSubstr("--lookup"), HasSubstr("--timeout")));
+    EXPECT_THAT(help.output, AllOf(HasSubstr("LIBRARY"), HasSubstr("--lookup"), HasSubstr("--timeout"),
+                                   HasSubstr("Examples:\n  tavosso-platform-check ")));
 }
 
 struct Defect {
