@@ -124,10 +124,11 @@ bool IsVersion2(const Endpoint &endpoint) { return boost::icontains(endpoint.url
 std::string AddressOfVersion1(const std::string &url) { return boost::ireplace_first_copy(url, "/v2.0/", "/"); }
 
 /// Azure AD has two versions of each endpoint. Tokens of one are not those of the other.
-void CheckVersion(Report &report, std::vector<Endpoint> endpoints) {
-    const auto firstOfVersion1 = std::stable_partition(endpoints.begin(), endpoints.end(), IsVersion2);
-    const std::vector<Endpoint> version2(endpoints.begin(), firstOfVersion1);
-    const std::vector<Endpoint> version1(firstOfVersion1, endpoints.end());
+void CheckVersion(Report &report, const std::vector<Endpoint> &endpoints) {
+    std::vector<Endpoint> version2;
+    std::vector<Endpoint> version1;
+    std::partition_copy(endpoints.begin(), endpoints.end(), std::back_inserter(version2), std::back_inserter(version1),
+                        IsVersion2);
     if (version2.empty()) {
         return;
     }
