@@ -10,6 +10,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <boost/algorithm/string/predicate.hpp>
 #include <cerrno>
 #include <csignal>
 #include <fstream>
@@ -94,10 +95,7 @@ class Start {
     }
 
     pid_t Command(Strings words, const Strings &variables) {
-        Strings environment = variables;
-        for (char **variable = environ; *variable != nullptr; ++variable) {
-            environment.emplace_back(*variable);
-        }
+        Strings environment = EnvironmentWith(variables);
         pid_t process = -1;
         Require(posix_spawn(&process, words.front().c_str(), &actions_, &attributes_, Pointers(words).data(),
                             Pointers(environment).data()) == 0,
@@ -106,6 +104,21 @@ class Start {
     }
 
   private:
+    /// This process's environment with these variables, each name once: of two values, libc reads the first, and
+    /// qemu-user passes on the last.
+    static Strings EnvironmentWith(const Strings &variables) {
+        Strings environment = variables;
+        for (char **variable = environ; *variable != nullptr; ++variable) {
+            const std::string text = *variable;
+            const std::string assignment = text.substr(0, text.find('=') + 1);
+            if (std::none_of(variables.begin(), variables.end(),
+                             [&](const std::string &other) { return boost::starts_with(other, assignment); })) {
+                environment.push_back(text);
+            }
+        }
+        return environment;
+    }
+
     static std::vector<char *> Pointers(Strings &texts) {
         std::vector<char *> pointers;
         for (std::string &text : texts) {
