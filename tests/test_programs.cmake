@@ -42,8 +42,8 @@ endfunction()
 function(tavosso_add_test label name)
     tavosso_label_program(${label} ${name})
     add_test(NAME ${label}.${name} COMMAND ${PROJECT_SOURCE_DIR}/tools/private-root $<TARGET_FILE:${name}>)
-    # qemu is ten to fifteen times slower.
-    set_tests_properties(${label}.${name} PROPERTIES LABELS ${label} TIMEOUT $<IF:$<BOOL:${CMAKE_CROSSCOMPILING}>,3600,600>)
+    # qemu is up to fifty times slower.
+    set_tests_properties(${label}.${name} PROPERTIES LABELS ${label} TIMEOUT $<IF:$<BOOL:${CMAKE_CROSSCOMPILING}>,5000,600>)
 endfunction()
 
 function(tavosso_test label name)
