@@ -43,7 +43,7 @@ function(tavosso_add_test label name program)
     tavosso_label_program(${label} ${program})
     add_test(NAME ${label}.${name} COMMAND ${PROJECT_SOURCE_DIR}/tools/private-root $<TARGET_FILE:${program}>)
     # qemu is up to fifty times slower.
-    set_tests_properties(${label}.${name} PROPERTIES LABELS ${label} TIMEOUT $<IF:$<BOOL:${CMAKE_CROSSCOMPILING}>,5000,600>)
+    set_tests_properties(${label}.${name} PROPERTIES LABELS ${label} TIMEOUT $<IF:$<BOOL:${CMAKE_CROSSCOMPILING}>,3000,600>)
 endfunction()
 
 function(tavosso_test label name)
