@@ -79,7 +79,7 @@ TEST_P(Token, StopsWhereLibraryStopsForAnyChangedByte) {
     const unsigned int seed = std::random_device()();
     std::cout << "seed " << seed << std::endl;
     Mutations mutations(seed);
-    // qemu-user takes seconds for each.
+    // qemu-user takes seconds for each token.
     const int count = IsEmulated() ? kMutations / 10 : kMutations;
     for (int i = 0; i < count && !HasFailure(); ++i) {
         SCOPED_TRACE("mutation " + std::to_string(i) + " of seed " + std::to_string(seed));
